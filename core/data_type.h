@@ -1,0 +1,32 @@
+// The vocabulary of pixel types that the RAW, EBN, SER and EMI readers share, with the name and the bit
+// count that the shell shows for each. The MRC family numbers its pixel types itself (mrc_file_info.h).
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+namespace Qel::Lumetra::ShellExt {
+
+/// The values are part of the vocabulary, gaps included; any value that is not listed is unknown.
+enum class DataType : std::uint32_t {
+  kUInt8 = 0,
+  kUInt16 = 1,
+  kUInt32 = 2,
+  kInt8 = 4,
+  kInt16 = 5,
+  kInt32 = 6,
+  kFloat32 = 8,
+  kFloat64 = 9,
+  kComplexFloat32 = 10,  // a pair of 32-bit floats, 64 bits in all
+  kComplexFloat64 = 13,  // a pair of 64-bit floats, 128 bits in all
+  kRgb24 = 16,
+  kBgr24 = 18,
+};
+
+/// The display name, for instance "16 bit signed"; "Unknown" for a value that is not listed.
+std::wstring DataTypeName(DataType type);
+
+/// Bits of one pixel; 0 for a value that is not listed.
+std::int32_t BitsPerPixel(DataType type);
+
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,199 @@
+#include "frame_reader.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <cstdlib>
+#include <memory>
+#include <utility>
+
+#include "frame_renderer.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+// Large enough to read at the speed of the page cache, small enough to stay in the processor's cache while
+// the band is reduced.
+constexpr std::int64_t kBandBytes = 256 * 1024;
+
+// Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
+// picture is refused when it has more pixels than bytes and more than this.
+constexpr std::int64_t kMostSharedPixels = 1024 * 1024;
+
+// Reading band by band is given up for reading column by column when it would read the block this often.
+constexpr std::int64_t kMostPasses = 8;
+
+/// Whether the layout has pixels, all inside of its block, and not out of proportion to its bytes.
+bool IsReadable(const FrameLayout& layout) {
+  if (layout.size.width < 1 || layout.size.height < 1) return false;
+  const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
+  if (pixels > std::max(layout.blockBytes, kMostSharedPixels)) return false;
+  const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
+  const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
+  const std::int64_t first = layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
+  const std::int64_t last = layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
+  return first >= 0 && last + BytesPerPixel(layout.format) <= layout.blockBytes;
+}
+
+/// Whether the stream holds the layout's block, so that a file cut short is refused before any work. The
+/// stream is left as a short read would leave it.
+bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
+  if (layout.blockPosition < 0) {
+    stream.setstate(std::ios_base::failbit);
+    return false;
+  }
+  stream.seekg(0, std::ios_base::end);
+  const std::int64_t size = stream.tellg();
+  if (!stream.good()) return false;
+  if (size - layout.blockPosition >= layout.blockBytes) return true;
+  stream.setstate(std::ios_base::eofbit | std::ios_base::failbit);
+  return false;
+}
+
+/// Reads the pixels that a renderer wants, through one buffer, and hands them over in pieces.
+class BandReader {
+ public:
+  BandReader(std::istream& stream, const FrameLayout& layout, FrameRenderer& renderer)
+      : stream_(stream),
+        layout_(layout),
+        renderer_(renderer),
+        factor_(renderer.reduction().factor),
+        width_(renderer.reduction().size.width * factor_),
+        height_(renderer.reduction().size.height * factor_),
+        pixelBytes_(BytesPerPixel(layout.format)),
+        pixelStep_(std::abs(layout.pixelStride)),
+        rowStep_(std::abs(layout.rowStride)),
+        bufferBytes_(std::min(kBandBytes, layout.blockBytes)),
+        buffer_(std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bufferBytes_))) {}
+
+  bool ReadFrame() {
+    const std::int32_t rows = RowsThatFit(width_);
+    const std::int64_t bands = rows == 0 ? height_ : (height_ + rows - 1) / rows;
+    const std::int64_t bytes = bands * Span(width_, std::max(rows, 1));
+    return bytes / kMostPasses > layout_.blockBytes ? ReadBlockColumns() : ReadBands(rows);
+  }
+
+ private:
+  /// Bytes from the first to the last byte of a rectangle of pixels.
+  std::int64_t Span(std::int64_t columns, std::int64_t rows) const {
+    return (columns - 1) * pixelStep_ + (rows - 1) * rowStep_ + pixelBytes_;
+  }
+
+  /// How many steps fit into `bytes` bytes behind what is already there, at most `most`.
+  static std::int32_t StepsThatFit(std::int64_t bytes, std::int64_t step, std::int32_t most) {
+    if (bytes < 0) return 0;
+    return step == 0 ? most : static_cast<std::int32_t>(std::min<std::int64_t>(most, bytes / step + 1));
+  }
+
+  std::int32_t RowsThatFit(std::int32_t columns) const {
+    return StepsThatFit(bufferBytes_ - Span(columns, 1), rowStep_, height_);
+  }
+
+  /// Bands of whole rows in the order of the file, from the bottom for a bottom-up frame. A row of blocks
+  /// that is larger than the buffer is read in parts from its top, because that is the order of its sums.
+  bool ReadBands(std::int32_t rowsThatFit) {
+    const std::int32_t bandRows = std::max(rowsThatFit / factor_, 1) * factor_;
+    const std::int32_t bands = (height_ + bandRows - 1) / bandRows;
+    for (std::int32_t i = 0; i < bands; ++i) {
+      const std::int32_t top = (layout_.rowStride < 0 ? bands - 1 - i : i) * bandRows;
+      const std::int32_t end = std::min(bandRows, height_ - top) + top;
+      for (std::int32_t y = top; y < end;) {
+        const std::int32_t rows = std::min(std::max(rowsThatFit, 1), end - y);
+        if (!(rowsThatFit > 0 ? ReadPiece(0, y, width_, rows) : ReadRowInParts(y))) return false;
+        y += rows;
+      }
+    }
+    return true;
+  }
+
+  /// A row that is larger than the buffer.
+  bool ReadRowInParts(std::int32_t y) {
+    const std::int32_t columns = StepsThatFit(bufferBytes_ - pixelBytes_, pixelStep_, width_);
+    for (std::int32_t x = 0; x < width_; x += columns) {
+      if (!ReadPiece(x, y, std::min(columns, width_ - x), 1)) return false;
+    }
+    return true;
+  }
+
+  /// Frames whose columns lie one after the other in the file: a column of blocks after the other, each of
+  /// its columns read by itself.
+  bool ReadBlockColumns() {
+    const auto mostColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
+    const std::int32_t columns = std::min(factor_, mostColumns);
+    const std::int32_t mostRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
+    // Blocks wider than the buffer are read a row at a time, to keep the order of their sums.
+    const std::int32_t rows = columns < factor_ ? 1 : mostRows;
+    for (std::int32_t left = 0; left < width_; left += factor_) {
+      for (std::int32_t y = 0; y < height_; y += rows) {
+        for (std::int32_t x = left; x < left + factor_; x += columns) {
+          if (!ReadColumnsPiece(x, y, std::min(columns, left + factor_ - x), std::min(rows, height_ - y))) {
+            return false;
+          }
+        }
+      }
+    }
+    return true;
+  }
+
+  /// Reads a rectangle of pixels with all bytes between its first and its last.
+  bool ReadPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
+    const std::int64_t right = (columns - std::int64_t{1}) * layout_.pixelStride;
+    const std::int64_t down = (rows - std::int64_t{1}) * layout_.rowStride;
+    const std::int64_t before = -(std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0));
+    if (!ReadBytes(PixelPosition(x, y) - before, 0, Span(columns, rows))) return false;
+    renderer_.Add({x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], layout_.pixelStride, layout_.rowStride}});
+    return true;
+  }
+
+  /// Reads a rectangle of pixels column by column, leaving out what lies between the columns.
+  bool ReadColumnsPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
+    const std::int64_t columnBytes = Span(1, rows);
+    const std::int64_t before = layout_.rowStride < 0 ? columnBytes - pixelBytes_ : 0;
+    for (std::int32_t column = 0; column < columns; ++column) {
+      if (!ReadBytes(PixelPosition(x + column, y) - before, column * columnBytes, columnBytes)) return false;
+    }
+    renderer_.Add({x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], columnBytes, layout_.rowStride}});
+    return true;
+  }
+
+  std::int64_t PixelPosition(std::int32_t x, std::int32_t y) const {
+    return layout_.blockPosition + layout_.firstPixel + x * layout_.pixelStride + y * layout_.rowStride;
+  }
+
+  /// Reads `count` bytes from file offset `position` to byte `offset` of the buffer.
+  bool ReadBytes(std::int64_t position, std::int64_t offset, std::int64_t count) {
+    if (position != position_) stream_.seekg(position);
+    std::byte* const bytes = &buffer_[static_cast<std::size_t>(offset)];
+    stream_.read(reinterpret_cast<char*>(bytes), count);
+    position_ = position + count;
+    if (layout_.swapBytes) {
+      for (std::int64_t i = 0; i + 1 < count; i += 2) std::swap(bytes[i], bytes[i + 1]);
+    }
+    return stream_.good();
+  }
+
+  std::istream& stream_;
+  const FrameLayout& layout_;
+  FrameRenderer& renderer_;
+  std::int32_t factor_;
+  std::int32_t width_;  // of the whole blocks
+  std::int32_t height_;
+  std::int64_t pixelBytes_;
+  std::int64_t pixelStep_;
+  std::int64_t rowStep_;
+  std::int64_t bufferBytes_;
+  std::unique_ptr<std::byte[]> buffer_;
+  std::int64_t position_ = -1;  // of the stream, as far as it is known
+};
+
+}  // namespace
+
+HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request) {
+  if (!IsReadable(layout) || !HoldsBlock(stream, layout)) return nullptr;
+  const auto renderer = MakeFrameRenderer(layout.format, layout.size, request);
+  const Reduction& reduction = renderer->reduction();
+  const bool hasBlocks = reduction.factor > 0 && reduction.size.width > 0 && reduction.size.height > 0;
+  if (hasBlocks && !BandReader(stream, layout, *renderer).ReadFrame()) return nullptr;
+  return renderer->Finish();
+}
+
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,19 @@
+// The way from a file to a thumbnail, the same for every file kind.
+#pragma once
+
+#include <windows.h>
+
+#include <istream>
+
+#include "frame_layout.h"
+
+namespace Qel::Lumetra::ShellExt {
+
+/// Reads one frame and renders it (frame_renderer.h); the bitmap is the caller's. Memory does not depend on
+/// the size of the frame: it is read in bands, in the order of the file where the picture allows it.
+///
+/// Answers null for a frame without pixels, for a layout that places a pixel outside of its block, and when
+/// the stream does not hold the whole block or fails; a short stream is left failed, as by a short read.
+HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request);
+
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,140 @@
+#include "mrc_file_info.h"
+
+#include <algorithm>
+#include <iterator>
+#include <string_view>
+
+#include "byte_order.h"
+#include "frame_reader.h"
+#include "same_text.h"
+#include "text.h"
+#include "wrap.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+constexpr std::int32_t kMostLabels = 10;
+constexpr std::size_t kLabelBytes = 80;
+constexpr std::uint32_t kLastMode = 16;
+
+struct PixelTypeFacts {
+  PixelFormat format;
+  const wchar_t* name;
+  std::int32_t bits;
+};
+
+PixelTypeFacts FactsOf(MrcPixelType type) {
+  switch (type) {
+    case MrcPixelType::kUInt8: return {PixelFormat::kUInt8, L"8 bit unsigned", 8};
+    case MrcPixelType::kInt16: return {PixelFormat::kInt16, L"16 bit signed", 16};
+    case MrcPixelType::kFloat32: return {PixelFormat::kFloat32, L"32 bit float", 32};
+    case MrcPixelType::kComplexInt16: return {PixelFormat::kComplexInt16, L"32 bit complex integer", 32};
+    case MrcPixelType::kComplexFloat32: return {PixelFormat::kComplexFloat32, L"64 bit complex float", 64};
+    case MrcPixelType::kUInt16: return {PixelFormat::kUInt16, L"16 bit unsigned", 16};
+    case MrcPixelType::kRgb24: return {PixelFormat::kRgb24, L"24 bit RGB", 24};
+  }
+  return {};
+}
+
+/// Reverses the bytes of `count` words of `wordBytes` bytes each.
+void SwapWords(unsigned char* bytes, std::size_t wordBytes, std::size_t count) {
+  for (std::size_t i = 0; i < count; ++i) std::reverse(bytes + i * wordBytes, bytes + (i + 1) * wordBytes);
+}
+
+/// Swaps the header words that are integers in every variant of the format. Floats stay as they are: none
+/// of them is used.
+void SwapHeader(unsigned char* bytes) {
+  struct Words {
+    std::size_t offset, wordBytes, count;
+  };
+  static constexpr Words kIntegers[] = {
+      {0, 4, 10},                        // size, mode, start and intervals
+      {64, 4, 3},  {92, 4, 1},           // axis order, extended header
+      {220, 4, 1},                       // number of labels
+      {88, 2, 2},  {96, 2, 1},           // 16-bit words of older variants
+      {128, 2, 4}, {160, 2, 4}, {168, 2, 2},
+  };
+  for (const Words& words : kIntegers) SwapWords(bytes + words.offset, words.wordBytes, words.count);
+}
+
+}  // namespace
+
+MrcHeader::MrcHeader(std::istream& stream) : stream_(&stream) {
+  stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
+  // No frame is that large in both directions, so the bytes must be in the other order.
+  constexpr std::uint32_t kTooLarge = 65536;
+  swapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge && static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
+  if (swapped_) SwapHeader(bytes_.data());
+  if (!IsAcceptable()) stream.setstate(std::ios_base::badbit);
+}
+
+std::int32_t MrcHeader::Word(std::size_t offset) const { return LoadLittleEndian<std::int32_t>(&bytes_[offset]); }
+
+bool MrcHeader::IsAcceptable() const {
+  return Word(kNx) >= 1 && Word(kNy) >= 1 && Word(kNz) >= 1 && static_cast<std::uint32_t>(Word(kMode)) <= kLastMode;
+}
+
+MrcPixelType MrcHeader::pixelType() const {
+  switch (Word(kMode)) {
+    case 1: return MrcPixelType::kInt16;
+    case 2: return MrcPixelType::kFloat32;
+    case 3: return MrcPixelType::kComplexInt16;
+    case 4: return MrcPixelType::kComplexFloat32;
+    case 6: return MrcPixelType::kUInt16;
+    case 16: return MrcPixelType::kRgb24;
+    default: return MrcPixelType::kUInt8;  // mode 0, and every mode that is not known here
+  }
+}
+
+std::string MrcHeader::Labels() const {
+  std::string text;
+  const std::int32_t count = std::min(Word(kNlabl), kMostLabels);
+  for (std::int32_t i = 0; i < count; ++i) {
+    const unsigned char* const first = &bytes_[kLabels + static_cast<std::size_t>(i) * kLabelBytes];
+    std::string_view label(reinterpret_cast<const char*>(first), kLabelBytes);
+    label = label.substr(0, label.find('\0'));
+    label = label.substr(0, label.find_last_not_of(' ') + 1);
+    if (label.empty()) continue;
+    if (!text.empty()) text += "\r\n";
+    text += label;
+  }
+  return text;
+}
+
+FrameLayout MrcHeader::Section(std::int32_t section) const {
+  const MrcPixelType type = pixelType();
+  const PixelFormat format = FactsOf(type).format;
+  // Sizes and positions are 32-bit and wrap: a section beyond 2 GiB is not reached.
+  const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size().width, size().height), BytesPerPixel(format));
+  const std::int32_t position =
+      WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
+  FrameLayout layout = FlippedVertically(PackedLayout(format, size(), position));
+  layout.blockBytes = frameBytes;
+  // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they are.
+  layout.swapBytes = swapped_ && (type == MrcPixelType::kInt16 || type == MrcPixelType::kUInt16);
+  return layout;
+}
+
+MrcFileInfo::MrcFileInfo(std::istream& stream, const std::wstring& extension)
+    : header_(stream),
+      descriptionId_(SameIgnoringCase(extension, L"ali") ? 210 : SameIgnoringCase(extension, L"rec") ? 211 : 212) {}
+
+bool MrcFileInfo::IsValid() const { return header_.stream().good(); }
+
+std::wstring MrcFileInfo::GetTypeDescription() const { return LoadResourceString(descriptionId_); }
+
+Size2 MrcFileInfo::GetDimensions() const { return header_.size(); }
+
+std::int32_t MrcFileInfo::GetFrameCount() const { return header_.sections(); }
+
+std::int32_t MrcFileInfo::GetBitDepth() const { return FactsOf(header_.pixelType()).bits; }
+
+std::wstring MrcFileInfo::GetDataTypeName() const { return FactsOf(header_.pixelType()).name; }
+
+std::wstring MrcFileInfo::GetComment() const { return WidenComment(header_.Labels()); }
+
+HBITMAP MrcFileInfo::CreateThumbnail(const SIZE& size) const {
+  return ReadThumbnail(header_.stream(), header_.Section(header_.sections() / 2), size);
+}
+
+}  // namespace Qel::Lumetra::ShellExt

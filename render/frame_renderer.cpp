@@ -1,0 +1,231 @@
+#include "frame_renderer.h"
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <new>
+#include <optional>
+#include <vector>
+
+#include "box_reducer.h"
+#include "dib_section.h"
+#include "downsample_box.h"
+#include "grey_levels.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+template <class T>
+ImageView<const T> As(const ImageView<const std::byte>& bytes) {
+  return {bytes.width, bytes.height, reinterpret_cast<const T*>(bytes.data), bytes.pixelStride, bytes.rowStride};
+}
+
+/// A size without any pixel, or without any that a bitmap could have.
+bool IsEmpty(const Reduction& reduction) { return reduction.size.width < 1 || reduction.size.height < 1; }
+
+/// Memory for `size` values that are all written before they are read.
+template <class T>
+std::unique_ptr<T[]> AllocateImage(Size2 size) {
+  const std::int64_t count = std::int64_t{size.width} * size.height;
+  if (count > std::numeric_limits<std::int32_t>::max()) throw std::bad_alloc();
+  return std::make_unique_for_overwrite<T[]>(static_cast<std::size_t>(count));
+}
+
+/// The reduced image of a grey frame, and the bitmap that becomes of it.
+template <class T>
+class GreyImage {
+ public:
+  explicit GreyImage(const Reduction& reduction) : size_(reduction.size) {
+    if (!IsEmpty(reduction)) values_ = AllocateImage<T>(size_);
+  }
+
+  bool empty() const { return values_ == nullptr; }
+
+  ImageView<T> view() const { return PackedView(values_.get(), size_.width, size_.height); }
+
+  HBITMAP ToBitmap() const {
+    DibSection bitmap;
+    bitmap.CreateGrey(size_.width, size_.height);
+    if (bitmap.Bits().data != nullptr) {
+      MapToGreyLevels(PackedView<const T>(values_.get(), size_.width, size_.height), bitmap.Bits());
+    }
+    return bitmap.Release();
+  }
+
+ private:
+  Size2 size_;
+  std::unique_ptr<T[]> values_;
+};
+
+template <class T>
+class GreyRenderer final : public FrameRenderer {
+ public:
+  GreyRenderer(Size2 frame, const SIZE& request) : reduction_(GreyReduction(frame, request)), image_(reduction_) {
+    if (!image_.empty()) reducer_.emplace(reduction_.factor, image_.view());
+  }
+
+  const Reduction& reduction() const override { return reduction_; }
+
+  void Add(const FramePiece& piece) override { Add(As<T>(piece.pixels), piece.x, piece.y); }
+
+  void Add(const ImageView<const T>& pixels, std::int32_t x, std::int32_t y) {
+    if (reducer_) reducer_->Add(pixels, x, y);
+  }
+
+  HBITMAP Finish() override { return image_.ToBitmap(); }
+
+ private:
+  Reduction reduction_;
+  GreyImage<T> image_;
+  std::optional<BoxReducer<T>> reducer_;
+};
+
+/// Turns every complex pixel into the logarithm of its squared magnitude, which is then a float frame.
+template <class T>
+class ComplexRenderer final : public FrameRenderer {
+ public:
+  ComplexRenderer(Size2 frame, const SIZE& request) : grey_(frame, request) {}
+
+  const Reduction& reduction() const override { return grey_.reduction(); }
+
+  void Add(const FramePiece& piece) override { Add(As<ComplexPixel<T>>(piece.pixels), piece.x, piece.y); }
+
+  void Add(const ImageView<const ComplexPixel<T>>& pixels, std::int32_t x, std::int32_t y) {
+    logarithms_.resize(static_cast<std::size_t>(std::min(pixels.width, kMostColumns)));
+    for (std::int32_t row = 0; row < pixels.height; ++row) {
+      for (std::int32_t column = 0; column < pixels.width; column += kMostColumns) {
+        const std::int32_t count = std::min(pixels.width - column, kMostColumns);
+        for (std::int32_t i = 0; i < count; ++i) {
+          logarithms_[static_cast<std::size_t>(i)] = LogSquaredMagnitude(pixels.Load(column + i, row));
+        }
+        grey_.Add(PackedView<const float>(logarithms_.data(), count, 1), x + column, y + row);
+      }
+    }
+  }
+
+  HBITMAP Finish() override { return grey_.Finish(); }
+
+ private:
+  static constexpr std::int32_t kMostColumns = 16384;
+
+  static float LogSquaredMagnitude(const ComplexPixel<T>& pixel) {
+    const double re = pixel.re;
+    const double im = pixel.im;
+    return static_cast<float>(std::log(re * re + im * im));
+  }
+
+  GreyRenderer<float> grey_;
+  std::vector<float> logarithms_;
+};
+
+/// Averages straight into the bitmap.
+template <ColourOrder kOrder>
+class ColourRenderer final : public FrameRenderer {
+ public:
+  ColourRenderer(Size2 frame, const SIZE& request) : reduction_(ColourReduction(frame, request)) {
+    bitmap_.CreateColour(reduction_.size.width, reduction_.size.height);
+    if (bitmap_.Bits().data != nullptr) reducer_.emplace(reduction_.factor, AsBitmapPixels(bitmap_.Bits()));
+  }
+
+  const Reduction& reduction() const override { return reduction_; }
+
+  void Add(const FramePiece& piece) override {
+    if (reducer_) reducer_->Add(As<ColourPixel<kOrder>>(piece.pixels), piece.x, piece.y);
+  }
+
+  HBITMAP Finish() override { return bitmap_.Release(); }
+
+ private:
+  Reduction reduction_;
+  DibSection bitmap_;
+  std::optional<BoxReducer<ColourPixel<kOrder>>> reducer_;
+};
+
+template <class Renderer>
+std::unique_ptr<FrameRenderer> Make(Size2 frame, const SIZE& request) {
+  return std::make_unique<Renderer>(frame, request);
+}
+
+}  // namespace
+
+std::int32_t BytesPerPixel(PixelFormat format) {
+  switch (format) {
+    case PixelFormat::kUInt8:
+    case PixelFormat::kInt8: return 1;
+    case PixelFormat::kUInt16:
+    case PixelFormat::kInt16: return 2;
+    case PixelFormat::kRgb24:
+    case PixelFormat::kBgr24: return 3;
+    case PixelFormat::kUInt32:
+    case PixelFormat::kInt32:
+    case PixelFormat::kFloat32:
+    case PixelFormat::kComplexInt16: return 4;
+    case PixelFormat::kFloat64:
+    case PixelFormat::kComplexFloat32: return 8;
+    case PixelFormat::kComplexFloat64: return 16;
+  }
+  return 0;
+}
+
+std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelFormat format, Size2 frame, const SIZE& request) {
+  switch (format) {
+    case PixelFormat::kUInt8: return Make<GreyRenderer<std::uint8_t>>(frame, request);
+    case PixelFormat::kUInt16: return Make<GreyRenderer<std::uint16_t>>(frame, request);
+    case PixelFormat::kUInt32: return Make<GreyRenderer<std::uint32_t>>(frame, request);
+    case PixelFormat::kInt8: return Make<GreyRenderer<std::int8_t>>(frame, request);
+    case PixelFormat::kInt16: return Make<GreyRenderer<std::int16_t>>(frame, request);
+    case PixelFormat::kInt32: return Make<GreyRenderer<std::int32_t>>(frame, request);
+    case PixelFormat::kFloat32: return Make<GreyRenderer<float>>(frame, request);
+    case PixelFormat::kFloat64: return Make<GreyRenderer<double>>(frame, request);
+    case PixelFormat::kComplexInt16: return Make<ComplexRenderer<std::int16_t>>(frame, request);
+    case PixelFormat::kComplexFloat32: return Make<ComplexRenderer<float>>(frame, request);
+    case PixelFormat::kComplexFloat64: return Make<ComplexRenderer<double>>(frame, request);
+    case PixelFormat::kRgb24: return Make<ColourRenderer<ColourOrder::kRedFirst>>(frame, request);
+    case PixelFormat::kBgr24: return Make<ColourRenderer<ColourOrder::kBlueFirst>>(frame, request);
+  }
+  return nullptr;
+}
+
+template <class T>
+HBITMAP RenderGreyThumbnail(const ImageView<const T>& frame, const SIZE& request) {
+  const Reduction reduction = GreyReduction({frame.width, frame.height}, request);
+  const GreyImage<T> image(reduction);
+  if (!image.empty()) DownsampleBox(frame, reduction.factor, image.view());
+  return image.ToBitmap();
+}
+
+template <class T>
+HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<T>>& frame, const SIZE& request) {
+  ComplexRenderer<T> renderer({frame.width, frame.height}, request);
+  const Reduction& reduction = renderer.reduction();
+  if (!IsEmpty(reduction)) {
+    renderer.Add(frame.Part(0, 0, reduction.size.width * reduction.factor, reduction.size.height * reduction.factor),
+                 0, 0);
+  }
+  return renderer.Finish();
+}
+
+template <ColourOrder kOrder>
+HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<kOrder>>& frame, const SIZE& request) {
+  const Reduction reduction = ColourReduction({frame.width, frame.height}, request);
+  DibSection bitmap;
+  bitmap.CreateColour(reduction.size.width, reduction.size.height);
+  if (bitmap.Bits().data != nullptr) DownsampleBoxRgb(frame, reduction.factor, bitmap.Bits());
+  return bitmap.Release();
+}
+
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::uint8_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::uint16_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::uint32_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::int8_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::int16_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const std::int32_t>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const float>&, const SIZE&);
+template HBITMAP RenderGreyThumbnail(const ImageView<const double>&, const SIZE&);
+template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<std::int16_t>>&, const SIZE&);
+template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<float>>&, const SIZE&);
+template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<double>>&, const SIZE&);
+template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kRedFirst>>&, const SIZE&);
+template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kBlueFirst>>&, const SIZE&);
+
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,28 @@
+// What a bitmap holds, read back from its handle.
+#pragma once
+
+#include <windows.h>
+
+#include <cstdint>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+struct BitmapPixels {
+  std::int32_t width = 0;
+  std::int32_t height = 0;
+  std::int32_t bits = 0;               // of one pixel
+  std::int32_t rowBytes = 0;           // with padding
+  std::vector<std::uint8_t> bytes;     // of all rows from the top, padding left out
+  std::vector<RGBQUAD> colours;        // the colour table; empty without one
+  BITMAPINFOHEADER header{};
+
+  friend bool operator==(const BitmapPixels& a, const BitmapPixels& b) {
+    return a.width == b.width && a.height == b.height && a.bits == b.bits && a.bytes == b.bytes;
+  }
+};
+
+/// Reads `bitmap`, which must be a DIB section, and deletes it. Null gives an empty result.
+BitmapPixels TakeBitmap(HBITMAP bitmap);
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
