@@ -28,8 +28,12 @@ Description Describe(DataType type) {
 
 }  // namespace
 
-std::wstring DataTypeName(DataType type) { return Describe(type).name; }
+std::wstring DataTypeName(DataType type) {
+  return Describe(type).name;
+}
 
-std::int32_t BitsPerPixel(DataType type) { return Describe(type).bits; }
+std::int32_t BitsPerPixel(DataType type) {
+  return Describe(type).bits;
+}
 
 }  // namespace Qel::Lumetra::ShellExt

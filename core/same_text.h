@@ -8,7 +8,9 @@ namespace Qel::Lumetra::ShellExt {
 
 /// Only the letters A to Z have a case here, whatever the locale.
 inline bool SameIgnoringCase(std::wstring_view a, std::wstring_view b) {
-  const auto lower = [](wchar_t c) { return c >= L'A' && c <= L'Z' ? static_cast<wchar_t>(c - L'A' + L'a') : c; };
+  const auto lower = [](wchar_t c) {
+    return c >= L'A' && c <= L'Z' ? static_cast<wchar_t>(c - L'A' + L'a') : c;
+  };
   return std::equal(a.begin(), a.end(), b.begin(), b.end(),
                     [lower](wchar_t x, wchar_t y) { return lower(x) == lower(y); });
 }

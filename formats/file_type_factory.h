@@ -22,7 +22,8 @@ bool IsEmiExtension(const std::wstring& extension);
 bool IsRawExtension(const std::wstring& extension);
 
 /// The reader of the kind that `extension` names, or none for an unknown one. It has parsed the header when
-/// this returns, and reads from `stream` as long as it lives. What a reader's constructor throws passes through.
+/// this returns, and reads from `stream` as long as it lives. What a reader's constructor throws passes
+/// through.
 std::unique_ptr<FileTypeInfo> CreateFileTypeInfo(std::istream& stream, const std::wstring& extension);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -29,8 +29,10 @@ bool IsReadable(const FrameLayout& layout) {
   if (pixels > std::max(layout.blockBytes, kMostSharedPixels)) return false;
   const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
   const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
-  const std::int64_t first = layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
-  const std::int64_t last = layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
+  const std::int64_t first =
+      layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
+  const std::int64_t last =
+      layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
   return first >= 0 && last + BytesPerPixel(layout.format) <= layout.blockBytes;
 }
 
@@ -140,7 +142,10 @@ class BandReader {
     const std::int64_t down = (rows - std::int64_t{1}) * layout_.rowStride;
     const std::int64_t before = -(std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0));
     if (!ReadBytes(PixelPosition(x, y) - before, 0, Span(columns, rows))) return false;
-    renderer_.Add({x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], layout_.pixelStride, layout_.rowStride}});
+    renderer_.Add({x,
+                   y,
+                   {columns, rows, &buffer_[static_cast<std::size_t>(before)], layout_.pixelStride,
+                    layout_.rowStride}});
     return true;
   }
 
@@ -151,7 +156,8 @@ class BandReader {
     for (std::int32_t column = 0; column < columns; ++column) {
       if (!ReadBytes(PixelPosition(x + column, y) - before, column * columnBytes, columnBytes)) return false;
     }
-    renderer_.Add({x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], columnBytes, layout_.rowStride}});
+    renderer_.Add(
+        {x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], columnBytes, layout_.rowStride}});
     return true;
   }
 

@@ -48,10 +48,10 @@ void SwapHeader(unsigned char* bytes) {
     std::size_t offset, wordBytes, count;
   };
   static constexpr Words kIntegers[] = {
-      {0, 4, 10},                        // size, mode, start and intervals
-      {64, 4, 3},  {92, 4, 1},           // axis order, extended header
-      {220, 4, 1},                       // number of labels
-      {88, 2, 2},  {96, 2, 1},           // 16-bit words of older variants
+      {0, 4, 10},               // size, mode, start and intervals
+      {64, 4, 3},  {92, 4, 1},  // axis order, extended header
+      {220, 4, 1},              // number of labels
+      {88, 2, 2},  {96, 2, 1},  // 16-bit words of older variants
       {128, 2, 4}, {160, 2, 4}, {168, 2, 2},
   };
   for (const Words& words : kIntegers) SwapWords(bytes + words.offset, words.wordBytes, words.count);
@@ -63,15 +63,19 @@ MrcHeader::MrcHeader(std::istream& stream) : stream_(&stream) {
   stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
   // No frame is that large in both directions, so the bytes must be in the other order.
   constexpr std::uint32_t kTooLarge = 65536;
-  swapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge && static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
+  swapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
+             static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
   if (swapped_) SwapHeader(bytes_.data());
   if (!IsAcceptable()) stream.setstate(std::ios_base::badbit);
 }
 
-std::int32_t MrcHeader::Word(std::size_t offset) const { return LoadLittleEndian<std::int32_t>(&bytes_[offset]); }
+std::int32_t MrcHeader::Word(std::size_t offset) const {
+  return LoadLittleEndian<std::int32_t>(&bytes_[offset]);
+}
 
 bool MrcHeader::IsAcceptable() const {
-  return Word(kNx) >= 1 && Word(kNy) >= 1 && Word(kNz) >= 1 && static_cast<std::uint32_t>(Word(kMode)) <= kLastMode;
+  return Word(kNx) >= 1 && Word(kNy) >= 1 && Word(kNz) >= 1 &&
+         static_cast<std::uint32_t>(Word(kMode)) <= kLastMode;
 }
 
 MrcPixelType MrcHeader::pixelType() const {
@@ -105,33 +109,51 @@ FrameLayout MrcHeader::Section(std::int32_t section) const {
   const MrcPixelType type = pixelType();
   const PixelFormat format = FactsOf(type).format;
   // Sizes and positions are 32-bit and wrap: a section beyond 2 GiB is not reached.
-  const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size().width, size().height), BytesPerPixel(format));
+  const std::int32_t frameBytes =
+      WrappingProduct(WrappingProduct(size().width, size().height), BytesPerPixel(format));
   const std::int32_t position =
       WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
   FrameLayout layout = FlippedVertically(PackedLayout(format, size(), position));
   layout.blockBytes = frameBytes;
-  // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they are.
+  // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they
+  // are.
   layout.swapBytes = swapped_ && (type == MrcPixelType::kInt16 || type == MrcPixelType::kUInt16);
   return layout;
 }
 
 MrcFileInfo::MrcFileInfo(std::istream& stream, const std::wstring& extension)
     : header_(stream),
-      descriptionId_(SameIgnoringCase(extension, L"ali") ? 210 : SameIgnoringCase(extension, L"rec") ? 211 : 212) {}
+      descriptionId_(SameIgnoringCase(extension, L"ali")   ? 210
+                     : SameIgnoringCase(extension, L"rec") ? 211
+                                                           : 212) {}
 
-bool MrcFileInfo::IsValid() const { return header_.stream().good(); }
+bool MrcFileInfo::IsValid() const {
+  return header_.stream().good();
+}
 
-std::wstring MrcFileInfo::GetTypeDescription() const { return LoadResourceString(descriptionId_); }
+std::wstring MrcFileInfo::GetTypeDescription() const {
+  return LoadResourceString(descriptionId_);
+}
 
-Size2 MrcFileInfo::GetDimensions() const { return header_.size(); }
+Size2 MrcFileInfo::GetDimensions() const {
+  return header_.size();
+}
 
-std::int32_t MrcFileInfo::GetFrameCount() const { return header_.sections(); }
+std::int32_t MrcFileInfo::GetFrameCount() const {
+  return header_.sections();
+}
 
-std::int32_t MrcFileInfo::GetBitDepth() const { return FactsOf(header_.pixelType()).bits; }
+std::int32_t MrcFileInfo::GetBitDepth() const {
+  return FactsOf(header_.pixelType()).bits;
+}
 
-std::wstring MrcFileInfo::GetDataTypeName() const { return FactsOf(header_.pixelType()).name; }
+std::wstring MrcFileInfo::GetDataTypeName() const {
+  return FactsOf(header_.pixelType()).name;
+}
 
-std::wstring MrcFileInfo::GetComment() const { return WidenComment(header_.Labels()); }
+std::wstring MrcFileInfo::GetComment() const {
+  return WidenComment(header_.Labels());
+}
 
 HBITMAP MrcFileInfo::CreateThumbnail(const SIZE& size) const {
   return ReadThumbnail(header_.stream(), header_.Section(header_.sections() / 2), size);

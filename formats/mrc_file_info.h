@@ -24,7 +24,8 @@ enum class MrcPixelType : std::uint32_t {
   kRgb24 = 6,
 };
 
-/// The fixed header, read once from the stream's position. Field offsets are those of the MRC2014 format note.
+/// The fixed header, read once from the stream's position. Field offsets are those of the MRC2014 format
+/// note.
 class MrcHeader {
  public:
   /// Sets badbit on `stream` for a header that is not acceptable.

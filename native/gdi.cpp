@@ -17,7 +17,9 @@ struct HDC__ {
   HBITMAP__* selected = nullptr;
 };
 
-HDC CreateCompatibleDC(HDC) { return new HDC__; }
+HDC CreateCompatibleDC(HDC) {
+  return new HDC__;
+}
 
 BOOL DeleteDC(HDC dc) {
   delete dc;
@@ -41,7 +43,8 @@ HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE,
                           header.biBitCount,
                           bitmap->bits.get()};
   bitmap->section.dsBmih = header;
-  const auto* const colours = reinterpret_cast<const RGBQUAD*>(reinterpret_cast<const BYTE*>(info) + header.biSize);
+  const auto* const colours =
+      reinterpret_cast<const RGBQUAD*>(reinterpret_cast<const BYTE*>(info) + header.biSize);
   bitmap->colours.assign(colours, colours + header.biClrUsed);
   if (bits != nullptr) *bits = bitmap->bits.get();
   return bitmap.release();

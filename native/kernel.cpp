@@ -79,6 +79,10 @@ BOOL CloseHandle(HANDLE file) {
   return close(static_cast<int>(reinterpret_cast<std::intptr_t>(file))) == 0;
 }
 
-int _open_osfhandle(std::intptr_t handle, int) { return static_cast<int>(handle); }
+int _open_osfhandle(std::intptr_t handle, int) {
+  return static_cast<int>(handle);
+}
 
-int _close(int descriptor) { return close(descriptor); }
+int _close(int descriptor) {
+  return close(descriptor);
+}

@@ -40,7 +40,8 @@ void DibSection::Create(std::int32_t width, std::int32_t height, std::int32_t by
 
   const HDC dc = CreateCompatibleDC(nullptr);
   void* bits = nullptr;
-  Replace(CreateDIBSection(dc, reinterpret_cast<const BITMAPINFO*>(&info), DIB_RGB_COLORS, &bits, nullptr, 0));
+  Replace(
+      CreateDIBSection(dc, reinterpret_cast<const BITMAPINFO*>(&info), DIB_RGB_COLORS, &bits, nullptr, 0));
   bits_ = {width, height, static_cast<std::uint8_t*>(bits), bytesPerPixel, stride};
   DeleteDC(dc);
 }

@@ -13,7 +13,8 @@ namespace Qel::Lumetra::ShellExt {
 
 /// The bits of a 24-bit bitmap as pixels.
 inline ImageView<BitmapPixel> AsBitmapPixels(const ImageView<std::uint8_t>& bits) {
-  return {bits.width, bits.height, reinterpret_cast<BitmapPixel*>(bits.data), bits.pixelStride, bits.rowStride};
+  return {bits.width, bits.height, reinterpret_cast<BitmapPixel*>(bits.data), bits.pixelStride,
+          bits.rowStride};
 }
 
 /// Holds a top-down bitmap (row 0 is the top row, rows padded to 4 bytes) until it is handed out by

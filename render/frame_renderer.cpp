@@ -17,11 +17,14 @@ namespace {
 
 template <class T>
 ImageView<const T> As(const ImageView<const std::byte>& bytes) {
-  return {bytes.width, bytes.height, reinterpret_cast<const T*>(bytes.data), bytes.pixelStride, bytes.rowStride};
+  return {bytes.width, bytes.height, reinterpret_cast<const T*>(bytes.data), bytes.pixelStride,
+          bytes.rowStride};
 }
 
 /// A size without any pixel, or without any that a bitmap could have.
-bool IsEmpty(const Reduction& reduction) { return reduction.size.width < 1 || reduction.size.height < 1; }
+bool IsEmpty(const Reduction& reduction) {
+  return reduction.size.width < 1 || reduction.size.height < 1;
+}
 
 /// Memory for `size` values that are all written before they are read.
 template <class T>
@@ -60,7 +63,8 @@ class GreyImage {
 template <class T>
 class GreyRenderer final : public FrameRenderer {
  public:
-  GreyRenderer(Size2 frame, const SIZE& request) : reduction_(GreyReduction(frame, request)), image_(reduction_) {
+  GreyRenderer(Size2 frame, const SIZE& request)
+      : reduction_(GreyReduction(frame, request)), image_(reduction_) {
     if (!image_.empty()) reducer_.emplace(reduction_.factor, image_.view());
   }
 
@@ -199,8 +203,9 @@ HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<T>>& frame, co
   ComplexRenderer<T> renderer({frame.width, frame.height}, request);
   const Reduction& reduction = renderer.reduction();
   if (!IsEmpty(reduction)) {
-    renderer.Add(frame.Part(0, 0, reduction.size.width * reduction.factor, reduction.size.height * reduction.factor),
-                 0, 0);
+    renderer.Add(
+        frame.Part(0, 0, reduction.size.width * reduction.factor, reduction.size.height * reduction.factor),
+        0, 0);
   }
   return renderer.Finish();
 }
@@ -225,7 +230,9 @@ template HBITMAP RenderGreyThumbnail(const ImageView<const double>&, const SIZE&
 template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<std::int16_t>>&, const SIZE&);
 template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<float>>&, const SIZE&);
 template HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<double>>&, const SIZE&);
-template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kRedFirst>>&, const SIZE&);
-template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kBlueFirst>>&, const SIZE&);
+template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kRedFirst>>&,
+                                       const SIZE&);
+template HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<ColourOrder::kBlueFirst>>&,
+                                       const SIZE&);
 
 }  // namespace Qel::Lumetra::ShellExt

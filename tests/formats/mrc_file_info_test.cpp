@@ -11,7 +11,9 @@ namespace {
 
 TEST(Mrc, Smoke) {
   std::string bytes(1024, '\0');
-  bytes[0] = 4; bytes[4] = 2; bytes[8] = 1;
+  bytes[0] = 4;
+  bytes[4] = 2;
+  bytes[8] = 1;
   for (char c = 0; c < 8; ++c) bytes += c;
   std::istringstream stream(bytes);
   MrcFileInfo info(stream, L"mrc");

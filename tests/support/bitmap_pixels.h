@@ -11,10 +11,10 @@ namespace Qel::Lumetra::ShellExt::Testing {
 struct BitmapPixels {
   std::int32_t width = 0;
   std::int32_t height = 0;
-  std::int32_t bits = 0;               // of one pixel
-  std::int32_t rowBytes = 0;           // with padding
-  std::vector<std::uint8_t> bytes;     // of all rows from the top, padding left out
-  std::vector<RGBQUAD> colours;        // the colour table; empty without one
+  std::int32_t bits = 0;            // of one pixel
+  std::int32_t rowBytes = 0;        // with padding
+  std::vector<std::uint8_t> bytes;  // of all rows from the top, padding left out
+  std::vector<RGBQUAD> colours;     // the colour table; empty without one
   BITMAPINFOHEADER header{};
 
   friend bool operator==(const BitmapPixels& a, const BitmapPixels& b) {
