@@ -1,0 +1,42 @@
+// The divisions by zero that are meant to end the process, each in a child process of its own.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include "divide.h"
+#include "frame_renderer.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+/// Whether a process ended by an integer division by zero.
+bool EndedByDivideFault(int status) {
+#ifdef _WIN32
+  return static_cast<DWORD>(status) == EXCEPTION_INT_DIVIDE_BY_ZERO;
+#else
+  return testing::KilledBySignal(SIGFPE)(status);
+#endif
+}
+
+TEST(RequiredFaultDeathTest, ColourFrameSmallerThanTheRequest) {
+  const std::byte bytes[12] = {};
+  const ImageView<const ColourPixel<ColourOrder::kRedFirst>> frame{
+      2, 2, reinterpret_cast<const ColourPixel<ColourOrder::kRedFirst>*>(bytes), 3, 6};
+  EXPECT_EXIT(RenderColourThumbnail<ColourOrder::kRedFirst>(frame, {3, 3}), EndedByDivideFault, "");
+}
+
+TEST(RequiredFaultDeathTest, RequestOfZero) {
+  const std::uint8_t value = 0;
+  const auto frame = PackedView(&value, 1, 1);
+  EXPECT_EXIT(RenderGreyThumbnail<std::uint8_t>(frame, {0, 96}), EndedByDivideFault, "");
+  EXPECT_EXIT(RenderGreyThumbnail<std::uint8_t>(frame, {96, 0}), EndedByDivideFault, "");
+}
+
+TEST(Divide, TruncatesTowardZero) {
+  EXPECT_EQ(DivideOrFault(7, 2), 3);
+  EXPECT_EQ(DivideOrFault(-7, 2), -3);
+  EXPECT_EQ(DivideOrFault(7, -2), -3);
+  EXPECT_EQ(DivideOrFault(0, 5), 0);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
