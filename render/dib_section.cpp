@@ -15,25 +15,33 @@ struct BitmapInfo {
 };
 static_assert(sizeof(BitmapInfo) == 40 + 256 * 4);
 
+std::int64_t RowStride(std::int32_t width, std::int32_t bytesPerPixel) {
+  return (std::int64_t{width} * bytesPerPixel + 3) & ~std::int64_t{3};
+}
+
 }  // namespace
 
-void DibSection::Create(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel) {
-  const bool grey = bytesPerPixel == 1;
+BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel) {
   const std::int64_t rowBytes = std::int64_t{width} * bytesPerPixel;
-  const std::int64_t stride = (rowBytes + 3) & ~std::int64_t{3};
+  BITMAPINFOHEADER header{};
+  header.biSize = sizeof header;
+  header.biWidth = width;
+  header.biHeight = WrapToInt32(-std::int64_t{height});  // negative: top-down
+  header.biPlanes = 1;
+  header.biBitCount = static_cast<WORD>(8 * bytesPerPixel);
+  header.biCompression = BI_RGB;
+  // The padding of the last row is not counted.
+  header.biSizeImage =
+      static_cast<DWORD>((height - std::int64_t{1}) * RowStride(width, bytesPerPixel) + rowBytes);
+  header.biXPelsPerMeter = kPixelsPerMetre;
+  header.biYPelsPerMeter = kPixelsPerMetre;
+  header.biClrUsed = bytesPerPixel == 1 ? kGreyLevels : 0;
+  return header;
+}
 
-  BitmapInfo info{};
-  info.header.biSize = sizeof info.header;
-  info.header.biWidth = width;
-  info.header.biHeight = WrapToInt32(-std::int64_t{height});  // negative: top-down
-  info.header.biPlanes = 1;
-  info.header.biBitCount = static_cast<WORD>(8 * bytesPerPixel);
-  info.header.biCompression = BI_RGB;
-  info.header.biSizeImage = static_cast<DWORD>((height - std::int64_t{1}) * stride + rowBytes);
-  info.header.biXPelsPerMeter = kPixelsPerMetre;
-  info.header.biYPelsPerMeter = kPixelsPerMetre;
-  info.header.biClrUsed = grey ? kGreyLevels : 0;
-  for (int level = 0; grey && level < kGreyLevels; ++level) {
+void DibSection::Create(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel) {
+  BitmapInfo info{BitmapHeader(width, height, bytesPerPixel), {}};
+  for (DWORD level = 0; level < info.header.biClrUsed; ++level) {
     const auto value = static_cast<BYTE>(level);
     info.colours[level] = {value, value, value, 0};
   }
@@ -42,7 +50,7 @@ void DibSection::Create(std::int32_t width, std::int32_t height, std::int32_t by
   void* bits = nullptr;
   Replace(
       CreateDIBSection(dc, reinterpret_cast<const BITMAPINFO*>(&info), DIB_RGB_COLORS, &bits, nullptr, 0));
-  bits_ = {width, height, static_cast<std::uint8_t*>(bits), bytesPerPixel, stride};
+  bits_ = {width, height, static_cast<std::uint8_t*>(bits), bytesPerPixel, RowStride(width, bytesPerPixel)};
   DeleteDC(dc);
 }
 

@@ -17,6 +17,9 @@ inline ImageView<BitmapPixel> AsBitmapPixels(const ImageView<std::uint8_t>& bits
           bits.rowStride};
 }
 
+/// The header of a top-down bitmap of 1 (grey) or 3 (colour) bytes a pixel, rows padded to 4 bytes.
+BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel);
+
 /// Holds a top-down bitmap (row 0 is the top row, rows padded to 4 bytes) until it is handed out by
 /// Release; deletes it otherwise. When the system does not make the bitmap, the handle and the bits are null.
 class DibSection {

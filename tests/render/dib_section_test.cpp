@@ -7,7 +7,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-TEST(DibSection, GreyHeaderIsComplete) {
+TEST(DibSection, GreyBitsHaveOneByteAPixel) {
   DibSection section;
   section.CreateGrey(5, 3);
   EXPECT_EQ(section.Bits().width, 5);
@@ -18,11 +18,25 @@ TEST(DibSection, GreyHeaderIsComplete) {
   section.Bits().Store(4, 2, 99);
   const auto pixels = Testing::TakeBitmap(section.Release());
   EXPECT_EQ(pixels.bytes.back(), 99);
-  EXPECT_EQ(pixels.header.biSize, 40u);
-  EXPECT_EQ(pixels.header.biPlanes, 1);
-  EXPECT_EQ(pixels.header.biSizeImage, 2u * 8u + 5u);
-  EXPECT_EQ(pixels.header.biXPelsPerMeter, 1200);
-  EXPECT_EQ(pixels.header.biYPelsPerMeter, 1200);
+}
+
+TEST(DibSection, HeaderIsTopDown) {
+  const BITMAPINFOHEADER grey = BitmapHeader(5, 3, 1);
+  EXPECT_EQ(grey.biSize, 40u);
+  EXPECT_EQ(grey.biWidth, 5);
+  EXPECT_EQ(grey.biHeight, -3);
+  EXPECT_EQ(grey.biPlanes, 1);
+  EXPECT_EQ(grey.biBitCount, 8);
+  EXPECT_EQ(grey.biCompression, BI_RGB);
+  EXPECT_EQ(grey.biSizeImage, 2u * 8u + 5u);
+  EXPECT_EQ(grey.biXPelsPerMeter, 1200);
+  EXPECT_EQ(grey.biYPelsPerMeter, 1200);
+  EXPECT_EQ(grey.biClrUsed, 256u);
+  EXPECT_EQ(grey.biClrImportant, 0u);
+  const BITMAPINFOHEADER colour = BitmapHeader(3, 2, 3);
+  EXPECT_EQ(colour.biBitCount, 24);
+  EXPECT_EQ(colour.biSizeImage, 12u + 9u);
+  EXPECT_EQ(colour.biClrUsed, 0u);
 }
 
 TEST(DibSection, ColourBitsHaveThreeBytesAPixel) {

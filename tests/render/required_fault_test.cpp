@@ -2,11 +2,18 @@
 #include <gtest/gtest.h>
 #include <windows.h>
 
+#include <csignal>
+
 #include "divide.h"
 #include "frame_renderer.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
+
+/// Sanitizers report the signal themselves; the child process must end as any other would.
+void LeaveFaultsToTheSystem() {
+  std::signal(SIGFPE, SIG_DFL);
+}
 
 /// Whether a process ended by an integer division by zero.
 bool EndedByDivideFault(int status) {
@@ -21,14 +28,25 @@ TEST(RequiredFaultDeathTest, ColourFrameSmallerThanTheRequest) {
   const std::byte bytes[12] = {};
   const ImageView<const ColourPixel<ColourOrder::kRedFirst>> frame{
       2, 2, reinterpret_cast<const ColourPixel<ColourOrder::kRedFirst>*>(bytes), 3, 6};
-  EXPECT_EXIT(RenderColourThumbnail<ColourOrder::kRedFirst>(frame, {3, 3}), EndedByDivideFault, "");
+  EXPECT_EXIT(
+      {
+        LeaveFaultsToTheSystem();
+        RenderColourThumbnail<ColourOrder::kRedFirst>(frame, {3, 3});
+      },
+      EndedByDivideFault, "");
 }
 
 TEST(RequiredFaultDeathTest, RequestOfZero) {
   const std::uint8_t value = 0;
   const auto frame = PackedView(&value, 1, 1);
-  EXPECT_EXIT(RenderGreyThumbnail<std::uint8_t>(frame, {0, 96}), EndedByDivideFault, "");
-  EXPECT_EXIT(RenderGreyThumbnail<std::uint8_t>(frame, {96, 0}), EndedByDivideFault, "");
+  for (const SIZE& request : {SIZE{0, 96}, SIZE{96, 0}}) {
+    EXPECT_EXIT(
+        {
+          LeaveFaultsToTheSystem();
+          RenderGreyThumbnail<std::uint8_t>(frame, request);
+        },
+        EndedByDivideFault, "");
+  }
 }
 
 TEST(Divide, TruncatesTowardZero) {

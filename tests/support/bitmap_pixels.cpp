@@ -12,7 +12,6 @@ BitmapPixels TakeBitmap(HBITMAP bitmap) {
   pixels.height = section.dsBm.bmHeight;
   pixels.bits = section.dsBm.bmBitsPixel;
   pixels.rowBytes = section.dsBm.bmWidthBytes;
-  pixels.header = section.dsBmih;
   const auto* row = static_cast<const std::uint8_t*>(section.dsBm.bmBits);
   const std::int32_t usedBytes = pixels.width * (pixels.bits / 8);
   for (std::int32_t y = 0; y < pixels.height; ++y, row += pixels.rowBytes) {

@@ -15,7 +15,6 @@ struct BitmapPixels {
   std::int32_t rowBytes = 0;        // with padding
   std::vector<std::uint8_t> bytes;  // of all rows from the top, padding left out
   std::vector<RGBQUAD> colours;     // the colour table; empty without one
-  BITMAPINFOHEADER header{};
 
   friend bool operator==(const BitmapPixels& a, const BitmapPixels& b) {
     return a.width == b.width && a.height == b.height && a.bits == b.bits && a.bytes == b.bytes;
