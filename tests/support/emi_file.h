@@ -1,0 +1,57 @@
+// Writes .emi files: every function makes the bytes of an item, of which lists are made by putting them one
+// after the other.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "file_bytes.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+/// Type and tag of an item, which is also all there is of the opening of a structure.
+std::string EmiOpening(std::uint16_t type, std::uint16_t tag);
+
+/// The end marker of a list.
+std::string EmiEnd();
+
+/// An item of a fixed size: one of the types 0x0010 to 0x0041. `value` is its bytes.
+std::string EmiScalar(std::uint16_t type, std::uint16_t tag, std::string_view value);
+
+std::string EmiDouble(std::uint16_t tag, double value);
+
+/// `length` is what the item says of its text's length, where it shall lie.
+std::string EmiText(std::uint16_t tag, std::string_view text, std::optional<std::uint32_t> length = {});
+
+/// `byteCount` is what the item says of its payload's length, where it shall lie.
+std::string EmiArray(std::uint16_t type, std::uint16_t tag, std::string_view payload,
+                     std::optional<std::uint32_t> byteCount = {});
+
+/// A structure of the items in `items`, with its end marker.
+std::string EmiStructure(std::uint16_t type, std::uint16_t tag, std::string_view items);
+
+/// A pixel array as it stands in an image object. The even types from 0x2200 to 0x2214 are signed and
+/// unsigned integers of 8, 16 and 32 bits, float, double, (0x2210: nothing), complex of doubles and complex
+/// of floats.
+std::string EmiPixelArray(std::uint16_t type, std::uint32_t width, std::uint32_t height,
+                          std::string_view pixels);
+
+std::string EmiImageObject(std::string_view items);
+std::string EmiLineDataObject(std::string_view items);
+
+struct EmiFile {
+  std::uint16_t magic = 0x4B4A;
+  std::uint16_t version = 0x0200;
+  std::uint32_t ignored = 0;
+  std::string items;  // of the top-level list, with or without its end marker
+
+  std::string Bytes() const;
+};
+
+/// A file of one image object.
+EmiFile OneImageEmiFile(std::uint16_t arrayType, std::uint32_t width, std::uint32_t height,
+                        std::string_view pixels);
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
