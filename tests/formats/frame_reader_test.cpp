@@ -1,0 +1,314 @@
+// Streamed frames of every pixel format and layout against the naive picture of the same bytes.
+#include "frame_reader.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstring>
+#include <sstream>
+#include <streambuf>
+#include <string>
+#include <vector>
+
+#include "bitmap_pixels.h"
+#include "naive_thumbnail.h"
+#include "random_values.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+using Testing::BitmapPixels;
+using Testing::NaiveFrame;
+using Testing::Random;
+using Testing::TakeBitmap;
+
+constexpr PixelFormat kFormats[] = {
+    PixelFormat::kUInt8,          PixelFormat::kUInt16,         PixelFormat::kUInt32,
+    PixelFormat::kInt8,           PixelFormat::kInt16,          PixelFormat::kInt32,
+    PixelFormat::kFloat32,        PixelFormat::kFloat64,        PixelFormat::kComplexInt16,
+    PixelFormat::kComplexFloat32, PixelFormat::kComplexFloat64, PixelFormat::kRgb24,
+    PixelFormat::kBgr24};
+
+/// The bytes of a file: `before` bytes of something else, then the block.
+std::string RandomFile(Random& random, std::int64_t before, std::int64_t blockBytes) {
+  std::string bytes(static_cast<std::size_t>(before + blockBytes), '\0');
+  for (char& byte : bytes) byte = static_cast<char>(random.Bits());
+  return bytes;
+}
+
+template <class T>
+NaiveFrame<T> Decode(const std::string& file, const FrameLayout& layout) {
+  NaiveFrame<T> frame{layout.size.width, layout.size.height, {}};
+  for (int y = 0; y < frame.height; ++y) {
+    for (int x = 0; x < frame.width; ++x) {
+      const std::int64_t position =
+          layout.blockPosition + layout.firstPixel + x * layout.pixelStride + y * layout.rowStride;
+      char bytes[sizeof(T)];
+      std::copy_n(file.begin() + position, sizeof(T), bytes);
+      if (layout.swapBytes) std::swap(bytes[0], bytes[sizeof(T) - 1]);
+      T value;
+      std::memcpy(&value, bytes, sizeof(T));
+      frame.values.push_back(value);
+    }
+  }
+  return frame;
+}
+
+template <class T>
+BitmapPixels NaiveGrey(const std::string& file, const FrameLayout& layout, int cx, int cy) {
+  return Testing::NaiveGreyThumbnail(Decode<T>(file, layout), cx, cy);
+}
+
+template <class T>
+BitmapPixels NaiveComplex(const std::string& file, const FrameLayout& layout, int cx, int cy) {
+  return Testing::NaiveComplexThumbnail(Decode<Testing::NaiveComplex<T>>(file, layout), cx, cy);
+}
+
+BitmapPixels NaivePicture(const std::string& file, const FrameLayout& layout, int cx, int cy) {
+  switch (layout.format) {
+    case PixelFormat::kUInt8: return NaiveGrey<std::uint8_t>(file, layout, cx, cy);
+    case PixelFormat::kUInt16: return NaiveGrey<std::uint16_t>(file, layout, cx, cy);
+    case PixelFormat::kUInt32: return NaiveGrey<std::uint32_t>(file, layout, cx, cy);
+    case PixelFormat::kInt8: return NaiveGrey<std::int8_t>(file, layout, cx, cy);
+    case PixelFormat::kInt16: return NaiveGrey<std::int16_t>(file, layout, cx, cy);
+    case PixelFormat::kInt32: return NaiveGrey<std::int32_t>(file, layout, cx, cy);
+    case PixelFormat::kFloat32: return NaiveGrey<float>(file, layout, cx, cy);
+    case PixelFormat::kFloat64: return NaiveGrey<double>(file, layout, cx, cy);
+    case PixelFormat::kComplexInt16: return NaiveComplex<std::int16_t>(file, layout, cx, cy);
+    case PixelFormat::kComplexFloat32: return NaiveComplex<float>(file, layout, cx, cy);
+    case PixelFormat::kComplexFloat64: return NaiveComplex<double>(file, layout, cx, cy);
+    case PixelFormat::kRgb24:
+    case PixelFormat::kBgr24: {
+      NaiveFrame<Testing::NaiveColour> frame = Decode<Testing::NaiveColour>(file, layout);
+      if (layout.format == PixelFormat::kBgr24) {
+        for (Testing::NaiveColour& colour : frame.values) std::swap(colour[0], colour[2]);
+      }
+      return Testing::NaiveColourThumbnail(frame, cx, cy);
+    }
+  }
+  return {};
+}
+
+/// A layout whose pixels need not touch: columns right of each other or, if `byColumn`, below each other.
+FrameLayout RandomLayout(Random& random, PixelFormat format, Size2 size, bool byColumn) {
+  FrameLayout layout;
+  layout.format = format;
+  layout.size = size;
+  const std::int64_t pixelBytes = BytesPerPixel(format);
+  std::int64_t& inner = byColumn ? layout.rowStride : layout.pixelStride;
+  std::int64_t& outer = byColumn ? layout.pixelStride : layout.rowStride;
+  inner = pixelBytes + (random.OneIn(3) ? random.Between(0, 9) : 0);
+  outer = inner * (byColumn ? size.height : size.width) + (random.OneIn(3) ? random.Between(0, 99) : 0);
+  if (random.OneIn(8)) inner = random.Between(0, static_cast<int>(pixelBytes));
+  if (random.OneIn(8)) outer = random.Between(0, 9);
+  if (random.OneIn(3)) inner = -inner;
+  if (random.OneIn(2)) outer = -outer;
+  const std::int64_t right = (size.width - 1) * layout.pixelStride;
+  const std::int64_t down = (size.height - 1) * layout.rowStride;
+  layout.firstPixel = -std::min<std::int64_t>(right, 0) - std::min<std::int64_t>(down, 0);
+  layout.blockBytes = std::abs(right) + std::abs(down) + pixelBytes;
+  layout.blockPosition = random.Between(0, 100);
+  layout.swapBytes =
+      pixelBytes == 2 && random.OneIn(3) && layout.pixelStride % 2 == 0 && layout.rowStride % 2 == 0;
+  return layout;
+}
+
+void CompareWithTheNaivePicture(Random& random, const FrameLayout& layout, int cx, int cy) {
+  const std::string file = RandomFile(random, layout.blockPosition, layout.blockBytes);
+  std::istringstream stream(file);
+  ASSERT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {cx, cy})), NaivePicture(file, layout, cx, cy))
+      << "format " << static_cast<int>(layout.format) << ", " << layout.size.width << " x "
+      << layout.size.height << " asked at " << cx << " x " << cy << ", strides " << layout.pixelStride
+      << " and " << layout.rowStride;
+  EXPECT_TRUE(stream.good());
+}
+
+TEST(FrameReader, EqualsTheNaivePictureOverRandomLayouts) {
+  Random random(1);
+  for (int round = 0; round < 1500; ++round) {
+    const Size2 size{random.Between(1, 90), random.Between(1, 90)};
+    const PixelFormat format = kFormats[random.Between(0, static_cast<int>(std::size(kFormats)) - 1)];
+    const FrameLayout layout = RandomLayout(random, format, size, random.OneIn(4));
+    CompareWithTheNaivePicture(random, layout, random.Between(1, size.width), random.Between(1, 100));
+    if (HasFatalFailure()) return;
+  }
+}
+
+TEST(FrameReader, EqualsTheNaivePictureForFramesLargerThanTheBand) {
+  Random random(2);
+  const Size2 shapes[] = {{700, 300}, {300, 700},  {90000, 4}, {200000, 2},
+                          {4, 90000}, {2, 200000}, {512, 512}};
+  for (const Size2& size : shapes) {
+    for (const PixelFormat format : kFormats) {
+      const FrameLayout layout = RandomLayout(random, format, size, random.OneIn(2));
+      const int f = std::max(1, std::min(size.width, size.height) / random.Between(1, 3));
+      CompareWithTheNaivePicture(random, layout, std::max(1, size.width / f), std::max(1, size.height / f));
+      if (HasFatalFailure()) return;
+    }
+  }
+}
+
+TEST(FrameReader, BlockRowsLargerThanTheBandAreSummedFromTheTop) {
+  // 2000 floats a row and a factor of 100: a row of blocks has 800,000 bytes.
+  Random random(3);
+  for (const PixelFormat format :
+       {PixelFormat::kFloat32, PixelFormat::kInt32, PixelFormat::kComplexFloat32}) {
+    for (const bool bottomUp : {false, true}) {
+      FrameLayout layout = PackedLayout(format, {2000, 201}, 17);
+      if (bottomUp) layout = FlippedVertically(layout);
+      CompareWithTheNaivePicture(random, layout, 20, 2);
+      if (HasFatalFailure()) return;
+    }
+  }
+}
+
+/// A file in memory that counts what is read of it, and can fail at a chosen read.
+class CountingBuffer : public std::streambuf {
+ public:
+  explicit CountingBuffer(std::string bytes, int failAtRead = -1)
+      : bytes_(std::move(bytes)), failAtRead_(failAtRead) {}
+
+  std::int64_t bytesRead = 0;
+  std::int64_t largestRead = 0;
+  int reads = 0;
+
+ protected:
+  std::streamsize xsgetn(char* target, std::streamsize count) override {
+    if (reads++ == failAtRead_) return 0;
+    const auto rest = static_cast<std::streamsize>(bytes_.size()) - position_;
+    const std::streamsize got = std::clamp<std::streamsize>(rest, 0, count);
+    std::copy_n(bytes_.begin() + position_, got, target);
+    position_ += got;
+    bytesRead += got;
+    largestRead = std::max<std::int64_t>(largestRead, got);
+    return got;
+  }
+
+  pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
+    const off_type base = direction == std::ios_base::end   ? static_cast<off_type>(bytes_.size())
+                          : direction == std::ios_base::cur ? position_
+                                                            : 0;
+    return seekpos(base + offset, std::ios_base::in);
+  }
+
+  pos_type seekpos(pos_type position, std::ios_base::openmode) override {
+    if (off_type(position) < 0) return pos_type(off_type(-1));
+    position_ = position;
+    return position;
+  }
+
+ private:
+  std::string bytes_;
+  std::streamoff position_ = 0;
+  int failAtRead_;
+};
+
+TEST(FrameReader, ReadsEachByteOfTheWholeBlocksOnce) {
+  CountingBuffer buffer(std::string(2'000'000, '\1'));
+  std::istream stream(&buffer);
+  const FrameLayout layout = FlippedVertically(PackedLayout(PixelFormat::kInt16, {1000, 999}, 100));
+  EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {100, 100})).height, 99);
+  EXPECT_EQ(buffer.bytesRead, 1000 * 990 * 2);
+  EXPECT_LE(buffer.largestRead, 256 * 1024);
+  EXPECT_LE(buffer.reads, 16);
+}
+
+TEST(FrameReader, ReadsColumnsOnceWhenRowsLieAcrossTheFile) {
+  CountingBuffer buffer(std::string(2'000'000, '\1'));
+  std::istream stream(&buffer);
+  FrameLayout layout = PackedLayout(PixelFormat::kInt16, {1000, 1000}, 0);
+  std::swap(layout.pixelStride, layout.rowStride);
+  EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {100, 100})).width, 100);
+  EXPECT_EQ(buffer.bytesRead, 2'000'000);
+}
+
+TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
+  const FrameLayout layout = PackedLayout(PixelFormat::kFloat32, {600, 600}, 0);
+  int reads = 0;
+  {
+    CountingBuffer buffer(std::string(600 * 600 * 4, '\0'));
+    std::istream stream(&buffer);
+    EXPECT_NE(TakeBitmap(ReadThumbnail(stream, layout, {60, 60})).width, 0);
+    reads = buffer.reads;
+  }
+  ASSERT_GT(reads, 3);
+  for (int i = 0; i < reads; ++i) {
+    CountingBuffer buffer(std::string(600 * 600 * 4, '\0'), i);
+    std::istream stream(&buffer);
+    EXPECT_EQ(ReadThumbnail(stream, layout, {60, 60}), nullptr);
+    EXPECT_TRUE(stream.fail());
+  }
+}
+
+TEST(FrameReader, ABlockThatIsNotWholeIsRefusedBeforeAnyRead) {
+  // The last row would be dropped by the reduction, and is wanted all the same.
+  const FrameLayout layout = PackedLayout(PixelFormat::kUInt8, {100, 101}, 10);
+  for (const std::size_t size : {0u, 9u, 10u, 10u + 100u * 100u, 10u + 100u * 101u - 1u}) {
+    CountingBuffer buffer(std::string(size, '\0'));
+    std::istream stream(&buffer);
+    EXPECT_EQ(ReadThumbnail(stream, layout, {50, 50}), nullptr) << size;
+    EXPECT_EQ(buffer.reads, 0);
+    EXPECT_TRUE(stream.fail());
+  }
+  std::istringstream whole(std::string(10 + 100 * 101, '\0'));
+  EXPECT_NE(TakeBitmap(ReadThumbnail(whole, layout, {50, 50})).width, 0);
+}
+
+TEST(FrameReader, AFrameWithoutPixelsHasNoBitmap) {
+  std::istringstream stream(std::string(1000, '\0'));
+  for (const PixelFormat format : {PixelFormat::kUInt8, PixelFormat::kRgb24}) {
+    for (const Size2& size : {Size2{0, 0}, Size2{0, 5}, Size2{5, 0}, Size2{-5, -5}, Size2{-300, 300}}) {
+      EXPECT_EQ(ReadThumbnail(stream, PackedLayout(format, size, 0), {96, 96}), nullptr);
+    }
+  }
+  EXPECT_TRUE(stream.good());
+}
+
+TEST(FrameReader, APixelOutsideOfTheBlockHasNoBitmap) {
+  std::istringstream stream(std::string(1000, '\0'));
+  const FrameLayout packed = PackedLayout(PixelFormat::kUInt16, {4, 4}, 100);
+  ASSERT_NE(TakeBitmap(ReadThumbnail(stream, packed, {8, 8})).width, 0);
+  const auto refused = [&stream](const FrameLayout& layout) {
+    return ReadThumbnail(stream, layout, {8, 8}) == nullptr;
+  };
+  FrameLayout layout = packed;
+  layout.firstPixel = -1;
+  EXPECT_TRUE(refused(layout));
+  layout.firstPixel = 1;
+  EXPECT_TRUE(refused(layout));
+  layout = packed;
+  layout.rowStride = -8;
+  EXPECT_TRUE(refused(layout));
+  layout = packed;
+  layout.pixelStride = 2'000'000'000;
+  EXPECT_TRUE(refused(layout));
+  layout = packed;
+  layout.blockBytes = 31;
+  EXPECT_TRUE(refused(layout));
+  // 65536 * 65536 pixels wrap to none.
+  EXPECT_TRUE(refused(PackedLayout(PixelFormat::kUInt8, {65536, 65536}, 0)));
+}
+
+TEST(FrameReader, ANegativePositionFailsTheStream) {
+  std::istringstream stream(std::string(1000, '\0'));
+  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelFormat::kUInt8, {4, 4}, -1), {8, 8}), nullptr);
+  EXPECT_TRUE(stream.fail());
+}
+
+TEST(FrameReader, PixelsThatShareTheirBytesAreReadUpToALimit) {
+  std::istringstream stream(std::string(16, '\3'));
+  FrameLayout layout{
+      .format = PixelFormat::kUInt16, .size = {1024, 1024}, .blockPosition = 0, .blockBytes = 2};
+  EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {128, 128})).width, 128);
+  layout.size.width = 1025;
+  EXPECT_EQ(ReadThumbnail(stream, layout, {128, 128}), nullptr);
+}
+
+TEST(FrameReader, AFailedStreamGivesNoBitmap) {
+  std::istringstream stream(std::string(1000, '\0'));
+  stream.setstate(std::ios_base::failbit);
+  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelFormat::kUInt8, {4, 4}, 0), {8, 8}), nullptr);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
