@@ -1,0 +1,38 @@
+# The Wine in which Windows programs of the project run: a prefix of its own in the build folder, quiet, and
+# without anything that would reach into the user's desktop.
+# shellcheck shell=bash
+. "$(dirname "${BASH_SOURCE[0]}")/common.sh"
+
+export WINEPREFIX=$root/build/wine
+export WINEARCH=win64
+export WINEDEBUG=-all
+# No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types.
+export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe="
+
+# Pipes are closed, as Wine's services inherit them and would keep whoever reads them waiting.
+wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }
+
+# Makes the prefix if there is none yet. The lock lets tests that start side by side wait for one of them.
+wine_make_prefix() {
+  [[ ! -f $WINEPREFIX/.complete ]] || return 0
+  mkdir -p "$WINEPREFIX"
+  (
+    flock 9
+    [[ ! -f $WINEPREFIX/.complete ]] || exit 0
+    progress "Making a Wine prefix"
+    # Rarely the first boot of a new prefix fails; the second one then completes it.
+    wine_boot --init || wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
+    touch "$WINEPREFIX/.complete"
+  ) 9>"$root/build/wine.lock"
+}
+
+# Boots the prefix and keeps its server until the script ends, so that programs start at once.
+wine_start() {
+  "$root/scripts/setup" wine
+  wine_make_prefix
+  trap wine_stop EXIT
+  wineserver -p >/dev/null 2>&1 </dev/null || fail "Wine's server cannot be started"
+  wine wineboot >/dev/null 2>&1 </dev/null || fail "Wine cannot boot its prefix in $WINEPREFIX"
+}
+
+wine_stop() { wineserver -k >/dev/null 2>&1 || true; }
