@@ -1,0 +1,153 @@
+// The byte source of a file that comes as a COM stream: a standard stream over an IStream.
+//
+// The property-store handlers own one each, so that the readers need not know where their bytes come from.
+// A COM stream is never repositioned here: a reader takes the bytes in the order in which they come, and a
+// seek fails as it does for any stream that cannot be repositioned. One thread at a time may use it.
+#pragma once
+
+#include <objidl.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <iostream>
+#include <memory>
+#include <streambuf>
+#include <vector>
+
+/// A stream buffer that holds one reference on the attached COM stream. Without a COM stream, or before it
+/// has been given a buffer, it is at its end and writes nothing. Nothing is thrown for failures of the COM
+/// stream: they end the input or fail the output.
+///
+/// One array serves both directions. The get area lies behind a reserve of four characters, which keeps what
+/// was read last across a refill; the put area begins at the first character and leaves the last one free
+/// for the character that overflow brings. Input and output are therefore not to be mixed.
+template <class Char, class Traits = std::char_traits<Char>, class Allocator = std::allocator<Char>>
+class basic_combuf : public std::basic_streambuf<Char, Traits> {
+  static_assert(sizeof(Char) == 1, "a COM stream counts bytes");
+
+ public:
+  using typename std::basic_streambuf<Char, Traits>::int_type;
+
+  basic_combuf() = default;
+
+  /// Writes what is pending.
+  ~basic_combuf() override { Flush(); }
+
+  /// Makes the buffer `size` characters large; it takes more than the put-back reserve to read anything.
+  /// What was read ahead or is pending is dropped.
+  void Allocate(std::size_t size) {
+    buffer_.assign(size, Char());
+    ResetAreas();
+  }
+
+  /// Reads on from where `stream` (null for none) stands, and forgets the recorded result. What was read
+  /// ahead or is pending is dropped.
+  void Attach(IStream* stream) {
+    if (stream != stream_.get()) {
+      if (stream != nullptr) stream->AddRef();
+      stream_.reset(stream);
+    }
+    result_ = S_OK;
+    ResetAreas();
+  }
+
+  /// What the COM stream answered when it first failed. As long as it has not, its last answer that brought
+  /// no bytes or took too few: S_OK, or another success such as S_FALSE.
+  HRESULT result() const { return result_; }
+
+ protected:
+  int_type overflow(int_type c = Traits::eof()) override {
+    if (Traits::eq_int_type(c, Traits::eof())) return Flush() ? Traits::not_eof(c) : Traits::eof();
+    // The last character is free, unless an earlier overflow stored its character and could not write.
+    if (!HasRoom() && !(Flush() && HasRoom())) return Traits::eof();
+    *this->pptr() = Traits::to_char_type(c);
+    MovePutPosition(this->pptr() + 1);
+    return Flush() ? c : Traits::eof();
+  }
+
+  int_type underflow() override {
+    if (stream_ == nullptr) return Traits::eof();
+    if (this->gptr() < this->egptr()) return Traits::to_int_type(*this->gptr());
+    if (buffer_.size() <= kPutBack) return Traits::eof();
+
+    Char* const first = Begin() + kPutBack;
+    const auto kept = std::min(std::ptrdiff_t{kPutBack}, this->gptr() - this->eback());
+    Traits::move(first - kept, this->gptr() - kept, static_cast<std::size_t>(kept));
+    // Even a Read that fails may write to its buffer, so that only the reserve can be put back now.
+    this->setg(first - kept, first, first);
+
+    const auto wanted = static_cast<ULONG>(buffer_.size() - kPutBack);
+    ULONG read = 0;
+    const HRESULT result = stream_->Read(first, wanted, &read);
+    if (FAILED(result) || read == 0) {
+      Record(result);
+      return Traits::eof();
+    }
+    // Whatever the stream says, it had room for no more than was wanted.
+    this->setg(first - kept, first, first + std::min(read, wanted));
+    return Traits::to_int_type(*first);
+  }
+
+  int sync() override { return Flush() ? 0 : -1; }
+
+ private:
+  struct Releaser {
+    void operator()(IStream* stream) const { stream->Release(); }
+  };
+
+  static constexpr std::size_t kPutBack = 4;
+
+  Char* Begin() { return buffer_.data(); }
+  Char* End() { return buffer_.data() + buffer_.size(); }
+  bool HasRoom() { return this->pptr() != End(); }
+
+  void ResetAreas() {
+    Char* const first = buffer_.size() < kPutBack ? End() : Begin() + kPutBack;
+    this->setg(first, first, first);
+    MovePutPosition(Begin());
+  }
+
+  /// The put area ends before the last character, but never before its position: the base class counts on it.
+  void MovePutPosition(Char* position) {
+    this->setp(Begin(), buffer_.empty() ? End() : std::max(End() - 1, position));
+    this->pbump(static_cast<int>(position - Begin()));
+  }
+
+  /// A stream that is only read is never asked to write, not even zero bytes.
+  bool Flush() {
+    if (stream_ == nullptr) return false;
+    const auto pending = static_cast<ULONG>(this->pptr() - this->pbase());
+    if (pending == 0) return true;
+    ULONG written = 0;
+    const HRESULT result = stream_->Write(Begin(), pending, &written);
+    if (SUCCEEDED(result) && written == pending) {
+      MovePutPosition(Begin());
+      return true;
+    }
+    Record(result);
+    return false;
+  }
+
+  void Record(HRESULT result) {
+    if (!FAILED(result_)) result_ = result;
+  }
+
+  std::unique_ptr<IStream, Releaser> stream_;
+  std::vector<Char, Allocator> buffer_;
+  HRESULT result_ = S_OK;
+};
+
+/// A stream that owns its stream buffer. It begins without a COM stream and without memory; its owner gives
+/// the buffer both.
+template <class Char, class Traits = std::char_traits<Char>>
+class basic_comstream : public std::basic_iostream<Char, Traits> {
+ public:
+  basic_comstream() : std::basic_iostream<Char, Traits>(nullptr) {
+    std::basic_ios<Char, Traits>::rdbuf(&buffer_);
+  }
+
+  basic_combuf<Char, Traits>* rdbuf() { return &buffer_; }
+
+ private:
+  basic_combuf<Char, Traits> buffer_;
+};

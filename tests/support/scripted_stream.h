@@ -1,0 +1,96 @@
+// A COM stream that lives in a test: it serves the bytes that it is given in pieces of any size, fails when
+// it is told to, and counts what is asked of it.
+#pragma once
+
+#include <objidl.h>
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+// COM interfaces have no virtual destructor; nobody deletes this object through one.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wnon-virtual-dtor"
+
+/// Lives as long as the test, whatever its reference count, which the test reads.
+class ScriptedStream final : public IStream {
+ public:
+  explicit ScriptedStream(std::string bytes) : content(std::move(bytes)) {}
+
+  ULONG mostPerRead = std::numeric_limits<ULONG>::max();
+  ULONG mostPerWrite = std::numeric_limits<ULONG>::max();
+  HRESULT readResult = S_OK;  // of a Read that brings bytes
+  HRESULT endResult = S_OK;   // of a Read at the end
+  int failingRead = 0;        // which Read fails, counted from 1; 0 for none
+  HRESULT readFailure = STG_E_READFAULT;
+  HRESULT writeResult = S_OK;  // a failure writes nothing
+  ULONG overclaim = 0;         // how many bytes more than it brings a Read says it brought
+
+  std::string content;
+  std::size_t position = 0;
+  std::string written;
+
+  ULONG references = 1;
+  int reads = 0;
+  int writes = 0;
+  int otherCalls = 0;         // whatever is neither counting references nor reading nor writing
+  std::vector<ULONG> wanted;  // bytes that each Read asked for
+
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void** object) override {
+    ++otherCalls;
+    *object = nullptr;
+    return E_NOINTERFACE;
+  }
+  ULONG STDMETHODCALLTYPE AddRef() override { return ++references; }
+  ULONG STDMETHODCALLTYPE Release() override { return --references; }
+
+  HRESULT STDMETHODCALLTYPE Read(void* bytes, ULONG count, ULONG* read) override {
+    wanted.push_back(count);
+    if (++reads == failingRead) {
+      // A failing stream may have written to its buffer all the same.
+      std::memset(bytes, '!', count);
+      *read = 0;
+      return readFailure;
+    }
+    const std::size_t brought =
+        std::min({content.size() - position, std::size_t{count}, std::size_t{mostPerRead}});
+    std::memcpy(bytes, content.data() + position, brought);
+    position += brought;
+    *read = static_cast<ULONG>(brought) + (brought == 0 ? 0 : overclaim);
+    return brought == 0 ? endResult : readResult;
+  }
+
+  HRESULT STDMETHODCALLTYPE Write(const void* bytes, ULONG count, ULONG* taken) override {
+    ++writes;
+    *taken = writeResult < 0 ? 0 : std::min(count, mostPerWrite);
+    written.append(static_cast<const char*>(bytes), *taken);
+    return writeResult;
+  }
+
+  HRESULT STDMETHODCALLTYPE Seek(LARGE_INTEGER, DWORD, ULARGE_INTEGER*) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE SetSize(ULARGE_INTEGER) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE CopyTo(IStream*, ULARGE_INTEGER, ULARGE_INTEGER*, ULARGE_INTEGER*) override {
+    return Refuse();
+  }
+  HRESULT STDMETHODCALLTYPE Commit(DWORD) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE Revert() override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE LockRegion(ULARGE_INTEGER, ULARGE_INTEGER, DWORD) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE UnlockRegion(ULARGE_INTEGER, ULARGE_INTEGER, DWORD) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE Stat(STATSTG*, DWORD) override { return Refuse(); }
+  HRESULT STDMETHODCALLTYPE Clone(IStream**) override { return Refuse(); }
+
+ private:
+  HRESULT Refuse() {
+    ++otherCalls;
+    return E_NOTIMPL;
+  }
+};
+
+#pragma GCC diagnostic pop
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
