@@ -1,0 +1,91 @@
+// The reduction alone: bands of a frame that stay in the processor's cache are added to a renderer again and
+// again, in the shapes in which the frame reader hands them over.
+#include <benchmark/benchmark.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "frame_renderer.h"
+
+namespace Qel::Lumetra::ShellExt::Bench {
+namespace {
+
+constexpr std::int64_t kBandBytes = 256 * 1024;
+
+template <class T>
+void Fill(std::vector<std::byte>& band) {
+  std::mt19937 engine(1);
+  std::normal_distribution<double> values(100, 20);
+  for (std::size_t i = 0; i + sizeof(T) <= band.size(); i += sizeof(T)) {
+    const T value = static_cast<T>(values(engine));
+    std::memcpy(&band[i], &value, sizeof(T));
+  }
+}
+
+void FillBand(PixelFormat format, std::vector<std::byte>& band) {
+  switch (format) {
+    case PixelFormat::kFloat32:
+    case PixelFormat::kComplexFloat32: return Fill<float>(band);
+    case PixelFormat::kFloat64:
+    case PixelFormat::kComplexFloat64: return Fill<double>(band);
+    default: return Fill<std::uint8_t>(band);  // every pattern of bytes is as good as any other for integers
+  }
+}
+
+void Kernel(benchmark::State& state, PixelFormat format, Size2 frame) {
+  const auto edge = static_cast<LONG>(state.range(0));
+  const auto renderer = MakeFrameRenderer(format, frame, SIZE{edge, edge});
+  const std::int32_t factor = renderer->reduction().factor;
+  const std::int32_t width = renderer->reduction().size.width * factor;
+  const std::int32_t height = renderer->reduction().size.height * factor;
+  const std::int64_t rowBytes = std::int64_t{frame.width} * BytesPerPixel(format);
+  // Whole rows of blocks where they fit, else the rows of one row of blocks in parts.
+  const auto fitting = static_cast<std::int32_t>(kBandBytes / rowBytes);
+  const std::int32_t bandRows = std::max(fitting / factor, 1) * factor;
+  std::vector<std::byte> band(static_cast<std::size_t>(fitting * rowBytes));
+  FillBand(format, band);
+
+  for (auto iteration : state) {
+    for (std::int32_t top = 0; top < height; top += bandRows) {
+      const std::int32_t end = std::min(top + bandRows, height);
+      for (std::int32_t y = top; y < end;) {
+        const std::int32_t rows = std::min(fitting, end - y);
+        renderer->Add({0, y, {width, rows, band.data(), BytesPerPixel(format), rowBytes}});
+        y += rows;
+      }
+    }
+    benchmark::ClobberMemory();
+  }
+  state.SetItemsProcessed(state.iterations() * width * height);
+}
+
+void Register(const char* name, PixelFormat format, Size2 frame) {
+  auto* const kernel =
+      benchmark::RegisterBenchmark(name, [=](benchmark::State& state) { Kernel(state, format, frame); });
+  for (const int edge : {96, 256, 1024}) kernel->Arg(edge);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Bench
+
+int main(int argc, char** argv) {
+  using namespace Qel::Lumetra::ShellExt;
+  Bench::Register("uint8", PixelFormat::kUInt8, {8192, 8192});
+  Bench::Register("int16", PixelFormat::kInt16, {4096, 4096});
+  Bench::Register("uint16", PixelFormat::kUInt16, {4096, 4096});
+  Bench::Register("uint16 5760x4092", PixelFormat::kUInt16, {5760, 4092});
+  Bench::Register("rgb", PixelFormat::kRgb24, {4096, 4096});
+  Bench::Register("int32", PixelFormat::kInt32, {4096, 4096});
+  Bench::Register("float32", PixelFormat::kFloat32, {4096, 4096});
+  Bench::Register("float64", PixelFormat::kFloat64, {4096, 4096});
+  Bench::Register("complex64", PixelFormat::kComplexFloat32, {4096, 4096});
+  Bench::Register("complex128", PixelFormat::kComplexFloat64, {2048, 2048});
+  benchmark::Initialize(&argc, argv);
+  if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
+  benchmark::RunSpecifiedBenchmarks();
+}
