@@ -15,6 +15,16 @@ using UINT = unsigned int;
 using HRESULT = std::int32_t;
 using HANDLE = void*;
 
+constexpr HRESULT S_OK = 0;
+constexpr HRESULT E_ACCESSDENIED = static_cast<HRESULT>(0x80070005);
+constexpr HRESULT E_INVALIDARG = static_cast<HRESULT>(0x80070057);
+constexpr bool SUCCEEDED(HRESULT result) {
+  return result >= 0;
+}
+constexpr bool FAILED(HRESULT result) {
+  return result < 0;
+}
+
 struct HINSTANCE__;
 using HINSTANCE = HINSTANCE__*;
 struct HBITMAP__;

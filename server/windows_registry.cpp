@@ -1,0 +1,90 @@
+#include "windows_registry.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+HKEY RootKey(RegistryRoot root) {
+  return root == RegistryRoot::kClassesRoot ? HKEY_CLASSES_ROOT : HKEY_LOCAL_MACHINE;
+}
+
+HRESULT FromStatus(LSTATUS status) {
+  return HRESULT_FROM_WIN32(static_cast<DWORD>(status));
+}
+
+HRESULT FromRemoval(LSTATUS status) {
+  const bool isGone = status == ERROR_FILE_NOT_FOUND || status == ERROR_PATH_NOT_FOUND;
+  return isGone ? S_OK : FromStatus(status);
+}
+
+/// An open key, closed at the end of its scope.
+class OpenKey {
+ public:
+  OpenKey() = default;
+  OpenKey(const OpenKey&) = delete;
+  OpenKey& operator=(const OpenKey&) = delete;
+  ~OpenKey() {
+    if (key_) RegCloseKey(key_);
+  }
+
+  HKEY get() const { return key_; }
+  HKEY* out() { return &key_; }
+
+ private:
+  HKEY key_ = nullptr;
+};
+
+}  // namespace
+
+HRESULT WindowsRegistry::CreateKey(RegistryRoot root, const std::wstring& path) {
+  OpenKey key;
+  return FromStatus(RegCreateKeyExW(RootKey(root), path.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE,
+                                    KEY_SET_VALUE, nullptr, key.out(), nullptr));
+}
+
+HRESULT WindowsRegistry::SetValue(RegistryRoot root, const std::wstring& path, const std::wstring& name,
+                                  const RegistryData& data) {
+  OpenKey key;
+  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.out());
+  if (opened != ERROR_SUCCESS) return FromStatus(opened);
+
+  const auto set = [&](DWORD type, const void* bytes, std::size_t size) {
+    return FromStatus(RegSetValueExW(key.get(), name.c_str(), 0, type, static_cast<const BYTE*>(bytes),
+                                     static_cast<DWORD>(size)));
+  };
+  if (const auto* number = std::get_if<std::uint32_t>(&data)) {
+    return set(REG_DWORD, number, sizeof(*number));
+  }
+  const std::wstring& text = std::get<std::wstring>(data);
+  return set(REG_SZ, text.c_str(), (text.size() + 1) * sizeof(wchar_t));
+}
+
+HRESULT WindowsRegistry::DeleteTree(RegistryRoot root, const std::wstring& path) {
+  return FromRemoval(RegDeleteTreeW(RootKey(root), path.c_str()));
+}
+
+HRESULT WindowsRegistry::DeleteValue(RegistryRoot root, const std::wstring& path, const std::wstring& name) {
+  OpenKey key;
+  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.out());
+  if (opened != ERROR_SUCCESS) return FromRemoval(opened);
+  return FromRemoval(RegDeleteValueW(key.get(), name.c_str()));
+}
+
+HRESULT WindowsRegistry::DeleteEmptyKey(RegistryRoot root, const std::wstring& path, bool ignoreDefault) {
+  DWORD subkeys = 0;
+  DWORD values = 0;
+  {
+    OpenKey key;
+    const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_QUERY_VALUE, key.out());
+    if (opened != ERROR_SUCCESS) return FromRemoval(opened);
+    const LSTATUS counted = RegQueryInfoKeyW(key.get(), nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr,
+                                             &values, nullptr, nullptr, nullptr, nullptr);
+    if (counted != ERROR_SUCCESS) return FromStatus(counted);
+    const bool hasDefault =
+        RegQueryValueExW(key.get(), nullptr, nullptr, nullptr, nullptr, nullptr) == ERROR_SUCCESS;
+    if (ignoreDefault && hasDefault) --values;
+  }
+  if (subkeys > 0 || values > 0) return S_OK;
+  return FromRemoval(RegDeleteKeyExW(RootKey(root), path.c_str(), 0, 0));
+}
+
+}  // namespace Qel::Lumetra::ShellExt
