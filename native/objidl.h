@@ -8,20 +8,12 @@
 
 #define STDMETHODCALLTYPE
 
-constexpr HRESULT S_OK = 0;
 constexpr HRESULT S_FALSE = 1;
 constexpr HRESULT E_NOTIMPL = static_cast<HRESULT>(0x80004001);
 constexpr HRESULT E_NOINTERFACE = static_cast<HRESULT>(0x80004002);
 constexpr HRESULT E_FAIL = static_cast<HRESULT>(0x80004005);
 constexpr HRESULT STG_E_ACCESSDENIED = static_cast<HRESULT>(0x80030005);
 constexpr HRESULT STG_E_READFAULT = static_cast<HRESULT>(0x8003001E);
-
-constexpr bool SUCCEEDED(HRESULT result) {
-  return result >= 0;
-}
-constexpr bool FAILED(HRESULT result) {
-  return result < 0;
-}
 
 struct GUID {
   std::uint32_t Data1;

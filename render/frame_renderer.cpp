@@ -1,16 +1,17 @@
 #include "frame_renderer.h"
 
 #include <algorithm>
-#include <cmath>
+#include <array>
+#include <cstring>
 #include <limits>
 #include <new>
 #include <optional>
-#include <vector>
 
 #include "box_reducer.h"
 #include "dib_section.h"
 #include "downsample_box.h"
 #include "grey_levels.h"
+#include "logarithm.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
@@ -95,13 +96,15 @@ class ComplexRenderer final : public FrameRenderer {
   void Add(const FramePiece& piece) override { Add(As<ComplexPixel<T>>(piece.pixels), piece.x, piece.y); }
 
   void Add(const ImageView<const ComplexPixel<T>>& pixels, std::int32_t x, std::int32_t y) {
-    logarithms_.resize(static_cast<std::size_t>(std::min(pixels.width, kMostColumns)));
+    const bool dense = pixels.pixelStride == static_cast<std::int64_t>(sizeof(ComplexPixel<T>));
     for (std::int32_t row = 0; row < pixels.height; ++row) {
       for (std::int32_t column = 0; column < pixels.width; column += kMostColumns) {
         const std::int32_t count = std::min(pixels.width - column, kMostColumns);
-        for (std::int32_t i = 0; i < count; ++i) {
-          logarithms_[static_cast<std::size_t>(i)] = LogSquaredMagnitude(pixels.Load(column + i, row));
-        }
+        const std::byte* const part = pixels.At(column, row);
+        // With the stride known to the compiler, the common case is done with vectors.
+        dense ? SquareMagnitudes(part, sizeof(ComplexPixel<T>), count)
+              : SquareMagnitudes(part, pixels.pixelStride, count);
+        LogarithmsToFloat(squares_.data(), static_cast<std::size_t>(count), logarithms_.data());
         grey_.Add(PackedView<const float>(logarithms_.data(), count, 1), x + column, y + row);
       }
     }
@@ -110,16 +113,22 @@ class ComplexRenderer final : public FrameRenderer {
   HBITMAP Finish() override { return grey_.Finish(); }
 
  private:
-  static constexpr std::int32_t kMostColumns = 16384;
+  static constexpr std::int32_t kMostColumns = 2048;
 
-  static float LogSquaredMagnitude(const ComplexPixel<T>& pixel) {
-    const double re = pixel.re;
-    const double im = pixel.im;
-    return static_cast<float>(std::log(re * re + im * im));
+  void SquareMagnitudes(const std::byte* pixels, std::int64_t pixelStride, std::int32_t count) {
+    for (std::int32_t i = 0; i < count; ++i) {
+      T parts[2];
+      std::memcpy(&parts[0], pixels + i * pixelStride, sizeof(T));
+      std::memcpy(&parts[1], pixels + i * pixelStride + sizeof(T), sizeof(T));
+      const double re = parts[0];
+      const double im = parts[1];
+      squares_[static_cast<std::size_t>(i)] = re * re + im * im;
+    }
   }
 
   GreyRenderer<float> grey_;
-  std::vector<float> logarithms_;
+  std::array<double, kMostColumns> squares_;
+  std::array<float, kMostColumns> logarithms_;
 };
 
 /// Averages straight into the bitmap.

@@ -1,0 +1,253 @@
+// The sums of one row of blocks of factor by factor pixels, for the box average (box_reducer.h).
+//
+// Each sum is what adding the block's values as doubles gives, row by row from the block's top row and from
+// left to right within a row. Values of 8 and 16 bits are added as integers, which gives the same sum in any
+// order, so whole rows are added to column sums and these are folded into blocks. Wider values are added as
+// doubles in exactly that order, the blocks side by side because each is a chain of additions of its own.
+#pragma once
+
+#include <emmintrin.h>
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include "image_view.h"
+#include "pixel.h"
+
+namespace Qel::Lumetra::ShellExt {
+
+/// A pixel is one sample (grey) or several (colour channels), each averaged by itself. The reduced image
+/// holds the same pixels, but for colours, which go into a bitmap and take its byte order.
+template <class Pixel>
+struct SamplesOf {
+  using Sample = Pixel;
+  using Target = Pixel;
+  static constexpr std::size_t kCount = 1;
+
+  /// The place in a target pixel of sample `i` of a pixel.
+  static constexpr std::size_t TargetIndex(std::size_t i) { return i; }
+};
+template <ColourOrder kOrder>
+struct SamplesOf<ColourPixel<kOrder>> {
+  using Sample = std::uint8_t;
+  using Target = BitmapPixel;
+  static constexpr std::size_t kCount = 3;
+
+  static constexpr std::size_t TargetIndex(std::size_t i) {
+    return kOrder == ColourOrder::kRedFirst ? 2 - i : i;
+  }
+};
+
+/// For samples whose sums are exact whatever the order.
+template <class Pixel>
+class ExactBlockSums {
+ public:
+  ExactBlockSums(std::int32_t blocks, std::int32_t factor)
+      : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
+
+  /// Adds dense rows of one row of blocks, whose first pixel is at column `x` of the frame.
+  void Add(const ImageView<const Pixel>& rows, std::int32_t x) {
+    columns_ = static_cast<std::size_t>(rows.width);
+    columnSums_.resize(columns_ * kSamples + kFolded - kSamples);
+    for (std::int32_t y = 0; y < rows.height; y += kMostRows) {
+      const std::int32_t count = std::min(kMostRows, rows.height - y);
+      SumColumns(rows.Part(0, y, rows.width, count));
+      // The sums of a block's columns mostly fit into 32 bits, which makes folding them faster.
+      const bool small =
+          count <= std::numeric_limits<std::int32_t>::max() / 65536 / static_cast<std::int64_t>(factor_);
+      small ? FoldColumns<std::int32_t>(static_cast<std::size_t>(x))
+            : FoldColumns<std::int64_t>(static_cast<std::size_t>(x));
+    }
+  }
+
+  /// The sums of the samples of every block; the caller sets those it has used back to 0.
+  double* sums() { return sums_.data(); }
+
+ private:
+  using Sample = typename SamplesOf<Pixel>::Sample;
+  static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
+  static_assert(sizeof(Sample) <= 2);
+
+  // Wide enough for the sum of kMostRows samples; narrow lanes make the pass over the rows a fast one.
+  using Lane = std::conditional_t<sizeof(Sample) == 1,
+                                  std::conditional_t<std::is_signed_v<Sample>, std::int16_t, std::uint16_t>,
+                                  std::int32_t>;
+  static constexpr std::int32_t kMostRows = sizeof(Sample) == 1 ? 255 : 32767;
+  // Three channels are folded as four lanes, which the processor adds at once; the fourth is not used.
+  static constexpr std::size_t kFolded = kSamples == 3 ? 4 : kSamples;
+
+  void SumColumns(const ImageView<const Pixel>& rows) {
+    std::int32_t y = 0;
+    for (; y + 8 <= rows.height; y += 8) AddRows<8>(rows, y);
+    for (; y + 4 <= rows.height; y += 4) AddRows<4>(rows, y);
+    for (; y + 2 <= rows.height; y += 2) AddRows<2>(rows, y);
+    if (y < rows.height) AddRows<1>(rows, y);
+  }
+
+  /// Adds rows to the column sums, which begin with row 0.
+  template <std::size_t kRows>
+  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y) {
+    y == 0 ? AddRows<kRows, true>(rows, y) : AddRows<kRows, false>(rows, y);
+  }
+
+  template <std::size_t kRows, bool kFirst>
+  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y) {
+    std::array<const std::byte*, kRows> row;
+    for (const std::byte*& bytes : row) bytes = rows.At(0, y++);
+    Lane* const __restrict sums = columnSums_.data();
+    const std::size_t count = columns_ * kSamples;
+    for (std::size_t i = 0; i < count; ++i) {
+      Lane sum = kFirst ? Lane{0} : sums[i];
+      for (std::size_t r = 0; r < kRows; ++r) {
+        Sample sample;
+        std::memcpy(&sample, row[r] + i * sizeof(Sample), sizeof(Sample));
+        sum = static_cast<Lane>(sum + sample);
+      }
+      sums[i] = sum;
+    }
+  }
+
+  template <class Sum>
+  void FoldColumns(std::size_t x) {
+    std::size_t column = 0;
+    if (x % factor_ != 0) column = FoldPart<Sum>(x, 0, std::min(columns_, factor_ - x % factor_));
+    const std::size_t blocks = (columns_ - column) / factor_;
+    const Lane* const lanes = &columnSums_[column * kSamples];
+    double* const sums = &sums_[(x + column) / factor_ * kSamples];
+    // With the factor known to the compiler, small blocks are folded many at once.
+    switch (factor_) {
+      case 2: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 2>()); break;
+      case 3: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 3>()); break;
+      case 4: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 4>()); break;
+      case 5: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 5>()); break;
+      case 6: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 6>()); break;
+      case 7: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 7>()); break;
+      case 8: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 8>()); break;
+      default: FoldBlocks<Sum>(lanes, sums, blocks, factor_); break;
+    }
+    column += blocks * factor_;
+    if (column < columns_) FoldPart<Sum>(x, column, columns_ - column);
+  }
+
+  template <class Sum, class Factor>
+  static void FoldBlocks(const Lane* __restrict lanes, double* __restrict sums, std::size_t blocks,
+                         Factor factor) {
+    for (std::size_t block = 0; block < blocks; ++block) {
+      std::array<Sum, kFolded> sum{};
+      for (std::size_t i = 0; i < factor; ++i) {
+        for (std::size_t sample = 0; sample < kFolded; ++sample) {
+          sum[sample] = static_cast<Sum>(sum[sample] + lanes[(block * factor + i) * kSamples + sample]);
+        }
+      }
+      for (std::size_t sample = 0; sample < kSamples; ++sample) {
+        sums[block * kSamples + sample] += static_cast<double>(sum[sample]);
+      }
+    }
+  }
+
+  /// Folds some columns of one block; returns the column after them.
+  template <class Sum>
+  std::size_t FoldPart(std::size_t x, std::size_t column, std::size_t columns) {
+    FoldBlocks<Sum>(&columnSums_[column * kSamples], &sums_[(x + column) / factor_ * kSamples], 1, columns);
+    return column + columns;
+  }
+
+  std::size_t factor_;
+  std::vector<double> sums_;
+  std::size_t columns_ = 0;
+  std::vector<Lane> columnSums_;
+};
+
+/// For samples that have to be added as doubles and in order.
+template <class Sample>
+class OrderedBlockSums {
+ public:
+  OrderedBlockSums(std::int32_t blocks, std::int32_t factor)
+      : factor_(factor), sums_(static_cast<std::size_t>(blocks)) {}
+
+  /// Adds dense rows of one row of blocks, whose first pixel is at column `x` of the frame.
+  void Add(const ImageView<const Sample>& rows, std::int32_t x) {
+    std::int32_t column = 0;
+    if (x % factor_ != 0) column = AddPart(rows, x, 0, std::min(rows.width, factor_ - x % factor_));
+    while ((rows.width - column) / kSideBySide >= factor_) column = AddBlocks(rows, x, column);
+    while (column < rows.width) column = AddPart(rows, x, column, std::min(rows.width - column, factor_));
+  }
+
+  /// The sums of every block; the caller sets those it has used back to 0.
+  double* sums() { return sums_.data(); }
+
+ private:
+  static constexpr std::int32_t kSideBySide = 8;
+
+  // Two blocks' sums are added to at once, two columns at a time: the columns of either block are loaded
+  // and widened together, then paired by column.
+  static __m128d LoadTwo(const std::byte* bytes) {
+    if constexpr (std::is_same_v<Sample, double>) {
+      return _mm_loadu_pd(reinterpret_cast<const double*>(bytes));
+    } else {
+      const __m128i samples = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(bytes));
+      if constexpr (std::is_same_v<Sample, float>) return _mm_cvtps_pd(_mm_castsi128_ps(samples));
+      if constexpr (std::is_same_v<Sample, std::int32_t>) return _mm_cvtepi32_pd(samples);
+      // There is no instruction for unsigned numbers: each becomes the low half of a double of 2^52 and more.
+      const __m128i raised = _mm_unpacklo_epi32(samples, _mm_set1_epi32(0x43300000));
+      return _mm_sub_pd(_mm_castsi128_pd(raised), _mm_set1_pd(4503599627370496.0));
+    }
+  }
+
+  static double LoadOne(const std::byte* bytes) {
+    Sample sample;
+    std::memcpy(&sample, bytes, sizeof sample);
+    return static_cast<double>(sample);
+  }
+
+  /// Adds all columns of kSideBySide neighbouring blocks; returns the column after them.
+  std::int32_t AddBlocks(const ImageView<const Sample>& rows, std::int32_t x, std::int32_t column) {
+    constexpr std::size_t kPairs = kSideBySide / 2;
+    double* const sums = &sums_[static_cast<std::size_t>((x + column) / factor_)];
+    __m128d chain[kPairs];
+    for (std::size_t pair = 0; pair < kPairs; ++pair) chain[pair] = _mm_loadu_pd(sums + 2 * pair);
+    const std::size_t blockBytes = static_cast<std::size_t>(factor_) * sizeof(Sample);
+    for (std::int32_t y = 0; y < rows.height; ++y) {
+      const std::byte* bytes = rows.At(column, y);
+      std::int32_t i = 0;
+      for (; i + 2 <= factor_; i += 2, bytes += 2 * sizeof(Sample)) {
+        for (std::size_t pair = 0; pair < kPairs; ++pair) {
+          const __m128d left = LoadTwo(bytes + 2 * pair * blockBytes);
+          const __m128d right = LoadTwo(bytes + (2 * pair + 1) * blockBytes);
+          chain[pair] = _mm_add_pd(chain[pair], _mm_unpacklo_pd(left, right));
+          chain[pair] = _mm_add_pd(chain[pair], _mm_unpackhi_pd(left, right));
+        }
+      }
+      if (i < factor_) {
+        for (std::size_t pair = 0; pair < kPairs; ++pair) {
+          chain[pair] = _mm_add_pd(chain[pair], _mm_set_pd(LoadOne(bytes + (2 * pair + 1) * blockBytes),
+                                                           LoadOne(bytes + 2 * pair * blockBytes)));
+        }
+      }
+    }
+    for (std::size_t pair = 0; pair < kPairs; ++pair) _mm_storeu_pd(sums + 2 * pair, chain[pair]);
+    return column + kSideBySide * factor_;
+  }
+
+  /// Adds some columns of one block; returns the column after them.
+  std::int32_t AddPart(const ImageView<const Sample>& rows, std::int32_t x, std::int32_t column,
+                       std::int32_t columns) {
+    double& sum = sums_[static_cast<std::size_t>((x + column) / factor_)];
+    for (std::int32_t y = 0; y < rows.height; ++y) {
+      for (std::int32_t i = 0; i < columns; ++i) sum += LoadOne(rows.At(column + i, y));
+    }
+    return column + columns;
+  }
+
+  std::int32_t factor_;
+  std::vector<double> sums_;
+};
+
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,115 @@
+#include "logarithm.h"
+
+#include <gtest/gtest.h>
+
+#include <bit>
+#include <cmath>
+#include <cstdint>
+#include <limits>
+#include <vector>
+
+#include "random_values.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+using Testing::Random;
+using Body = void (*)(const double*, std::size_t, float*);
+
+/// Compares bits, so that a zero's sign and a NaN count.
+void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
+  std::vector<float> logarithms(values.size());
+  body(values.data(), values.size(), logarithms.data());
+  for (std::size_t i = 0; i < values.size(); ++i) {
+    const float expected = static_cast<float>(std::log(values[i]));
+    if (std::isnan(expected)) {
+      ASSERT_TRUE(std::isnan(logarithms[i])) << values[i];
+    } else {
+      ASSERT_EQ(std::bit_cast<std::uint32_t>(logarithms[i]), std::bit_cast<std::uint32_t>(expected))
+          << values[i];
+    }
+  }
+}
+
+class EveryBody : public testing::TestWithParam<Body> {
+ protected:
+  void SetUp() override {
+    // A processor without the instructions never gets to this body.
+    if (GetParam() == LogarithmsToFloatAvx2 && !HasAvx2()) bodies_ = {};
+  }
+
+  void Expect(const std::vector<double>& values) const {
+    for (const Body body : bodies_) ExpectTheLibrarysLogarithms(body, values);
+  }
+
+ private:
+  std::vector<Body> bodies_{GetParam()};
+};
+
+TEST_P(EveryBody, SpecialValues) {
+  using Limits = std::numeric_limits<double>;
+  Expect({0.0,
+          -0.0,
+          1.0,
+          -1.0,
+          Limits::infinity(),
+          -Limits::infinity(),
+          Limits::quiet_NaN(),
+          Limits::min(),
+          Limits::denorm_min(),
+          Limits::max(),
+          Limits::min() / 3,
+          std::nextafter(1.0, 0.0),
+          std::nextafter(1.0, 2.0),
+          0.5,
+          2.0,
+          std::sqrt(0.5),
+          std::sqrt(2.0),
+          1e-300,
+          1e300,
+          10.0});
+}
+
+TEST_P(EveryBody, EveryExponent) {
+  Random random(1);
+  std::vector<double> values;
+  for (int i = 0; i < 300'000; ++i) values.push_back(std::bit_cast<double>(random.Bits()));
+  Expect(values);
+}
+
+TEST_P(EveryBody, SumsOfTwoSquares) {
+  Random random(2);
+  std::vector<double> values;
+  for (int i = 0; i < 1'000'000; ++i) {
+    const double re = random.Between(-32768, 32767);
+    const double im = static_cast<float>(random.Between(-1'000'000, 1'000'000)) / 1024.0f;
+    values.push_back(i % 2 == 0 ? re * re + std::trunc(im) * std::trunc(im) : re * re + im * im);
+  }
+  Expect(values);
+}
+
+TEST_P(EveryBody, AroundOne) {
+  Random random(3);
+  std::vector<double> values;
+  for (int i = 0; i < 300'000; ++i) {
+    values.push_back(1.0 + std::ldexp(static_cast<double>(random.Between(-1'000'000, 1'000'000)),
+                                      -random.Between(20, 70)));
+  }
+  Expect(values);
+}
+
+TEST_P(EveryBody, EveryLengthOfABatch) {
+  Random random(4);
+  for (std::size_t length : {0u, 1u, 3u, 255u, 256u, 257u, 513u}) {
+    std::vector<double> values;
+    while (values.size() < length) values.push_back(random.OneIn(5) ? 0.0 : random.Between(1, 100));
+    Expect(values);
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Logarithm, EveryBody,
+                         testing::Values(LogarithmsToFloatBaseline, LogarithmsToFloatAvx2,
+                                         LogarithmsToFloat));
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
