@@ -3,27 +3,35 @@
 
 #include <array>
 #include <bit>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
+#include <istream>
 #include <type_traits>
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The little-endian integer at `bytes`, which must hold sizeof(Integer) bytes.
-template <class Integer>
-constexpr Integer LoadLittleEndian(const unsigned char* bytes) {
-  static_assert(std::is_integral_v<Integer>);
-  std::make_unsigned_t<Integer> value = 0;
-  for (std::size_t i = 0; i < sizeof(Integer); ++i) {
-    value = static_cast<decltype(value)>(value | (static_cast<decltype(value)>(bytes[i]) << (8 * i)));
+/// The integer, or the IEEE float or double, whose sizeof(Number) bytes at `bytes` begin with the low one.
+template <class Number>
+constexpr Number LoadLittleEndian(const unsigned char* bytes) {
+  if constexpr (std::floating_point<Number>) {
+    using Bits = std::conditional_t<sizeof(Number) == 4, std::uint32_t, std::uint64_t>;
+    return std::bit_cast<Number>(LoadLittleEndian<Bits>(bytes));
+  } else {
+    std::make_unsigned_t<Number> value = 0;
+    for (std::size_t i = 0; i < sizeof(Number); ++i) {
+      value = static_cast<decltype(value)>(value | (static_cast<decltype(value)>(bytes[i]) << (8 * i)));
+    }
+    return static_cast<Number>(value);
   }
-  return static_cast<Integer>(value);
 }
 
-/// The IEEE double at `bytes`, stored low byte first.
-inline double LoadDouble(const unsigned char* bytes) {
-  return std::bit_cast<double>(LoadLittleEndian<std::uint64_t>(bytes));
+/// The number at the stream's position. Bytes that are not there count as 0, and their lack fails the stream.
+template <class Number>
+Number ReadLittleEndian(std::istream& stream) {
+  std::array<unsigned char, sizeof(Number)> bytes{};
+  stream.read(reinterpret_cast<char*>(bytes.data()), bytes.size());
+  return LoadLittleEndian<Number>(bytes.data());
 }
 
 }  // namespace Qel::Lumetra::ShellExt

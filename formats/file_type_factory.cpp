@@ -1,7 +1,11 @@
 #include "file_type_factory.h"
 
+#include "ebn_file_info.h"
+#include "emi_file_info.h"
 #include "mrc_file_info.h"
+#include "raw_file_info.h"
 #include "same_text.h"
+#include "ser_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -32,7 +36,11 @@ bool IsRawExtension(const std::wstring& extension) {
 }
 
 std::unique_ptr<FileTypeInfo> CreateFileTypeInfo(std::istream& stream, const std::wstring& extension) {
+  if (IsSerExtension(extension)) return std::make_unique<SerFileInfo>(stream);
   if (IsMrcExtension(extension)) return std::make_unique<MrcFileInfo>(stream, extension);
+  if (IsEbnExtension(extension)) return std::make_unique<EbnFileInfo>(stream);
+  if (IsEmiExtension(extension)) return std::make_unique<EmiFileInfo>(stream);
+  if (IsRawExtension(extension)) return std::make_unique<RawFileInfo>(stream);
   return nullptr;
 }
 

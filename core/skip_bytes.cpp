@@ -1,0 +1,19 @@
+#include "skip_bytes.h"
+
+#include <array>
+
+namespace Qel::Lumetra::ShellExt {
+
+void SkipBytes(std::istream& stream, std::uint32_t count) {
+  // Reading on in the stream's own buffer is faster than a seek, which throws that buffer away.
+  std::array<char, 512> bytes;
+  std::streamsize rest = count;
+  if (count > bytes.size()) {
+    // A file can be positioned behind its end. Its last byte tells whether the part is there.
+    stream.seekg(rest - 1, std::ios_base::cur);
+    rest = 1;
+  }
+  stream.read(bytes.data(), rest);
+}
+
+}  // namespace Qel::Lumetra::ShellExt

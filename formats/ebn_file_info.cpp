@@ -1,0 +1,149 @@
+#include "ebn_file_info.h"
+
+#include <array>
+#include <charconv>
+#include <limits>
+#include <string_view>
+
+#include "byte_order.h"
+#include "frame_reader.h"
+#include "text.h"
+#include "type_code.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+constexpr std::uint32_t kDescriptionId = 214;
+constexpr std::int32_t kHeaderBytes = 54;
+constexpr std::int32_t kLastTypeCode = 8;  // the format has no complex types
+
+/// What the header says of the microscope, in the order of the file. All but the voltage are codes.
+struct Instrument {
+  double model;
+  double source;
+  double lens;
+  double dNumber;
+  double kilovolts;
+};
+
+/// A code is stored as a double; half is added, the rest of the fraction cut off. On purpose that is not the
+/// nearest integer below 0: a stored -2.0 is the code -1. What no int can hold is no code, like 0.
+std::int32_t CodeOf(double stored) {
+  using Limits = std::numeric_limits<std::int32_t>;
+  const double code = stored + 0.5;
+  const bool fits = code > Limits::min() - 1.0 && code < Limits::max() + 1.0;
+  return fits ? static_cast<std::int32_t>(code) : 0;
+}
+
+std::string_view ModelText(std::int32_t code) {
+  switch (code) {
+    case -2: return "Halden 10";
+    case -1: return "Halden 12";
+    case 1: return "Halden 20";
+    case 2: return "Halden 30";
+    default: return "";
+  }
+}
+
+std::string_view SourceText(std::int32_t code) {
+  switch (code) {
+    case -2: return " W";
+    case -1: return " Lab6";
+    case 1: return " FEG";
+    default: return "";
+  }
+}
+
+std::string_view LensText(std::int32_t code) {
+  switch (code) {
+    case -3: return " HC";
+    case -2: return " BioPOLE";
+    case -1: return " POLE";
+    case 1: return " SPOLE";
+    case 2: return " UPOLE";
+    case 3: return " XPOLE";
+    case 4: return " CryoPOLE";
+    default: return "";
+  }
+}
+
+/// One digit after the point, whatever the locale of the host.
+std::string OneDecimal(double number) {
+  // The digits of the largest double, a sign, the point and the digit behind it.
+  std::array<char, std::numeric_limits<double>::max_exponent10 + 4> text;
+  const auto end = std::to_chars(text.data(), text.data() + text.size(), number, std::chars_format::fixed, 1);
+  return {text.data(), end.ptr};
+}
+
+std::string Describe(const Instrument& instrument) {
+  std::string text(ModelText(CodeOf(instrument.model)));
+  text += SourceText(CodeOf(instrument.source));
+  text += LensText(CodeOf(instrument.lens));
+  if (const std::int32_t d = CodeOf(instrument.dNumber); d != 0) text += " D" + std::to_string(d);
+  return text + " " + OneDecimal(instrument.kilovolts) + " kV";
+}
+
+}  // namespace
+
+EbnParser::EbnParser(std::istream& stream) : stream_(&stream) {
+  const auto typeCode = ReadLittleEndian<std::uint16_t>(stream);
+  const auto width = ReadLittleEndian<std::int32_t>(stream);
+  const auto height = ReadLittleEndian<std::int32_t>(stream);
+  const auto dataOffset = ReadLittleEndian<std::int32_t>(stream);
+  const Instrument instrument = {
+      .model = ReadLittleEndian<double>(stream),
+      .source = ReadLittleEndian<double>(stream),
+      .lens = ReadLittleEndian<double>(stream),
+      .dNumber = ReadLittleEndian<double>(stream),
+      .kilovolts = ReadLittleEndian<double>(stream),
+  };
+  const auto type = DataTypeOfCode(typeCode);
+  if (width < 1 || height < 1 || dataOffset < kHeaderBytes || !type || typeCode > kLastTypeCode) {
+    stream.setstate(std::ios_base::failbit);
+    return;
+  }
+  dataType_ = *type;
+  size_ = {width, height};
+  dataOffset_ = dataOffset;
+  comment_ = Describe(instrument);
+}
+
+FrameLayout EbnParser::Frame() const {
+  return PackedLayout(PixelFormatOf(dataType_).value(), size_, dataOffset_);
+}
+
+EbnFileInfo::EbnFileInfo(std::istream& stream) : parser_(stream) {}
+
+bool EbnFileInfo::IsValid() const {
+  return parser_.stream().good();
+}
+
+std::wstring EbnFileInfo::GetTypeDescription() const {
+  return LoadResourceString(kDescriptionId);
+}
+
+Size2 EbnFileInfo::GetDimensions() const {
+  return parser_.size();
+}
+
+std::int32_t EbnFileInfo::GetFrameCount() const {
+  return 1;
+}
+
+std::int32_t EbnFileInfo::GetBitDepth() const {
+  return BitsPerPixel(parser_.dataType());
+}
+
+std::wstring EbnFileInfo::GetDataTypeName() const {
+  return DataTypeName(parser_.dataType());
+}
+
+std::wstring EbnFileInfo::GetComment() const {
+  return WidenComment(parser_.comment());
+}
+
+HBITMAP EbnFileInfo::CreateThumbnail(const SIZE& size) const {
+  return ReadThumbnail(parser_.stream(), parser_.Frame(), size);
+}
+
+}  // namespace Qel::Lumetra::ShellExt

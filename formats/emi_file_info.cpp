@@ -1,0 +1,196 @@
+#include "emi_file_info.h"
+
+#include <optional>
+#include <stdexcept>
+
+#include "byte_order.h"
+#include "frame_reader.h"
+#include "skip_bytes.h"
+#include "text.h"
+#include "wrap.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+constexpr std::uint32_t kDescriptionId = 101;
+
+constexpr std::uint16_t kMagic = 0x4B4A;
+constexpr std::int16_t kLastVersion = 0x0200;
+
+constexpr EmiItemId kImageObject = {0x49B0, 0x0610};
+constexpr std::uint16_t kDataTag = 0x0202;  // of the one array of an image that holds its pixels
+
+constexpr std::uint16_t kDouble = 0x0041;
+constexpr std::uint16_t kText = 0x0060;
+constexpr std::uint16_t kArrayBit = 0x2000;
+
+/// Bytes of the value of an item that is one number; none for another item.
+std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
+  switch (type) {
+    case 0x0010:
+    case 0x0020:
+    case 0x0070: return 1;
+    case 0x0030:
+    case 0x0032: return 2;
+    case 0x0031:
+    case 0x0033:
+    case 0x0040: return 4;
+    case 0x0034:
+    case kDouble: return 8;
+    default: return std::nullopt;
+  }
+}
+
+/// Data arrays have the even types from 0x2100 (of lines) and from 0x2200 (of images) to 0x14 further.
+bool IsDataArray(std::uint16_t type) {
+  const int series = type & 0xFF00;
+  const int elementType = type & 0x00FF;
+  return (series == 0x2100 || series == 0x2200) && elementType <= 0x14 && elementType % 2 == 0;
+}
+
+bool IsPixelArray(EmiItemId id) {
+  return IsDataArray(id.type) && (id.type & 0xFF00) == 0x2200 && id.tag == kDataTag;
+}
+
+/// The elements of a data array. The larger of the complex types has the smaller number.
+std::optional<DataType> ElementType(std::uint16_t arrayType) {
+  switch (arrayType & 0x00FF) {
+    case 0x00: return DataType::kInt8;
+    case 0x02: return DataType::kUInt8;
+    case 0x04: return DataType::kInt16;
+    case 0x06: return DataType::kUInt16;
+    case 0x08: return DataType::kInt32;
+    case 0x0A: return DataType::kUInt32;
+    case 0x0C: return DataType::kFloat32;
+    case 0x0E: return DataType::kFloat64;
+    case 0x12: return DataType::kComplexFloat64;
+    case 0x14: return DataType::kComplexFloat32;
+    default: return std::nullopt;
+  }
+}
+
+}  // namespace
+
+EmiParser::EmiParser(std::istream& stream) : stream_(&stream) {
+  const auto magic = ReadLittleEndian<std::uint16_t>(stream);
+  const auto version = ReadLittleEndian<std::int16_t>(stream);
+  ReadLittleEndian<std::uint32_t>(stream);  // nothing that is known
+  if (!stream.good() || magic != kMagic || version > kLastVersion) return;
+  Walk();
+  // A walk may well end with the file; what it found is usable all the same.
+  stream.clear();
+}
+
+void EmiParser::Walk() {
+  while (true) {
+    const EmiItemId id = ReadItemId();
+    if (!stream_->good()) return;
+    if (id.type == 0) {  // the end of a list
+      if (objectPath_.empty()) return;
+      objectPath_.pop_back();
+      continue;
+    }
+    objectPath_.push_back(id);
+    if (id == kImageObject) ++imageCount_;
+    if (ReadValue()) objectPath_.pop_back();
+  }
+}
+
+EmiItemId EmiParser::ReadItemId() {
+  EmiItemId id;
+  id.type = ReadLittleEndian<std::uint16_t>(*stream_);
+  if (id.type != 0) id.tag = ReadLittleEndian<std::uint16_t>(*stream_);
+  return id;
+}
+
+bool EmiParser::ReadValue() {
+  const std::uint16_t type = objectPath_.back().type;
+  if (const auto bytes = BytesOfNumber(type)) {
+    if (type == kDouble) PathEntry(-3);  // belongs to an object of an object
+    SkipBytes(*stream_, *bytes);
+    return true;
+  }
+  if (type == kText) {
+    PathEntry(-2);  // belongs to an object
+    SkipBytes(*stream_, ReadLittleEndian<std::uint32_t>(*stream_));
+    return true;
+  }
+  if ((type & kArrayBit) != 0) {
+    ReadArray();
+    return true;
+  }
+  return false;
+}
+
+void EmiParser::ReadArray() {
+  const auto byteCount = ReadLittleEndian<std::uint32_t>(*stream_);
+  const EmiItemId id = objectPath_.back();
+  if (IsDataArray(id.type)) {
+    const bool inImage = PathEntry(-2) == kImageObject;
+    // The array belongs to the image that was opened last.
+    if (inImage && IsPixelArray(id) && imageCount_ == 1) ReadPixelArray();
+  }
+  // The byte count says where the next item is, whatever the array's width and height come to.
+  SkipBytes(*stream_, byteCount);
+}
+
+void EmiParser::ReadPixelArray() {
+  const std::int64_t start = stream_->tellg();
+  const auto width = ReadLittleEndian<std::int32_t>(*stream_);
+  const auto height = ReadLittleEndian<std::int32_t>(*stream_);
+  if (const auto type = ElementType(objectPath_.back().type)) {
+    firstImage_ = {*type, {width, height}, stream_->tellg()};
+  }
+  stream_->seekg(start);
+}
+
+const EmiItemId& EmiParser::PathEntry(std::ptrdiff_t index) const {
+  const auto depth = static_cast<std::ptrdiff_t>(objectPath_.size());
+  if (-index > depth) throw std::invalid_argument("bad EMI object index");
+  return objectPath_[static_cast<std::size_t>(depth + index)];
+}
+
+std::int32_t EmiParser::imageCount() const {
+  return WrapToInt32(imageCount_);
+}
+
+FrameLayout EmiParser::FirstFrame() const {
+  return PackedLayout(PixelFormatOf(firstImage_.dataType).value(), firstImage_.size,
+                      firstImage_.dataPosition);
+}
+
+EmiFileInfo::EmiFileInfo(std::istream& stream) : parser_(stream) {}
+
+bool EmiFileInfo::IsValid() const {
+  return parser_.imageCount() > 0 && !parser_.stream().bad();
+}
+
+std::wstring EmiFileInfo::GetTypeDescription() const {
+  return LoadResourceString(kDescriptionId);
+}
+
+Size2 EmiFileInfo::GetDimensions() const {
+  return parser_.firstImage().size;
+}
+
+std::int32_t EmiFileInfo::GetFrameCount() const {
+  return parser_.imageCount();
+}
+
+std::int32_t EmiFileInfo::GetBitDepth() const {
+  return BitsPerPixel(parser_.firstImage().dataType);
+}
+
+std::wstring EmiFileInfo::GetDataTypeName() const {
+  return DataTypeName(parser_.firstImage().dataType);
+}
+
+std::wstring EmiFileInfo::GetComment() const {
+  return WidenComment("VRA EMI File");
+}
+
+HBITMAP EmiFileInfo::CreateThumbnail(const SIZE& size) const {
+  return ReadThumbnail(parser_.stream(), parser_.FirstFrame(), size);
+}
+
+}  // namespace Qel::Lumetra::ShellExt
