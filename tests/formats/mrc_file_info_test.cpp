@@ -2,26 +2,280 @@
 
 #include <gtest/gtest.h>
 
-#include <sstream>
+#include <limits>
 
-#include "bitmap_pixels.h"
+#include "mrc_file.h"
+#include "open_file.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-TEST(Mrc, Smoke) {
-  std::string bytes(1024, '\0');
-  bytes[0] = 4;
-  bytes[4] = 2;
-  bytes[8] = 1;
-  for (char c = 0; c < 8; ++c) bytes += c;
-  std::istringstream stream(bytes);
-  MrcFileInfo info(stream, L"mrc");
-  ASSERT_TRUE(info.IsValid());
-  const auto pixels = Testing::TakeBitmap(info.CreateThumbnail({10, 10}));
-  EXPECT_EQ(pixels.bytes.size(), 8u);
-  EXPECT_EQ(pixels.bytes[0], 145);
-  EXPECT_EQ(pixels.colours.size(), 256u);
+using Testing::ByteOrder;
+using Testing::BytesOf;
+using Testing::MrcFile;
+
+using Bytes = std::vector<std::uint8_t>;
+
+constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr std::int32_t kLeast = std::numeric_limits<std::int32_t>::min();
+constexpr std::int32_t kMost = std::numeric_limits<std::int32_t>::max();
+
+class OpenMrc : public Testing::OpenFile<MrcFileInfo> {
+ public:
+  explicit OpenMrc(const MrcFile& file, const std::wstring& extension = L"mrc") : OpenFile(file, extension) {}
+};
+
+bool IsValid(const MrcFile& file) {
+  return OpenMrc(file)->IsValid();
+}
+
+TEST(Mrc, AnswersFromItsHeader) {
+  MrcFile file;
+  file.nx = 7;
+  file.ny = 5;
+  file.nz = 3;
+  const OpenMrc mrc(file);
+  ASSERT_TRUE(mrc->IsValid());
+  EXPECT_EQ(mrc->GetDimensions(), (Size2{7, 5}));
+  EXPECT_EQ(mrc->GetFrameCount(), 3);
+  EXPECT_EQ(mrc->GetComment(), L"");
+}
+
+TEST(Mrc, HasTheTypeOfItsMode) {
+  struct Row {
+    std::int32_t mode, bits;
+    const wchar_t* name;
+  };
+  constexpr Row kRows[] = {
+      {0, 8, L"8 bit unsigned"},          {1, 16, L"16 bit signed"},        {2, 32, L"32 bit float"},
+      {3, 32, L"32 bit complex integer"}, {4, 64, L"64 bit complex float"}, {5, 8, L"8 bit unsigned"},
+      {6, 16, L"16 bit unsigned"},        {7, 8, L"8 bit unsigned"},        {8, 8, L"8 bit unsigned"},
+      {9, 8, L"8 bit unsigned"},          {10, 8, L"8 bit unsigned"},       {11, 8, L"8 bit unsigned"},
+      {12, 8, L"8 bit unsigned"},         {13, 8, L"8 bit unsigned"},       {14, 8, L"8 bit unsigned"},
+      {15, 8, L"8 bit unsigned"},         {16, 24, L"24 bit RGB"},
+  };
+  for (const ByteOrder order : {ByteOrder::kLittleEndian, ByteOrder::kBigEndian}) {
+    for (const Row& row : kRows) {
+      SCOPED_TRACE(row.mode);
+      MrcFile file;
+      file.mode = row.mode;
+      file.order = order;
+      file.pixels = std::string(static_cast<std::size_t>(row.bits / 8), '\1');
+      const OpenMrc mrc(file);
+      ASSERT_TRUE(mrc->IsValid());
+      EXPECT_EQ(mrc->GetBitDepth(), row.bits);
+      EXPECT_EQ(mrc->GetDataTypeName(), row.name);
+      EXPECT_EQ(mrc.Thumbnail({1, 1}).width, 1);
+      file.pixels.pop_back();
+      EXPECT_EQ(OpenMrc(file).Thumbnail({1, 1}).width, 0);
+    }
+  }
+}
+
+TEST(Mrc, RejectsModesOutsideOf0To16) {
+  for (const std::int32_t mode : {17, 101, kMost, -1, kLeast}) {
+    MrcFile file;
+    file.mode = mode;
+    EXPECT_FALSE(IsValid(file)) << mode;
+  }
+}
+
+TEST(Mrc, RejectsEmptyStacks) {
+  for (const auto field : {&MrcFile::nx, &MrcFile::ny, &MrcFile::nz}) {
+    for (const std::int32_t number : {0, -1, kLeast}) {
+      MrcFile file;
+      file.*field = number;
+      EXPECT_FALSE(IsValid(file)) << number;
+    }
+  }
+}
+
+TEST(Mrc, RejectionSetsBadbit) {
+  MrcFile file;
+  file.mode = 17;
+  OpenMrc mrc(file);
+  EXPECT_TRUE(mrc.stream().bad());
+}
+
+TEST(Mrc, DescriptionsAreEmptyForEveryExtension) {
+  for (const wchar_t* extension : {L"mrc", L"ali", L"ALI", L"rec", L"Rec", L""}) {
+    EXPECT_EQ(OpenMrc(MrcFile(), extension)->GetTypeDescription(), L"");
+  }
+}
+
+TEST(Mrc, BigEndianHeaderIsRecognisedByItsSize) {
+  MrcFile file;
+  file.order = ByteOrder::kBigEndian;
+  file.nx = 512;
+  file.ny = 300;
+  file.nz = 40;
+  file.mode = 6;
+  file.labels = {"one", "two"};
+  const OpenMrc mrc(file);
+  ASSERT_TRUE(mrc->IsValid());
+  EXPECT_EQ(mrc->GetDimensions(), (Size2{512, 300}));
+  EXPECT_EQ(mrc->GetFrameCount(), 40);
+  EXPECT_EQ(mrc->GetDataTypeName(), L"16 bit unsigned");
+  EXPECT_EQ(mrc->GetComment(), L"one\r\ntwo");
+}
+
+TEST(Mrc, BothEdgesMustBeTooLargeForTheOtherByteOrder) {
+  MrcFile file;
+  file.nx = 65536;
+  file.ny = 65535;
+  EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{65536, 65535}));
+  file.ny = 65536;  // both are 256 in the other order, and so are their high bits
+  EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x100, 0x100}));
+  file.nz = 0x01000000;
+  EXPECT_EQ(OpenMrc(file)->GetFrameCount(), 1);
+  file.nx = kLeast;  // as an unsigned number
+  EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x80, 0x100}));
+}
+
+TEST(MrcComment, JoinsTheLabels) {
+  MrcFile file;
+  file.labels = {"first", "  second  ", "   ", "", "fifth"};
+  EXPECT_EQ(OpenMrc(file)->GetComment(), L"first\r\n  second\r\nfifth");
+}
+
+TEST(MrcComment, LabelsOfOnlySpacesLeaveNoEmptyLines) {
+  MrcFile file;
+  file.labels = {" ", "text", std::string(80, ' ')};
+  EXPECT_EQ(OpenMrc(file)->GetComment(), L"text");
+}
+
+TEST(MrcComment, LabelEndsAtItsFirstZero) {
+  MrcFile file;
+  file.labels = {std::string("before \0after", 13), std::string("\0after", 6)};
+  EXPECT_EQ(OpenMrc(file)->GetComment(), L"before");
+}
+
+TEST(MrcComment, LabelCanFillItsPlace) {
+  MrcFile file;
+  file.labels = {std::string(80, 'a'), std::string(79, 'b') + ' '};
+  EXPECT_EQ(OpenMrc(file)->GetComment(), std::wstring(80, L'a') + L"\r\n" + std::wstring(79, L'b'));
+}
+
+TEST(MrcComment, HasAtMostTenLabels) {
+  MrcFile file;
+  std::wstring all;
+  for (char c = 'a'; c < 'a' + 10; ++c) {
+    file.labels.emplace_back(1, c);
+    all += (all.empty() ? L"" : L"\r\n") + std::wstring(1, static_cast<wchar_t>(c));
+  }
+  EXPECT_EQ(OpenMrc(file)->GetComment(), all);
+  for (const std::int32_t count : {25, kMost}) {
+    file.nlabl = count;
+    EXPECT_EQ(OpenMrc(file)->GetComment(), all);
+  }
+  file.nlabl = 2;
+  EXPECT_EQ(OpenMrc(file)->GetComment(), L"a\r\nb");
+  for (const std::int32_t count : {0, -1, kLeast}) {
+    file.nlabl = count;
+    EXPECT_EQ(OpenMrc(file)->GetComment(), L"");
+  }
+}
+
+TEST(MrcComment, WidensBytesWithTheirSign) {
+  MrcFile file;
+  file.labels = {"5 \xB5m"};
+  EXPECT_EQ(OpenMrc(file)->GetComment(), (std::wstring{L'5', L' ', wchar_t{0xFFB5}, L'm'}));
+}
+
+/// Sections of one column: 255 at the bottom, the section's number, and 0 at the top.
+MrcFile Stack(std::int32_t sections) {
+  MrcFile file;
+  file.ny = 3;
+  file.nz = sections;
+  for (std::int32_t i = 0; i < sections; ++i) {
+    file.pixels += BytesOf<std::uint8_t>({255, static_cast<std::uint8_t>(i), 0});
+  }
+  return file;
+}
+
+TEST(MrcThumbnail, ShowsTheMiddleSectionWithItsFirstRowAtTheBottom) {
+  for (std::int32_t sections = 1; sections <= 7; ++sections) {
+    const auto middle = static_cast<std::uint8_t>(sections / 2);
+    EXPECT_EQ(OpenMrc(Stack(sections)).Thumbnail(kWholeSize).bytes, (Bytes{0, middle, 255})) << sections;
+  }
+}
+
+TEST(MrcThumbnail, CanBeAskedForAgain) {
+  const OpenMrc mrc(Stack(5));
+  EXPECT_EQ(mrc.Thumbnail(kWholeSize).bytes, (Bytes{0, 2, 255}));
+  EXPECT_EQ(mrc.Thumbnail({1, 1}).width, 0);  // no whole block
+  EXPECT_EQ(mrc.Thumbnail(kWholeSize).bytes, (Bytes{0, 2, 255}));
+}
+
+TEST(MrcThumbnail, NeedsOnlyItsSection) {
+  MrcFile file = Stack(5);
+  file.pixels.resize(3 * 3);
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 2, 255}));
+  file.pixels.resize(3 * 3 - 1);
+  EXPECT_TRUE(IsValid(file));
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
+}
+
+TEST(MrcThumbnail, PixelsFollowTheExtendedHeader) {
+  MrcFile file = Stack(1);
+  file.extendedHeader = std::string(4096, 'x');
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 0, 255}));
+  // A negative length leads back into the header, a more negative one out of the file.
+  file.next = -1024;
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 1);
+  file.next = -1025;
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
+  file.next = kMost;  // wraps to a negative position
+  EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
+}
+
+TEST(MrcThumbnail, OnlySixteenBitPixelsAreSwapped) {
+  const auto thumbnail = [](std::int32_t mode, ByteOrder header, std::string pixels) {
+    MrcFile file;
+    file.order = header;
+    file.nx = 3;
+    file.mode = mode;
+    file.pixels = std::move(pixels);
+    return OpenMrc(file).Thumbnail({3, 1}).bytes;
+  };
+  constexpr ByteOrder kLittle = ByteOrder::kLittleEndian;
+  constexpr ByteOrder kBig = ByteOrder::kBigEndian;
+  for (const std::int32_t mode : {1, 6}) {
+    EXPECT_EQ(thumbnail(mode, kBig, BytesOf<std::int16_t>({0, 1, 255}, kBig)), (Bytes{0, 1, 255}));
+    EXPECT_EQ(thumbnail(mode, kBig, BytesOf<std::int16_t>({0, 1, 256}, kLittle)), (Bytes{0, 255, 0}));
+    EXPECT_EQ(thumbnail(mode, kLittle, BytesOf<std::int16_t>({0, 1, 255}, kLittle)), (Bytes{0, 1, 255}));
+  }
+  // All others are read as they are, whatever the header's order.
+  EXPECT_EQ(thumbnail(0, kBig, BytesOf<std::uint8_t>({0, 1, 255})), (Bytes{0, 1, 255}));
+  EXPECT_EQ(thumbnail(2, kBig, BytesOf<float>({0, 1, 255})), (Bytes{0, 1, 255}));
+  EXPECT_EQ(thumbnail(3, kBig, BytesOf<std::int16_t>({1, 0, 3, 0, 9, 0})), (Bytes{0, 127, 255}));
+  EXPECT_EQ(thumbnail(4, kBig, BytesOf<float>({1, 0, 3, 0, 9, 0})), (Bytes{0, 127, 255}));
+  EXPECT_EQ(thumbnail(16, kBig, BytesOf<std::uint8_t>({1, 2, 3, 4, 5, 6, 7, 8, 9})),
+            (Bytes{3, 2, 1, 6, 5, 4, 9, 8, 7}));
+}
+
+TEST(MrcThumbnail, SectionBehind2GiBIsNotReached) {
+  MrcFile file = Stack(1);
+  file.nx = 0x8000;
+  file.ny = 0x4000;
+  file.nz = 8;  // the middle one is at 4 * 2^29 + 1024, which is negative in 32 bits
+  EXPECT_TRUE(IsValid(file));
+  EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);
+}
+
+TEST(MrcThumbnail, HugeSectionsHaveNone) {
+  MrcFile file = Stack(1);
+  for (const std::int32_t mode : {0, 1, 2, 3, 4, 6, 16}) {
+    file.mode = mode;
+    for (const Size2 size :
+         {Size2{65536, 65535}, Size2{kMost, 65535}, Size2{kMost, 1}, Size2{1, kMost}, Size2{65535, 65535}}) {
+      file.nx = size.width;
+      file.ny = size.height;
+      file.nz = kMost;
+      EXPECT_TRUE(IsValid(file));
+      EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);
+    }
+  }
 }
 
 }  // namespace

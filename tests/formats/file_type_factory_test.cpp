@@ -1,0 +1,149 @@
+#include "file_type_factory.h"
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <sstream>
+#include <stdexcept>
+
+#include "ebn_file.h"
+#include "ebn_file_info.h"
+#include "emi_file.h"
+#include "emi_file_info.h"
+#include "mrc_file.h"
+#include "mrc_file_info.h"
+#include "raw_file.h"
+#include "raw_file_info.h"
+#include "ser_file.h"
+#include "ser_file_info.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+/// Whether the factory makes a `Reader` for `path`, on a stream that holds `bytes`.
+template <class Reader>
+bool Makes(const std::wstring& path, const std::string& bytes = {}) {
+  std::istringstream stream(bytes);
+  const auto reader = CreateFileTypeInfo(stream, GetExtension(path));
+  return dynamic_cast<const Reader*>(reader.get()) != nullptr;
+}
+
+bool MakesNone(const std::wstring& path) {
+  std::istringstream stream;
+  return CreateFileTypeInfo(stream, GetExtension(path)) == nullptr;
+}
+
+TEST(GetExtension, IsWhatFollowsTheLastDot) {
+  EXPECT_EQ(GetExtension(L""), L"");
+  EXPECT_EQ(GetExtension(L"image"), L"");
+  EXPECT_EQ(GetExtension(L"image.mrc"), L"mrc");
+  EXPECT_EQ(GetExtension(L"Image.MRC"), L"MRC");
+  EXPECT_EQ(GetExtension(L"archive.tar.ser"), L"ser");
+  EXPECT_EQ(GetExtension(L"image."), L"");
+  EXPECT_EQ(GetExtension(L"image.mrc."), L"");
+  EXPECT_EQ(GetExtension(L"."), L"");
+  EXPECT_EQ(GetExtension(L".raw"), L"raw");
+}
+
+TEST(GetExtension, SearchesTheWholePath) {
+  EXPECT_EQ(GetExtension(L"C:\\scans.old\\image"), L"old\\image");
+  EXPECT_EQ(GetExtension(L"C:\\scans.mrc\\image"), L"mrc\\image");
+  EXPECT_EQ(GetExtension(L"C:\\scans.old\\image.raw"), L"raw");
+}
+
+TEST(Extensions, AreComparedWholeAndWithoutCase) {
+  struct Row {
+    std::function<bool(const std::wstring&)> test;
+    std::wstring extension;
+  };
+  const Row rows[] = {
+      {IsSerExtension, L"ser"}, {IsMrcExtension, L"ali"}, {IsMrcExtension, L"rec"}, {IsMrcExtension, L"mrc"},
+      {IsEbnExtension, L"ebn"}, {IsEmiExtension, L"emi"}, {IsRawExtension, L"raw"},
+  };
+  for (const Row& row : rows) {
+    const wchar_t first = row.extension[0];
+    const wchar_t upper = static_cast<wchar_t>(first - L'a' + L'A');
+    EXPECT_TRUE(row.test(row.extension));
+    EXPECT_TRUE(row.test(upper + row.extension.substr(1)));
+    EXPECT_FALSE(row.test(L""));
+    EXPECT_FALSE(row.test(row.extension.substr(0, 2)));
+    EXPECT_FALSE(row.test(row.extension + L"2"));
+    EXPECT_FALSE(row.test(L"." + row.extension));
+    EXPECT_FALSE(row.test(row.extension + L" "));
+    EXPECT_FALSE(row.test(row.extension + std::wstring(1, L'\0')));
+    // A character that other bits make of the first letter is another one.
+    EXPECT_FALSE(row.test(static_cast<wchar_t>(first ^ 0x80) + row.extension.substr(1)));
+    // Each test knows its own extensions only.
+    for (const Row& other : rows) {
+      const bool same = row.extension == other.extension ||
+                        (IsMrcExtension(row.extension) && IsMrcExtension(other.extension));
+      EXPECT_EQ(row.test(other.extension), same);
+    }
+  }
+}
+
+TEST(CreateFileTypeInfo, ChoosesTheReaderByExtension) {
+  EXPECT_TRUE(Makes<SerFileInfo>(L"a.ser"));
+  EXPECT_TRUE(Makes<MrcFileInfo>(L"a.ali"));
+  EXPECT_TRUE(Makes<MrcFileInfo>(L"a.rec"));
+  EXPECT_TRUE(Makes<MrcFileInfo>(L"a.mrc"));
+  EXPECT_TRUE(Makes<EbnFileInfo>(L"a.ebn"));
+  EXPECT_TRUE(Makes<EmiFileInfo>(L"a.emi"));
+  EXPECT_TRUE(Makes<RawFileInfo>(L"a.raw"));
+
+  EXPECT_TRUE(Makes<MrcFileInfo>(L"Image.MRC"));
+  EXPECT_TRUE(Makes<MrcFileInfo>(L"stack.Ali"));
+  EXPECT_TRUE(Makes<SerFileInfo>(L"archive.tar.ser"));
+}
+
+TEST(CreateFileTypeInfo, MakesNoneForOtherExtensions) {
+  EXPECT_TRUE(MakesNone(L"x.mrc2"));
+  EXPECT_TRUE(MakesNone(L"x.mr"));
+  EXPECT_TRUE(MakesNone(L"x.mrc."));
+  EXPECT_TRUE(MakesNone(L"x"));
+  EXPECT_TRUE(MakesNone(L""));
+  EXPECT_TRUE(MakesNone(L"C:\\scans.old\\image"));
+  EXPECT_TRUE(MakesNone(L"C:\\scans.mrc\\image"));
+}
+
+TEST(CreateFileTypeInfo, HasParsedTheHeader) {
+  const auto valid = [](const std::string& bytes, const std::wstring& extension) {
+    std::istringstream stream(bytes);
+    return CreateFileTypeInfo(stream, extension)->IsValid();
+  };
+  Testing::SerFile ser;
+  ser.elements.resize(1);
+  EXPECT_TRUE(valid(ser.Bytes(), L"SER"));
+  EXPECT_TRUE(valid(Testing::MrcFile().Bytes(), L"rec"));
+  EXPECT_TRUE(valid(Testing::EbnFile().Bytes(), L"ebn"));
+  EXPECT_TRUE(valid(Testing::OneImageEmiFile(0x2202, 1, 1, "x").Bytes(), L"emi"));
+  EXPECT_TRUE(valid(Testing::RawFile().Bytes(), L"raw"));
+}
+
+TEST(CreateFileTypeInfo, ContentsPlayNoPart) {
+  const std::string bytes = Testing::RawFile().Bytes();
+  EXPECT_TRUE(Makes<EbnFileInfo>(L"a.ebn", bytes));
+  std::istringstream stream(bytes);
+  EXPECT_FALSE(CreateFileTypeInfo(stream, L"ebn")->IsValid());
+}
+
+TEST(CreateFileTypeInfo, PassesOnWhatAReaderThrows) {
+  std::istringstream emi(Testing::EmiFile{.items = Testing::EmiText(0, "text")}.Bytes());
+  EXPECT_THROW(CreateFileTypeInfo(emi, L"emi"), std::invalid_argument);
+  Testing::SerFile file;
+  file.elements.resize(1);
+  file.dimensions[0].unitsLength = -1;
+  std::istringstream ser(file.Bytes());
+  EXPECT_THROW(CreateFileTypeInfo(ser, L"ser"), std::length_error);
+}
+
+TEST(CreateFileTypeInfo, ReadersOfFailedStreamsAreNotValid) {
+  for (const wchar_t* extension : {L"ser", L"mrc", L"ebn", L"emi", L"raw"}) {
+    std::istringstream stream(Testing::MrcFile().Bytes());
+    stream.setstate(std::ios_base::failbit);
+    EXPECT_FALSE(CreateFileTypeInfo(stream, extension)->IsValid());
+  }
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,31 @@
+// A reader on a file in memory.
+#pragma once
+
+#include <sstream>
+#include <string>
+
+#include "bitmap_pixels.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+/// Made of a writer (mrc_file.h and its neighbours) and of what else the reader's constructor takes.
+template <class Reader>
+class OpenFile {
+ public:
+  template <class File, class... Arguments>
+  explicit OpenFile(const File& file, const Arguments&... arguments)
+      : stream_(file.Bytes()), reader_(stream_, arguments...) {}
+
+  const Reader* operator->() const { return &reader_; }
+
+  /// The thumbnail; empty where there is none.
+  BitmapPixels Thumbnail(const SIZE& size) const { return TakeBitmap(reader_.CreateThumbnail(size)); }
+
+  std::istringstream& stream() { return stream_; }
+
+ private:
+  std::istringstream stream_;
+  Reader reader_;
+};
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
