@@ -1,7 +1,9 @@
 """Processes that measure on command, and their memory."""
 
+import os
 import pathlib
 import subprocess
+import time
 
 
 class Failure(Exception):
@@ -41,13 +43,33 @@ class Worker:
     def peak_memory(self):
         return self._memory("VmHWM")
 
+    def bytes_read(self):
+        """Bytes that the process has read in all its life, from whatever."""
+        return self._number(self._proc / "io", "rchar")
+
     @property
     def _proc(self):
         return pathlib.Path("/proc") / str(self._process.pid)
 
     def _memory(self, field):
-        for line in (self._proc / "status").read_text().splitlines():
+        return self._number(self._proc / "status", field) * 1024
+
+    @staticmethod
+    def _number(path, field):
+        for line in path.read_text().splitlines():
             name, value = line.split(":", 1)
             if name == field:
-                return int(value.split()[0]) * 1024
-        raise Failure(f"no {field} of process {self._process.pid}")
+                return int(value.split()[0])
+        raise Failure(f"there is no {field} in {path}")
+
+
+def run_command(command, folder):
+    """Runs a command to its end. Returns its nanoseconds and its peak memory in bytes."""
+    begin = time.perf_counter_ns()
+    process = subprocess.Popen(command, cwd=folder, stdout=subprocess.DEVNULL)
+    _, status, usage = os.wait4(process.pid, 0)
+    end = time.perf_counter_ns()
+    process.returncode = os.waitstatus_to_exitcode(status)
+    if process.returncode != 0:
+        raise Failure(f"{' '.join(map(str, command))}: exit status {process.returncode}")
+    return end - begin, usage.ru_maxrss * 1024

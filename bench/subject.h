@@ -14,7 +14,8 @@ HBITMAP MakeThumbnail(const std::wstring& path, const SIZE& request);
 /// Makes a reader of the file, which parses its header or index, and drops it. Returns whether it is valid.
 bool OpenFile(const std::wstring& path);
 
-/// Asks all that the shell shows of a file beside its picture. Returns whether there were answers.
-bool ReadMetadata(const std::wstring& path);
+/// Asks what the shell shows of a file beside its picture: "reader" (natively), or "tip", "columns", "sets"
+/// or "store" (on Windows). Returns whether there were answers.
+bool ReadMetadata(const std::string& what, const std::wstring& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Bench

@@ -32,9 +32,9 @@ bool OpenFile(const std::wstring& path) {
   return OpenedFile(path).valid();
 }
 
-bool ReadMetadata(const std::wstring& path) {
+bool ReadMetadata(const std::string& what, const std::wstring& path) {
   const OpenedFile file(path);
-  if (!file.valid()) return false;
+  if (what != "reader" || !file.valid()) return false;
   const FileTypeInfo& reader = *file.reader;
   const std::wstring texts = reader.GetTypeDescription() + reader.GetDataTypeName() + reader.GetComment();
   return reader.GetDimensions().width > 0 && reader.GetFrameCount() > 0 && reader.GetBitDepth() > 0 &&

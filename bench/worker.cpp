@@ -8,8 +8,9 @@
 //   thumbnail CX FILE             the whole way from the file to the bitmap
 //   read POSITION COUNT FILE      the bare read of these bytes
 //   open FILE                     making the reader
-//   headers FIRST STEP COUNT BYTES FILE   one positioned read of BYTES at each of COUNT places
-//   metadata COUNT FILE...        all that is shown beside the picture, of COUNT files
+//   headers FIRST STEP COUNT BYTES FILE   one positioned read of BYTES bytes at each of COUNT places
+//   metadata WHAT FILE...         what the shell shows of each file beside the picture (subject.h)
+//   starts BYTES FILE...          opening each file and reading its first BYTES bytes
 //   bitmap CX FILE OUT            writes the bitmap's bytes to OUT
 //   naive CX FORMAT WIDTH HEIGHT FIRST PIXELSTRIDE ROWSTRIDE FILE OUT   the same of the naive reference
 #include <windows.h>
@@ -29,6 +30,7 @@
 #include "bitmap_pixels.h"
 #include "naive_picture.h"
 #include "path_stream.h"
+#include "positioned_reads.h"
 #include "subject.h"
 
 namespace Qel::Lumetra::ShellExt::Bench {
@@ -91,15 +93,40 @@ std::string TimeOpen(const Words& words) {
   return time;
 }
 
-std::string TimeMetadata(const Words& words) {
-  std::vector<std::wstring> paths;
-  for (std::size_t i = 1; i < words.size(); ++i) paths.push_back(Path(words[i]));
-  bool answered = true;
-  std::string time = TimeOf([&] {
-    for (const std::wstring& path : paths) answered = ReadMetadata(path) && answered;
-  });
-  Require(answered, "a file has no metadata");
+std::string TimeHeaders(const Words& words) {
+  const std::wstring path = Path(words.at(5));
+  const PositionedReads reads{std::stoll(words.at(1)), std::stoll(words.at(2)), std::stoll(words.at(3)),
+                              static_cast<std::size_t>(std::stoll(words.at(4)))};
+  bool done = false;
+  std::string time = TimeOf([&] { done = ReadAtPositions(path, reads); });
+  Require(done, "cannot read " + words.at(5));
   return time;
+}
+
+/// The time that `work`, which answers whether it could be done, takes for the files from word 2 on.
+template <class Work>
+std::string TimeForFiles(const Words& words, const Work& work) {
+  std::vector<std::wstring> paths;
+  for (std::size_t i = 2; i < words.size(); ++i) paths.push_back(Path(words[i]));
+  bool done = true;
+  std::string time = TimeOf([&] {
+    for (const std::wstring& path : paths) done = work(path) && done;
+  });
+  Require(done, words.front() + " of a file failed");
+  return time;
+}
+
+std::string TimeMetadata(const Words& words) {
+  return TimeForFiles(words, [&](const std::wstring& path) { return ReadMetadata(words.at(1), path); });
+}
+
+std::string TimeStarts(const Words& words) {
+  std::vector<char> start(static_cast<std::size_t>(std::stoi(words.at(1))));
+  return TimeForFiles(words, [&](const std::wstring& path) {
+    std::ifstream stream;
+    OpenPath(stream, path.c_str());
+    return stream.read(start.data(), static_cast<std::streamsize>(start.size())).good();
+  });
 }
 
 std::string WritePicture(const Testing::BitmapPixels& picture, const std::string& file) {
@@ -128,8 +155,8 @@ std::string WriteNaive(const Words& words) {
 
 std::string Answer(const std::string& line) {
   static const std::map<std::string, std::string (*)(const Words&)> kCommands = {
-      {"thumbnail", TimeThumbnail}, {"read", TimeRead},      {"open", TimeOpen},
-      {"metadata", TimeMetadata},   {"bitmap", WriteBitmap}, {"naive", WriteNaive},
+      {"thumbnail", TimeThumbnail}, {"read", TimeRead},     {"open", TimeOpen},      {"headers", TimeHeaders},
+      {"metadata", TimeMetadata},   {"starts", TimeStarts}, {"bitmap", WriteBitmap}, {"naive", WriteNaive},
   };
   Words words;
   std::istringstream stream(line);

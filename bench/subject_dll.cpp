@@ -1,0 +1,152 @@
+// The DLL that is built beside this program, spoken to as the shell speaks to it.
+#include <windows.h>
+
+#include <propsys.h>
+#include <shlobj.h>
+#include <shlwapi.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <iterator>
+#include <map>
+#include <stdexcept>
+
+#include "com_ptr.h"
+#include "subject.h"
+
+namespace Qel::Lumetra::ShellExt::Bench {
+namespace {
+
+using Com::ComPtr;
+
+constexpr CLSID kShellExtClass = {
+    0x79E696A1, 0x2FA5, 0x4B3E, {0x96, 0x10, 0xD5, 0xF7, 0x60, 0x41, 0x7E, 0x62}};
+constexpr CLSID kMrcStoreClass = {
+    0xADF28042, 0x3A9F, 0x4409, {0x9C, 0x62, 0x44, 0x4B, 0x01, 0x8A, 0x78, 0x10}};
+constexpr CLSID kRawStoreClass = {
+    0xE217E970, 0x5E2E, 0x11E1, {0xB8, 0x6C, 0x08, 0x00, 0x20, 0x0C, 0x9A, 0x66}};
+constexpr GUID kSummarySet = {0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0x00, 0x2B, 0x27, 0xB3, 0xD9}};
+constexpr GUID kImageSet = {0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
+
+/// What the extension publishes, as column, property and property key alike.
+constexpr PROPERTYKEY kProperties[] = {
+    {kImageSet, 3}, {kImageSet, 4}, {kImageSet, 7}, {kImageSet, 12}, {kImageSet, 13}, {kSummarySet, 6},
+};
+
+DLLGETCLASSOBJECTPROC LoadServer() {
+  wchar_t program[MAX_PATH] = {};
+  GetModuleFileNameW(nullptr, program, MAX_PATH);
+  const auto path = std::filesystem::path(program).parent_path().parent_path() / L"QelShellExt.dll";
+  const HMODULE module = LoadLibraryW(path.c_str());
+  if (module == nullptr) throw std::runtime_error("cannot load the DLL");
+  return reinterpret_cast<DLLGETCLASSOBJECTPROC>(
+      reinterpret_cast<void*>(GetProcAddress(module, "DllGetClassObject")));
+}
+
+template <class Interface>
+ComPtr<Interface> Create(const CLSID& clsid, const IID& iid) {
+  static const DLLGETCLASSOBJECTPROC getClassObject = LoadServer();
+  ComPtr<IClassFactory> factory;
+  ComPtr<Interface> object;
+  if (SUCCEEDED(getClassObject(clsid, IID_IClassFactory, reinterpret_cast<void**>(factory.Put())))) {
+    factory->CreateInstance(nullptr, iid, reinterpret_cast<void**>(object.Put()));
+  }
+  if (!object) throw std::runtime_error("the DLL makes no object");
+  return object;
+}
+
+/// A new object that was given the file.
+template <class Interface>
+ComPtr<Interface> Load(const std::wstring& path, const IID& iid) {
+  const auto file = Create<IPersistFile>(kShellExtClass, IID_IPersistFile);
+  file->Load(path.c_str(), STGM_READ);
+  ComPtr<Interface> object;
+  file->QueryInterface(iid, reinterpret_cast<void**>(object.Put()));
+  return object;
+}
+
+bool ReadTip(const std::wstring& path) {
+  wchar_t* tip = nullptr;
+  if (Load<IQueryInfo>(path, IID_IQueryInfo)->GetInfoTip(0, &tip) != S_OK) return false;
+  CoTaskMemFree(tip);
+  return true;
+}
+
+/// All columns of the Details view.
+bool ReadColumns(const std::wstring& path) {
+  const auto provider = Create<IColumnProvider>(kShellExtClass, IID_IColumnProvider);
+  SHCOLUMNDATA file{};
+  path.copy(file.wszFile, std::size(file.wszFile) - 1);
+  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const SHCOLUMNID& column) {
+    VARIANT value;
+    VariantInit(&value);
+    const HRESULT result = provider->GetItemData(&column, &file, &value);
+    VariantClear(&value);
+    return result == S_OK;
+  });
+}
+
+/// All properties of both legacy property sets.
+bool ReadPropertySets(const std::wstring& path) {
+  const auto sets = Load<IPropertySetStorage>(path, IID_IPropertySetStorage);
+  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const PROPERTYKEY& key) {
+    ComPtr<IPropertyStorage> storage;
+    if (sets->Open(key.fmtid, STGM_READ, storage.Put()) != S_OK) return false;
+    PROPSPEC property{};
+    property.ulKind = PRSPEC_PROPID;
+    property.propid = key.pid;
+    PROPVARIANT value;
+    PropVariantInit(&value);
+    const HRESULT result = storage->ReadMultiple(1, &property, &value);
+    PropVariantClear(&value);
+    return result == S_OK;
+  });
+}
+
+/// All properties of the property system's handler, which reads from a stream.
+bool ReadPropertyStore(const std::wstring& path) {
+  const bool isRaw = std::filesystem::path(path).extension() == L".raw";
+  const auto handler =
+      Create<IInitializeWithStream>(isRaw ? kRawStoreClass : kMrcStoreClass, IID_IInitializeWithStream);
+  ComPtr<IStream> stream;
+  if (SHCreateStreamOnFileEx(path.c_str(), STGM_READ | STGM_SHARE_DENY_NONE, FILE_ATTRIBUTE_NORMAL, FALSE,
+                             nullptr, stream.Put()) != S_OK) {
+    return false;
+  }
+  handler->Initialize(stream.Get(), STGM_READ);
+  ComPtr<IPropertyStore> store;
+  handler->QueryInterface(IID_IPropertyStore, reinterpret_cast<void**>(store.Put()));
+  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const PROPERTYKEY& key) {
+    PROPVARIANT value;
+    PropVariantInit(&value);
+    const HRESULT result = store->GetValue(key, &value);
+    PropVariantClear(&value);
+    return result == S_OK;
+  });
+}
+
+}  // namespace
+
+HBITMAP MakeThumbnail(const std::wstring& path, const SIZE& request) {
+  const auto extractor = Load<IExtractImage>(path, IID_IExtractImage);
+  wchar_t location[MAX_PATH] = {};
+  DWORD priority = 0;
+  DWORD flags = 0;
+  extractor->GetLocation(location, MAX_PATH, &priority, &request, 24, &flags);
+  HBITMAP bitmap = nullptr;
+  extractor->Extract(&bitmap);
+  return bitmap;
+}
+
+/// The tip is the cheapest answer that tells whether the reader took the file.
+bool OpenFile(const std::wstring& path) {
+  return ReadTip(path);
+}
+
+bool ReadMetadata(const std::string& what, const std::wstring& path) {
+  static const std::map<std::string, bool (*)(const std::wstring&)> kQuestions = {
+      {"tip", ReadTip}, {"columns", ReadColumns}, {"sets", ReadPropertySets}, {"store", ReadPropertyStore}};
+  return kQuestions.at(what)(path);
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Bench
