@@ -6,6 +6,7 @@
 #include <limits>
 #include <new>
 #include <optional>
+#include <span>
 
 #include "box_reducer.h"
 #include "dib_section.h"
@@ -51,7 +52,8 @@ class GreyImage {
     DibSection bitmap;
     bitmap.CreateGrey(size_.width, size_.height);
     if (bitmap.Bits().data != nullptr) {
-      MapToGreyLevels(PackedView<const T>(values_.get(), size_.width, size_.height), bitmap.Bits());
+      const auto count = static_cast<std::size_t>(size_.width) * static_cast<std::size_t>(size_.height);
+      MapToGreyLevels(std::span<const T>(values_.get(), count), bitmap.Bits());
     }
     return bitmap.Release();
   }

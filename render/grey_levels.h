@@ -1,7 +1,10 @@
 // From a reduced image of scalar values to grey levels.
 #pragma once
 
+#include <array>
+#include <cstddef>
 #include <cstdint>
+#include <span>
 #include <type_traits>
 
 #include "image_view.h"
@@ -28,14 +31,24 @@ struct ValueRange {
   T minimum;
   T maximum;
 
-  explicit ValueRange(const ImageView<const T>& image) : minimum(image.Load(0, 0)), maximum(minimum) {
-    for (std::int32_t y = 0; y < image.height; ++y) {
-      for (std::int32_t x = 0; x < image.width; ++x) {
-        const T value = image.Load(x, y);
-        if (value < minimum) minimum = value;
-        if (value > maximum) maximum = value;
+  explicit ValueRange(std::span<const T> values) : minimum(values.front()), maximum(values.front()) {
+    // Each lane sees every kLanes-th value. The result does not depend on it: a NaN as the first value stays
+    // in every lane, any other is passed over by every lane.
+    constexpr std::size_t kLanes = 32 / sizeof(T);
+    std::array<T, kLanes> low;
+    std::array<T, kLanes> high;
+    low.fill(minimum);
+    high.fill(maximum);
+    std::size_t i = 0;
+    for (; i + kLanes <= values.size(); i += kLanes) {
+      for (std::size_t lane = 0; lane < kLanes; ++lane) {
+        const T value = values[i + lane];
+        low[lane] = value < low[lane] ? value : low[lane];
+        high[lane] = value > high[lane] ? value : high[lane];
       }
     }
+    for (const T value : values.subspan(i)) Include(value, value);
+    for (std::size_t lane = 0; lane < kLanes; ++lane) Include(low[lane], high[lane]);
   }
 
   /// Grey levels per unit. A flat image is given a range of one, formed in T itself: it wraps at the type's
@@ -51,22 +64,32 @@ struct ValueRange {
     }
     return 255.0 / Difference(upper, minimum);
   }
+
+ private:
+  void Include(T low, T high) {
+    if (low < minimum) minimum = low;
+    if (high > maximum) maximum = high;
+  }
 };
 
 /// The low 8 bits of `level` truncated toward zero to 32 bits; 0 for what 32 bits cannot hold, NaN included.
 inline std::uint8_t ToGreyLevel(double level) {
-  const bool fits = level > -2147483649.0 && level < 2147483648.0;
-  return fits ? static_cast<std::uint8_t>(static_cast<std::int32_t>(level)) : std::uint8_t{0};
+  const double fitting = level > -2147483649.0 && level < 2147483648.0 ? level : 0.0;
+  return static_cast<std::uint8_t>(static_cast<std::int32_t>(fitting));
 }
 
-/// Stretches the image's own range linearly to 0..255. `bits` has the image's size.
+/// Stretches an image's own range linearly to 0..255. `values` are its pixels, row by row; `bits` has its
+/// size.
 template <class T>
-void MapToGreyLevels(const ImageView<const T>& image, const ImageView<std::uint8_t>& bits) {
-  const ValueRange<T> range(image);
+void MapToGreyLevels(std::span<const T> values, const ImageView<std::uint8_t>& bits) {
+  const ValueRange<T> range(values);
   const double scale = range.Scale();
-  for (std::int32_t y = 0; y < image.height; ++y) {
-    for (std::int32_t x = 0; x < image.width; ++x) {
-      bits.Store(x, y, ToGreyLevel(Difference(image.Load(x, y), range.minimum) * scale));
+  const auto width = static_cast<std::size_t>(bits.width);
+  for (std::int32_t y = 0; y < bits.height; ++y) {
+    const T* const row = &values[static_cast<std::size_t>(y) * width];
+    auto* const levels = reinterpret_cast<std::uint8_t*>(bits.At(0, y));
+    for (std::size_t x = 0; x < width; ++x) {
+      levels[x] = ToGreyLevel(Difference(row[x], range.minimum) * scale);
     }
   }
 }
