@@ -1,5 +1,6 @@
 // The reduction alone: bands of a frame that stay in the processor's cache are added to a renderer again and
-// again, in the shapes in which the frame reader hands them over.
+// again, in the shapes in which the frame reader hands them over. And by itself the costliest part of it, the
+// logarithms of complex frames.
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
@@ -11,6 +12,7 @@
 #include <vector>
 
 #include "frame_renderer.h"
+#include "logarithm.h"
 
 namespace Qel::Lumetra::ShellExt::Bench {
 namespace {
@@ -64,6 +66,19 @@ void Kernel(benchmark::State& state, PixelFormat format, Size2 frame) {
   state.SetItemsProcessed(state.iterations() * width * height);
 }
 
+void Logarithms(benchmark::State& state, decltype(LogarithmsToFloat) body) {
+  std::vector<double> values(4096);
+  std::mt19937 engine(1);
+  std::chi_squared_distribution<double> squaredMagnitudes(2);
+  for (double& value : values) value = squaredMagnitudes(engine);
+  std::vector<float> logarithms(values.size());
+  for (auto iteration : state) {
+    body(values.data(), values.size(), logarithms.data());
+    benchmark::ClobberMemory();
+  }
+  state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(values.size()));
+}
+
 void Register(const char* name, PixelFormat format, Size2 frame) {
   auto* const kernel =
       benchmark::RegisterBenchmark(name, [=](benchmark::State& state) { Kernel(state, format, frame); });
@@ -85,6 +100,8 @@ int main(int argc, char** argv) {
   Bench::Register("float64", PixelFormat::kFloat64, {4096, 4096});
   Bench::Register("complex64", PixelFormat::kComplexFloat32, {4096, 4096});
   Bench::Register("complex128", PixelFormat::kComplexFloat64, {2048, 2048});
+  benchmark::RegisterBenchmark("logarithms/SSE2", Bench::Logarithms, LogarithmsToFloatBaseline);
+  if (HasAvx2()) benchmark::RegisterBenchmark("logarithms/AVX2", Bench::Logarithms, LogarithmsToFloatAvx2);
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
   benchmark::RunSpecifiedBenchmarks();

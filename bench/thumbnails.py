@@ -79,30 +79,37 @@ def print_thumbnail(table, result):
 
 
 def measure_kernels(frames, program, rounds):
-    """The reduction alone of those frames that `program` knows; it names its measurements frame/edge."""
-    names = subprocess.run([program, "--benchmark_list_tests=true"], check=True, stdout=subprocess.PIPE,
-                           text=True).stdout.splitlines()
-    frames = [frame for frame in frames if f"{frame.name}/{EDGES[0]}" in names]
-    if not frames:
-        return []
+    """The reduction alone, of those frames that `program` knows; it names its measurements frame/edge. For
+    complex frames also the logarithms by themselves, with each kind of vectors."""
+    prefixes = [frame.name for frame in frames]
+    if any(frame.pixel_format.startswith("complex") for frame in frames):
+        prefixes.append("logarithms")
     output = subprocess.run(
-        [program, f"--benchmark_filter=^({'|'.join(frame.name for frame in frames)})/",
-         "--benchmark_format=json", f"--benchmark_repetitions={rounds}", "--benchmark_min_time=0.05",
+        [program, f"--benchmark_filter=^({'|'.join(prefixes)})/", "--benchmark_format=json",
+         f"--benchmark_repetitions={rounds}", "--benchmark_min_time=0.05",
          "--benchmark_enable_random_interleaving=true", "--benchmark_report_aggregates_only=true"],
         check=True, stdout=subprocess.PIPE, stderr=subprocess.DEVNULL, text=True).stdout
+    if not output:
+        return []
     times = {run["run_name"]: 1e9 / run["items_per_second"] for run in json.loads(output)["benchmarks"]
              if run["aggregate_name"] == "median"}
     table = Table("The kernel alone, on a band in the cache", workload=22, asked=5, factor=6, ns_a_pixel=10,
                   goal=9, time=7)
     results = []
+
+    def add(name, edge, factor, aim):
+        if f"{name}/{edge}" in times:
+            time = times[f"{name}/{edge}"]
+            results.append({"workload": name, "asked": edge, "factor": factor, "ns_a_pixel": time, "goal": aim,
+                            "verdict": goals.verdict(time, aim)})
+            table.row(name, edge, factor, f"{time:.3f}", goal(aim), results[-1]["verdict"])
+
     for frame in frames:
         for edge in EDGES:
             factor = frame.factor(edge)
-            time = times[f"{frame.name}/{edge}"]
-            aim = goals.kernel(frame.pixel_format, factor)
-            results.append({"workload": frame.name, "asked": edge, "factor": factor, "ns_a_pixel": time,
-                            "goal": aim, "verdict": goals.verdict(time, aim)})
-            table.row(frame.name, edge, factor, f"{time:.3f}", goal(aim), results[-1]["verdict"])
+            add(frame.name, edge, factor, goals.kernel(frame.pixel_format, factor))
+    for vectors in ("SSE2", "AVX2"):
+        add("logarithms", vectors, "", None)
     return results
 
 
