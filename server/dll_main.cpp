@@ -1,0 +1,35 @@
+// The functions through which Windows and COM talk to the DLL.
+#include <windows.h>
+
+#include "object_map.h"
+#include "qel_shell_ext_module.h"
+
+// Defined by the linker: its address is the module's instance handle.
+extern "C" IMAGE_DOS_HEADER __ImageBase;
+
+namespace {
+
+// Made before DllMain runs, destroyed when the DLL is unloaded.
+CQelShellExtModule g_module(reinterpret_cast<HINSTANCE>(&__ImageBase), Qel::Lumetra::ShellExt::ObjectMap());
+
+}  // namespace
+
+extern "C" BOOL WINAPI DllMain(HINSTANCE, DWORD reason, void*) {
+  return reason != DLL_PROCESS_ATTACH || !g_module.initFailed();
+}
+
+STDAPI DllGetClassObject(REFCLSID clsid, REFIID iid, void** classObject) {
+  return g_module.GetClassObject(clsid, iid, classObject);
+}
+
+STDAPI DllCanUnloadNow() {
+  return g_module.GetLockCount() == 0 ? S_OK : S_FALSE;
+}
+
+STDAPI DllRegisterServer() {
+  return g_module.RegisterServer();
+}
+
+STDAPI DllUnregisterServer() {
+  return g_module.UnregisterServer();
+}

@@ -1,0 +1,69 @@
+// The one module object of the DLL: the lock count that says when it may be unloaded, and the class objects
+// of the object map, which are made when first asked for and kept until the module goes.
+#pragma once
+
+#include <windows.h>
+
+#include <atomic>
+#include <span>
+#include <vector>
+
+#include "com_ptr.h"
+#include "critical_section.h"
+#include "module.h"
+#include "object_map.h"
+#include "registration.h"
+
+class CQelShellExtModule : public Qel::Com::Module {
+ public:
+  using ObjectMapEntry = Qel::Lumetra::ShellExt::ObjectMapEntry;
+
+  /// The identifier of the module's type library, which is never registered.
+  static constexpr GUID kTypeLibraryId = {
+      0x0506151B, 0x7799, 0x43EC, {0xB1, 0x47, 0x65, 0x85, 0x6D, 0xF0, 0x03, 0x0A}};
+
+  /// Makes this the current module. `objectMap` outlives it.
+  CQelShellExtModule(HINSTANCE instance, std::span<ObjectMapEntry> objectMap);
+
+  /// Releases the class objects.
+  ~CQelShellExtModule() override;
+
+  LONG Lock() override { return ++lockCount_; }
+  LONG Unlock() override { return --lockCount_; }
+  LONG GetLockCount() const override { return lockCount_; }
+  HRESULT GetGITPtr(IGlobalInterfaceTable** table) override;
+
+  /// Adds what the registry scripts of the module and of all its classes refer to.
+  virtual HRESULT AddCommonRGSReplacements(
+      std::vector<Qel::Lumetra::ShellExt::Replacement>& replacements) const;
+
+  /// A module without its critical sections must not be loaded.
+  bool initFailed() const { return initFailed_; }
+
+  /// What DllGetClassObject answers: the class object of `clsid`, the same one for every caller. Threads may
+  /// ask at the same time.
+  HRESULT GetClassObject(REFCLSID clsid, REFIID iid, void** classObject);
+
+  /// Register and unregister the module and the classes of the object map (registration.h).
+  HRESULT RegisterServer() const;
+  HRESULT UnregisterServer() const;
+
+ private:
+  struct ClassRegistry {
+    UINT size = 0;  // of this structure, set when it is ready for use
+    HINSTANCE instance = nullptr;
+    std::span<ObjectMapEntry> objectMap;
+    Qel::Com::CriticalSection section;  // guards the creation of class objects
+  };
+
+  using RegistrationStep = HRESULT(const Qel::Lumetra::ShellExt::ServerRegistration&);
+
+  HRESULT UpdateRegistration(RegistrationStep* step) const;
+  static HRESULT MakeClassObject(ObjectMapEntry& entry);
+
+  std::atomic<LONG> lockCount_ = 0;
+  bool initFailed_ = false;
+  ClassRegistry classes_;
+  Qel::Com::CriticalSection section_;  // guards the members below
+  Qel::Com::ComPtr<IGlobalInterfaceTable> interfaceTable_;
+};
