@@ -53,17 +53,21 @@ def main():
     results = {"machine": machine(), "rounds": rounds}
     print_machine(results["machine"])
     with contextlib.ExitStack() as stack:
-        native = stack.enter_context(System("native", [BUILD / "linux/bench/bench_worker"], {"reader": 1}, FOLDER))
-        systems = [native]
+        native = stack.enter_context(
+            System("native", [BUILD / "linux/bench/bench_worker"], {"reader": 1}, FOLDER))
+        dll = stack.enter_context(
+            System("DLL", [BUILD.parent / "scripts/wine", BUILD / "windows/bench/bench_worker.exe"],
+                   {"tip": 1, "columns": 6, "sets": 1, "store": 1}, FOLDER))
+        systems = [native, dll]
         if frames:
             results["thumbnails"] = measure_thumbnails(frames, systems, rounds)
             results["kernels"] = measure_kernels(frames, BUILD / "linux/bench/bench_kernels", rounds)
         if STACK.name in chosen:
             results["stack"] = measure_stack(STACK, systems, rounds)
         if "series" in chosen:
-            results["series"] = measure_series((10_000, 100_000), systems, rounds)
+            results["series"] = measure_series((10_000, 100_000), [native], rounds)
         if "folder" in chosen:
-            results["folder"] = measure_folder("mrc", 1000, systems, rounds)
+            results["folder"] = measure_folder("mrc", 1000, [native], rounds)
         if "others" in chosen:
             results["others"] = [result for frame in FRAMES if frame.name in COMPARED
                                  for result in measure_others(frame, native, rounds)]

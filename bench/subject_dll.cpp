@@ -9,22 +9,19 @@
 #include <filesystem>
 #include <iterator>
 #include <map>
-#include <stdexcept>
 
 #include "com_ptr.h"
+#include "server_dll.h"
 #include "subject.h"
 
 namespace Qel::Lumetra::ShellExt::Bench {
 namespace {
 
 using Com::ComPtr;
+using Testing::kMrcHandlerClass;
+using Testing::kRawHandlerClass;
+using Testing::kShellExtClass;
 
-constexpr CLSID kShellExtClass = {
-    0x79E696A1, 0x2FA5, 0x4B3E, {0x96, 0x10, 0xD5, 0xF7, 0x60, 0x41, 0x7E, 0x62}};
-constexpr CLSID kMrcStoreClass = {
-    0xADF28042, 0x3A9F, 0x4409, {0x9C, 0x62, 0x44, 0x4B, 0x01, 0x8A, 0x78, 0x10}};
-constexpr CLSID kRawStoreClass = {
-    0xE217E970, 0x5E2E, 0x11E1, {0xB8, 0x6C, 0x08, 0x00, 0x20, 0x0C, 0x9A, 0x66}};
 constexpr GUID kSummarySet = {0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0x00, 0x2B, 0x27, 0xB3, 0xD9}};
 constexpr GUID kImageSet = {0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
 
@@ -33,26 +30,10 @@ constexpr PROPERTYKEY kProperties[] = {
     {kImageSet, 3}, {kImageSet, 4}, {kImageSet, 7}, {kImageSet, 12}, {kImageSet, 13}, {kSummarySet, 6},
 };
 
-DLLGETCLASSOBJECTPROC LoadServer() {
-  wchar_t program[MAX_PATH] = {};
-  GetModuleFileNameW(nullptr, program, MAX_PATH);
-  const auto path = std::filesystem::path(program).parent_path().parent_path() / L"QelShellExt.dll";
-  const HMODULE module = LoadLibraryW(path.c_str());
-  if (module == nullptr) throw std::runtime_error("cannot load the DLL");
-  return reinterpret_cast<DLLGETCLASSOBJECTPROC>(
-      reinterpret_cast<void*>(GetProcAddress(module, "DllGetClassObject")));
-}
-
 template <class Interface>
 ComPtr<Interface> Create(const CLSID& clsid, const IID& iid) {
-  static const DLLGETCLASSOBJECTPROC getClassObject = LoadServer();
-  ComPtr<IClassFactory> factory;
-  ComPtr<Interface> object;
-  if (SUCCEEDED(getClassObject(clsid, IID_IClassFactory, reinterpret_cast<void**>(factory.Put())))) {
-    factory->CreateInstance(nullptr, iid, reinterpret_cast<void**>(object.Put()));
-  }
-  if (!object) throw std::runtime_error("the DLL makes no object");
-  return object;
+  static const Testing::ServerDll server;
+  return server.CreateInstance<Interface>(clsid, iid);
 }
 
 /// A new object that was given the file.
@@ -107,7 +88,7 @@ bool ReadPropertySets(const std::wstring& path) {
 bool ReadPropertyStore(const std::wstring& path) {
   const bool isRaw = std::filesystem::path(path).extension() == L".raw";
   const auto handler =
-      Create<IInitializeWithStream>(isRaw ? kRawStoreClass : kMrcStoreClass, IID_IInitializeWithStream);
+      Create<IInitializeWithStream>(isRaw ? kRawHandlerClass : kMrcHandlerClass, IID_IInitializeWithStream);
   ComPtr<IStream> stream;
   if (SHCreateStreamOnFileEx(path.c_str(), STGM_READ | STGM_SHARE_DENY_NONE, FILE_ATTRIBUTE_NORMAL, FALSE,
                              nullptr, stream.Put()) != S_OK) {
