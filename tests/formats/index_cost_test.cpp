@@ -1,0 +1,122 @@
+// What the readers of indexed files ask of their stream, counted at the stream's buffer.
+#include <gtest/gtest.h>
+
+#include <istream>
+#include <sstream>
+#include <string>
+
+#include "emi_file.h"
+#include "emi_file_info.h"
+#include "ser_file.h"
+#include "ser_file_info.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+using namespace Testing;
+
+class CountingBuffer : public std::stringbuf {
+ public:
+  explicit CountingBuffer(const std::string& bytes) : std::stringbuf(bytes, std::ios_base::in) {}
+
+  std::int64_t seeks() const { return seeks_; }
+  std::int64_t reads() const { return reads_; }
+  std::int64_t bytes() const { return bytes_; }
+
+ protected:
+  std::streamsize xsgetn(char* bytes, std::streamsize count) override {
+    const std::streamsize read = std::stringbuf::xsgetn(bytes, count);
+    ++reads_;
+    bytes_ += read;
+    return read;
+  }
+  pos_type seekoff(off_type offset, std::ios_base::seekdir from, std::ios_base::openmode which) override {
+    ++seeks_;
+    return std::stringbuf::seekoff(offset, from, which);
+  }
+  pos_type seekpos(pos_type position, std::ios_base::openmode which) override {
+    ++seeks_;
+    return std::stringbuf::seekpos(position, which);
+  }
+
+ private:
+  std::int64_t seeks_ = 0;
+  std::int64_t reads_ = 0;
+  std::int64_t bytes_ = 0;
+};
+
+TEST(SerCost, ElementHeaderTakesOneSeekAndOneRead) {
+  constexpr std::int64_t kElements = 100000;
+  SerFile file;
+  file.elements.resize(kElements);
+  CountingBuffer buffer(file.Bytes());
+  std::istream stream(&buffer);
+  const SerFileInfo ser(stream);
+  ASSERT_TRUE(ser.IsValid());
+  EXPECT_EQ(ser.GetFrameCount(), kElements);
+  // Beyond that: the fixed header, and one seek and one read for every thousand offsets.
+  EXPECT_LE(buffer.seeks(), kElements + kElements / 1000 + 1);
+  EXPECT_LE(buffer.reads(), kElements + kElements / 1000 + 20);
+  EXPECT_LE(buffer.bytes(), kElements * (50 + 4) + 100);
+}
+
+TEST(SerCost, NumbersThatLieTakeNoMoreThanTheFileHolds) {
+  SerFile honest;
+  honest.elements.resize(100);
+  SerFile elements = honest;
+  elements.totalElements = elements.validElements = 0xFFFFFFFF;
+  SerFile dimensions = honest;
+  dimensions.dimensionCount = 0xFFFFFFFF;
+  SerFile text = honest;
+  text.dimensions[0].descriptionLength = 0x7FFFFFFF;
+  for (const SerFile& file : {elements, dimensions, text}) {
+    const std::string bytes = file.Bytes();
+    CountingBuffer buffer(bytes);
+    std::istream stream(&buffer);
+    EXPECT_FALSE(SerFileInfo(stream).IsValid());
+    EXPECT_LE(buffer.bytes(), static_cast<std::int64_t>(bytes.size()));
+    EXPECT_LE(buffer.seeks() + buffer.reads(), static_cast<std::int64_t>(bytes.size() / 4));
+  }
+}
+
+/// Walks a tree and expects that no byte is read twice, but for the widths and heights of pixel arrays.
+void ExpectOnePass(const std::string& items, std::int64_t images) {
+  const std::string bytes = EmiFile{.items = items}.Bytes();
+  CountingBuffer buffer(bytes);
+  std::istream stream(&buffer);
+  const EmiFileInfo emi(stream);
+  EXPECT_EQ(emi.GetFrameCount(), images);
+  EXPECT_LE(buffer.bytes(), static_cast<std::int64_t>(bytes.size()) + 8 * images);
+  EXPECT_LE(buffer.seeks() + buffer.reads(), static_cast<std::int64_t>(bytes.size()) + 3 * images);
+}
+
+TEST(EmiCost, TreeIsWalkedInOnePass) {
+  constexpr std::int64_t kMany = 50000;
+  std::string openings;
+  std::string ends;
+  std::string images;
+  std::string arrays;
+  for (std::int64_t i = 0; i < kMany; ++i) {
+    openings += EmiOpening(0x4000, 1);
+    ends += EmiEnd();
+    images += EmiImageObject(EmiPixelArray(0x2202, 1, 1, "x"));
+    arrays += EmiArray(0x2060, 1, "x");
+  }
+  ExpectOnePass(openings, 0);
+  ExpectOnePass(openings + ends, 0);
+  ExpectOnePass(images, kMany);
+  ExpectOnePass(openings + arrays + images, kMany);
+}
+
+TEST(EmiCost, LongValuesAreNotRead) {
+  const std::string longText = EmiStructure(0x4000, 1, EmiText(1, std::string(1000000, 'x')));
+  const std::string longArray = EmiArray(0x2060, 1, std::string(1000000, 'x'));
+  const std::string bytes = EmiFile{.items = longText + longArray + EmiImageObject("")}.Bytes();
+  CountingBuffer buffer(bytes);
+  std::istream stream(&buffer);
+  EXPECT_TRUE(EmiFileInfo(stream).IsValid());
+  EXPECT_LE(buffer.bytes(), 1000);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
