@@ -137,6 +137,16 @@ TEST(CreateFileTypeInfo, PassesOnWhatAReaderThrows) {
   EXPECT_THROW(CreateFileTypeInfo(ser, L"ser"), std::length_error);
 }
 
+TEST(CreateFileTypeInfo, DeletingAReaderLeavesTheStreamAlone) {
+  std::istringstream stream(Testing::EbnFile{.model = 1, .afterHeader = "x"}.Bytes());
+  auto reader = CreateFileTypeInfo(stream, L"ebn");
+  const auto position = stream.tellg();
+  reader.reset();
+  EXPECT_TRUE(stream.good());
+  EXPECT_EQ(stream.tellg(), position);
+  EXPECT_EQ(stream.get(), 'x');
+}
+
 TEST(CreateFileTypeInfo, ReadersOfFailedStreamsAreNotValid) {
   for (const wchar_t* extension : {L"ser", L"mrc", L"ebn", L"emi", L"raw"}) {
     std::istringstream stream(Testing::MrcFile().Bytes());

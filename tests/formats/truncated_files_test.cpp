@@ -134,14 +134,15 @@ TEST_P(TruncatedFile, OnDiskIsAcceptedAsFarAsItGoes) {
   }
 }
 
+std::string NameOf(const testing::TestParamInfo<Specimen>& specimen) {
+  const std::wstring& extension = specimen.param.extension;
+  return std::string(extension.begin(), extension.end()) + std::to_string(specimen.index);
+}
+
 INSTANTIATE_TEST_SUITE_P(AllKinds, TruncatedFile,
                          testing::Values(MrcSpecimen(), RawSpecimen(), EbnSpecimen(), SerSpecimen(),
                                          WideSerSpecimen(), SerWithIndexFirstSpecimen(), EmiSpecimen()),
-                         [](const testing::TestParamInfo<Specimen>& info) {
-                           const std::wstring& extension = info.param.extension;
-                           return std::string(extension.begin(), extension.end()) +
-                                  std::to_string(info.index);
-                         });
+                         NameOf);
 
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt

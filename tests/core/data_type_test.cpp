@@ -1,0 +1,50 @@
+#include "data_type.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <type_traits>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+struct Row {
+  std::uint32_t value;
+  const wchar_t* name;
+  std::int32_t bits;
+};
+
+constexpr Row kRows[] = {
+    {0, L"8 bit unsigned", 8},         {1, L"16 bit unsigned", 16},
+    {2, L"32 bit unsigned", 32},       {4, L"8 bit signed", 8},
+    {5, L"16 bit signed", 16},         {6, L"32 bit signed", 32},
+    {8, L"32 bit float", 32},          {9, L"64 bit float", 64},
+    {10, L"64 bit complex float", 64}, {13, L"128 bit complex float", 128},
+    {16, L"24 bit RGB", 24},           {18, L"24 bit BGR", 24},
+};
+
+TEST(DataType, HasItsNameAndBits) {
+  for (const Row& row : kRows) {
+    EXPECT_EQ(DataTypeName(DataType{row.value}), row.name) << row.value;
+    EXPECT_EQ(BitsPerPixel(DataType{row.value}), row.bits) << row.value;
+  }
+}
+
+TEST(DataType, IsUnknownInTheGapsAndBehindThem) {
+  std::vector<std::uint32_t> values = {1000, 0x10000, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};
+  for (std::uint32_t value = 0; value < 40; ++value) values.push_back(value);
+  for (const std::uint32_t value : values) {
+    if (std::ranges::find(kRows, value, &Row::value) != std::end(kRows)) continue;
+    EXPECT_EQ(DataTypeName(DataType{value}), L"Unknown") << value;
+    EXPECT_EQ(BitsPerPixel(DataType{value}), 0) << value;
+  }
+}
+
+TEST(DataType, Has32Bits) {
+  EXPECT_EQ(sizeof(DataType), 4u);
+  EXPECT_TRUE((std::is_same_v<std::underlying_type_t<DataType>, std::uint32_t>));
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt

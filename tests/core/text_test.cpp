@@ -1,0 +1,66 @@
+#include "text.h"
+
+#include <gtest/gtest.h>
+
+#include "same_text.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+TEST(LoadResourceString, AnswersWhatTheTableHolds) {
+  EXPECT_EQ(LoadResourceString(100), L"QelShellExt");
+  EXPECT_EQ(LoadResourceString(200), L"Dimensions");
+  EXPECT_EQ(LoadResourceString(201), L"Size");
+  EXPECT_EQ(LoadResourceString(202), L"Type");
+  EXPECT_EQ(LoadResourceString(203), L"images");
+  EXPECT_EQ(LoadResourceString(204), L"Date Modified");
+  EXPECT_EQ(LoadResourceString(205), L"Comments");
+  EXPECT_EQ(LoadResourceString(206), L"Width");
+  EXPECT_EQ(LoadResourceString(207), L"Height");
+  EXPECT_EQ(LoadResourceString(208), L"Frame Count");
+  EXPECT_EQ(LoadResourceString(209), L"Bit Depth");
+}
+
+TEST(LoadResourceString, IsEmptyForAllOtherIds) {
+  for (std::uint32_t id = 0; id < 1000; ++id) {
+    if (id == 100 || (id >= 200 && id <= 209)) continue;
+    EXPECT_EQ(LoadResourceString(id), L"") << id;
+  }
+  EXPECT_EQ(LoadResourceString(0xFFFFFFFF), L"");
+}
+
+TEST(WidenComment, KeepsTheLowerHalfOfTheBytes) {
+  for (int byte = 0; byte < 0x80; ++byte) {
+    EXPECT_EQ(WidenComment(std::string(1, static_cast<char>(byte))),
+              std::wstring(1, static_cast<wchar_t>(byte)));
+  }
+}
+
+TEST(WidenComment, ExtendsTheSignOfTheUpperHalf) {
+  for (int byte = 0x80; byte < 0x100; ++byte) {
+    EXPECT_EQ(WidenComment(std::string(1, static_cast<char>(byte))),
+              std::wstring(1, static_cast<wchar_t>(0xFF00 + byte)));
+  }
+  EXPECT_EQ(WidenComment("\xB5"), std::wstring(1, wchar_t{0xFFB5}));
+  EXPECT_EQ(WidenComment("\xE9"), std::wstring(1, wchar_t{0xFFE9}));
+}
+
+TEST(WidenComment, KeepsTheLength) {
+  EXPECT_EQ(WidenComment(""), L"");
+  EXPECT_EQ(WidenComment("a text"), L"a text");
+  EXPECT_EQ(WidenComment(std::string_view("a\0b", 3)), std::wstring(L"a\0b", 3));
+}
+
+TEST(SameIgnoringCase, KnowsTheCaseOfAToZOnly) {
+  EXPECT_TRUE(SameIgnoringCase(L"", L""));
+  EXPECT_TRUE(SameIgnoringCase(L"AbyZ@[`{", L"aBYz@[`{"));
+  EXPECT_FALSE(SameIgnoringCase(L"ab", L"abc"));
+  EXPECT_FALSE(SameIgnoringCase(L"abc", L"ab"));
+  EXPECT_FALSE(SameIgnoringCase(L"@", L"`"));
+  EXPECT_FALSE(SameIgnoringCase(L"[", L"{"));
+  EXPECT_FALSE(SameIgnoringCase(L"\u00C9", L"\u00E9"));
+  EXPECT_FALSE(SameIgnoringCase(L"\u212A", L"k"));  // the sign for kelvin
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
