@@ -1,0 +1,121 @@
+#include "asking.h"
+
+#include <windows.h>
+
+#include <algorithm>
+#include <cwchar>
+
+#include "file_type_factory.h"
+#include "text_tools.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+std::wstring AbsolutePath(const std::wstring& path) {
+  std::wstring absolute(GetFullPathNameW(path.c_str(), 0, nullptr, nullptr), L'\0');
+  absolute.resize(
+      GetFullPathNameW(path.c_str(), static_cast<DWORD>(absolute.size()), absolute.data(), nullptr));
+  return absolute.empty() ? path : absolute;
+}
+
+std::uint64_t FileBytes(const std::wstring& path) {
+  WIN32_FILE_ATTRIBUTE_DATA data{};
+  if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &data)) return 0;
+  return (std::uint64_t{data.nFileSizeHigh} << 32) | data.nFileSizeLow;
+}
+
+std::wstring Square(std::int32_t size) {
+  return std::to_wstring(size) + L" x " + std::to_wstring(size);
+}
+
+/// Asks, and makes the end of the process the answer's problem.
+template <class Answer>
+void Ask(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
+  if (const auto end = worker.Ask({subject, path}, answer)) {
+    answer.problem = std::wstring(L"Asked for ") + what + L", the extension ends its process with " +
+                     ProcessEndText(*end) + L".";
+  }
+}
+
+/// The number that a column delivered; 0 without one.
+std::int32_t Number(const ListAnswer<Column>& columns, std::uint32_t id) {
+  for (const Column& column : columns.items) {
+    if (column.id == id && column.deliveredType == L"VT_I4") {
+      return static_cast<std::int32_t>(std::wcstol(column.value.c_str(), nullptr, 10));
+    }
+  }
+  return 0;
+}
+
+/// The pixel type is told in the tip only, at the end of its first line: "Dimensions: (640 × 480) 8 bit
+/// unsigned".
+std::wstring PixelType(const std::wstring& tip) {
+  const std::wstring line = tip.substr(0, tip.find(L"\r\n"));
+  const std::size_t end = line.find(L") ");
+  return end == std::wstring::npos ? std::wstring() : line.substr(end + 2);
+}
+
+/// Asks for the thumbnail. A colour picture smaller than the request ends the process; such a file is asked
+/// again at its own size, so that it can be shown, with a remark.
+void AskThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
+  const auto end = worker.Ask({Subject::kThumbnail, path, size}, facts.thumbnail);
+  facts.thumbnail.request = size;
+  if (!end) return;
+  const std::wstring fault = L"Asked for a thumbnail of " + Square(size) +
+                             L" pixels, the extension ends its process with " + ProcessEndText(*end);
+  const std::int32_t ownSize = std::max(facts.width, facts.height);
+  facts.thumbnail.problem = fault + L".";
+  if (ownSize < 1 || ownSize >= size) return;
+  Thumbnail smaller;
+  if (worker.Ask({Subject::kThumbnail, path, ownSize}, smaller) || smaller.png.empty()) return;
+  facts.thumbnail = std::move(smaller);
+  facts.remark =
+      fault + L"; the picture shown was asked for at " + Square(ownSize) + L", the frame's own size.";
+}
+
+}  // namespace
+
+FileFacts AskFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size) {
+  FileFacts facts;
+  facts.path = path;
+  facts.name = name;
+  facts.kind = Lowered(GetExtension(path));
+  facts.thumbnail.request = size;
+  // The shell names files by their full path.
+  const std::wstring absolute = AbsolutePath(path);
+  facts.bytes = FileBytes(absolute);
+
+  Diagnosis diagnosis;
+  if (const auto end = worker.Ask({Subject::kDiagnosis, absolute}, diagnosis)) {
+    diagnosis = {Verdict::kDamaged, L"Reading the file ends the process with " + ProcessEndText(*end) + L"."};
+  }
+  facts.verdict = diagnosis.verdict;
+  facts.problem = diagnosis.sentence;
+  if (diagnosis.verdict == Verdict::kFailed || diagnosis.verdict == Verdict::kUnsupported) {
+    facts.thumbnail.problem = facts.tip.problem = facts.columns.problem = facts.propertySets.problem =
+        facts.propertyStore.problem = diagnosis.sentence;
+    return facts;
+  }
+  Ask(worker, Subject::kTip, absolute, L"the tip", facts.tip);
+  Ask(worker, Subject::kColumns, absolute, L"the columns", facts.columns);
+  Ask(worker, Subject::kPropertySets, absolute, L"the property sets", facts.propertySets);
+  Ask(worker, Subject::kPropertyStore, absolute, L"the property store", facts.propertyStore);
+  facts.width = Number(facts.columns, 3);
+  facts.height = Number(facts.columns, 4);
+  facts.bitDepth = Number(facts.columns, 7);
+  facts.frames = Number(facts.columns, 12);
+  facts.type = PixelType(facts.tip.text);
+  AskThumbnail(worker, absolute, size, facts);
+
+  // What the extension shows counts, whatever this program's readers think of the file.
+  if (!facts.thumbnail.png.empty()) {
+    facts.verdict = Verdict::kGood;
+    facts.problem.clear();
+  } else if (facts.verdict == Verdict::kGood) {
+    facts.verdict = Verdict::kDamaged;
+    facts.problem = facts.thumbnail.problem;
+  }
+  return facts;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

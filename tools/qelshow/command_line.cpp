@@ -1,0 +1,194 @@
+#include "command_line.h"
+
+#include <cwchar>
+#include <string_view>
+
+#include "failure.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+constexpr std::int32_t kMostSize = 4096;
+
+constexpr const wchar_t* kHelp =
+    LR"(qelshow shows what the QelShellExt extension shows to the Windows shell.
+
+usage: qelshow COMMAND ... [--server PATH] [--size N]
+
+commands:
+  info FILE...             everything that the shell learns about each file
+  thumbnail FILE -o PNG    the thumbnail of one file
+  page FOLDER|FILE...      a page of all thumbnails, with everything else beside them
+  COMMAND --help           more about a command
+
+options of every command:
+  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
+  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+  --help         this text
+
+exit status, of several files the highest:
+  0  done
+  1  failed: something cannot be read, written or loaded
+  2  the command line is wrong
+  3  a file is of no kind that the extension shows
+  4  a file is damaged: it has no thumbnail
+)";
+
+constexpr const wchar_t* kInfoHelp =
+    LR"(usage: qelshow info FILE... [--json] [--server PATH] [--size N]
+
+Prints everything that the shell learns about each file: the size of its thumbnail or why there is none, the
+tip, the columns of the Details view with the declared and the delivered types, the property sets, and the
+property store.
+
+  --json         print one JSON document: {"schema": 1, "files": [...]}
+  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
+  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+
+exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported kind, 4 a damaged file
+)";
+
+constexpr const wchar_t* kThumbnailHelp =
+    LR"(usage: qelshow thumbnail FILE -o PNG [--server PATH] [--size N]
+
+Writes the thumbnail of the file as a PNG image.
+
+  -o, --out PNG  the file to write; - for standard output
+  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
+  --size N       ask for a thumbnail of N by N pixels (1 to 4096; 256 without it)
+
+exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported kind, 4 a damaged file
+)";
+
+constexpr const wchar_t* kPageHelp =
+    LR"(usage: qelshow page FOLDER|FILE... --out DIR [--server PATH] [--size N]
+
+Writes DIR\index.html, a page of the files' thumbnails with everything else that the shell learns about them,
+and prints a table of the files. The page needs nothing but its folder. Of a folder, all files of the supported
+kinds are shown, those in the folders below it too.
+
+  --out DIR      the folder of the page; made if it is missing
+  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
+  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+
+exit status: 0 the page is written, whatever it has to say about single files; 1 failed, 2 wrong command line,
+3 no file of a supported kind
+)";
+
+struct CommandFacts {
+  const wchar_t* name;
+  Command command;
+  const wchar_t* help;
+  bool takesJson;
+  bool takesOut;
+};
+
+constexpr CommandFacts kCommands[] = {
+    {L"info", Command::kInfo, kInfoHelp, true, false},
+    {L"thumbnail", Command::kThumbnail, kThumbnailHelp, false, true},
+    {L"page", Command::kPage, kPageHelp, false, true},
+};
+
+[[noreturn]] void WrongUsage(const std::wstring& sentence, std::wstring_view command = {}) {
+  const std::wstring help =
+      command.empty() ? L"qelshow --help" : L"qelshow " + std::wstring(command) + L" --help";
+  throw Failure(sentence + L" See \"" + help + L"\".", kExitUsage);
+}
+
+CommandLine HelpLine(const wchar_t* text) {
+  CommandLine line;
+  line.helpText = text;
+  return line;
+}
+
+std::int32_t ParseSize(const std::wstring& text, std::wstring_view command) {
+  wchar_t* end = nullptr;
+  const long size = std::wcstol(text.c_str(), &end, 10);
+  if (text.empty() || *end != L'\0' || size < 1 || size > kMostSize) {
+    WrongUsage(L"--size takes a number from 1 to 4096, not \"" + text + L"\".", command);
+  }
+  return static_cast<std::int32_t>(size);
+}
+
+const CommandFacts& FindCommand(const std::wstring& name) {
+  for (const CommandFacts& facts : kCommands) {
+    if (name == facts.name) return facts;
+  }
+  WrongUsage(L"There is no command \"" + name + L"\".");
+}
+
+/// The arguments behind the command.
+class OptionReader {
+ public:
+  OptionReader(const CommandFacts& facts, const std::vector<std::wstring>& arguments)
+      : facts_(facts), arguments_(arguments) {}
+
+  CommandLine Read() {
+    CommandLine line;
+    line.command = facts_.command;
+    while (next_ < arguments_.size()) {
+      const std::wstring& argument = arguments_[next_++];
+      if (argument.size() < 2 || argument.front() != L'-') {
+        line.files.push_back(argument);
+      } else if (argument == L"--help" || argument == L"-h") {
+        return HelpLine(facts_.help);
+      } else if (!ReadOption(argument, line)) {
+        WrongUsage(L"\"" + argument + L"\" is no option of \"" + facts_.name + L"\".", facts_.name);
+      }
+    }
+    Check(line);
+    return line;
+  }
+
+ private:
+  bool ReadOption(const std::wstring& argument, CommandLine& line) {
+    const std::size_t equals = argument.find(L'=');
+    const std::wstring name = argument.substr(0, equals);
+    if (name == L"--json" && facts_.takesJson) {
+      line.json = true;
+    } else if (name == L"--server") {
+      line.server = Value(argument, equals);
+    } else if (name == L"--size") {
+      line.size = ParseSize(Value(argument, equals), facts_.name);
+    } else if ((name == L"--out" || name == L"-o") && facts_.takesOut) {
+      line.out = Value(argument, equals);
+    } else {
+      return false;
+    }
+    return true;
+  }
+
+  /// The value of an option: behind the equals sign, or the next argument.
+  std::wstring Value(const std::wstring& argument, std::size_t equals) {
+    if (equals != std::wstring::npos) return argument.substr(equals + 1);
+    if (next_ == arguments_.size()) WrongUsage(L"\"" + argument + L"\" needs a value.", facts_.name);
+    return arguments_[next_++];
+  }
+
+  void Check(const CommandLine& line) const {
+    if (line.files.empty()) WrongUsage(L"No file is named.", facts_.name);
+    if (line.command == Command::kThumbnail && line.files.size() > 1) {
+      WrongUsage(L"A thumbnail is made of one file, not of " + std::to_wstring(line.files.size()) + L".",
+                 facts_.name);
+    }
+    if (facts_.takesOut && line.out.empty()) {
+      WrongUsage(L"The option --out, which says where to write, is missing.", facts_.name);
+    }
+  }
+
+  const CommandFacts& facts_;
+  const std::vector<std::wstring>& arguments_;
+  std::size_t next_ = 1;
+};
+
+}  // namespace
+
+CommandLine ParseCommandLine(const std::vector<std::wstring>& arguments) {
+  if (arguments.empty()) WrongUsage(L"No command is given.");
+  if (arguments.front() == L"--help" || arguments.front() == L"-h" || arguments.front() == L"help") {
+    return HelpLine(kHelp);
+  }
+  return OptionReader(FindCommand(arguments.front()), arguments).Read();
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,105 @@
+#include "commands.h"
+
+#include <windows.h>
+
+#include <algorithm>
+#include <filesystem>
+
+#include "asking.h"
+#include "console.h"
+#include "failure.h"
+#include "file_list.h"
+#include "page_writer.h"
+#include "reports.h"
+#include "text_tools.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+int ExitStatus(Verdict verdict) {
+  return static_cast<int>(verdict);
+}
+
+std::wstring FileName(const std::wstring& path) {
+  return std::filesystem::path(path).filename().wstring();
+}
+
+/// Names a file with what is wrong with it.
+void PrintProblem(const FileFacts& facts) {
+  if (!facts.problem.empty()) PrintError(facts.path + L": " + facts.problem);
+  if (!facts.remark.empty()) PrintError(facts.path + L": " + facts.remark);
+}
+
+}  // namespace
+
+int RunInfo(const CommandLine& line) {
+  Worker worker(line.server);
+  ProgressBar progress(line.files.size());
+  int status = kExitDone;
+  std::size_t count = 0;
+  if (line.json) PrintUtf8("{\"schema\":" + std::to_string(kJsonSchema) + ",\"files\":[");
+  for (const std::wstring& path : line.files) {
+    progress.Show(count, FileName(path));
+    const FileFacts facts = AskFile(worker, path, FileName(path), line.size);
+    progress.Hide();
+    if (line.json) {
+      PrintUtf8((count > 0 ? ",\n" : "\n") + JsonReport(facts, {}));
+    } else {
+      Print((count > 0 ? L"\n" : L"") + TextReport(facts));
+    }
+    if (facts.verdict != Verdict::kGood) PrintProblem(facts);
+    status = std::max(status, ExitStatus(facts.verdict));
+    ++count;
+  }
+  if (line.json) PrintUtf8("\n]}\n");
+  return status;
+}
+
+int RunThumbnail(const CommandLine& line) {
+  Worker worker(line.server);
+  const std::wstring& path = line.files.front();
+  const FileFacts facts = AskFile(worker, path, FileName(path), line.size);
+  PrintProblem(facts);
+  const auto& png = facts.thumbnail.png;
+  if (png.empty()) return ExitStatus(facts.verdict);
+  if (line.out != L"-") {
+    WriteFileAt(line.out, png.data(), png.size());
+  } else if (!WriteBytes(GetStdHandle(STD_OUTPUT_HANDLE), png.data(), png.size())) {
+    throw Failure(L"Standard output cannot be written: " + SystemErrorText(GetLastError()) + L".");
+  }
+  return kExitDone;
+}
+
+int RunPage(const CommandLine& line) {
+  const std::vector<ListedFile> files = ListFiles(line.files);
+  if (files.empty()) {
+    throw Failure(
+        L"\"" + line.files.front() + L"\" holds no .mrc, .ali, .rec, .ser, .emi, .ebn or .raw file.",
+        ExitStatus(Verdict::kUnsupported));
+  }
+  Worker worker(line.server);
+  PageWriter page(line.out);
+  constexpr std::size_t kMostNameWidth = 40;
+  std::size_t nameWidth = 4;
+  for (const ListedFile& file : files) nameWidth = std::max(nameWidth, file.name.size());
+  nameWidth = std::min(nameWidth, kMostNameWidth);
+
+  Print(TableHeading(nameWidth));
+  ProgressBar progress(files.size());
+  std::size_t count = 0;
+  std::size_t pictures = 0;
+  for (const ListedFile& file : files) {
+    progress.Show(count++, file.name);
+    const FileFacts facts = AskFile(worker, file.path, file.name, line.size);
+    page.Add(facts);
+    if (!facts.thumbnail.png.empty()) ++pictures;
+    progress.Hide();
+    Print(TableRow(facts, nameWidth));
+  }
+  page.Finish();
+  Print(L"\n" + page.path() + L": " + std::to_wstring(pictures) + L" thumbnails of " +
+        std::to_wstring(files.size()) + L" files\n");
+  return kExitDone;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,19 @@
+// The files that a page shows.
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+struct ListedFile {
+  std::wstring path;
+  std::wstring name;  // what the page calls it: relative to the folder that was named
+};
+
+/// The files named, and of the folders named all files of the supported kinds, also in folders below them,
+/// ordered by name. A path that does not exist is kept as a file, so that it is reported. Throws Failure for
+/// a folder that cannot be listed.
+std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths);
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,4 @@
+// Ids of the program's resources.
+#pragma once
+
+#define IDR_PAGE 101

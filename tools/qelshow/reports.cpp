@@ -1,0 +1,216 @@
+#include "reports.h"
+
+#include <algorithm>
+#include <cwchar>
+#include <vector>
+
+#include "json.h"
+#include "text_tools.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+const char* VerdictName(Verdict verdict) {
+  switch (verdict) {
+    case Verdict::kGood: return "good";
+    case Verdict::kFailed: return "failed";
+    case Verdict::kUnsupported: return "unsupported";
+    case Verdict::kDamaged: return "damaged";
+  }
+  return "";
+}
+
+std::string ThumbnailJson(const Thumbnail& thumbnail, std::wstring_view picture) {
+  return JsonObject()
+      .Number("request", thumbnail.request)
+      .Number("width", thumbnail.width)
+      .Number("height", thumbnail.height)
+      .Number("bitsPerPixel", thumbnail.bits)
+      .TextOrNull("picture", picture)
+      .TextOrNull("problem", thumbnail.problem)
+      .Take();
+}
+
+std::string TipJson(const TipAnswer& tip) {
+  return JsonObject().TextOrNull("text", tip.text).TextOrNull("problem", tip.problem).Take();
+}
+
+std::string ColumnJson(const Column& column) {
+  return JsonObject()
+      .Number("index", column.index)
+      .Text("title", column.title)
+      .Text("set", column.set)
+      .Number("id", column.id)
+      .Number("characters", column.characters)
+      .Number("state", column.state)
+      .Text("declared", column.declaredType)
+      .TextOrNull("delivered", column.deliveredType)
+      .Text("value", column.value)
+      .TextOrNull("problem", column.problem)
+      .Take();
+}
+
+std::string PropertyJson(const Property& property) {
+  return JsonObject()
+      .TextOrNull("name", property.name)
+      .Text("set", property.set)
+      .Number("id", property.id)
+      .TextOrNull("type", property.type)
+      .Text("value", property.value)
+      .TextOrNull("problem", property.problem)
+      .Take();
+}
+
+template <class Item, class ToJson>
+std::string ListJson(const ListAnswer<Item>& list, ToJson toJson) {
+  return JsonObject().Json("items", JsonArray(list.items, toJson)).TextOrNull("problem", list.problem).Take();
+}
+
+std::wstring Dimensions(std::int32_t width, std::int32_t height) {
+  return std::to_wstring(width) + L" x " + std::to_wstring(height);
+}
+
+std::wstring Padded(std::wstring_view text, std::size_t width) {
+  std::wstring padded(text);
+  if (padded.size() < width) padded.append(width - padded.size(), L' ');
+  return padded;
+}
+
+/// `text` with every line after the first moved to the right.
+std::wstring Indented(std::wstring_view text, std::size_t columns) {
+  std::wstring indented;
+  for (const wchar_t c : text) {
+    if (c == L'\r') continue;
+    indented += c;
+    if (c == L'\n') indented.append(columns, L' ');
+  }
+  return indented;
+}
+
+/// Rows of cells in columns as wide as their widest cell, each line indented.
+std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows) {
+  std::vector<std::size_t> widths;
+  for (const auto& row : rows) {
+    widths.resize(std::max(widths.size(), row.size()));
+    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], row[i].size());
+  }
+  std::wstring text;
+  for (const auto& row : rows) {
+    std::wstring line = L"    ";
+    for (std::size_t i = 0; i < row.size(); ++i) line += Padded(row[i], widths[i] + 2);
+    line.erase(line.find_last_not_of(L' ') + 1);
+    text += line + L"\n";
+  }
+  return text;
+}
+
+std::wstring OneLine(std::wstring_view text) {
+  std::wstring line;
+  for (const wchar_t c : text) {
+    if (c != L'\r') line += c == L'\n' ? L' ' : c;
+  }
+  return line;
+}
+
+std::wstring ValueOrProblem(const std::wstring& value, const std::wstring& problem) {
+  return problem.empty() ? OneLine(value) : L"(" + problem + L")";
+}
+
+std::wstring ColumnsText(const ListAnswer<Column>& columns) {
+  std::vector<std::vector<std::wstring>> rows = {
+      {L"title", L"identifier", L"declared", L"delivered", L"value"}};
+  for (const Column& column : columns.items) {
+    rows.push_back({column.title, column.set + L" " + std::to_wstring(column.id), column.declaredType,
+                    column.deliveredType.empty() ? L"-" : column.deliveredType,
+                    ValueOrProblem(column.value, column.problem)});
+  }
+  return Grid(rows);
+}
+
+std::wstring PropertiesText(const ListAnswer<Property>& properties) {
+  std::vector<std::vector<std::wstring>> rows = {{L"name", L"identifier", L"type", L"value"}};
+  for (const Property& property : properties.items) {
+    rows.push_back({property.name, property.set + L" " + std::to_wstring(property.id),
+                    property.type.empty() ? L"-" : property.type,
+                    ValueOrProblem(property.value, property.problem)});
+  }
+  return Grid(rows);
+}
+
+template <class Answer>
+std::wstring Section(const wchar_t* title, const Answer& answer, const std::wstring& text) {
+  return std::wstring(L"  ") + title + L"\n" +
+         (answer.problem.empty() ? text : L"    " + answer.problem + L"\n");
+}
+
+std::wstring ThumbnailText(const Thumbnail& thumbnail) {
+  if (thumbnail.png.empty()) return L"none";
+  return Dimensions(thumbnail.width, thumbnail.height) + L", " + std::to_wstring(thumbnail.bits) +
+         L" bits per pixel, asked for at " + Dimensions(thumbnail.request, thumbnail.request);
+}
+
+}  // namespace
+
+std::string JsonReport(const FileFacts& facts, std::wstring_view picture) {
+  return JsonObject()
+      .Text("path", facts.path)
+      .Text("name", facts.name)
+      .Text("kind", facts.kind)
+      .Number("bytes", static_cast<std::int64_t>(facts.bytes))
+      .Json("verdict", std::string("\"") + VerdictName(facts.verdict) + "\"")
+      .TextOrNull("problem", facts.problem)
+      .TextOrNull("remark", facts.remark)
+      .Number("width", facts.width)
+      .Number("height", facts.height)
+      .Number("frames", facts.frames)
+      .Number("bitDepth", facts.bitDepth)
+      .TextOrNull("type", facts.type)
+      .Json("thumbnail", ThumbnailJson(facts.thumbnail, picture))
+      .Json("tip", TipJson(facts.tip))
+      .Json("columns", ListJson(facts.columns, ColumnJson))
+      .Json("propertySets", ListJson(facts.propertySets, PropertyJson))
+      .Json("propertyStore", ListJson(facts.propertyStore, PropertyJson))
+      .Take();
+}
+
+std::wstring TextReport(const FileFacts& facts) {
+  std::wstring text = facts.path + L"\n";
+  if (!facts.problem.empty()) text += L"  Problem     " + facts.problem + L"\n";
+  if (!facts.remark.empty()) text += L"  Remark      " + facts.remark + L"\n";
+  if (facts.verdict == Verdict::kFailed || facts.verdict == Verdict::kUnsupported) return text;
+  if (facts.width > 0) {
+    text += L"  Dimensions  " + Dimensions(facts.width, facts.height) + L"\n";
+    text += L"  Frames      " + std::to_wstring(facts.frames) + L"\n";
+  }
+  if (!facts.type.empty()) text += L"  Type        " + facts.type + L"\n";
+  text += L"  Thumbnail   " + ThumbnailText(facts.thumbnail) + L"\n";
+  text += Section(L"Tip", facts.tip, L"    " + Indented(facts.tip.text, 4) + L"\n");
+  text += Section(L"Columns", facts.columns, ColumnsText(facts.columns));
+  text += Section(L"Property sets", facts.propertySets, PropertiesText(facts.propertySets));
+  text += Section(L"Property store", facts.propertyStore, PropertiesText(facts.propertyStore));
+  return text;
+}
+
+namespace {
+
+std::wstring TableLine(std::size_t nameWidth, std::wstring_view name, std::wstring_view dimensions,
+                       std::wstring_view frames, std::wstring_view type, std::wstring_view thumbnail) {
+  return Padded(name, nameWidth) + L"  " + Padded(dimensions, 13) + L"  " + Padded(frames, 6) + L"  " +
+         Padded(type, 23) + L"  " + std::wstring(thumbnail) + L"\n";
+}
+
+}  // namespace
+
+std::wstring TableHeading(std::size_t nameWidth) {
+  return TableLine(nameWidth, L"NAME", L"DIMENSIONS", L"FRAMES", L"TYPE", L"THUMBNAIL");
+}
+
+std::wstring TableRow(const FileFacts& facts, std::size_t nameWidth) {
+  const bool known = facts.width > 0;
+  return TableLine(nameWidth, facts.name, known ? Dimensions(facts.width, facts.height) : L"-",
+                   known ? std::to_wstring(facts.frames) : L"-", facts.type.empty() ? L"-" : facts.type,
+                   facts.thumbnail.png.empty() ? L"none: " + facts.problem
+                                               : Dimensions(facts.thumbnail.width, facts.thumbnail.height));
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

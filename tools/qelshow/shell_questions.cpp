@@ -1,0 +1,306 @@
+#include "shell_questions.h"
+
+#include <propidl.h>
+#include <propsys.h>
+#include <shlguid.h>
+#include <shlobj.h>
+#include <shlwapi.h>
+
+#include <algorithm>
+#include <exception>
+#include <memory>
+#include <string_view>
+
+#include "class_ids.h"
+#include "file_type_factory.h"
+#include "png.h"
+#include "same_text.h"
+#include "text_tools.h"
+#include "value_text.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+constexpr GUID kSummarySet = {0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0x00, 0x2B, 0x27, 0xB3, 0xD9}};
+constexpr GUID kImageSummarySet = {
+    0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
+
+/// The bound of a list that the extension ends itself.
+constexpr DWORD kMostItems = 64;
+
+/// A PROPVARIANT that is cleared.
+struct OwnedValue : PROPVARIANT {
+  OwnedValue() { PropVariantInit(this); }
+  ~OwnedValue() { PropVariantClear(this); }
+  OwnedValue(const OwnedValue&) = delete;
+  OwnedValue& operator=(const OwnedValue&) = delete;
+};
+
+/// A VARIANT that is cleared.
+struct OwnedVariant : VARIANT {
+  OwnedVariant() { VariantInit(this); }
+  ~OwnedVariant() { VariantClear(this); }
+  OwnedVariant(const OwnedVariant&) = delete;
+  OwnedVariant& operator=(const OwnedVariant&) = delete;
+};
+
+struct BitmapDeleter {
+  using pointer = HBITMAP;
+  void operator()(HBITMAP bitmap) const { DeleteObject(bitmap); }
+};
+
+std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
+  return std::wstring(L"The extension gives no ") + what + L": " + ResultText(result) + L".";
+}
+
+/// Runs `question`; an exception that leaves the extension becomes the answer's problem.
+template <class Answer, class Ask>
+Answer Guarded(Ask question) {
+  Answer answer;
+  try {
+    question(answer);
+  } catch (const std::exception& e) {
+    answer.problem = L"The extension throws \"" + Wide(e.what()) + L"\".";
+  } catch (...) {
+    answer.problem = L"The extension throws an exception of an unknown type.";
+  }
+  return answer;
+}
+
+/// A fresh object that was given the path, as the shell prepares it.
+template <class Interface>
+HRESULT LoadFile(const Server& server, const std::wstring& path, const IID& iid, ComPtr<Interface>& object) {
+  ComPtr<IPersistFile> file;
+  HRESULT result = server.Create(CLSID_QelShellExt, IID_IPersistFile, file);
+  if (SUCCEEDED(result)) result = file->Load(path.c_str(), STGM_READ);
+  if (SUCCEEDED(result)) {
+    result = file->QueryInterface(iid, reinterpret_cast<void**>(object.Put()));
+  }
+  return result;
+}
+
+struct KnownProperty {
+  const GUID& set;
+  DWORD id;
+  const wchar_t* canonicalName;
+  const wchar_t* plainName;
+};
+
+/// The properties that the extension publishes. The names are the platform's.
+constexpr KnownProperty kKnownProperties[] = {
+    {kImageSummarySet, 3, L"System.Image.HorizontalSize", L"Width"},
+    {kImageSummarySet, 4, L"System.Image.VerticalSize", L"Height"},
+    {kImageSummarySet, 7, L"System.Image.BitDepth", L"Bit depth"},
+    {kImageSummarySet, 12, L"System.Media.FrameCount", L"Frame count"},
+    {kImageSummarySet, 13, L"System.Image.Dimensions", L"Dimensions"},
+    {kSummarySet, 6, L"System.Comment", L"Comments"},
+};
+
+const KnownProperty* FindProperty(const GUID& set, DWORD id) {
+  for (const KnownProperty& known : kKnownProperties) {
+    if (known.id == id && known.set == set) return &known;
+  }
+  return nullptr;
+}
+
+/// The value of a column, or why there is none.
+void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDATA& file, Column& column) {
+  OwnedVariant value;
+  const HRESULT result = provider.GetItemData(&id, &file, &value);
+  if (result == S_OK) {
+    column.deliveredType = TypeName(value.vt);
+    column.value = ValueText(value);
+  } else {
+    column.problem = ResultText(result);
+  }
+}
+
+HRESULT ReadPropertySet(IPropertySetStorage& sets, const GUID& format, std::vector<Property>& properties) {
+  ComPtr<IPropertyStorage> storage;
+  HRESULT result = sets.Open(format, STGM_READ | STGM_SHARE_EXCLUSIVE, storage.Put());
+  ComPtr<IEnumSTATPROPSTG> enumerator;
+  if (SUCCEEDED(result)) result = storage->Enum(enumerator.Put());
+  if (FAILED(result)) return result;
+  STATPROPSTG entry{};
+  ULONG fetched = 0;
+  while (enumerator->Next(1, &entry, &fetched) == S_OK && fetched == 1) {
+    CoTaskMemFree(entry.lpwstrName);
+    Property property;
+    const KnownProperty* const known = FindProperty(format, entry.propid);
+    property.name = known == nullptr ? L"" : known->plainName;
+    property.set = GuidText(format);
+    property.id = entry.propid;
+    PROPSPEC specifier{};
+    specifier.ulKind = PRSPEC_PROPID;
+    specifier.propid = entry.propid;
+    OwnedValue value;
+    const HRESULT read = storage->ReadMultiple(1, &specifier, &value);
+    if (read == S_OK) {
+      property.type = TypeName(value.vt);
+      property.value = ValueText(value);
+    } else {
+      property.problem = ResultText(read);
+    }
+    properties.push_back(std::move(property));
+  }
+  return S_OK;
+}
+
+/// The class that the property system is told to use for the file; null for a kind without one.
+const CLSID* StoreClassOf(const std::wstring& path) {
+  const std::wstring extension = GetExtension(path);
+  if (IsEbnExtension(extension)) return &CLSID_QelShellExtVistaEbn;
+  if (IsRawExtension(extension)) return &CLSID_QelShellExtVistaRaw;
+  // .ali and .rec are of the same format as .mrc, but the property system has no class for them.
+  return SameIgnoringCase(extension, L"mrc") ? &CLSID_QelShellExtVistaMrc : nullptr;
+}
+
+}  // namespace
+
+TipAnswer AskTip(const Server& server, const std::wstring& path) {
+  return Guarded<TipAnswer>([&](TipAnswer& answer) {
+    ComPtr<IQueryInfo> info;
+    HRESULT result = LoadFile(server, path, IID_IQueryInfo, info);
+    wchar_t* text = nullptr;
+    if (SUCCEEDED(result)) result = info->GetInfoTip(0, &text);
+    if (result == S_OK && text != nullptr) {
+      answer.text = text;
+    } else {
+      answer.problem = NoAnswer(L"tip", result);
+    }
+    CoTaskMemFree(text);
+  });
+}
+
+ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
+  return Guarded<ListAnswer<Column>>([&](ListAnswer<Column>& answer) {
+    ComPtr<IColumnProvider> provider;
+    HRESULT result = server.Create(CLSID_QelShellExt, IID_IColumnProvider, provider);
+    SHCOLUMNINIT folder{};
+    if (SUCCEEDED(result)) result = provider->Initialize(&folder);
+    if (FAILED(result)) {
+      answer.problem = NoAnswer(L"columns", result);
+      return;
+    }
+    SHCOLUMNDATA file{};
+    if (path.size() >= std::size(file.wszFile)) {
+      answer.problem = L"The shell asks for no columns of a file whose path has 260 characters or more.";
+      return;
+    }
+    std::copy(path.begin(), path.end(), file.wszFile);
+    std::wstring extension = L"." + GetExtension(path);
+    file.pwszExt = extension.data();
+    file.dwFileAttributes = FILE_ATTRIBUTE_NORMAL;
+
+    SHCOLUMNINFO info{};
+    for (DWORD index = 0; index < kMostItems; ++index) {
+      result = provider->GetColumnInfo(index, &info);
+      if (result != S_OK) break;
+      Column column;
+      column.index = index;
+      column.title = info.wszTitle;
+      column.set = GuidText(info.scid.fmtid);
+      column.id = info.scid.pid;
+      column.characters = info.cChars;
+      column.state = info.csFlags;
+      column.declaredType = TypeName(info.vt);
+      FillValue(*provider.Get(), info.scid, file, column);
+      answer.items.push_back(std::move(column));
+    }
+    if (answer.items.empty()) answer.problem = NoAnswer(L"columns", result);
+  });
+}
+
+ListAnswer<Property> AskPropertySets(const Server& server, const std::wstring& path) {
+  return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
+    ComPtr<IPropertySetStorage> sets;
+    HRESULT result = LoadFile(server, path, IID_IPropertySetStorage, sets);
+    ComPtr<IEnumSTATPROPSETSTG> enumerator;
+    if (SUCCEEDED(result)) result = sets->Enum(enumerator.Put());
+    STATPROPSETSTG entry{};
+    ULONG fetched = 0;
+    while (SUCCEEDED(result) && enumerator->Next(1, &entry, &fetched) == S_OK && fetched == 1) {
+      result = ReadPropertySet(*sets.Get(), entry.fmtid, answer.items);
+    }
+    if (FAILED(result)) answer.problem = NoAnswer(L"property sets", result);
+  });
+}
+
+ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& path) {
+  return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
+    const CLSID* const clsid = StoreClassOf(path);
+    if (clsid == nullptr) {
+      answer.problem = L"There is no property store for ." + Lowered(GetExtension(path)) +
+                       L" files: the property system has handlers for .mrc, .ebn and .raw.";
+      return;
+    }
+    ComPtr<IInitializeWithStream> handler;
+    HRESULT result = server.Create(*clsid, IID_IInitializeWithStream, handler);
+    ComPtr<IStream> stream;
+    if (SUCCEEDED(result)) {
+      result = SHCreateStreamOnFileEx(path.c_str(), STGM_READ | STGM_SHARE_DENY_NONE, FILE_ATTRIBUTE_NORMAL,
+                                      FALSE, nullptr, stream.Put());
+    }
+    if (SUCCEEDED(result)) result = handler->Initialize(stream.Get(), STGM_READ);
+    ComPtr<IPropertyStore> store;
+    if (SUCCEEDED(result)) {
+      result = handler->QueryInterface(IID_IPropertyStore, reinterpret_cast<void**>(store.Put()));
+    }
+    if (FAILED(result)) {
+      answer.problem = NoAnswer(L"property store", result);
+      return;
+    }
+    // GetCount answers 0 by design, so the keys are asked for until there are no more.
+    PROPERTYKEY key{};
+    for (DWORD index = 0; index < kMostItems && store->GetAt(index, &key) == S_OK; ++index) {
+      Property property;
+      const KnownProperty* const known = FindProperty(key.fmtid, key.pid);
+      property.name = known == nullptr ? L"" : known->canonicalName;
+      property.set = GuidText(key.fmtid);
+      property.id = key.pid;
+      OwnedValue value;
+      result = store->GetValue(key, &value);
+      if (SUCCEEDED(result)) {
+        property.type = TypeName(value.vt);
+        property.value = ValueText(value);
+      } else {
+        property.problem = ResultText(result);
+      }
+      answer.items.push_back(std::move(property));
+    }
+    if (answer.items.empty()) answer.problem = NoAnswer(L"property store", result);
+  });
+}
+
+Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int32_t size) {
+  return Guarded<Thumbnail>([&](Thumbnail& thumbnail) {
+    thumbnail.request = size;
+    ComPtr<IExtractImage> extractor;
+    HRESULT result = LoadFile(server, path, IID_IExtractImage, extractor);
+    if (SUCCEEDED(result)) {
+      wchar_t location[MAX_PATH] = L"";
+      DWORD priority = 0;
+      DWORD flags = IEIFLAG_SCREEN;
+      const SIZE request = {size, size};
+      result = extractor->GetLocation(location, MAX_PATH, &priority, &request, 32, &flags);
+    }
+    HBITMAP handle = nullptr;
+    if (SUCCEEDED(result)) result = extractor->Extract(&handle);
+    const std::unique_ptr<HBITMAP, BitmapDeleter> bitmap(handle);
+    BITMAP facts{};
+    if (FAILED(result) || GetObjectW(bitmap.get(), sizeof facts, &facts) == 0) {
+      thumbnail.problem = NoAnswer(L"thumbnail", result);
+      return;
+    }
+    result = EncodePng(bitmap.get(), thumbnail.png);
+    if (FAILED(result)) {
+      thumbnail.problem = L"The thumbnail cannot be written as PNG: " + ResultText(result) + L".";
+      return;
+    }
+    thumbnail.width = facts.bmWidth;
+    thumbnail.height = facts.bmHeight;
+    thumbnail.bits = facts.bmBitsPixel;
+  });
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,100 @@
+#include "text_tools.h"
+
+#include <objbase.h>
+
+#include <array>
+#include <cstdio>
+#include <cwctype>
+#include <iterator>
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+std::string Utf8(std::wstring_view text) {
+  const int length = static_cast<int>(text.size());
+  std::string utf8(static_cast<std::size_t>(
+                       WideCharToMultiByte(CP_UTF8, 0, text.data(), length, nullptr, 0, nullptr, nullptr)),
+                   '\0');
+  WideCharToMultiByte(CP_UTF8, 0, text.data(), length, utf8.data(), static_cast<int>(utf8.size()), nullptr,
+                      nullptr);
+  return utf8;
+}
+
+std::wstring Wide(std::string_view utf8) {
+  const int length = static_cast<int>(utf8.size());
+  std::wstring text(
+      static_cast<std::size_t>(MultiByteToWideChar(CP_UTF8, 0, utf8.data(), length, nullptr, 0)), L'\0');
+  MultiByteToWideChar(CP_UTF8, 0, utf8.data(), length, text.data(), static_cast<int>(text.size()));
+  return text;
+}
+
+std::wstring Lowered(std::wstring_view text) {
+  std::wstring lowered(text);
+  for (wchar_t& c : lowered) c = static_cast<wchar_t>(std::towlower(c));
+  return lowered;
+}
+
+std::wstring HexCode(std::uint32_t code) {
+  std::array<wchar_t, 16> text{};
+  std::swprintf(text.data(), text.size(), L"0x%08X", static_cast<unsigned>(code));
+  return text.data();
+}
+
+std::wstring SystemErrorText(DWORD error) {
+  std::array<wchar_t, 512> text{};
+  const DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
+                                      error, 0, text.data(), static_cast<DWORD>(text.size()), nullptr);
+  std::wstring_view message(text.data(), length);
+  const std::size_t last = message.find_last_not_of(L" .\r\n");
+  if (last == std::wstring_view::npos) return L"error " + std::to_wstring(error);
+  return std::wstring(message.substr(0, last + 1)) + L" (error " + std::to_wstring(error) + L")";
+}
+
+std::wstring ResultText(HRESULT result) {
+  struct Known {
+    HRESULT result;
+    const wchar_t* meaning;
+  };
+  static constexpr Known kKnown[] = {
+      {S_FALSE, L"no value"},
+      {E_FAIL, L"failed"},
+      {E_NOTIMPL, L"not implemented"},
+      {E_NOINTERFACE, L"no such interface"},
+      {E_UNEXPECTED, L"unexpected request"},
+      {E_OUTOFMEMORY, L"out of memory"},
+      {CLASS_E_CLASSNOTAVAILABLE, L"no such class"},
+      {REGDB_E_CLASSNOTREG, L"class not registered"},
+  };
+  for (const Known& known : kKnown) {
+    if (known.result == result) {
+      return HexCode(static_cast<std::uint32_t>(result)) + L", " + known.meaning;
+    }
+  }
+  return HexCode(static_cast<std::uint32_t>(result));
+}
+
+std::wstring ProcessEndText(DWORD exitCode) {
+  struct Known {
+    DWORD code;
+    const wchar_t* meaning;
+  };
+  static constexpr Known kKnown[] = {
+      {EXCEPTION_INT_DIVIDE_BY_ZERO, L"integer division by zero"},
+      {EXCEPTION_ACCESS_VIOLATION, L"access violation"},
+      {EXCEPTION_STACK_OVERFLOW, L"stack overflow"},
+      {EXCEPTION_ILLEGAL_INSTRUCTION, L"illegal instruction"},
+      {0xC0000374u, L"damaged heap"},
+      {0xC0000409u, L"damaged stack"},
+  };
+  for (const Known& known : kKnown) {
+    if (known.code == exitCode) return HexCode(exitCode) + L" (" + known.meaning + L")";
+  }
+  return HexCode(exitCode);
+}
+
+std::wstring GuidText(const GUID& guid) {
+  std::array<wchar_t, 40> text{};
+  StringFromGUID2(guid, text.data(), static_cast<int>(text.size()));
+  return text.data();
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

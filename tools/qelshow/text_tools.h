@@ -1,0 +1,34 @@
+// Small texts: conversions to and from UTF-8, and the way in which codes and identifiers are written.
+#pragma once
+
+#include <windows.h>
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+std::string Utf8(std::wstring_view text);
+
+/// Bytes that are not UTF-8 become U+FFFD.
+std::wstring Wide(std::string_view utf8);
+
+std::wstring Lowered(std::wstring_view text);
+
+/// For instance 0x80004005.
+std::wstring HexCode(std::uint32_t code);
+
+/// The code of an HRESULT with what the system or this program knows to say about it.
+std::wstring ResultText(HRESULT result);
+
+/// What the system says about an error code of GetLastError, without a full stop.
+std::wstring SystemErrorText(DWORD error);
+
+/// The code with which a process ended, and its meaning where it is a known fault.
+std::wstring ProcessEndText(DWORD exitCode);
+
+/// For instance {6444048F-4C8B-11D1-8B70-080036B11A03}.
+std::wstring GuidText(const GUID& guid);
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,18 @@
+// A small collection of files of every supported kind and pixel type, with pictures that look like what a
+// microscope delivers, and a few files that cannot be shown. The bytes are the same in every run and on every
+// machine.
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Samples {
+
+struct Sample {
+  const char* name;       // of the file
+  std::string (*make)();  // its bytes
+};
+
+const std::vector<Sample>& AllSamples();
+
+}  // namespace Qel::Lumetra::ShellExt::Samples
