@@ -5,6 +5,7 @@
 
 export WINEPREFIX=$root/build/wine
 export WINEARCH=win64
+export LC_ALL=C.UTF-8 # in another character set Wine mangles the letters of paths
 export WINEDEBUG=-all
 # No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types.
 export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe="
@@ -36,3 +37,10 @@ wine_start() {
 }
 
 wine_stop() { wineserver -k >/dev/null 2>&1 || true; }
+
+# windows_path PATH: the path under which Windows programs find it, whether it exists or not.
+windows_path() {
+  local path
+  path=$(realpath --no-symlinks --canonicalize-missing -- "$1")
+  printf 'Z:%s\n' "${path//\//\\}"
+}
