@@ -17,7 +17,7 @@
 namespace Qel::Lumetra::ShellExt::Bench {
 namespace {
 
-constexpr std::int64_t kBandBytes = 256 * 1024;
+constexpr std::int64_t kBandBytes = 256LL * 1024;
 
 template <class T>
 void Fill(std::vector<std::byte>& band) {

@@ -68,7 +68,7 @@ std::string TimeThumbnail(const Words& words) {
 }
 
 std::string TimeRead(const Words& words) {
-  static constexpr std::streamsize kBufferBytes = 256 * 1024;
+  static constexpr std::streamsize kBufferBytes = 256LL * 1024;
   static const auto buffer = std::make_unique<char[]>(kBufferBytes);
   const std::wstring path = Path(words.at(3));
   const std::int64_t position = std::stoll(words.at(1));

@@ -9,7 +9,7 @@ namespace Qel::Lumetra::ShellExt {
 
 /// Ids of the module's string table (string_table.inc).
 enum StringId : std::uint32_t {
-#define QEL_STRING(name, id, text) name = id,
+#define QEL_STRING(name, id, text) name = (id),
 #include "string_table.inc"
 #undef QEL_STRING
 };

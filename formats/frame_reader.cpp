@@ -13,11 +13,11 @@ namespace {
 
 // Large enough to read at the speed of the page cache, small enough to stay in the processor's cache while
 // the band is reduced.
-constexpr std::int64_t kBandBytes = 256 * 1024;
+constexpr std::int64_t kBandBytes = 256LL * 1024;
 
 // Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
 // picture is refused when it has more pixels than bytes and more than this.
-constexpr std::int64_t kMostSharedPixels = 1024 * 1024;
+constexpr std::int64_t kMostSharedPixels = 1024LL * 1024;
 
 // Reading band by band is given up for reading column by column when it would read the block this often.
 constexpr std::int64_t kMostPasses = 8;

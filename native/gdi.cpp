@@ -33,12 +33,12 @@ HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE,
 
   auto bitmap = std::make_unique<HBITMAP__>();
   const std::int64_t rows = std::abs(std::int64_t{header.biHeight});
-  const std::int64_t row_bytes = (std::int64_t{header.biWidth} * header.biBitCount + 31) / 32 * 4;
-  bitmap->bits = std::make_unique<BYTE[]>(static_cast<std::size_t>(rows * row_bytes));
+  const std::int64_t rowBytes = (std::int64_t{header.biWidth} * header.biBitCount + 31) / 32 * 4;
+  bitmap->bits = std::make_unique<BYTE[]>(static_cast<std::size_t>(rows * rowBytes));
   bitmap->section.dsBm = {0,
                           header.biWidth,
                           static_cast<LONG>(rows),
-                          static_cast<LONG>(row_bytes),
+                          static_cast<LONG>(rowBytes),
                           header.biPlanes,
                           header.biBitCount,
                           bitmap->bits.get()};

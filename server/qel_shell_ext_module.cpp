@@ -6,7 +6,6 @@
 
 using Qel::Com::ComPtr;
 using Qel::Lumetra::ShellExt::Replacement;
-using Qel::Lumetra::ShellExt::ServerRegistration;
 
 CQelShellExtModule::CQelShellExtModule(HINSTANCE instance, std::span<ObjectMapEntry> objectMap) {
   classes_.instance = instance;

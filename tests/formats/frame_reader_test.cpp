@@ -192,7 +192,7 @@ class CountingBuffer : public std::streambuf {
   }
 
   pos_type seekpos(pos_type position, std::ios_base::openmode) override {
-    if (off_type(position) < 0) return pos_type(off_type(-1));
+    if (off_type{position} < 0) return {off_type{-1}};
     position_ = position;
     return position;
   }
@@ -226,14 +226,14 @@ TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
   const FrameLayout layout = PackedLayout(PixelFormat::kFloat32, {600, 600}, 0);
   int reads = 0;
   {
-    CountingBuffer buffer(std::string(600 * 600 * 4, '\0'));
+    CountingBuffer buffer(std::string(std::size_t{600} * 600 * 4, '\0'));
     std::istream stream(&buffer);
     EXPECT_NE(TakeBitmap(ReadThumbnail(stream, layout, {60, 60})).width, 0);
     reads = buffer.reads;
   }
   ASSERT_GT(reads, 3);
   for (int i = 0; i < reads; ++i) {
-    CountingBuffer buffer(std::string(600 * 600 * 4, '\0'), i);
+    CountingBuffer buffer(std::string(std::size_t{600} * 600 * 4, '\0'), i);
     std::istream stream(&buffer);
     EXPECT_EQ(ReadThumbnail(stream, layout, {60, 60}), nullptr);
     EXPECT_TRUE(stream.fail());

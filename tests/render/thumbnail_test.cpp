@@ -171,8 +171,8 @@ TEST(GreyThumbnail, DropsWhatIsLeftOverAtTheRightAndTheBottom) {
   Random random(5);
   auto frame = random.Frame<std::uint16_t>(1000, 602, Values::kSmall);
   const auto before = Grey(frame, {256, 256});
-  for (int y = 0; y < 602; ++y) frame.values[static_cast<std::size_t>(y * 1000 + 999)] = 65535;
-  for (int x = 0; x < 1000; ++x) frame.values[static_cast<std::size_t>(601 * 1000 + x)] = 65535;
+  for (int y = 0; y < 602; ++y) frame.values[static_cast<std::size_t>(y) * 1000 + 999] = 65535;
+  for (int x = 0; x < 1000; ++x) frame.values[static_cast<std::size_t>(x) + std::size_t{601} * 1000] = 65535;
   EXPECT_EQ(Grey(frame, {256, 256}), before);
 }
 

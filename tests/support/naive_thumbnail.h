@@ -116,8 +116,8 @@ template <class T>
 BitmapPixels NaiveComplexThumbnail(const NaiveFrame<NaiveComplex<T>>& frame, int cx, int cy) {
   NaiveFrame<float> logarithms{frame.width, frame.height, {}};
   for (const NaiveComplex<T>& value : frame.values) {
-    const double re = static_cast<double>(value.re);
-    const double im = static_cast<double>(value.im);
+    const auto re = static_cast<double>(value.re);
+    const auto im = static_cast<double>(value.im);
     logarithms.values.push_back(static_cast<float>(std::log(re * re + im * im)));
   }
   return NaiveGreyThumbnail(logarithms, cx, cy);

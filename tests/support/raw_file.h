@@ -10,7 +10,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct RawFile {
-  std::string magic{"QEL RawImage", 13};  // with its terminating zero
+  std::string magic{"QEL RawImage\0", 13};
   std::int32_t word1 = 1;
   std::int32_t width = 1;
   std::int32_t height = 1;
