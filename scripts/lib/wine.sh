@@ -13,18 +13,24 @@ export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe="
 # Pipes are closed, as Wine's services inherit them and would keep whoever reads them waiting.
 wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }
 
-# Makes the prefix if there is none yet. The lock lets tests that start side by side wait for one of them.
+# wine_alone "$@": starts the calling script again as the only one that uses the prefix, since the script that
+# ends first ends the server. What a script leaves behind does not keep the lock.
+wine_alone() {
+  [[ ${QEL_ALONE_IN-} != "$WINEPREFIX" ]] || return 0
+  mkdir -p "$root/build"
+  local lock=$root/build/wine.lock
+  flock --nonblock "$lock" true || progress "Waiting for another script that uses Wine"
+  QEL_ALONE_IN=$WINEPREFIX exec flock --close "$lock" "$0" "$@"
+}
+
+# Makes the prefix if there is none yet.
 wine_make_prefix() {
   [[ ! -f $WINEPREFIX/.complete ]] || return 0
+  progress "Making a Wine prefix"
   mkdir -p "$WINEPREFIX"
-  (
-    flock 9
-    [[ ! -f $WINEPREFIX/.complete ]] || exit 0
-    progress "Making a Wine prefix"
-    # Rarely the first boot of a new prefix fails; the second one then completes it.
-    wine_boot --init || wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
-    touch "$WINEPREFIX/.complete"
-  ) 9>"$root/build/wine.lock"
+  # Rarely the first boot of a new prefix fails; the second one then completes it.
+  wine_boot --init || wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
+  touch "$WINEPREFIX/.complete"
 }
 
 # Boots the prefix and keeps its server until the script ends, so that programs start at once.
