@@ -45,7 +45,7 @@ struct EmiFile {
   std::uint16_t magic = 0x4B4A;
   std::uint16_t version = 0x0200;
   std::uint32_t ignored = 0;
-  std::string items;  // of the top-level list, with or without its end marker
+  std::string items{};  // of the top-level list, with or without its end marker
 
   std::string Bytes() const;
 };

@@ -20,7 +20,7 @@ struct RawFile {
   std::int32_t offset = 0;
   std::int32_t pixelStride = 1;
   std::int32_t rowStride = 1;
-  std::string pixels;  // the block of bytes that follows the header
+  std::string pixels{};  // the block of bytes that follows the header
 
   std::string Bytes() const;
 };

@@ -18,21 +18,21 @@ struct SerCalibration {
 
 struct SerDimension {
   std::uint32_t size = 1;
-  SerCalibration calibration;
+  SerCalibration calibration{};
   std::string description = "Number";
-  std::string units;
-  std::optional<std::int32_t> descriptionLength;  // unless it shall lie
-  std::optional<std::int32_t> unitsLength;        // unless it shall lie
+  std::string units{};
+  std::optional<std::int32_t> descriptionLength{};  // unless it shall lie
+  std::optional<std::int32_t> unitsLength{};        // unless it shall lie
 };
 
 struct SerElement {
-  SerCalibration calibrationX;
-  SerCalibration calibrationY;
+  SerCalibration calibrationX{};
+  SerCalibration calibrationY{};
   std::int16_t typeCode = 1;  // 1 to 6: unsigned, then signed, of 8, 16 and 32 bits; 7 float; 8 double;
                               // 9 complex of floats; 10 complex of doubles
   std::uint32_t width = 1;
   std::uint32_t height = 1;
-  std::string pixels;
+  std::string pixels{};
 
   std::string Bytes() const;
 };
@@ -45,14 +45,14 @@ struct SerFile {
   std::uint32_t dataTypeId = 0x4122;  // images; 0x4120: lines
   std::uint32_t tagTypeId = 0x4152;   // times; 0x4142: times and positions
   std::vector<SerDimension> dimensions = std::vector<SerDimension>(1);
-  std::vector<SerElement> elements;
+  std::vector<SerElement> elements{};
 
   // What the file says, where it shall lie.
-  std::optional<std::uint32_t> totalElements;
-  std::optional<std::uint32_t> validElements;
-  std::optional<std::uint64_t> offsetArrayOffset;
-  std::optional<std::uint32_t> dimensionCount;
-  std::optional<std::string> offsetArrays;  // the bytes of both
+  std::optional<std::uint32_t> totalElements{};
+  std::optional<std::uint32_t> validElements{};
+  std::optional<std::uint64_t> offsetArrayOffset{};
+  std::optional<std::uint32_t> dimensionCount{};
+  std::optional<std::string> offsetArrays{};  // the bytes of both
 
   std::string Bytes() const;
 };
