@@ -1,9 +1,9 @@
 #include "shell_ext.h"
 
-#include <algorithm>
-#include <tuple>
-
+#include "columns.h"
+#include "enum_statpropsetstg.h"
 #include "file_type_factory.h"
+#include "info_tip.h"
 #include "path_stream.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -27,51 +27,47 @@ HRESULT CShellExt::Load(LPCOLESTR path, DWORD) {
   const std::wstring newPath = path != nullptr ? path : L"";
   info_ = CreateFileTypeInfo(stream_, GetExtension(newPath));
   path_ = newPath;
-  propertySets_.clear();
+  propertySets_.reset();
   return S_OK;
 }
 
-HRESULT CShellExt::GetInfoTip(DWORD, WCHAR**) {
-  return E_NOTIMPL;
+HRESULT CShellExt::GetInfoTip(DWORD, WCHAR** tip) {
+  if (!HasValidFile()) return E_FAIL;
+  return tip != nullptr ? MakeInfoTip(*info_, path_, tip) : E_POINTER;
 }
 
-HRESULT CShellExt::GetInfoFlags(DWORD*) {
-  return E_NOTIMPL;
+HRESULT CShellExt::GetInfoFlags(DWORD* flags) {
+  if (flags == nullptr) return E_POINTER;
+  *flags = 0;
+  return S_OK;
 }
 
-HRESULT CShellExt::Initialize(LPCSHCOLUMNINIT) {
-  return E_NOTIMPL;
+HRESULT CShellExt::GetColumnInfo(DWORD index, SHCOLUMNINFO* info) {
+  return DescribeColumn(index, info);
 }
 
-HRESULT CShellExt::GetColumnInfo(DWORD, SHCOLUMNINFO*) {
-  return E_NOTIMPL;
+HRESULT CShellExt::GetItemData(LPCSHCOLUMNID column, LPCSHCOLUMNDATA item, VARIANT* value) {
+  if (column == nullptr || item == nullptr) return E_POINTER;
+  return ReadColumn(*column, *item, value);
 }
 
-HRESULT CShellExt::GetItemData(LPCSHCOLUMNID, LPCSHCOLUMNDATA, VARIANT*) {
-  return E_NOTIMPL;
+HRESULT CShellExt::Open(REFFMTID set, DWORD, IPropertyStorage** storage) {
+  if (const HRESULT result = BuildPropertySetsOnce(); FAILED(result)) return result;
+  const auto found = propertySets_->find(set);
+  if (found == propertySets_->end()) return STG_E_FILENOTFOUND;
+  if (storage == nullptr) return E_POINTER;
+  *storage = Com::ComPtr(found->second).Detach();
+  return S_OK;
 }
 
-HRESULT CShellExt::Create(REFFMTID, const CLSID*, DWORD, DWORD, IPropertyStorage**) {
-  return E_NOTIMPL;
+HRESULT CShellExt::Enum(IEnumSTATPROPSETSTG** enumerator) {
+  if (const HRESULT result = BuildPropertySetsOnce(); FAILED(result)) return result;
+  return CEnumSTATPROPSETSTG::Make(propertySets_, enumerator);
 }
 
-HRESULT CShellExt::Open(REFFMTID, DWORD, IPropertyStorage**) {
-  return E_NOTIMPL;
-}
-
-HRESULT CShellExt::Delete(REFFMTID) {
-  return E_NOTIMPL;
-}
-
-HRESULT CShellExt::Enum(IEnumSTATPROPSETSTG**) {
-  return E_NOTIMPL;
-}
-
-bool CShellExt::FormatIdLess::operator()(const FMTID& a, const FMTID& b) const {
-  const auto head = [](const FMTID& id) { return std::tie(id.Data1, id.Data2, id.Data3); };
-  if (head(a) != head(b)) return head(a) < head(b);
-  return std::lexicographical_compare(std::begin(a.Data4), std::end(a.Data4), std::begin(b.Data4),
-                                      std::end(b.Data4));
+HRESULT CShellExt::BuildPropertySetsOnce() {
+  if (propertySets_ != nullptr) return S_OK;
+  return HasValidFile() ? BuildPropertySets(*info_, propertySets_) : E_FAIL;
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -9,13 +9,12 @@
 #include <windows.h>
 
 #include <fstream>
-#include <map>
 #include <memory>
 #include <string>
 
-#include "com_ptr.h"
 #include "com_root.h"
 #include "file_type_info.h"
+#include "property_sets.h"
 #include "shell_interfaces.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -45,37 +44,39 @@ class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPers
   HRESULT STDMETHODCALLTYPE GetCurFile(LPOLESTR*) override { return E_NOTIMPL; }
 
   // IQueryInfo
+  /// The tip (info_tip.h) is the caller's, to be freed with the task allocator. E_FAIL without a valid file.
   HRESULT STDMETHODCALLTYPE GetInfoTip(DWORD flags, WCHAR** tip) override;
+
+  /// Always 0.
   HRESULT STDMETHODCALLTYPE GetInfoFlags(DWORD* flags) override;
 
-  // IColumnProvider
-  HRESULT STDMETHODCALLTYPE Initialize(LPCSHCOLUMNINIT init) override;
+  // IColumnProvider, which does without the file that was loaded: columns.h.
+  HRESULT STDMETHODCALLTYPE Initialize(LPCSHCOLUMNINIT) override { return S_OK; }
   HRESULT STDMETHODCALLTYPE GetColumnInfo(DWORD index, SHCOLUMNINFO* info) override;
-  HRESULT STDMETHODCALLTYPE GetItemData(LPCSHCOLUMNID column, LPCSHCOLUMNDATA file, VARIANT* value) override;
+  HRESULT STDMETHODCALLTYPE GetItemData(LPCSHCOLUMNID column, LPCSHCOLUMNDATA item, VARIANT* value) override;
 
-  // IPropertySetStorage
-  HRESULT STDMETHODCALLTYPE Create(REFFMTID set, const CLSID* clsid, DWORD flags, DWORD mode,
-                                   IPropertyStorage** storage) override;
+  // IPropertySetStorage, read-only. The sets are built at the first call after Load, and every Open of a set
+  // gives the same storage. E_FAIL without a valid file.
   HRESULT STDMETHODCALLTYPE Open(REFFMTID set, DWORD mode, IPropertyStorage** storage) override;
-  HRESULT STDMETHODCALLTYPE Delete(REFFMTID set) override;
-  HRESULT STDMETHODCALLTYPE Enum(IEnumSTATPROPSETSTG** sets) override;
+  HRESULT STDMETHODCALLTYPE Enum(IEnumSTATPROPSETSTG** enumerator) override;
+  HRESULT STDMETHODCALLTYPE Create(REFFMTID, const CLSID*, DWORD, DWORD, IPropertyStorage**) override {
+    return STG_E_ACCESSDENIED;
+  }
+  HRESULT STDMETHODCALLTYPE Delete(REFFMTID) override { return STG_E_ACCESSDENIED; }
 
  protected:
   ~CShellExt() = default;
 
  private:
-  /// Orders format ids by their fields, the first one first.
-  struct FormatIdLess {
-    bool operator()(const FMTID& a, const FMTID& b) const;
-  };
-
   bool HasValidFile() const { return info_ && info_->IsValid(); }
+
+  HRESULT BuildPropertySetsOnce();
 
   std::ifstream stream_;
   std::unique_ptr<FileTypeInfo> info_;  // reads from stream_, and goes before it
   std::wstring path_;
   SIZE thumbnailSize_{128, 128};
-  std::map<FMTID, Com::ComPtr<IPropertyStorage>, FormatIdLess> propertySets_;
+  std::shared_ptr<const PropertySets> propertySets_;  // null until asked for; shared with the enumerators
 };
 
 }  // namespace Qel::Lumetra::ShellExt

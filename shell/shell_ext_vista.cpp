@@ -1,33 +1,74 @@
 #include "shell_ext_vista.h"
 
+#include <cstddef>
+#include <cstring>
+#include <mutex>
+#include <optional>
+
+#include "ebn_file_info.h"
+#include "metadata.h"
+#include "mrc_file_info.h"
+#include "raw_file_info.h"
+
 namespace Qel::Lumetra::ShellExt {
+namespace {
 
-HRESULT CShellExtVista::Initialize(IStream*, DWORD) {
-  return E_NOTIMPL;
+// The put-back reserve and the largest of the headers: one Read brings any of them, and of an MRC file not a
+// byte more.
+constexpr std::size_t kBufferBytes = 4 + 1024;
+
+constexpr HRESULT kNoCount = 6;
+
+}  // namespace
+
+HRESULT CShellExtVista::Initialize(IStream* stream, DWORD mode) {
+  const std::lock_guard guard(section());
+  mode_ = mode;
+  stream_.rdbuf()->Allocate(kBufferBytes);
+  stream_.rdbuf()->Attach(stream);
+  reader_ = CreateFileInfo(stream_);
+  return S_OK;
 }
 
-HRESULT CShellExtVista::GetCount(DWORD*) {
-  return E_NOTIMPL;
+HRESULT CShellExtVista::GetCount(DWORD* count) {
+  if (count == nullptr) return E_POINTER;
+  *count = 0;
+  return kNoCount;
 }
 
-HRESULT CShellExtVista::GetAt(DWORD, PROPERTYKEY*) {
-  return E_NOTIMPL;
+HRESULT CShellExtVista::GetAt(DWORD index, PROPERTYKEY* key) {
+  if (key == nullptr) return E_POINTER;
+  const bool isListed = index < kListedProperties.size();
+  *key = isListed ? kListedProperties[index] : PROPERTYKEY{};
+  return isListed ? S_OK : E_UNEXPECTED;
 }
 
-HRESULT CShellExtVista::GetValue(REFPROPERTYKEY, PROPVARIANT*) {
-  return E_NOTIMPL;
-}
-
-HRESULT CShellExtVista::SetValue(REFPROPERTYKEY, REFPROPVARIANT) {
-  return E_NOTIMPL;
+HRESULT CShellExtVista::GetValue(REFPROPERTYKEY key, PROPVARIANT* value) {
+  const std::lock_guard guard(section());
+  if (reader_ == nullptr || !reader_->IsValid()) return E_FAIL;
+  if (value == nullptr) return E_POINTER;
+  std::memset(value, 0, sizeof *value);
+  const std::optional<Metadatum> found = FindMetadatum(View::kPropertyStore, *reader_, key);
+  return found ? ToPropertyStoreValue(*found, *value) : E_UNEXPECTED;
 }
 
 HRESULT CShellExtVista::Commit() {
-  return E_NOTIMPL;
+  const std::lock_guard guard(section());
+  stream_.rdbuf()->pubsync();
+  stream_.rdbuf()->Attach(nullptr);
+  return E_FAIL;
 }
 
-HRESULT CShellExtVista::IsPropertyWritable(REFPROPERTYKEY) {
-  return E_NOTIMPL;
+std::unique_ptr<FileTypeInfo> CShellExtVistaMrc::CreateFileInfo(basic_comstream<char>& stream) {
+  return std::make_unique<MrcFileInfo>(stream, L"mrc");
+}
+
+std::unique_ptr<FileTypeInfo> CShellExtVistaEbn::CreateFileInfo(basic_comstream<char>& stream) {
+  return std::make_unique<EbnFileInfo>(stream);
+}
+
+std::unique_ptr<FileTypeInfo> CShellExtVistaRaw::CreateFileInfo(basic_comstream<char>& stream) {
+  return std::make_unique<RawFileInfo>(stream);
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -13,10 +13,6 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-// COM interfaces have no virtual destructor; nobody deletes this object through one.
-#pragma GCC diagnostic push
-#pragma GCC diagnostic ignored "-Wnon-virtual-dtor"
-
 /// Lives as long as the test, whatever its reference count, which the test reads.
 class ScriptedStream final : public IStream {
  public:
@@ -90,7 +86,5 @@ class ScriptedStream final : public IStream {
     return E_NOTIMPL;
   }
 };
-
-#pragma GCC diagnostic pop
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,0 +1,80 @@
+#include "info_tip.h"
+
+#include <shlobj.h>
+#include <shlwapi.h>
+
+#include <array>
+#include <cstdint>
+#include <cstring>
+
+#include "com_ptr.h"
+#include "metadata.h"
+#include "text.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+constexpr int kTextRoom = 256;  // wide characters of a date and time or of a size
+
+std::wstring Label(StringId id) {
+  return LoadResourceString(id) + L": ";
+}
+
+/// Date and time of the day in the user's zone and format; empty when the platform cannot say them.
+std::wstring LocalTime(const FILETIME& time) {
+  SYSTEMTIME utc{};
+  if (!FileTimeToSystemTime(&time, &utc)) return {};
+  SYSTEMTIME local{};
+  if (!SystemTimeToTzSpecificLocalTime(nullptr, &utc, &local)) local = utc;
+
+  std::array<wchar_t, kTextRoom + 1> text{};  // ends in a null even when the date fills its room
+  const int dateEnd =
+      GetDateFormatW(LOCALE_USER_DEFAULT, DATE_SHORTDATE, &local, nullptr, text.data(), kTextRoom);
+  if (dateEnd == 0) return {};
+  wchar_t* const timeBegin = text.data() + dateEnd;
+  timeBegin[-1] = L' ';
+  const int timeLength =
+      GetTimeFormatW(LOCALE_USER_DEFAULT, TIME_NOSECONDS, &local, nullptr, timeBegin, kTextRoom - dateEnd);
+  return timeLength > 0 ? text.data() : std::wstring();
+}
+
+/// The lines that come from the file system, each with the line break before it; none for a file that is
+/// gone.
+std::wstring FileLines(const std::wstring& path) {
+  WIN32_FILE_ATTRIBUTE_DATA attributes{};
+  if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &attributes)) return {};
+  std::wstring lines;
+  if (const std::wstring time = LocalTime(attributes.ftLastWriteTime); !time.empty()) {
+    lines += L"\r\n" + Label(kDateModifiedLabel) + time;
+  }
+  // The size is shown modulo 4 GiB: its high half is left out, and that is meant to stay so.
+  std::array<wchar_t, kTextRoom> size{};
+  if (StrFormatByteSizeW(std::int64_t{attributes.nFileSizeLow}, size.data(), kTextRoom) != nullptr) {
+    lines += L"\r\n" + Label(kSizeLabel) + size.data();
+  }
+  return lines;
+}
+
+std::wstring TipText(const FileTypeInfo& file, const std::wstring& path) {
+  std::wstring text = Label(kDimensionsLabel) + TipDimensions(file);
+  text += L"\r\n" + Label(kTypeLabel) + file.GetTypeDescription();
+  text += FileLines(path);
+  if (const std::wstring comment = file.GetComment(); !comment.empty()) text += L"\r\n" + comment;
+  return text;
+}
+
+}  // namespace
+
+HRESULT MakeInfoTip(const FileTypeInfo& file, const std::wstring& path, wchar_t** tip) {
+  Com::ComPtr<IMalloc> allocator;
+  if (const HRESULT result = SHGetMalloc(allocator.Put()); FAILED(result)) return result;
+  const std::wstring text = TipText(file, path);
+  const std::size_t bytes = (text.size() + 1) * sizeof(wchar_t);
+  void* const copy = allocator->Alloc(bytes);
+  if (copy == nullptr) return E_OUTOFMEMORY;
+  std::memcpy(copy, text.c_str(), bytes);
+  *tip = static_cast<wchar_t*>(copy);
+  return S_OK;
+}
+
+}  // namespace Qel::Lumetra::ShellExt

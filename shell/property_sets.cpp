@@ -1,0 +1,48 @@
+#include "property_sets.h"
+
+#include <algorithm>
+#include <iterator>
+#include <optional>
+#include <tuple>
+
+#include "com_object.h"
+#include "metadata.h"
+#include "property_storage.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+HRESULT AddPropertySet(const FileTypeInfo& file, const FMTID& set, PropertySets& sets) {
+  Com::ComPtr<Com::CComObject<CPropertyStorage>> storage;
+  HRESULT result = Com::MakeObject(storage);
+  if (FAILED(result)) return result;
+  for (const PROPERTYKEY& key : kListedProperties) {
+    if (key.fmtid != set) continue;
+    PropertyValue value;
+    result = ToPropertySetValue(FindMetadatum(View::kPropertySet, file, key).value(), value.Put());
+    if (SUCCEEDED(result)) result = storage->Add(key.pid, value.Get());
+    if (FAILED(result)) return result;
+  }
+  sets.emplace(set, storage.Get());
+  return S_OK;
+}
+
+}  // namespace
+
+bool FormatIdLess::operator()(const FMTID& a, const FMTID& b) const {
+  const auto fields = [](const FMTID& id) { return std::tie(id.Data1, id.Data2, id.Data3); };
+  if (fields(a) != fields(b)) return fields(a) < fields(b);
+  return std::lexicographical_compare(std::begin(a.Data4), std::end(a.Data4), std::begin(b.Data4),
+                                      std::end(b.Data4));
+}
+
+HRESULT BuildPropertySets(const FileTypeInfo& file, std::shared_ptr<const PropertySets>& sets) {
+  const auto built = std::make_shared<PropertySets>();
+  for (const FMTID& set : {kSummarySet, kImageSummarySet}) {
+    if (const HRESULT result = AddPropertySet(file, set, *built); FAILED(result)) return result;
+  }
+  sets = built;
+  return S_OK;
+}
+
+}  // namespace Qel::Lumetra::ShellExt
