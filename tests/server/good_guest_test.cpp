@@ -1,0 +1,256 @@
+// The release DLL as a guest in a process that is not its own: what it asks of the process, and what it
+// leaves behind.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <algorithm>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "ebn_file.h"
+#include "emi_file.h"
+#include "every_request.h"
+#include "mrc_file.h"
+#include "portable_executable.h"
+#include "process_census.h"
+#include "raw_file.h"
+#include "ser_file.h"
+#include "server_dll.h"
+#include "temp_folder.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+using testing::AssertionResult;
+
+TEST(ReleaseDll, ExportsFourUndecoratedFunctions) {
+  const auto module = PortableExecutable::Read(ServerDll::Path());
+  EXPECT_EQ(module.exports, (std::vector<std::string>{"DllCanUnloadNow", "DllGetClassObject",
+                                                      "DllRegisterServer", "DllUnregisterServer"}));
+  EXPECT_EQ(module.exportedName, "QelShellExt.DLL");
+}
+
+TEST(ReleaseDll, ImportsFromTheSystemsOwnModulesOnly) {
+  for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
+    const std::vector<std::string> system = {"advapi32.dll", "gdi32.dll",   "kernel32.dll",
+                                             "msvcrt.dll",   "ole32.dll",   "oleaut32.dll",
+                                             "shell32.dll",  "shlwapi.dll", "user32.dll"};
+    EXPECT_NE(std::ranges::find(system, name), system.end()) << name;
+  }
+}
+
+TEST(ReleaseDll, AsksForNothingThatOutlivesItInTheProcess) {
+  // Not a thread, not a handler of the process's faults, and not a thread-local slot that is not freed.
+  for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
+    for (const char* const function :
+         {"createthread", "_beginthreadex", "addvectoredexceptionhandler", "setunhandledexceptionfilter",
+          "tlsalloc", "setwindowshookexw", "createeventa", "createsemaphorea", "suspendthread"}) {
+      EXPECT_FALSE(functions.contains(function)) << name << " " << function;
+    }
+  }
+}
+
+TEST(ReleaseDll, IsHardened) {
+  const auto module = PortableExecutable::Read(ServerDll::Path());
+  EXPECT_EQ(module.machine, IMAGE_FILE_MACHINE_AMD64);
+  EXPECT_TRUE(module.fileCharacteristics & IMAGE_FILE_DLL);
+  EXPECT_FALSE(module.fileCharacteristics & IMAGE_FILE_RELOCS_STRIPPED);
+  EXPECT_TRUE(module.dllCharacteristics & IMAGE_DLLCHARACTERISTICS_DYNAMIC_BASE);
+  EXPECT_TRUE(module.dllCharacteristics & IMAGE_DLLCHARACTERISTICS_NX_COMPAT);
+  EXPECT_TRUE(module.dllCharacteristics & 0x20);  // high-entropy addresses
+  EXPECT_FALSE(module.sections.empty());
+  for (const auto& section : module.sections) {
+    EXPECT_FALSE((section.characteristics & IMAGE_SCN_MEM_WRITE) != 0 &&
+                 (section.characteristics & IMAGE_SCN_MEM_EXECUTE) != 0)
+        << section.name;
+  }
+}
+
+TEST(ReleaseDll, IsProtectedAgainstOverrunsOfTheStack) {
+  std::ifstream file(ServerDll::Path(), std::ios::binary);
+  const std::string bytes{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  // What the check of a function's stack says before it ends the process.
+  EXPECT_NE(bytes.find("stack smashing detected"), std::string::npos);
+}
+
+TEST(ReleaseDll, CarriesNoTimeOfItsBuild) {
+  EXPECT_EQ(PortableExecutable::Read(ServerDll::Path()).timeStamp, 0u);
+}
+
+/// Sound and damaged files of every kind.
+std::vector<std::filesystem::path> WriteFiles(const TempFolder& folder) {
+  std::vector<std::filesystem::path> files;
+  const auto write = [&](const char* name, const std::string& bytes) {
+    files.push_back(folder.Write(name, bytes));
+  };
+  const std::string pixels(16 * 16 * 16, '\7');
+
+  MrcFile mrc;
+  mrc.nx = mrc.ny = 16;
+  mrc.nz = 3;
+  mrc.labels = {"A label"};
+  mrc.pixels = pixels;
+  for (const std::int32_t mode : {0, 1, 2, 3, 4, 6, 16}) {
+    mrc.mode = mode;
+    write(("mode" + std::to_string(mode) + ".mrc").c_str(), mrc.Bytes());
+  }
+  write("cut.ali", mrc.Bytes().substr(0, 1100));
+  write("short.rec", mrc.Bytes().substr(0, 1000));
+
+  write("grey.raw", PackedRawFile(DataType::kUInt16, 16, 16, pixels).Bytes());
+  write("colour.raw", PackedRawFile(DataType::kBgr24, 16, 16, pixels).Bytes());
+  write("complex.raw", PackedRawFile(DataType::kComplexFloat64, 16, 16, pixels).Bytes());
+  write("short.raw", PackedRawFile(DataType::kUInt16, 16, 16, "").Bytes());
+
+  EbnFile ebn;
+  ebn.width = ebn.height = 16;
+  ebn.afterHeader = pixels;
+  write("sound.ebn", ebn.Bytes());
+  write("short.ebn", ebn.Bytes().substr(0, 40));
+
+  SerElement element;
+  element.width = element.height = 16;
+  element.pixels = pixels;
+  SerFile ser;
+  ser.elements = {element, element};
+  write("sound.ser", ser.Bytes());
+  ser.dimensions[0].unitsLength = -1;
+  write("throwing.ser", ser.Bytes());
+
+  EmiFile emi = OneImageEmiFile(0x2202, 16, 16, pixels);
+  write("sound.emi", emi.Bytes());
+  write("short.emi", emi.Bytes().substr(0, 20));
+  emi.items = EmiArray(0x2202, 0x0202, pixels);
+  write("throwing.emi", emi.Bytes());
+
+  write("unknown.tif", pixels);
+  files.push_back(folder.path() / "missing.mrc");
+  return files;
+}
+
+class Unloading : public testing::Test {
+ protected:
+  // What the DLL uses stays loaded, as it is in a process with a shell, so that only the DLL comes and goes.
+  Unloading() {
+    for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
+      system_.push_back(LoadLibraryA(name.c_str()));
+    }
+    CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED);
+  }
+
+  ~Unloading() override {
+    CoUninitialize();
+    for (const HMODULE module : system_) FreeLibrary(module);
+  }
+
+  /// Loads the DLL, sends it every request for `file`, and unloads it.
+  int Cycle(const std::filesystem::path& file) {
+    const ServerDll dll;
+    const int exceptions = MakeEveryRequest(dll, file);
+    EXPECT_EQ(dll.CanUnloadNow(), S_OK);
+    return exceptions;
+  }
+
+ private:
+  std::vector<HMODULE> system_;
+};
+
+/// Whether nothing has become more but for what the system keeps for itself: a leak of one cycle in a hundred
+/// would show.
+AssertionResult NothingIsLeft(const ProcessCensus& before, const ProcessCensus& after, std::size_t cycles) {
+  const auto grown = [](std::size_t from, std::size_t to) { return to > from ? to - from : 0; };
+  const std::size_t blocks = grown(before.heapBlocks, after.heapBlocks);
+  const std::size_t bytes = grown(before.heapBytes, after.heapBytes);
+  if (blocks <= cycles / 100 && bytes <= 16 * 1024 && after.threadSlots == before.threadSlots &&
+      after.fiberSlots == before.fiberSlots && after.handles <= before.handles &&
+      after.gdiObjects == before.gdiObjects) {
+    return testing::AssertionSuccess();
+  }
+  return testing::AssertionFailure() << "after " << cycles << " cycles " << blocks << " blocks, " << bytes
+                                     << " bytes, " << after.threadSlots - before.threadSlots
+                                     << " thread-local slots, " << after.fiberSlots - before.fiberSlots
+                                     << " fiber-local slots, " << after.handles - before.handles
+                                     << " handles, " << after.gdiObjects - before.gdiObjects
+                                     << " GDI objects are left";
+}
+
+TEST(ProcessCensus, SeesWhatIsTaken) {
+  const auto before = ProcessCensus::Take();
+  const auto unchanged = ProcessCensus::Take();
+  EXPECT_EQ(unchanged.heapBlocks, before.heapBlocks);
+
+  void* const block = HeapAlloc(GetProcessHeap(), 0, 1000);
+  const DWORD threadSlot = TlsAlloc();
+  const DWORD fiberSlot = FlsAlloc(nullptr);
+  const HANDLE handle = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+  const HDC gdiObject = CreateCompatibleDC(nullptr);
+  const auto after = ProcessCensus::Take();
+  DeleteDC(gdiObject);
+  CloseHandle(handle);
+  FlsFree(fiberSlot);
+  TlsFree(threadSlot);
+  HeapFree(GetProcessHeap(), 0, block);
+
+  EXPECT_GT(after.heapBlocks, before.heapBlocks);
+  EXPECT_GE(after.heapBytes, before.heapBytes + 1000);
+  EXPECT_EQ(after.threadSlots, before.threadSlots + 1);
+  EXPECT_EQ(after.fiberSlots, before.fiberSlots + 1);
+  EXPECT_GT(after.handles, before.handles);
+  EXPECT_GT(after.gdiObjects, before.gdiObjects);
+}
+
+TEST_F(Unloading, LeavesNothingAfterThreeThousandCycles) {
+  constexpr std::size_t kCycles = 3000;
+  const TempFolder folder;
+  const auto files = WriteFiles(folder);
+  int exceptions = 0;
+  for (const auto& file : files) exceptions += Cycle(file);
+  EXPECT_GT(exceptions, 0);  // thrown by the DLL, caught here
+
+  const auto before = ProcessCensus::Take();
+  for (std::size_t i = 0; i < kCycles && !HasFailure(); ++i) Cycle(files[i % files.size()]);
+  EXPECT_TRUE(NothingIsLeft(before, ProcessCensus::Take(), kCycles));
+}
+
+TEST_F(Unloading, LeavesNothingInOtherThreads) {
+  constexpr std::size_t kCycles = 200;
+  const TempFolder folder;
+  const auto files = WriteFiles(folder);
+
+  // One thread lives on when the DLL is unloaded, one has ended before.
+  const HANDLE go = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+  const HANDLE done = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+  const ServerDll* dll = nullptr;
+  const std::filesystem::path* file = nullptr;
+  std::thread living([&] {
+    for (WaitForSingleObject(go, INFINITE); dll != nullptr; WaitForSingleObject(go, INFINITE)) {
+      MakeEveryRequest(*dll, *file);
+      SetEvent(done);
+    }
+  });
+  const auto cycle = [&](const std::filesystem::path& path) {
+    const ServerDll loaded;
+    dll = &loaded;
+    file = &path;
+    SignalObjectAndWait(go, done, INFINITE, FALSE);
+    std::thread([&] { MakeEveryRequest(loaded, path); }).join();
+    EXPECT_EQ(loaded.CanUnloadNow(), S_OK);
+  };
+  for (const auto& path : files) cycle(path);
+
+  const auto before = ProcessCensus::Take();
+  for (std::size_t i = 0; i < kCycles && !HasFailure(); ++i) cycle(files[i % files.size()]);
+  EXPECT_TRUE(NothingIsLeft(before, ProcessCensus::Take(), kCycles));
+
+  dll = nullptr;
+  SetEvent(go);
+  living.join();
+  CloseHandle(go);
+  CloseHandle(done);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,0 +1,32 @@
+// What a module's file says about itself: the tables of the Portable Executable format that a test looks at.
+#pragma once
+
+#include <cstdint>
+#include <filesystem>
+#include <map>
+#include <set>
+#include <string>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+struct PortableExecutable {
+  struct Section {
+    std::string name;
+    std::uint32_t characteristics = 0;
+  };
+
+  std::uint16_t machine = 0;
+  std::uint16_t fileCharacteristics = 0;
+  std::uint16_t dllCharacteristics = 0;
+  std::uint32_t timeStamp = 0;
+  std::vector<Section> sections;
+  std::string exportedName;                              // of the module
+  std::vector<std::string> exports;                      // in their order
+  std::map<std::string, std::set<std::string>> imports;  // functions by module, names in lower case
+
+  /// Reads a 64-bit module. Throws std::exception for a file that is none.
+  static PortableExecutable Read(const std::filesystem::path& path);
+};
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
