@@ -62,7 +62,7 @@ HRESULT WriteKey(const ScriptKey& key, const std::wstring& path, RegistryStore& 
   return result;
 }
 
-/// The keys inside it have been dealt with.
+/// The keys inside it have been dealt with, or go with it.
 HRESULT RemoveKey(const ScriptKey& key, const std::wstring& path, RegistryStore& store) {
   const KeyMark mark = EffectiveMark(key);
   if (mark == KeyMark::kForceRemove) return store.DeleteTree(key.root, path);
@@ -99,10 +99,13 @@ HRESULT Unregister(const RegistryScript& script, RegistryStore& store) {
     }
     return result;
   };
+  const ScriptKey* whole = nullptr;  // goes with all the keys inside it
   for (const ScriptKey& key : script) {
+    if (whole && key.depth > whole->depth) continue;
     const HRESULT result = removeDownTo(key.depth);
     if (FAILED(result)) return result;
     path.Enter(key);
+    whole = EffectiveMark(key) == KeyMark::kForceRemove ? &key : nullptr;
   }
   return removeDownTo(0);
 }
