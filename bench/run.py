@@ -65,9 +65,9 @@ def main():
         if STACK.name in chosen:
             results["stack"] = measure_stack(STACK, systems, rounds)
         if "series" in chosen:
-            results["series"] = measure_series((10_000, 100_000), [native], rounds)
+            results["series"] = measure_series((10_000, 100_000), systems, rounds)
         if "folder" in chosen:
-            results["folder"] = measure_folder("mrc", 1000, [native], rounds)
+            results["folder"] = measure_folder("mrc", 1000, systems, rounds)
         if "others" in chosen:
             results["others"] = [result for frame in FRAMES if frame.name in COMPARED
                                  for result in measure_others(frame, native, rounds)]
