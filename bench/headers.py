@@ -56,18 +56,19 @@ def measure_folder(kind, count, systems, rounds):
             questions.update({what: ("metadata", what, *folder.files) for what in system.metadata})
             times = interleaved({name: system.asking(*words) for name, words in questions.items()}, rounds)
             for what, due in system.metadata.items():
+                few = folder.files[:100]  # as the kernel counts up to some 16,000 events at a time
                 with OpenCounter(system.folder / folder.file) as opens:
                     before = system.worker.bytes_read()
-                    system.worker.ask(*questions[what])
+                    system.worker.ask("metadata", what, *few)
                     results.append({
                         "question": what,
                         "system": system.name,
                         "start_ns": statistics.median(times["start"]) / count,
                         "answer_ns": statistics.median(times[what]) / count,
                         "ratio": ratio(times[what], times["start"]),
-                        "opens": opens.count() / count,
+                        "opens": opens.count() / len(few),
                         "opens_due": due,
-                        "bytes_read": (system.worker.bytes_read() - before) / count,
+                        "bytes_read": (system.worker.bytes_read() - before) / len(few),
                     })
                 result = results[-1]
                 table.row(what, system.name, f"{result['start_ns'] / 1000:.1f}",

@@ -13,13 +13,13 @@ bool ReadAtPositions(const std::wstring& path, const PositionedReads& reads) {
   std::vector<char> bytes(reads.bytes);
   bool done = true;
   for (std::int64_t i = 0; i < reads.count && done; ++i) {
-    const std::int64_t position = reads.first + i * reads.step;
-    OVERLAPPED place{};
-    place.Offset = static_cast<DWORD>(position);
-    place.OffsetHigh = static_cast<DWORD>(position >> 32);
+    // Two calls: under Wine one that reads at a position asks its server and takes twenty times as long.
+    LARGE_INTEGER position{};
+    position.QuadPart = reads.first + i * reads.step;
     DWORD read = 0;
-    done =
-        ReadFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &read, &place) && read == bytes.size();
+    done = SetFilePointerEx(file, position, nullptr, FILE_BEGIN) &&
+           ReadFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &read, nullptr) &&
+           read == bytes.size();
   }
   CloseHandle(file);
   return done;
