@@ -1,0 +1,160 @@
+#include "qel_shell_ext_module.h"
+
+#include <gtest/gtest.h>
+
+#include <array>
+
+#include "server_dll.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+constexpr CLSID kClass = {0x12345678, 0x1234, 0x1234, {1, 2, 3, 4, 5, 6, 7, 8}};
+
+/// Answers IUnknown, and IClassFactory with success but without an object.
+class FaultyFactory final : public IUnknown {
+ public:
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override {
+    *object = iid == IID_IClassFactory ? nullptr : this;
+    if (*object != nullptr) AddRef();
+    return S_OK;
+  }
+  ULONG STDMETHODCALLTYPE AddRef() override { return ++references; }
+  ULONG STDMETHODCALLTYPE Release() override { return --references; }
+
+  ULONG references = 1;
+};
+
+FaultyFactory g_factory;
+int g_makerCalls = 0;
+HRESULT g_makerResult = S_OK;
+
+HRESULT MakeFaultyFactory(Com::InstanceMaker, REFIID iid, void** classObject) {
+  ++g_makerCalls;
+  EXPECT_EQ(iid, IID_IUnknown);
+  return FAILED(g_makerResult) ? g_makerResult : g_factory.QueryInterface(iid, classObject);
+}
+
+HRESULT MakeNoFactory(Com::InstanceMaker, REFIID, void**) {
+  return S_FALSE;
+}
+
+class Module : public testing::Test {
+ protected:
+  Module() {
+    g_makerCalls = 0;
+    g_makerResult = S_OK;
+  }
+
+  /// What the module answers for the class object of `kClass`.
+  static HRESULT GetClassObject(CQelShellExtModule& module, REFIID iid = IID_IUnknown) {
+    void* answer = &answer;
+    const HRESULT result = module.GetClassObject(kClass, iid, &answer);
+    EXPECT_EQ(answer, SUCCEEDED(result) ? &g_factory : nullptr);
+    if (SUCCEEDED(result)) g_factory.Release();
+    return result;
+  }
+};
+
+TEST_F(Module, ListsItsClassesInTheOrderOfTheirRegistration) {
+  struct Row {
+    CLSID clsid;
+    UINT script;
+  };
+  const Row rows[] = {
+      {kShellExtClass, 102}, {kEbnHandlerClass, 104}, {kRawHandlerClass, 107}, {kMrcHandlerClass, 106}};
+  const auto map = ObjectMap();
+  ASSERT_EQ(map.size(), std::size(rows));
+  for (std::size_t i = 0; i < map.size(); ++i) {
+    EXPECT_EQ(*map[i].clsid, rows[i].clsid);
+    EXPECT_EQ(map[i].registryScript, rows[i].script);
+  }
+}
+
+TEST_F(Module, SkipsEntriesThatAreEmptyOrMakeNoClassObject) {
+  std::array<ObjectMapEntry, 3> map{{{}, {&kClass}, {&kClass, 0, &MakeFaultyFactory}}};
+  CQelShellExtModule module(nullptr, map);
+  EXPECT_EQ(GetClassObject(module), S_OK);
+
+  CQelShellExtModule without(nullptr, std::span(map).first(2));
+  EXPECT_EQ(GetClassObject(without), CLASS_E_CLASSNOTAVAILABLE);
+}
+
+TEST_F(Module, KeepsTheClassObjectEncodedUntilItGoes) {
+  std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
+  {
+    CQelShellExtModule module(nullptr, map);
+    EXPECT_EQ(map[0].classObject, nullptr);
+    EXPECT_EQ(GetClassObject(module), S_OK);
+    EXPECT_EQ(GetClassObject(module), S_OK);
+    EXPECT_EQ(g_makerCalls, 1);
+    EXPECT_EQ(g_factory.references, 2u);
+    EXPECT_NE(map[0].classObject, &g_factory);
+    EXPECT_EQ(DecodePointer(map[0].classObject), &g_factory);
+  }
+  EXPECT_EQ(g_factory.references, 1u);
+}
+
+TEST_F(Module, ReturnsTheFailureOfTheMakerAndAsksItAgain) {
+  std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
+  CQelShellExtModule module(nullptr, map);
+  g_makerResult = E_OUTOFMEMORY;
+  EXPECT_EQ(GetClassObject(module), E_OUTOFMEMORY);
+  EXPECT_EQ(map[0].classObject, nullptr);
+  g_makerResult = S_OK;
+  EXPECT_EQ(GetClassObject(module), S_OK);
+  EXPECT_EQ(g_makerCalls, 2);
+}
+
+TEST_F(Module, TakesSuccessWithoutAnObjectForAClassThatIsNotAvailable) {
+  std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeNoFactory}}};
+  CQelShellExtModule module(nullptr, map);
+  EXPECT_EQ(GetClassObject(module), CLASS_E_CLASSNOTAVAILABLE);
+
+  std::array<ObjectMapEntry, 1> faultyMap{{{&kClass, 0, &MakeFaultyFactory}}};
+  CQelShellExtModule faulty(nullptr, faultyMap);
+  EXPECT_EQ(GetClassObject(faulty, IID_IClassFactory), CLASS_E_CLASSNOTAVAILABLE);
+}
+
+TEST_F(Module, CountsItsLocks) {
+  CQelShellExtModule module(nullptr, {});
+  EXPECT_FALSE(module.initFailed());
+  EXPECT_EQ(module.GetLockCount(), 0);
+  EXPECT_EQ(module.Lock(), 1);
+  EXPECT_EQ(module.Lock(), 2);
+  EXPECT_EQ(module.GetLockCount(), 2);
+  EXPECT_EQ(module.Unlock(), 1);
+  EXPECT_EQ(module.Unlock(), 0);
+}
+
+TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
+  CQelShellExtModule module(nullptr, {});
+  EXPECT_EQ(module.GetGITPtr(nullptr), E_POINTER);
+
+  ComPtr<IGlobalInterfaceTable> table;
+  EXPECT_EQ(module.GetGITPtr(table.Put()), CO_E_NOTINITIALIZED);
+  EXPECT_FALSE(table);
+
+  ASSERT_EQ(CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED), S_OK);
+  {
+    EXPECT_EQ(module.GetGITPtr(table.Put()), S_OK);
+    ASSERT_TRUE(table);
+    ComPtr<IGlobalInterfaceTable> again;
+    EXPECT_EQ(module.GetGITPtr(again.Put()), S_OK);
+    EXPECT_EQ(again.Get(), table.Get());
+  }
+  table = {};
+  CoUninitialize();
+}
+
+TEST_F(Module, TellsTheRegistryScriptsItsAppId) {
+  const CQelShellExtModule module(nullptr, {});
+  std::vector<Replacement> replacements;
+  EXPECT_EQ(module.AddCommonRGSReplacements(replacements), S_OK);
+  ASSERT_EQ(replacements.size(), 1u);
+  EXPECT_EQ(replacements[0].name, L"APPID");
+  EXPECT_EQ(replacements[0].value, L"{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}");
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing
