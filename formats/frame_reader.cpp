@@ -16,8 +16,9 @@ namespace {
 constexpr std::int64_t kBandBytes = 256LL * 1024;
 
 // Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
-// picture is refused when it has more pixels than bytes and more than this.
-constexpr std::int64_t kMostSharedPixels = 1024LL * 1024;
+// picture is refused when it has more pixels than bytes and more than this, which bounds the memory that a
+// file of a few bytes can take to 576 KiB (a double and a grey level for each pixel).
+constexpr std::int64_t kMostSharedPixels = 64LL * 1024;
 
 // Reading band by band is given up for reading column by column when it would read the block this often.
 constexpr std::int64_t kMostPasses = 8;

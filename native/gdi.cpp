@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
+#include <new>
 #include <vector>
 
 struct HBITMAP__ {
@@ -18,7 +19,7 @@ struct HDC__ {
 };
 
 HDC CreateCompatibleDC(HDC) {
-  return new HDC__;
+  return new (std::nothrow) HDC__;
 }
 
 BOOL DeleteDC(HDC dc) {
@@ -26,7 +27,8 @@ BOOL DeleteDC(HDC dc) {
   return 1;
 }
 
-HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE, DWORD) {
+// Without memory for it there is no bitmap, and no exception.
+HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE, DWORD) try {
   if (bits != nullptr) *bits = nullptr;
   const BITMAPINFOHEADER& header = info->bmiHeader;
   if (header.biWidth <= 0 || header.biHeight == 0) return nullptr;
@@ -48,6 +50,8 @@ HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE,
   bitmap->colours.assign(colours, colours + header.biClrUsed);
   if (bits != nullptr) *bits = bitmap->bits.get();
   return bitmap.release();
+} catch (const std::bad_alloc&) {
+  return nullptr;
 }
 
 BOOL DeleteObject(HGDIOBJ object) {

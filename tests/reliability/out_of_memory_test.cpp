@@ -1,0 +1,134 @@
+// Memory that runs out at every single allocation: the standard exception or no thumbnail, nothing leaked,
+// and an object that answers again as soon as there is memory.
+#include <gtest/gtest.h>
+
+#include <istream>
+#include <memory>
+#include <new>
+#include <string>
+#include <utility>
+
+#include "allocation_meter.h"
+#include "bitmap_pixels.h"
+#include "file_kind_test.h"
+#include "memory_buffer.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+using Testing::BitmapPixels;
+using Testing::FailingHeap;
+using Testing::SampleFile;
+
+/// What came of a call while an allocation failed.
+enum class Outcome { kAnswered, kThrew, kNotReached };
+
+/// Calls `call` with its allocation number `allocation` failing.
+template <class Call>
+Outcome CallWithFailingHeap(std::int64_t allocation, FailingHeap::Then then, const Call& call) {
+  const FailingHeap heap(allocation, then);
+  try {
+    call();
+  } catch (const std::bad_alloc&) {
+    return Outcome::kThrew;
+  }
+  return heap.Failed() ? Outcome::kAnswered : Outcome::kNotReached;
+}
+
+/// Calls `call` with its first allocation failing, its second, and so on until it comes to no further one,
+/// and after each time `check`, which is to free what the call has answered. Returns how often the call
+/// threw.
+template <class Call, class Check>
+int FailEveryAllocation(const Call& call, const Check& check) {
+  int exceptions = 0;
+  for (const auto then : {FailingHeap::Then::kRecovers, FailingHeap::Then::kStaysFull}) {
+    Outcome outcome = Outcome::kAnswered;
+    for (std::int64_t i = 0; outcome != Outcome::kNotReached; ++i) {
+      SCOPED_TRACE("allocation " + std::to_string(i));
+      const Testing::HeapUse before = Testing::CurrentHeapUse();
+      outcome = CallWithFailingHeap(i, then, call);
+      check(outcome);
+      EXPECT_EQ(Testing::CurrentHeapUse(), before);
+      if (outcome == Outcome::kThrew) ++exceptions;
+    }
+  }
+  return exceptions;
+}
+
+class OutOfMemory : public Testing::FileKindTest {
+ protected:
+  /// The first exception of a thread allocates what the runtime keeps for all others.
+  static void SetUpTestSuite() {
+    try {
+      throw std::bad_alloc();
+    } catch (const std::bad_alloc&) {
+    }
+  }
+};
+
+TEST_P(OutOfMemory, WhileAReaderIsMadeLeavesNothingBehind) {
+  for (const SampleFile& sample : samples_) {
+    SCOPED_TRACE(sample.name);
+    Testing::MemoryBuffer buffer(sample.bytes);
+    std::istream stream(&buffer);
+    const int exceptions = FailEveryAllocation(
+        [&] {
+          stream.clear();
+          stream.seekg(0);
+          MakeReader(stream);
+        },
+        [](Outcome outcome) { EXPECT_NE(outcome, Outcome::kAnswered); });
+    EXPECT_GT(exceptions, 0);
+    stream.clear();
+    stream.seekg(0);
+    EXPECT_TRUE(MakeReader(stream)->IsValid());
+  }
+}
+
+TEST_P(OutOfMemory, WhileAThumbnailIsMadeLeavesNothingBehind) {
+  for (const SampleFile& sample : samples_) {
+    SCOPED_TRACE(sample.name);
+    Testing::MemoryBuffer buffer(sample.bytes);
+    std::istream stream(&buffer);
+    const auto reader = MakeReader(stream);
+    const BitmapPixels expected = Testing::TakeBitmap(reader->CreateThumbnail(Testing::kSmallRequest));
+    HBITMAP bitmap = nullptr;
+    const int exceptions = FailEveryAllocation(
+        [&] { bitmap = reader->CreateThumbnail(Testing::kSmallRequest); },
+        [&](Outcome) {
+          // The system's own failures give no bitmap, or the bitmap all the same: making it needs no device
+          // context.
+          EXPECT_TRUE(bitmap == nullptr || Testing::TakeBitmap(std::exchange(bitmap, nullptr)) == expected);
+          EXPECT_TRUE(reader->IsValid());
+          EXPECT_EQ(Testing::TakeBitmap(reader->CreateThumbnail(Testing::kSmallRequest)), expected);
+        });
+    EXPECT_GT(exceptions, 0);
+  }
+}
+
+TEST_P(OutOfMemory, WhileTextsAreMadeLeavesNothingBehind) {
+  for (const SampleFile& sample : samples_) {
+    SCOPED_TRACE(sample.name);
+    Testing::MemoryBuffer buffer(sample.bytes);
+    std::istream stream(&buffer);
+    const auto reader = MakeReader(stream);
+    const std::wstring name = reader->GetDataTypeName();
+    const std::wstring comment = reader->GetComment();
+    FailEveryAllocation(
+        [&] {
+          reader->GetTypeDescription();
+          reader->GetDataTypeName();
+          reader->GetComment();
+        },
+        [&](Outcome outcome) {
+          EXPECT_NE(outcome, Outcome::kAnswered);
+          EXPECT_EQ(reader->GetDataTypeName(), name);
+          EXPECT_EQ(reader->GetComment(), comment);
+        });
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(All, OutOfMemory, Testing::kEachFileKind, Testing::KindName);
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt

@@ -1,0 +1,84 @@
+#include "ask_everything.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <memory>
+#include <numeric>
+#include <stdexcept>
+#include <tuple>
+
+#include "file_type_factory.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+auto Metadata(const FileTypeInfo& reader) {
+  return std::tuple(reader.GetTypeDescription(), reader.GetDimensions(), reader.GetFrameCount(),
+                    reader.GetBitDepth(), reader.GetDataTypeName(), reader.GetComment());
+}
+
+/// The only exceptions that may leave a constructor.
+std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream, const std::wstring& extension) {
+  try {
+    return CreateFileTypeInfo(stream, extension);
+  } catch (const std::invalid_argument&) {  // an item outside of the object that it belongs to
+    if (!IsEmiExtension(extension)) throw;
+  } catch (const std::length_error&) {  // a negative length of a text
+    if (!IsSerExtension(extension)) throw;
+  }
+  return nullptr;
+}
+
+/// The edge of the blocks that become one pixel. Written down once more, independently of what it checks.
+std::int64_t Factor(Size2 frame, bool colour, const SIZE& request) {
+  const std::int64_t factor =
+      std::max(std::int64_t{frame.width} / request.cx, std::int64_t{frame.height} / request.cy);
+  return colour ? factor : std::max<std::int64_t>(factor, 1);
+}
+
+/// Checks the shape of `bitmap`, reads all of it and deletes it.
+void Take(HBITMAP bitmap, Size2 frame, bool colour, const SIZE& request, Answers& answers) {
+  DIBSECTION section{};
+  if (GetObjectW(bitmap, sizeof section, &section) != static_cast<int>(sizeof section)) {
+    answers.wrong = "a thumbnail is no DIB section";
+    return;
+  }
+  const BITMAP& shape = section.dsBm;
+  const std::int64_t factor = Factor(frame, colour, request);
+  if (shape.bmWidth != frame.width / factor || shape.bmHeight != frame.height / factor) {
+    answers.wrong = "a thumbnail has another size than the frame and the request give";
+  }
+  if (shape.bmBitsPixel != (colour ? 24 : 8)) answers.wrong = "a thumbnail has another depth than its kind";
+  const auto* const bits = static_cast<const std::uint8_t*>(shape.bmBits);
+  const std::int64_t bytes = std::int64_t{shape.bmWidthBytes} * shape.bmHeight;
+  answers.bitmapSum = std::accumulate(bits, bits + bytes, answers.bitmapSum);
+  ++answers.bitmaps;
+  DeleteObject(bitmap);
+}
+
+}  // namespace
+
+bool IsRequiredFault(Size2 frame, bool colour, const SIZE& request) {
+  return request.cx == 0 || request.cy == 0 || Factor(frame, colour, request) == 0;
+}
+
+Answers AskEverything(std::istream& stream, const std::wstring& extension, std::span<const SIZE> requests) {
+  Answers answers;
+  const std::unique_ptr<FileTypeInfo> reader = MakeReader(stream, extension);
+  answers.constructed = reader != nullptr;
+  answers.valid = answers.constructed && reader->IsValid();
+  if (!answers.valid) return answers;
+
+  const auto metadata = Metadata(*reader);
+  const Size2 frame = reader->GetDimensions();
+  const bool colour = reader->GetBitDepth() == 24;
+  for (const SIZE& request : requests) {
+    if (IsRequiredFault(frame, colour, request)) continue;
+    const HBITMAP bitmap = reader->CreateThumbnail(request);
+    if (bitmap != nullptr) Take(bitmap, frame, colour, request, answers);
+  }
+  if (Metadata(*reader) != metadata) answers.wrong = "the metadata changed with the thumbnails";
+  return answers;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Testing

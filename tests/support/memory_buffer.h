@@ -1,0 +1,74 @@
+// A file in memory that counts what is read of it and fails when it is told to.
+#pragma once
+
+#include <algorithm>
+#include <cstdint>
+#include <stdexcept>
+#include <streambuf>
+#include <string_view>
+
+namespace Qel::Lumetra::ShellExt::Testing {
+
+/// Every read is one read of the file: nothing is buffered. It can be positioned behind its end, as a file.
+class MemoryBuffer : public std::streambuf {
+ public:
+  /// What the failing read does. Reads after it work again.
+  enum class Failure { kBringsNothing, kBringsHalf, kThrows };
+
+  /// `bytes` must outlive the buffer.
+  explicit MemoryBuffer(std::string_view bytes) : bytes_(bytes) {}
+
+  std::int64_t failingRead = -1;  // counted from 0; -1 for none
+  Failure failure = Failure::kBringsNothing;
+  bool seekable = true;
+
+  std::int64_t reads = 0;
+  std::int64_t bytesRead = 0;
+  std::int64_t largestRead = 0;
+
+ protected:
+  std::streamsize xsgetn(char* target, std::streamsize count) override {
+    if (count == 0) return 0;  // is no read
+    const auto size = static_cast<std::streamsize>(bytes_.size());
+    std::streamsize got = std::clamp<std::streamsize>(size - position_, 0, count);
+    if (reads++ == failingRead) {
+      if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
+      got = failure == Failure::kBringsHalf ? got / 2 : 0;
+    }
+    std::copy_n(bytes_.begin() + std::min(position_, size), got, target);
+    position_ += got;
+    bytesRead += got;
+    largestRead = std::max<std::int64_t>(largestRead, got);
+    return got;
+  }
+
+  int_type uflow() override {
+    char byte = 0;
+    return xsgetn(&byte, 1) == 1 ? traits_type::to_int_type(byte) : traits_type::eof();
+  }
+
+  int_type underflow() override {
+    const int_type byte = uflow();
+    if (!traits_type::eq_int_type(byte, traits_type::eof())) --position_;
+    return byte;
+  }
+
+  pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
+    const off_type base = direction == std::ios_base::end   ? static_cast<off_type>(bytes_.size())
+                          : direction == std::ios_base::cur ? position_
+                                                            : 0;
+    return seekpos(base + offset, std::ios_base::in);
+  }
+
+  pos_type seekpos(pos_type position, std::ios_base::openmode) override {
+    if (!seekable || off_type{position} < 0) return {off_type{-1}};
+    position_ = position;
+    return position;
+  }
+
+ private:
+  std::string_view bytes_;
+  std::streamoff position_ = 0;
+};
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
