@@ -98,7 +98,11 @@ EbnParser::EbnParser(std::istream& stream) : stream_(&stream) {
       .kilovolts = ReadLittleEndian<double>(stream),
   };
   const auto type = DataTypeOfCode(typeCode);
-  if (width < 1 || height < 1 || dataOffset < kHeaderBytes || !type || typeCode > kLastTypeCode) {
+  check_.Require(type && typeCode <= kLastTypeCode, "data type code", typeCode, "from 1 to 8")
+      .Require(width >= 1, "width", width, "at least 1")
+      .Require(height >= 1, "height", height, "at least 1")
+      .Require(dataOffset >= kHeaderBytes, "data offset", dataOffset, "at least 54, behind the header");
+  if (fault()) {
     stream.setstate(std::ios_base::failbit);
     return;
   }

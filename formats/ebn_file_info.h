@@ -5,11 +5,13 @@
 
 #include <cstdint>
 #include <istream>
+#include <optional>
 #include <string>
 
 #include "data_type.h"
 #include "file_type_info.h"
 #include "frame_layout.h"
+#include "header_check.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -20,6 +22,11 @@ class EbnParser {
   explicit EbnParser(std::istream& stream);
 
   std::istream& stream() const { return *stream_; }
+
+  /// What is wrong with the header; nothing for one that is acceptable. Bytes that the file does not have
+  /// count as 0.
+  const std::optional<HeaderFault>& fault() const { return check_.fault(); }
+
   DataType dataType() const { return dataType_; }
   Size2 size() const { return size_; }
 
@@ -31,6 +38,7 @@ class EbnParser {
 
  private:
   std::istream* stream_;
+  HeaderCheck check_;
   DataType dataType_ = DataType::kUInt8;
   Size2 size_;
   std::int32_t dataOffset_ = 0;  // file offset of the pixels

@@ -75,7 +75,9 @@ EmiParser::EmiParser(std::istream& stream) : stream_(&stream) {
   const auto magic = ReadLittleEndian<std::uint16_t>(stream);
   const auto version = ReadLittleEndian<std::int16_t>(stream);
   ReadLittleEndian<std::uint32_t>(stream);  // nothing that is known
-  if (!stream.good() || magic != kMagic || version > kLastVersion) return;
+  check_.Require(magic == kMagic, "magic", magic, "0x4B4A")
+      .Require(version <= kLastVersion, "version", version, "0x0200 or below");
+  if (!stream.good() || fault()) return;
   Walk();
   // A walk may well end with the file; what it found is usable all the same.
   stream.clear();

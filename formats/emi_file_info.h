@@ -6,12 +6,14 @@
 #include <cstddef>
 #include <cstdint>
 #include <istream>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "data_type.h"
 #include "file_type_info.h"
 #include "frame_layout.h"
+#include "header_check.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -40,6 +42,10 @@ class EmiParser {
   explicit EmiParser(std::istream& stream);
 
   std::istream& stream() const { return *stream_; }
+
+  /// What is wrong with the header; nothing for one that is acceptable. Bytes that the file does not have
+  /// count as 0.
+  const std::optional<HeaderFault>& fault() const { return check_.fault(); }
   std::int32_t imageCount() const;
   const EmiImage& firstImage() const { return firstImage_; }
 
@@ -59,6 +65,7 @@ class EmiParser {
   const EmiItemId& PathEntry(std::ptrdiff_t index) const;
 
   std::istream* stream_;
+  HeaderCheck check_;
   std::vector<EmiItemId> objectPath_;  // the open items, innermost last
   std::uint64_t imageCount_ = 0;
   EmiImage firstImage_;

@@ -66,16 +66,20 @@ MrcHeader::MrcHeader(std::istream& stream) : stream_(&stream) {
   swapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
              static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
   if (swapped_) SwapHeader(bytes_.data());
-  if (!IsAcceptable()) stream.setstate(std::ios_base::badbit);
+  check_ = Check();
+  if (fault()) stream.setstate(std::ios_base::badbit);
 }
 
 std::int32_t MrcHeader::Word(std::size_t offset) const {
   return LoadLittleEndian<std::int32_t>(&bytes_[offset]);
 }
 
-bool MrcHeader::IsAcceptable() const {
-  return Word(kNx) >= 1 && Word(kNy) >= 1 && Word(kNz) >= 1 &&
-         static_cast<std::uint32_t>(Word(kMode)) <= kLastMode;
+HeaderCheck MrcHeader::Check() const {
+  return HeaderCheck()
+      .Require(Word(kNx) >= 1, "nx", Word(kNx), "at least 1")
+      .Require(Word(kNy) >= 1, "ny", Word(kNy), "at least 1")
+      .Require(Word(kNz) >= 1, "nz", Word(kNz), "at least 1")
+      .Require(static_cast<std::uint32_t>(Word(kMode)) <= kLastMode, "mode", Word(kMode), "from 0 to 16");
 }
 
 MrcPixelType MrcHeader::pixelType() const {

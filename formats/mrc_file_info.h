@@ -6,10 +6,12 @@
 #include <array>
 #include <cstdint>
 #include <istream>
+#include <optional>
 #include <string>
 
 #include "file_type_info.h"
 #include "frame_layout.h"
+#include "header_check.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -33,6 +35,10 @@ class MrcHeader {
 
   std::istream& stream() const { return *stream_; }
 
+  /// What is wrong with the header; nothing for one that is acceptable. Bytes that the file does not have
+  /// count as 0.
+  const std::optional<HeaderFault>& fault() const { return check_.fault(); }
+
   Size2 size() const { return {Word(kNx), Word(kNy)}; }
   std::int32_t sections() const { return Word(kNz); }
   MrcPixelType pixelType() const;
@@ -55,10 +61,11 @@ class MrcHeader {
   static constexpr std::size_t kLabels = 224;
 
   std::int32_t Word(std::size_t offset) const;
-  bool IsAcceptable() const;
+  HeaderCheck Check() const;
 
   std::istream* stream_;
   std::array<unsigned char, kBytes> bytes_{};
+  HeaderCheck check_;
   bool swapped_ = false;  // written on a big-endian machine
 };
 

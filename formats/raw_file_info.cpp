@@ -51,8 +51,14 @@ RawHeader::RawHeader(std::istream& stream) : stream_(&stream) {
   pixelStride_ = ReadLittleEndian<std::int32_t>(stream);
   rowStride_ = ReadLittleEndian<std::int32_t>(stream);
 
-  const auto type = TypeOf(WrapToInt32(std::int64_t{valueClass} * 65536 + bitsPerPixel));
-  if (!std::ranges::equal(magic, kMagic) || word1 != 1 || word4 != word1 || !type) {
+  const std::int32_t code = WrapToInt32(std::int64_t{valueClass} * 65536 + bitsPerPixel);
+  const auto type = TypeOf(code);
+  check_.Require(std::ranges::equal(magic, kMagic), "magic", {}, "the text \"QEL RawImage\" and a zero byte")
+      .Require(word1 == 1, "word 1", word1, "1")
+      .Require(word4 == word1, "word 4", word4, "1")
+      .Require(type.has_value(), "the value class (upper 16 bits) with the bits per pixel (lower 16 bits)",
+               code, "one of the format's pairs, such as 0x00010 for 16 bit unsigned");
+  if (fault()) {
     stream.setstate(std::ios_base::badbit);
     return;
   }

@@ -38,11 +38,18 @@ struct SerHeader {
   std::uint32_t offsetArrayOffset = 0;
   std::uint32_t dimensionCount = 0;
 
-  bool IsAcceptable() const {
-    return byteOrder == kByteOrder && seriesId == kSeriesId && seriesVersion >= kFirstVersion &&
-           validElements >= 1 && totalElements >= validElements &&
-           (dataTypeId == kLines || dataTypeId == kImages) &&
-           (tagTypeId == kTimeTags || tagTypeId == kPositionTags);
+  HeaderCheck Check() const {
+    return HeaderCheck()
+        .Require(byteOrder == kByteOrder, "byte order", byteOrder, "0x4949")
+        .Require(seriesId == kSeriesId, "series id", seriesId, "0x0197")
+        .Require(seriesVersion >= kFirstVersion, "series version", seriesVersion, "0x0210 or above")
+        .Require(validElements >= 1, "valid elements", validElements, "at least 1")
+        .Require(totalElements >= validElements, "total elements", totalElements,
+                 "at least the number of valid elements")
+        .Require(dataTypeId == kLines || dataTypeId == kImages, "data type id", dataTypeId,
+                 "0x4122 (images) or 0x4120 (lines)")
+        .Require(tagTypeId == kTimeTags || tagTypeId == kPositionTags, "tag type id", tagTypeId,
+                 "0x4152 (times) or 0x4142 (positions)");
   }
 };
 
@@ -80,7 +87,7 @@ void SkipDimensions(std::istream& stream, std::uint32_t count) {
 }
 
 /// Fails the stream for an element that is not there or of an unknown type.
-SerElement ReadElement(std::istream& stream, std::uint32_t position) {
+SerElement ReadElement(std::istream& stream, std::uint32_t position, HeaderCheck& check) {
   constexpr std::size_t kTypeCode = 2 * kCalibrationBytes;  // the calibrations of both axes come first
   constexpr std::size_t kSizeX = kTypeCode + sizeof(std::int16_t);
   constexpr std::size_t kSizeY = kSizeX + sizeof(std::uint32_t);
@@ -89,8 +96,10 @@ SerElement ReadElement(std::istream& stream, std::uint32_t position) {
   std::array<unsigned char, kBytes> bytes{};
   stream.seekg(position);
   stream.read(reinterpret_cast<char*>(bytes.data()), kBytes);
-  const auto type = DataTypeOfCode(LoadLittleEndian<std::int16_t>(&bytes[kTypeCode]));
+  const auto typeCode = LoadLittleEndian<std::int16_t>(&bytes[kTypeCode]);
+  const auto type = DataTypeOfCode(typeCode);
   if (!type) {
+    check.Require(false, "the data type code of an element", typeCode, "from 1 to 10");
     stream.setstate(std::ios_base::failbit);
     return {};
   }
@@ -103,7 +112,8 @@ SerElement ReadElement(std::istream& stream, std::uint32_t position) {
 
 SerParser::SerParser(std::istream& stream) : stream_(&stream) {
   const SerHeader header = ReadHeader(stream);
-  if (!header.IsAcceptable()) {
+  check_ = header.Check();
+  if (fault()) {
     stream.setstate(std::ios_base::failbit);
     return;
   }
@@ -130,7 +140,7 @@ void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
     stream_->read(reinterpret_cast<char*>(offsets.data()), std::streamsize{kEntryBytes} * entries);
     for (std::uint32_t i = 0; i < entries && stream_->good(); ++i) {
       const auto offset = LoadLittleEndian<std::uint32_t>(&offsets[i * kEntryBytes]);
-      const SerElement element = ReadElement(*stream_, offset);
+      const SerElement element = ReadElement(*stream_, offset, check_);
       if (done + i == 0) firstElement_ = element;
     }
     done += entries;

@@ -5,11 +5,13 @@
 
 #include <cstdint>
 #include <istream>
+#include <optional>
 #include <string>
 
 #include "data_type.h"
 #include "file_type_info.h"
 #include "frame_layout.h"
+#include "header_check.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -29,6 +31,11 @@ class SerParser {
   explicit SerParser(std::istream& stream);
 
   std::istream& stream() const { return *stream_; }
+
+  /// What is wrong with the header or an element; nothing for a series that is acceptable, be it of images or
+  /// of lines. Bytes that the file does not have count as 0.
+  const std::optional<HeaderFault>& fault() const { return check_.fault(); }
+
   bool isImageSeries() const { return isImageSeries_; }  // and not one of lines
   std::int32_t elementCount() const { return elementCount_; }
   const SerElement& firstElement() const { return firstElement_; }
@@ -40,6 +47,7 @@ class SerParser {
   void ReadElements(std::uint32_t arrayOffset, std::uint32_t count);
 
   std::istream* stream_;
+  HeaderCheck check_;
   bool isImageSeries_ = false;
   std::int32_t elementCount_ = 0;
   SerElement firstElement_;
