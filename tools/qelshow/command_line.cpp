@@ -16,14 +16,14 @@ constexpr const wchar_t* kHelp =
 usage: qelshow COMMAND ... [--server PATH] [--size N]
 
 commands:
-  info FILE...             everything that the shell learns about each file
-  thumbnail FILE -o PNG    the thumbnail of one file
-  page FOLDER|FILE...      a page of all thumbnails, with everything else beside them
-  COMMAND --help           more about a command
+  info FILE...           everything that the shell learns about each file
+  thumbnail FILE -o PNG  the thumbnail of one file
+  page FOLDER|FILE...    a page of all thumbnails and everything else
+  COMMAND --help         more about a command
 
 options of every command:
-  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
-  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+  --server PATH  ask this QelShellExt.DLL instead of the registered one
+  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
   --help         this text
 
 exit status, of several files the highest:
@@ -37,15 +37,16 @@ exit status, of several files the highest:
 constexpr const wchar_t* kInfoHelp =
     LR"(usage: qelshow info FILE... [--json] [--server PATH] [--size N]
 
-Prints everything that the shell learns about each file: the size of its thumbnail or why there is none, the
-tip, the columns of the Details view with the declared and the delivered types, the property sets, and the
-property store.
+Prints everything that the shell learns about each file: the size of its
+thumbnail or why there is none, the tip, the columns of the Details view with
+the declared and the delivered types, the property sets, the property store.
 
   --json         print one JSON document: {"schema": 1, "files": [...]}
-  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
-  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+  --server PATH  ask this QelShellExt.DLL instead of the registered one
+  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported kind, 4 a damaged file
+exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported
+kind, 4 a damaged file; of several files the highest
 )";
 
 constexpr const wchar_t* kThumbnailHelp =
@@ -54,25 +55,27 @@ constexpr const wchar_t* kThumbnailHelp =
 Writes the thumbnail of the file as a PNG image.
 
   -o, --out PNG  the file to write; - for standard output
-  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
-  --size N       ask for a thumbnail of N by N pixels (1 to 4096; 256 without it)
+  --server PATH  ask this QelShellExt.DLL instead of the registered one
+  --size N       ask for a thumbnail of N by N pixels (1 to 4096, else 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported kind, 4 a damaged file
+exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported
+kind, 4 a damaged file
 )";
 
 constexpr const wchar_t* kPageHelp =
     LR"(usage: qelshow page FOLDER|FILE... --out DIR [--server PATH] [--size N]
 
-Writes DIR\index.html, a page of the files' thumbnails with everything else that the shell learns about them,
-and prints a table of the files. The page needs nothing but its folder. Of a folder, all files of the supported
-kinds are shown, those in the folders below it too.
+Writes DIR\index.html, a page of the files' thumbnails with everything else that
+the shell learns about them, and prints a table of the files. The page needs
+nothing but its folder. Of a folder, all files of the supported kinds are shown,
+those in the folders below it too.
 
-  --out DIR      the folder of the page; made if it is missing
-  --server PATH  ask this QelShellExt.DLL; without it the registered one is asked
-  --size N       ask for thumbnails of N by N pixels (1 to 4096; 256 without it)
+  -o, --out DIR  the folder of the page; made if it is missing
+  --server PATH  ask this QelShellExt.DLL instead of the registered one
+  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
 
-exit status: 0 the page is written, whatever it has to say about single files; 1 failed, 2 wrong command line,
-3 no file of a supported kind
+exit status: 0 the page is written, whatever it says about single files,
+1 failed, 2 wrong command line, 3 no file of a supported kind
 )";
 
 struct CommandFacts {

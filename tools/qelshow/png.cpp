@@ -58,6 +58,7 @@ HRESULT ReadAll(IStream& stream, std::vector<std::uint8_t>& bytes) {
 }  // namespace
 
 HRESULT EncodePng(HBITMAP bitmap, std::vector<std::uint8_t>& png) {
+  png.clear();
   DIBSECTION section{};
   if (GetObjectW(bitmap, sizeof section, &section) != static_cast<int>(sizeof section)) return E_INVALIDARG;
   if (section.dsBm.bmBitsPixel != 8 && section.dsBm.bmBitsPixel != 24) return E_INVALIDARG;

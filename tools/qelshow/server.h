@@ -8,6 +8,7 @@
 #include <string>
 
 #include "com_ptr.h"
+#include "shell_interfaces.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 
@@ -21,8 +22,8 @@ class Server {
 
   /// A new object of the class, seen through one of its interfaces.
   template <class Interface>
-  HRESULT Create(const CLSID& clsid, const IID& iid, ComPtr<Interface>& object) const {
-    return Create(clsid, iid, reinterpret_cast<void**>(object.Put()));
+  HRESULT Create(const CLSID& clsid, ComPtr<Interface>& object) const {
+    return Create(clsid, Com::kInterfaceId<Interface>, reinterpret_cast<void**>(object.Put()));
   }
 
  private:

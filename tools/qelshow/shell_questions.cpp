@@ -67,14 +67,19 @@ Answer Guarded(Ask question) {
   return answer;
 }
 
+template <class Object, class Interface>
+HRESULT QueryFor(const ComPtr<Object>& object, ComPtr<Interface>& answer) {
+  return object->QueryInterface(Com::kInterfaceId<Interface>, reinterpret_cast<void**>(answer.Put()));
+}
+
 /// A fresh object that was given the path, as the shell prepares it.
 template <class Interface>
-HRESULT LoadFile(const Server& server, const std::wstring& path, const IID& iid, ComPtr<Interface>& object) {
+HRESULT LoadFile(const Server& server, const std::wstring& path, ComPtr<Interface>& object) {
   ComPtr<IPersistFile> file;
-  HRESULT result = server.Create(CLSID_QelShellExt, IID_IPersistFile, file);
+  HRESULT result = server.Create(CLSID_QelShellExt, file);
   if (SUCCEEDED(result)) result = file->Load(path.c_str(), STGM_READ);
   if (SUCCEEDED(result)) {
-    result = file->QueryInterface(iid, reinterpret_cast<void**>(object.Put()));
+    result = QueryFor(file, object);
   }
   return result;
 }
@@ -160,7 +165,7 @@ const CLSID* StoreClassOf(const std::wstring& path) {
 TipAnswer AskTip(const Server& server, const std::wstring& path) {
   return Guarded<TipAnswer>([&](TipAnswer& answer) {
     ComPtr<IQueryInfo> info;
-    HRESULT result = LoadFile(server, path, IID_IQueryInfo, info);
+    HRESULT result = LoadFile(server, path, info);
     wchar_t* text = nullptr;
     if (SUCCEEDED(result)) result = info->GetInfoTip(0, &text);
     if (result == S_OK && text != nullptr) {
@@ -175,7 +180,7 @@ TipAnswer AskTip(const Server& server, const std::wstring& path) {
 ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
   return Guarded<ListAnswer<Column>>([&](ListAnswer<Column>& answer) {
     ComPtr<IColumnProvider> provider;
-    HRESULT result = server.Create(CLSID_QelShellExt, IID_IColumnProvider, provider);
+    HRESULT result = server.Create(CLSID_QelShellExt, provider);
     SHCOLUMNINIT folder{};
     if (SUCCEEDED(result)) result = provider->Initialize(&folder);
     if (FAILED(result)) {
@@ -214,7 +219,7 @@ ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
 ListAnswer<Property> AskPropertySets(const Server& server, const std::wstring& path) {
   return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
     ComPtr<IPropertySetStorage> sets;
-    HRESULT result = LoadFile(server, path, IID_IPropertySetStorage, sets);
+    HRESULT result = LoadFile(server, path, sets);
     ComPtr<IEnumSTATPROPSETSTG> enumerator;
     if (SUCCEEDED(result)) result = sets->Enum(enumerator.Put());
     STATPROPSETSTG entry{};
@@ -235,7 +240,7 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
       return;
     }
     ComPtr<IInitializeWithStream> handler;
-    HRESULT result = server.Create(*clsid, IID_IInitializeWithStream, handler);
+    HRESULT result = server.Create(*clsid, handler);
     ComPtr<IStream> stream;
     if (SUCCEEDED(result)) {
       result = SHCreateStreamOnFileEx(path.c_str(), STGM_READ | STGM_SHARE_DENY_NONE, FILE_ATTRIBUTE_NORMAL,
@@ -244,7 +249,7 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
     if (SUCCEEDED(result)) result = handler->Initialize(stream.Get(), STGM_READ);
     ComPtr<IPropertyStore> store;
     if (SUCCEEDED(result)) {
-      result = handler->QueryInterface(IID_IPropertyStore, reinterpret_cast<void**>(store.Put()));
+      result = QueryFor(handler, store);
     }
     if (FAILED(result)) {
       answer.problem = NoAnswer(L"property store", result);
@@ -276,7 +281,7 @@ Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int3
   return Guarded<Thumbnail>([&](Thumbnail& thumbnail) {
     thumbnail.request = size;
     ComPtr<IExtractImage> extractor;
-    HRESULT result = LoadFile(server, path, IID_IExtractImage, extractor);
+    HRESULT result = LoadFile(server, path, extractor);
     if (SUCCEEDED(result)) {
       wchar_t location[MAX_PATH] = L"";
       DWORD priority = 0;
