@@ -8,6 +8,7 @@
 #include <array>
 #include <filesystem>
 #include <fstream>
+#include <stdexcept>
 #include <string>
 
 #include "ebn_file.h"
@@ -197,6 +198,14 @@ TEST_F(InfoTip, IsRefusedWithoutAValidFile) {
   EXPECT_EQ(Refusal(Load(folder_.path() / L"missing.mrc")), E_FAIL);
   EXPECT_EQ(Refusal(Load(folder_.Write(L"invalid.mrc", MrcFile{.nx = 0}.Bytes()))), E_FAIL);
   EXPECT_EQ(Refusal(Load(folder_.Write(L"unknown.tif", MrcFile{}.Bytes()))), E_FAIL);
+}
+
+TEST_F(InfoTip, IsRefusedWhenTheReaderHasThrown) {
+  const auto file = folder_.Write(L"image.emi", EmiFile{.items = EmiText(0x0100, "text") + EmiEnd()}.Bytes());
+  const Object object = Make();
+  EXPECT_THROW(As<IPersistFile>(object, IID_IPersistFile)->Load(file.c_str(), STGM_READ),
+               std::invalid_argument);
+  EXPECT_EQ(Refusal(object), E_FAIL);
 }
 
 TEST_F(InfoTip, SurvivesNullPlacesForItsAnswers) {

@@ -3,6 +3,7 @@
 #include <windows.h>
 
 #include <propsys.h>
+#include <shlobj.h>
 
 #include <atomic>
 #include <cstring>
@@ -78,6 +79,35 @@ class PropertyStore : public ServerTest {
     return handler->GetValue(kWidthKey, &value);
   }
 };
+
+TEST_F(PropertyStore, AnswersItsThreeInterfacesInOrderAndNoOther) {
+  const IID interfaces[] = {
+      {0xB824B49D,
+       0x22AC,
+       0x4161,
+       {0xAC, 0x8A, 0x99, 0x16, 0xE8, 0xFA, 0x3F, 0x7F}},  // IInitializeWithStream
+      {0x886D8EEB, 0x8CF2, 0x4446, {0x8D, 0x02, 0xCD, 0xBA, 0x1D, 0xBD, 0xCF, 0x99}},  // IPropertyStore
+      {0xC8E2D566,
+       0x186E,
+       0x4D49,
+       {0xBF, 0x41, 0x69, 0x09, 0xEA, 0xD5, 0x6A, 0xCC}},  // IPropertyStoreCapabilities
+  };
+  for (const CLSID& clsid : {kMrcHandlerClass, kEbnHandlerClass, kRawHandlerClass}) {
+    const auto object = dll_.CreateInstance<IUnknown>(clsid, IID_IUnknown);
+    const auto* place = reinterpret_cast<const char*>(object.Get());
+    for (const IID& iid : interfaces) {
+      const auto answer = As<IUnknown>(object, iid);
+      EXPECT_EQ(reinterpret_cast<const char*>(answer.Get()), place);
+      EXPECT_EQ(As<IUnknown>(answer, IID_IUnknown).Get(), object.Get());
+      place += sizeof(void*);
+    }
+    for (const IID& iid : {IID_IInitializeWithFile, IID_IPersistFile, IID_IExtractImage, IID_IMarshal}) {
+      void* answer = &answer;
+      EXPECT_EQ(object->QueryInterface(iid, &answer), E_NOINTERFACE);
+      EXPECT_EQ(answer, nullptr);
+    }
+  }
+}
 
 TEST_F(PropertyStore, OfMrcHasTheSixProperties) {
   ScriptedStream stream(MrcBytes(512, 256, 61, 1));

@@ -7,10 +7,13 @@
 #include <array>
 #include <cstddef>
 #include <cwchar>
+#include <stdexcept>
 #include <string>
 
 #include "bitmap_pixels.h"
+#include "emi_file.h"
 #include "mrc_file.h"
+#include "ser_file.h"
 #include "server_dll.h"
 #include "temp_folder.h"
 
@@ -313,6 +316,24 @@ TEST_F(ShellExtObject, HasNothingElseOfIPersistFile) {
   HBITMAP bitmap = nullptr;
   EXPECT_EQ(object.image->Extract(&bitmap), S_OK);
   EXPECT_EQ(TakeBitmap(bitmap).width, 3);
+}
+
+TEST_F(ShellExtObject, LetsTheExceptionsOfReadersThrough) {
+  const ShellExt object(dll_);
+  EmiFile emi;
+  emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside of any image");
+  EXPECT_THROW(object.Load(folder_.Write("bad.emi", emi.Bytes())), std::invalid_argument);
+
+  SerFile ser;
+  ser.dimensions[0].unitsLength = -1;
+  const ShellExt other(dll_);
+  EXPECT_THROW(other.Load(folder_.Write("bad.ser", ser.Bytes())), std::length_error);
+
+  for (const ShellExt* const without : {&object, &other}) {
+    HBITMAP bitmap = kUntouched;
+    EXPECT_EQ(without->image->Extract(&bitmap), E_FAIL);
+    EXPECT_EQ(bitmap, kUntouched);
+  }
 }
 
 using ShellExtObjectDeathTest = ShellExtObject;
