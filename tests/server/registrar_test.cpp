@@ -10,6 +10,7 @@
 
 #include "expected_registration.h"
 #include "memory_registry.h"
+#include "same_contents.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {

@@ -20,16 +20,6 @@ void AddKey(RegistryContents& contents, const std::wstring& key,
   for (const auto& [name, data] : values) contents.insert(ValueLine(key, name, data));
 }
 
-::testing::AssertionResult Same(const RegistryContents& actual, const RegistryContents& expected) {
-  const RegistryContents missing = Without(expected, actual);
-  const RegistryContents excess = Without(actual, expected);
-  if (missing.empty() && excess.empty()) return ::testing::AssertionSuccess();
-  auto failure = ::testing::AssertionFailure();
-  for (const std::wstring& line : missing) failure << "\n  missing: " << line;
-  for (const std::wstring& line : excess) failure << "\n  too many: " << line;
-  return failure;
-}
-
 RegistryContents Without(const RegistryContents& a, const RegistryContents& b) {
   RegistryContents difference;
   std::set_difference(a.begin(), a.end(), b.begin(), b.end(), std::inserter(difference, difference.end()));

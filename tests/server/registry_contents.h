@@ -5,8 +5,6 @@
 //   HKLM\Software\Classes\CLSID\{...} : @ = s 'a default value'
 #pragma once
 
-#include <gtest/gtest.h>
-
 #include <initializer_list>
 #include <set>
 #include <string>
@@ -24,9 +22,6 @@ std::wstring ValueLine(const std::wstring& key, const std::wstring& name, const 
 /// Adds the line of the key, of every key on the way to it, and of its values.
 void AddKey(RegistryContents& contents, const std::wstring& key,
             std::initializer_list<std::pair<std::wstring, RegistryData>> values = {});
-
-/// Equal, or else only the lines that are missing or too many.
-::testing::AssertionResult Same(const RegistryContents& actual, const RegistryContents& expected);
 
 /// Lines of `a` that are not in `b`.
 RegistryContents Without(const RegistryContents& a, const RegistryContents& b);

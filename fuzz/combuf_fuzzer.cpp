@@ -1,0 +1,121 @@
+// The fuzzer of basic_combuf: the input says how large the buffer is, what the COM stream brings and where it
+// fails, and then what is done with the buffer. What is read is compared with what the stream has.
+#include <fuzzer/FuzzedDataProvider.h>
+
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <string>
+
+#include "com_stream.h"
+#include "scripted_stream.h"
+
+namespace {
+
+using Qel::Lumetra::ShellExt::Testing::ScriptedStream;
+using Traits = std::char_traits<char>;
+
+constexpr HRESULT kResults[] = {S_OK, S_FALSE, E_FAIL, STG_E_READFAULT, STG_E_ACCESSDENIED};
+constexpr std::size_t kMostBytes = 3000;
+
+void Require(bool condition, const char* what) {
+  if (condition) return;
+  std::fprintf(stderr, "%s\n", what);
+  std::abort();
+}
+
+/// Reads from a buffer and knows what has to come.
+class Reader {
+ public:
+  Reader(basic_combuf<char>& buffer, ScriptedStream& stream) : buffer_(buffer), stream_(stream) {}
+
+  void Next() { Expect(buffer_.sbumpc(), 1); }
+  void Peek() { Expect(buffer_.sgetc(), 0); }
+
+  void PutBack() {
+    if (!Traits::eq_int_type(buffer_.sungetc(), Traits::eof())) --position_;
+  }
+
+  void Read(std::size_t count) {
+    std::string bytes(count, '\0');
+    bytes.resize(static_cast<std::size_t>(buffer_.sgetn(bytes.data(), static_cast<std::streamsize>(count))));
+    Require(bytes == stream_.content.substr(position_, bytes.size()), "other bytes are read than there are");
+    position_ += bytes.size();
+  }
+
+  /// What was read ahead is dropped.
+  void Restart() { position_ = stream_.position; }
+
+ private:
+  void Expect(Traits::int_type got, std::size_t step) {
+    if (Traits::eq_int_type(got, Traits::eof())) return;
+    Require(position_ < stream_.content.size(), "more is read than there is");
+    Require(Traits::to_char_type(got) == stream_.content[position_], "another byte is read than there is");
+    position_ += step;
+  }
+
+  basic_combuf<char>& buffer_;
+  ScriptedStream& stream_;
+  std::size_t position_ = 0;
+};
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+  FuzzedDataProvider input(data, size);
+  ScriptedStream stream(input.ConsumeRandomLengthString(kMostBytes));
+  stream.mostPerRead = input.ConsumeIntegralInRange<ULONG>(1, kMostBytes);
+  stream.mostPerWrite = input.ConsumeIntegralInRange<ULONG>(0, kMostBytes);
+  stream.failingRead = input.ConsumeIntegralInRange<int>(0, 20);
+  stream.endResult = input.PickValueInArray(kResults);
+  stream.writeResult = input.PickValueInArray(kResults);
+  // A stream that claims more than it brings has no bytes to compare with.
+  const bool honest = input.ConsumeBool();
+  if (!honest) stream.overclaim = input.ConsumeIntegral<ULONG>();
+  {
+    basic_combuf<char> buffer;
+    buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes));
+    buffer.Attach(&stream);
+    Reader reader(buffer, stream);
+    // Reading and writing share the buffer's memory and are not mixed by those who care for the bytes.
+    const bool writes = input.ConsumeBool();
+    while (input.remaining_bytes() > 0) {
+      const bool compares = honest && !writes;
+      switch (input.ConsumeIntegralInRange(0, writes ? 11 : 6)) {
+        case 0: compares ? reader.Next() : void(buffer.sbumpc()); break;
+        case 1: compares ? reader.Peek() : void(buffer.sgetc()); break;
+        case 2: compares ? reader.PutBack() : void(buffer.sungetc()); break;
+        case 3: {
+          const auto count = input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes);
+          std::string bytes(count, '\0');
+          compares ? reader.Read(count) : void(buffer.sgetn(bytes.data(), std::streamsize(count)));
+          break;
+        }
+        case 4:
+          Require(buffer.pubseekoff(input.ConsumeIntegral<int>(), std::ios_base::cur) ==
+                      std::streampos(std::streamoff(-1)),
+                  "a COM stream is repositioned");
+          break;
+        case 5:
+          buffer.Attach(&stream);
+          reader.Restart();
+          break;
+        case 6:
+          buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes));
+          reader.Restart();
+          break;
+        case 7: buffer.sputbackc(input.ConsumeIntegral<char>()); break;
+        case 8: buffer.sputc(input.ConsumeIntegral<char>()); break;
+        case 9: {
+          const std::string bytes = input.ConsumeRandomLengthString(kMostBytes);
+          buffer.sputn(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+          break;
+        }
+        case 10: buffer.pubsync(); break;
+        case 11: buffer.Attach(nullptr); break;
+      }
+    }
+  }
+  Require(stream.references == 1, "a reference on the COM stream is left or was given back too often");
+  return 0;
+}
