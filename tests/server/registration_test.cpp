@@ -16,6 +16,7 @@
 #include "import_patch.h"
 #include "registry_reader.h"
 #include "registry_writes.h"
+#include "same_contents.h"
 #include "temp_folder.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
