@@ -273,6 +273,69 @@ class Json(Test):
         self.assertEqual((file["bytes"], file["kind"]), (1024 + 12, "mrc"))
 
 
+class Answers(Test):
+    """What the shell learns, from the extension to the report."""
+
+    IMAGE_SUMMARY = "{6444048F-4C8B-11D1-8B70-080036B11A03}"
+    SUMMARY = "{F29F85E0-4FF9-1068-AB91-08002B27B3D9}"
+
+    def rows(self, answer, *members):
+        self.assertIsNone(answer["problem"])
+        return [tuple(item[member] for member in members) for item in answer["items"]]
+
+    def test_of_a_stack(self):
+        path = self.write("stack.mrc", mrc(40, 30, 7, 1, b"Line one"))
+        file, = self.info(path)
+        self.assertEqual([file[name] for name in ("width", "height", "frames", "bitDepth", "type")],
+                         [40, 30, 7, 16, "16 bit signed"])
+        self.assertRegex(file["tip"]["text"], r"\ADimensions: 7 images \(40 × 30\) 16 bit signed\r\nType: \r\n"
+                                              r"Date Modified: .+\r\nSize: 17.4 KB\r\nLine one\Z")
+        self.assertEqual(self.rows(file["columns"], "title", "set", "id", "declared", "delivered", "value"), [
+            ("Width", self.IMAGE_SUMMARY, 3, "VT_I4", "VT_I4", "40"),
+            ("Height", self.IMAGE_SUMMARY, 4, "VT_I4", "VT_I4", "30"),
+            ("Bit Depth", self.IMAGE_SUMMARY, 7, "VT_UI4", "VT_I4", "16"),
+            ("Frame Count", self.IMAGE_SUMMARY, 12, "VT_UI4", "VT_I4", "7"),
+            ("Dimensions", self.IMAGE_SUMMARY, 13, "VT_LPWSTR", "VT_BSTR", "40 x 30"),
+            ("Comments", self.SUMMARY, 6, "VT_LPWSTR", "VT_BSTR", "Line one"),
+        ])
+        self.assertEqual(self.rows(file["columns"], "index", "characters", "state"),
+                         [(0, 5, 0x101), (1, 5, 0x101), (2, 5, 1), (3, 5, 1), (4, 20, 0x11), (5, 30, 0x11)])
+        self.assertEqual(self.rows(file["propertySets"], "set", "id", "type", "value"), [
+            (self.IMAGE_SUMMARY, 3, "VT_INT", "40"),
+            (self.IMAGE_SUMMARY, 4, "VT_INT", "30"),
+            (self.IMAGE_SUMMARY, 7, "VT_INT", "16"),
+            (self.IMAGE_SUMMARY, 12, "VT_INT", "7"),
+            (self.IMAGE_SUMMARY, 13, "VT_BSTR", "40 x 30"),
+            (self.SUMMARY, 6, "VT_BSTR", "Line one"),
+        ])
+        self.assertEqual(self.rows(file["propertyStore"], "name", "set", "id", "type", "value"), [
+            ("System.Image.HorizontalSize", self.IMAGE_SUMMARY, 3, "VT_UI4", "40"),
+            ("System.Image.VerticalSize", self.IMAGE_SUMMARY, 4, "VT_UI4", "30"),
+            ("System.Image.BitDepth", self.IMAGE_SUMMARY, 7, "VT_UI4", "16"),
+            ("System.Media.FrameCount", self.IMAGE_SUMMARY, 12, "VT_UI4", "7"),
+            ("System.Image.Dimensions", self.IMAGE_SUMMARY, 13, "VT_LPWSTR", "(40 x 30) 16 bit signed"),
+            ("System.Comment", self.SUMMARY, 6, "VT_LPWSTR", ""),
+        ])
+
+        text = run("info", path).stdout
+        for part in ("40 x 30", "Frames      7", "16 bit signed", "Thumbnail   40 x 30, 8 bits per pixel",
+                     "    Line one\n", "VT_UI4     VT_I4      16", "System.Media.FrameCount"):
+            self.assertIn(part, text)
+
+    def test_a_kind_without_a_property_store_says_so(self):
+        files = self.info(*(self.write("a." + kind, b"") for kind in ("ali", "rec", "ser", "emi")))
+        for file in files:
+            self.assertEqual(file["propertyStore"]["items"], [])
+            self.assertIn(f"no property store for .{file['kind']} files", file["propertyStore"]["problem"])
+
+    def test_of_a_damaged_file_say_why_they_are_missing(self):
+        file, = self.info(self.write("a.mrc", mrc(mode=17)))
+        self.assertIn("0x80004005", file["tip"]["problem"])
+        self.assertIn("0x80004005", file["propertySets"]["problem"])
+        self.assertEqual({column["problem"] for column in file["columns"]["items"]}, {"0x00000001, no value"})
+        self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"0x80004005, failed"})
+
+
 class Page(Test):
     def files_of(self, page):
         """The facts in a page."""
