@@ -20,8 +20,17 @@ constexpr std::int64_t kBandBytes = 256LL * 1024;
 // file of a few bytes can take to 576 KiB (a double and a grey level for each pixel).
 constexpr std::int64_t kMostSharedPixels = 64LL * 1024;
 
-// Reading band by band is given up for reading column by column when it would read the block this often.
+// Reading band by band is given up for reading column by column when it would read the block this often, and
+// that for reading the block as a whole.
 constexpr std::int64_t kMostPasses = 8;
+
+// A read takes as long as one of this many bytes, however few it brings.
+constexpr std::int64_t kLeastRead = 1024;
+
+// Strides can interleave rows and columns with each other, so that no part of the picture lies together in
+// the file. No program writes such a picture, but a few bytes suffice to claim one: a larger block than this
+// is refused, since it would be read pixel by pixel.
+constexpr std::int64_t kMostInterleavedBytes = 16LL * 1024 * 1024;
 
 /// Whether the layout has pixels, all inside of its block, and not out of proportion to its bytes.
 bool IsReadable(const FrameLayout& layout) {
@@ -64,18 +73,42 @@ class BandReader {
         height_(renderer.reduction().size.height * factor_),
         pixelBytes_(BytesPerPixel(layout.format)),
         pixelStep_(std::abs(layout.pixelStride)),
-        rowStep_(std::abs(layout.rowStride)),
-        bufferBytes_(std::min(kBandBytes, layout.blockBytes)),
-        buffer_(std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bufferBytes_))) {}
+        rowStep_(std::abs(layout.rowStride)) {
+    Allocate(std::min(kBandBytes, layout.blockBytes));
+  }
 
   bool ReadFrame() {
     const std::int32_t rows = RowsThatFit(width_);
-    const std::int64_t bands = rows == 0 ? height_ : (height_ + rows - 1) / rows;
-    const std::int64_t bytes = bands * Span(width_, std::max(rows, 1));
-    return bytes / kMostPasses > layout_.blockBytes ? ReadBlockColumns() : ReadBands(rows);
+    const std::int64_t bands = Pieces(height_, std::max(rows, 1));
+    if (IsEconomical(bands, Span(width_, std::max(rows, 1)))) return ReadBands(rows);
+
+    const ColumnPieces pieces = SizeOfColumnPieces();
+    const std::int64_t columns = width_ * Pieces(height_, pieces.rows);
+    if (IsEconomical(columns, std::max(Span(1, pieces.rows), kLeastRead))) return ReadBlockColumns(pieces);
+
+    if (layout_.blockBytes > kMostInterleavedBytes) return false;
+    Allocate(layout_.blockBytes);
+    return ReadBands(height_);
   }
 
  private:
+  /// Parts of columns that are read one by one and handed over side by side.
+  struct ColumnPieces {
+    std::int32_t columns;
+    std::int32_t rows;
+  };
+
+  void Allocate(std::int64_t bytes) {
+    bufferBytes_ = bytes;
+    buffer_ = std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bytes));
+  }
+
+  static std::int64_t Pieces(std::int64_t count, std::int64_t most) { return (count + most - 1) / most; }
+
+  bool IsEconomical(std::int64_t reads, std::int64_t bytesOfEach) const {
+    return reads * bytesOfEach / kMostPasses <= layout_.blockBytes;
+  }
+
   /// Bytes from the first to the last byte of a rectangle of pixels.
   std::int64_t Span(std::int64_t columns, std::int64_t rows) const {
     return (columns - 1) * pixelStep_ + (rows - 1) * rowStep_ + pixelBytes_;
@@ -119,12 +152,8 @@ class BandReader {
 
   /// Frames whose columns lie one after the other in the file: a column of blocks after the other, each of
   /// its columns read by itself.
-  bool ReadBlockColumns() {
-    const auto mostColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
-    const std::int32_t columns = std::min(factor_, mostColumns);
-    const std::int32_t mostRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
-    // Blocks wider than the buffer are read a row at a time, to keep the order of their sums.
-    const std::int32_t rows = columns < factor_ ? 1 : mostRows;
+  bool ReadBlockColumns(const ColumnPieces& pieces) {
+    const auto [columns, rows] = pieces;
     for (std::int32_t left = 0; left < width_; left += factor_) {
       for (std::int32_t y = 0; y < height_; y += rows) {
         for (std::int32_t x = left; x < left + factor_; x += columns) {
@@ -135,6 +164,14 @@ class BandReader {
       }
     }
     return true;
+  }
+
+  ColumnPieces SizeOfColumnPieces() const {
+    const auto mostColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
+    const std::int32_t columns = std::min(factor_, mostColumns);
+    const std::int32_t mostRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
+    // Blocks wider than the buffer are read a row at a time, to keep the order of their sums.
+    return {columns, columns < factor_ ? 1 : mostRows};
   }
 
   /// Reads a rectangle of pixels with all bytes between its first and its last.
@@ -187,7 +224,7 @@ class BandReader {
   std::int64_t pixelBytes_;
   std::int64_t pixelStep_;
   std::int64_t rowStep_;
-  std::int64_t bufferBytes_;
+  std::int64_t bufferBytes_ = 0;
   std::unique_ptr<std::byte[]> buffer_;
   std::int64_t position_ = -1;  // of the stream, as far as it is known
 };

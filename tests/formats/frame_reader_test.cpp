@@ -186,6 +186,46 @@ TEST(FrameReader, ReadsColumnsOnceWhenRowsLieAcrossTheFile) {
   EXPECT_EQ(buffer.bytesRead, 2'000'000);
 }
 
+/// Pixels as far apart as from row to row, so that neither rows nor columns lie together.
+FrameLayout InterleavedLayout(PixelFormat format, std::int32_t edge, std::int64_t stride) {
+  return {.format = format,
+          .size = {edge, edge},
+          .blockPosition = 10,
+          .blockBytes = 2 * (edge - 1) * stride + BytesPerPixel(format),
+          .pixelStride = stride,
+          .rowStride = stride};
+}
+
+TEST(FrameReader, ReadsInterleavedRowsAndColumnsAtOnce) {
+  Random random(4);
+  for (const PixelFormat format : {PixelFormat::kUInt8, PixelFormat::kFloat32, PixelFormat::kRgb24}) {
+    FrameLayout layout = InterleavedLayout(format, 300, 2000);
+    CompareWithTheNaivePicture(random, layout, 30, 30);
+    layout.firstPixel = (300 - 1) * layout.rowStride;
+    layout.rowStride = -layout.rowStride;
+    CompareWithTheNaivePicture(random, layout, 30, 30);
+    if (HasFatalFailure()) return;
+
+    const std::string file(static_cast<std::size_t>(layout.blockPosition + layout.blockBytes), '\1');
+    MemoryBuffer buffer(file);
+    std::istream stream(&buffer);
+    EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {30, 30})).width, 30);
+    EXPECT_EQ(buffer.bytesRead, layout.blockBytes);
+    EXPECT_EQ(buffer.reads, 1);
+  }
+}
+
+TEST(FrameReader, RefusesInterleavedRowsAndColumnsOfALargeBlock) {
+  const FrameLayout layout = InterleavedLayout(PixelFormat::kUInt8, 3000, 3000);
+  ASSERT_GT(layout.blockBytes, 16 * 1024 * 1024);
+  const std::string file(static_cast<std::size_t>(layout.blockPosition + layout.blockBytes), '\1');
+  MemoryBuffer buffer(file);
+  std::istream stream(&buffer);
+  EXPECT_EQ(ReadThumbnail(stream, layout, {256, 256}), nullptr);
+  EXPECT_EQ(buffer.bytesRead, 0);
+  EXPECT_TRUE(stream.good());
+}
+
 TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
   const FrameLayout layout = PackedLayout(PixelFormat::kFloat32, {600, 600}, 0);
   const std::string file(std::size_t{600} * 600 * 4, '\0');
