@@ -1,5 +1,5 @@
 // A server that misbehaves on purpose, in place of the extension: what it does to whoever asks is in the name
-// of the file. It knows fewer interfaces than the extension, too.
+// of the file. It knows fewer interfaces and classes than the extension, too.
 #include <windows.h>
 
 #include <stdexcept>
@@ -70,6 +70,9 @@ extern "C" HRESULT __declspec(dllexport) STDAPICALLTYPE
     DllGetClassObject(REFCLSID clsid, REFIID iid, void** classObject) {
   using namespace Qel;
   *classObject = nullptr;
+  if (clsid == Lumetra::ShellExt::CLSID_QelShellExtVistaEbn) {
+    RaiseException(EXCEPTION_ACCESS_VIOLATION, 0, 0, nullptr);
+  }
   if (clsid != Lumetra::ShellExt::CLSID_QelShellExt) return CLASS_E_CLASSNOTAVAILABLE;
   return Com::MakeClassFactory(&Com::MakeInstance<Lumetra::ShellExt::Testing::FaultyObject>, iid,
                                classObject);

@@ -16,7 +16,7 @@ import unittest
 
 EMULATOR, QELSHOW, SERVER, FAULTY_SERVER = sys.argv[1:5]
 
-COMMANDS = ("info", "thumbnail", "page")
+COMMANDS = ("info", "thumbnail", "page", "doctor")
 DONE, FAILED, USAGE, UNSUPPORTED, DAMAGED = range(5)
 
 
@@ -87,12 +87,11 @@ class CommandLine(Test):
         texts = [run("--help", server=None)] + [run(command, "--help", server=None) for command in COMMANDS]
         for result in texts:
             self.assertEqual((result.returncode, result.stderr), (DONE, ""))
-            self.assertIn("--server PATH", result.stdout)
             self.assertIn("exit status", result.stdout)
             self.assertLessEqual(max(map(len, result.stdout.splitlines())), 80)
         for command in COMMANDS:
             self.assertIn(f"  {command} ", texts[0].stdout)
-        self.assertEqual(len({result.stdout for result in texts}), 4)
+        self.assertEqual(len({result.stdout for result in texts}), 5)
 
     def test_what_cannot_be_understood_is_a_usage_error_of_one_sentence(self):
         for arguments, *parts in (
@@ -109,6 +108,8 @@ class CommandLine(Test):
             (("thumbnail", "a.mrc", "b.mrc", "-o", "-"), "one file", "2"),
             (("page", "a.mrc"), "--out"),
             (("page", "a.mrc", "--json", "--out", "x"), '"--json"'),
+            (("doctor", "--server", "a.dll"), '"--server"'),
+            (("doctor", "--size=8"), '"--size=8"'),
         ):
             with self.subTest(arguments=arguments):
                 result = run(*arguments, server=None)
@@ -122,6 +123,23 @@ class CommandLine(Test):
             result = run("info", self.write("a.mrc", mrc()), server=str(server))
             self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
             self.assertOneSentence(result.stderr, server)
+
+
+    def test_what_is_wrong_with_a_server_is_told(self):
+        dll = bytearray(pathlib.Path(SERVER).read_bytes())
+        machine = struct.unpack_from("<i", dll, 60)[0] + 4
+        for name, contents, part in (
+            ("empty.dll", b"", "damaged or no DLL"),
+            ("cut.dll", dll[:len(dll) // 2], "damaged or no DLL"),
+            ("x86.dll", dll[:machine] + b"\x4C\x01" + dll[machine + 2:], "32-bit"),
+            ("arm.dll", dll[:machine] + b"\x64\xAA" + dll[machine + 2:], "other processors"),
+            ("needy.dll", dll.replace(b"SHLWAPI.dll", b"NOTHERE.dll"), "another DLL that it needs is missing"),
+        ):
+            with self.subTest(name):
+                server = self.write(name, contents)
+                result = run("info", self.write("a.mrc", mrc()), server=str(server))
+                self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
+                self.assertOneSentence(result.stderr, server, part)
 
 
 class ExitStatus(Test):
@@ -410,6 +428,221 @@ class Page(Test):
             run("page", path, "--out", self.folder / out)
         for name in ("index.html", "pictures/1.png"):
             self.assertEqual((self.folder / "one" / name).read_bytes(), (self.folder / "two" / name).read_bytes())
+
+
+class Doctor(Test):
+    """Changes the registry of the Wine prefix, so that nothing else may use it at the same time."""
+
+    EBN_STORE = "{E37DEDA9-F652-401B-B619-A1A88EADD003}"
+    RAW_STORE = "{E217E970-5E2E-11E1-B86C-0800200C9A66}"
+    MRC_STORE = "{ADF28042-3A9F-4409-9C62-444B018A7810}"
+    FOREIGN = "{0FF0FF0F-0000-4000-8000-00000000F0F0}"
+    CLASSES = "HKEY_LOCAL_MACHINE\\Software\\Classes\\"
+    THUMBNAIL = "ShellEx\\{BB2E617C-0920-11D1-9A0B-00C04FC2D6C1}"
+    INFO_TIP = "ShellEx\\{00021500-0000-0000-C000-000000000046}"
+    NEWER_THUMBNAIL = "ShellEx\\{E357FCCD-A995-4576-B01F-234630154E96}"
+    PROPERTY_STORES = ("HKEY_LOCAL_MACHINE\\Software\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\"
+                       "PropertyHandlers\\")
+
+    @classmethod
+    def setUpClass(cls):
+        cls.register("/u")
+
+    def setUp(self):
+        super().setUp()
+        self.addCleanup(self.register, "/u")
+
+    @staticmethod
+    def wine(*command):
+        subprocess.run([EMULATOR, *map(str, command)], check=True, capture_output=True, stdin=subprocess.DEVNULL)
+
+    @classmethod
+    def register(cls, *options, dll=SERVER):
+        cls.wine("regsvr32", "/s", *options, f"Z:{dll}")
+
+    def set_registry(self, values):
+        """Sets values to texts: by their key, and behind an "@" their name. None deletes the key."""
+        lines = ["Windows Registry Editor Version 5.00"]
+        for place, text in values.items():
+            key, _, name = place.partition("@")
+            if text is None:
+                lines += [f"[-{key}]"]
+            else:
+                name, text = (part.replace("\\", r"\\").replace('"', r'\"') for part in (name, text))
+                lines += [f"[{key}]", (f'"{name}"' if name else "@") + f'="{text}"']
+        self.wine("regedit", "/S", self.write("change.reg", "\r\n".join(lines + [""]).encode("utf-16")))
+
+    def set_dll(self, path, *classes):
+        self.set_registry({f"{self.CLASSES}CLSID\\{clsid}\\InProcServer32": f"Z:{path}".replace("/", "\\")
+                           for clsid in classes})
+
+    def doctor(self, *files):
+        """The finished process, and the JSON document that it prints."""
+        result = run("doctor", *files, "--json", server=None)
+        self.assertEqual(result.stderr, "")
+        document = json.loads(result.stdout)
+        self.assertEqual(document["schema"], 1)
+        return result, document
+
+    def conditions(self, document):
+        """Of the classes by name, and of the handlers by extension and role."""
+        return ({each["name"]: each["condition"] for each in document["classes"]}
+                | {(kind["extension"], each["role"]): each["condition"]
+                   for kind in document["kinds"] for each in kind["handlers"]})
+
+    def assertWorksBut(self, document, differences):
+        """Everything works, with the exception of what is named with its condition."""
+        conditions = self.conditions(document)
+        self.assertEqual(len(conditions), 4 + 7 * 3 + 3)
+        self.assertEqual({name: each for name, each in conditions.items() if each != "works"}, differences)
+
+    def assertProblems(self, *problems, files=()):
+        """Just these things are wrong, each told with its parts, in this order; answers the JSON."""
+        result, document = self.doctor(*files)
+        self.assertEqual(result.returncode, FAILED)
+        self.assertEqual(len(document["problems"]), len(problems), document["problems"])
+        for problem, parts in zip(document["problems"], problems):
+            self.assertOneSentence(problem, *parts)
+        return document
+
+    def assertProblem(self, *parts, files=()):
+        return self.assertProblems(parts, files=files)
+
+    def test_finds_nothing_where_everything_works(self):
+        self.register()
+        result, document = self.doctor()
+        self.assertEqual((result.returncode, document["problems"], document["files"]), (DONE, [], []))
+        self.assertWorksBut(document, {})
+        for each in document["classes"]:
+            self.assertEqual((each["dll"].replace("\\", "/"), each["problem"]), (f"Z:{SERVER}", None))
+            self.assertRegex(each["version"], r"^\d+\.\d+\.\d+$")
+        self.assertEqual([kind["extension"] for kind in document["kinds"]],
+                         [".mrc", ".ali", ".rec", ".ser", ".emi", ".ebn", ".raw"])
+        result = run("doctor", server=None)
+        self.assertEqual((result.returncode, result.stderr), (DONE, ""))
+        self.assertRegex(result.stdout, r"(?m)^ +\.mrc( +works){4}$")
+        self.assertRegex(result.stdout, r"(?m)^ +\.ser( +works){3}$")
+        self.assertRegex(result.stdout, r"(?m)^ +\.raw property store +works +[\d.]+ +Z:.*QelShellExt\.dll$")
+        self.assertIn("QelShellExt is registered and works.", result.stdout)
+
+    def test_tells_of_each_file_whether_it_is_read_and_why_not(self):
+        self.register()
+        good = self.write("good ä.mrc", mrc(300, 200, 2))
+        gone = self.folder / "gone.mrc"
+        bad = {gone: "cannot be opened", self.write("a.txt", b""): ".mrc",
+               self.write("mode.mrc", mrc(mode=17)): "mode is 17"}
+        for files, status in (((good, gone), FAILED), ((good, *bad), DAMAGED)):
+            with self.subTest(files=files):
+                result = run("doctor", *files, server=None)
+                self.assertEqual((result.returncode, result.stderr), (status, ""))
+                self.assertIn(f"{good}: is read, 300 x 200 pixels, frames: 2, 8 bit", result.stdout)
+                for path, part in bad.items():
+                    lines = [line for line in result.stdout.splitlines() if str(path) in line]
+                    self.assertEqual(len(lines), int(path in files))
+                    for line in lines:
+                        self.assertOneSentence(line, path, "is not read", part)
+        result, document = self.doctor(good)
+        self.assertEqual(result.returncode, DONE)
+        self.assertEqual([(each["verdict"], each["frames"]) for each in document["files"]], [("good", 2)])
+
+    def test_tells_that_nothing_is_registered(self):
+        document = self.assertProblem("not registered on this computer", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\"),
+                                      "administrator")
+        self.assertEqual(set(self.conditions(document).values()), {"not registered"})
+        self.assertEqual({each["dll"] for each in document["classes"]}, {None})
+        document = self.assertProblem("not registered", files=(self.write("a.mrc", mrc()),))
+        self.assertEqual(document["files"][0]["verdict"], "failed")
+        self.assertOneSentence(document["files"][0]["problem"], "not registered")
+        alone = self.write("alone/qelshow.exe", pathlib.Path(QELSHOW).read_bytes())
+        result = subprocess.run([EMULATOR, alone, "doctor"], capture_output=True, encoding="utf-8",
+                                stdin=subprocess.DEVNULL)
+        self.assertEqual(result.returncode, FAILED)
+        self.assertIn("with the path of QelShellExt.dll", result.stdout)
+
+    def test_tells_that_the_dll_was_moved_away(self):
+        dll = self.write("it's here, ä Ω/QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
+        self.register(dll=dll)
+        self.assertEqual(self.doctor()[0].returncode, DONE)
+        dll.rename(self.folder / "moved.dll")
+        document = self.assertProblem(f"Z:{dll}".replace("/", "\\"), "is not found", "regsvr32", SERVER.split("/")[-1])
+        self.assertEqual(set(self.conditions(document).values()), {"DLL not found"})
+        self.assertEqual({each["version"] for each in document["classes"]}, {None})
+
+    def test_tells_why_the_dll_does_not_load(self):
+        self.register()
+        dll = bytearray(pathlib.Path(SERVER).read_bytes())
+        machine = struct.unpack_from("<i", dll, 60)[0] + 4
+        for clsid, name, contents in (
+            (self.EBN_STORE, "text.dll", b"this is no DLL"),
+            (self.RAW_STORE, "x86.dll", dll[:machine] + b"\x4C\x01" + dll[machine + 2:]),
+            (self.MRC_STORE, "plain.dll", dll.replace(b"DllGetClassObject", b"DllGetCrassObject")),
+        ):
+            self.set_dll(self.write(name, contents), clsid)
+        document = self.assertProblems(
+            ("text.dll", "damaged or no DLL", "Install QelShellExt again."),
+            ("x86.dll", "32-bit", "Install QelShellExt again."),
+            ("plain.dll", "does not export DllGetClassObject", "Install QelShellExt again."))
+        self.assertWorksBut(document, {f".{kind} property store": "DLL not loaded" for kind in ("ebn", "raw", "mrc")}
+                            | {(f".{kind}", "property store"): "DLL not loaded" for kind in ("ebn", "raw", "mrc")})
+
+    def test_tells_that_no_objects_can_be_made(self):
+        self.register()
+        self.set_dll(FAULTY_SERVER, self.EBN_STORE, self.MRC_STORE)
+        document = self.assertProblems(("faulty_server.dll", "ends the process", "access violation", "again."),
+                                       (self.MRC_STORE, "no such class", "Install QelShellExt again."))
+        self.assertWorksBut(document, dict.fromkeys(
+            (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store")),
+            "no object"))
+
+    def test_tells_which_part_of_the_registration_is_missing(self):
+        self.register()
+        self.set_registry({self.CLASSES + ".mrc\\" + self.THUMBNAIL: None,
+                           self.CLASSES + ".mrc\\ShellEx\\PropertyHandler": None,
+                           self.PROPERTY_STORES + ".raw": None,
+                           f"{self.CLASSES}CLSID\\{self.EBN_STORE}\\InProcServer32": None,
+                           f"{self.CLASSES}CLSID\\{self.MRC_STORE}": None})
+        document = self.assertProblems(
+            (self.EBN_STORE, "registered without its DLL", "regsvr32"),
+            (self.MRC_STORE, "is not registered", "regsvr32"),
+            (".mrc", "(thumbnail, properties)", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\")),
+            (".raw", "(property store)"))
+        self.assertWorksBut(document, dict.fromkeys(
+            (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store"),
+             (".mrc", "thumbnail"), (".mrc", "properties"), (".raw", "property store")), "not registered"))
+
+    def test_names_the_program_that_has_taken_a_handler(self):
+        foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"
+        self.addCleanup(self.set_registry, {foreign: None})
+        self.register()
+        self.set_registry({foreign: "Stack Peeker", foreign + "\\InprocServer32": 'C:\\peek "er".dll',
+                           self.CLASSES + ".ser\\" + self.THUMBNAIL: self.FOREIGN,
+                           self.PROPERTY_STORES + ".ebn": self.FOREIGN})
+        told = ("Stack Peeker", self.FOREIGN, 'C:\\peek "er".dll', "run regsvr32")
+        document = self.assertProblems((".ser", "thumbnail", *told), (".ebn", "property store", *told))
+        self.assertWorksBut(document, {(".ser", "thumbnail"): "another program",
+                                       (".ebn", "property store"): "another program"})
+
+    def test_sees_the_handlers_that_go_before_the_extension_s_own(self):
+        choice = ("HKEY_CURRENT_USER\\Software\\Microsoft\\Windows\\CurrentVersion\\Explorer\\FileExts\\"
+                  ".ser\\UserChoice")
+        newer_key = self.CLASSES + ".mrc\\" + self.NEWER_THUMBNAIL
+        types = [self.CLASSES + name for name in ("Peeker.Chosen", "Peeker.Newer", "Peeker.Plain")]
+        self.addCleanup(self.set_registry, dict.fromkeys([choice, newer_key, *types])
+                        | {self.CLASSES + extension: "" for extension in (".emi", ".raw")})
+        self.register()
+        self.set_registry({newer_key: self.FOREIGN,
+                           choice + "@ProgId": "Peeker.Chosen", types[0] + "\\" + self.INFO_TIP: self.FOREIGN,
+                           self.CLASSES + ".emi": "Peeker.Newer", types[1] + "\\" + self.NEWER_THUMBNAIL: self.FOREIGN,
+                           self.CLASSES + ".raw": "Peeker.Plain", types[2] + "\\" + self.THUMBNAIL: self.FOREIGN})
+        told = (self.FOREIGN, "goes before", "remove that key")
+        document = self.assertProblems(
+            (".mrc", r"HKEY_CLASSES_ROOT\.mrc" + "\\" + self.NEWER_THUMBNAIL, *told),
+            (".ser", r"HKEY_CLASSES_ROOT\Peeker.Chosen" + "\\" + self.INFO_TIP, *told),
+            (".emi", r"HKEY_CLASSES_ROOT\Peeker.Newer" + "\\" + self.NEWER_THUMBNAIL, *told),
+            (".raw", r"HKEY_CLASSES_ROOT\Peeker.Plain" + "\\" + self.THUMBNAIL, *told))
+        self.assertWorksBut(document, dict.fromkeys(
+            ((".mrc", "thumbnail"), (".ser", "info tip"), (".emi", "thumbnail"), (".raw", "thumbnail")),
+            "another program"))
 
 
 if __name__ == "__main__":

@@ -13,18 +13,18 @@ constexpr std::int32_t kMostSize = 4096;
 constexpr const wchar_t* kHelp =
     LR"(qelshow shows what the QelShellExt extension shows to the Windows shell.
 
-usage: qelshow COMMAND ... [--server PATH] [--size N]
+usage: qelshow COMMAND ... [OPTION ...]
 
 commands:
   info FILE...           everything that the shell learns about each file
   thumbnail FILE -o PNG  the thumbnail of one file
   page FOLDER|FILE...    a page of all thumbnails and everything else
+  doctor [FILE...]       whether the extension works, and if not, why
   COMMAND --help         more about a command
 
-options of every command:
+options of info, thumbnail and page:
   --server PATH  ask this QelShellExt.DLL instead of the registered one
   --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
-  --help         this text
 
 exit status, of several files the highest:
   0  done
@@ -78,18 +78,35 @@ exit status: 0 the page is written, whatever it says about single files,
 1 failed, 2 wrong command line, 3 no file of a supported kind
 )";
 
+constexpr const wchar_t* kDoctorHelp =
+    LR"(usage: qelshow doctor [FILE...] [--json]
+
+Says whether the extension works on this computer: for each kind of file which
+handlers are registered, whether their DLL is found and loads, its version, and
+whether objects of its classes can be made; and whether the registered extension
+reads each file. What is wrong is told with its reason and what to do about it.
+
+  --json  print one JSON document: {"schema": 1, "classes": [...],
+          "kinds": [...], "problems": [...], "files": [...]}
+
+exit status: 0 everything works, 1 something does not, 2 wrong command line, 3 a
+file of no supported kind, 4 a damaged file; of several the highest
+)";
+
 struct CommandFacts {
   const wchar_t* name;
   Command command;
   const wchar_t* help;
   bool takesJson;
   bool takesOut;
+  bool takesServer;  // and asks it about files
 };
 
 constexpr CommandFacts kCommands[] = {
-    {L"info", Command::kInfo, kInfoHelp, true, false},
-    {L"thumbnail", Command::kThumbnail, kThumbnailHelp, false, true},
-    {L"page", Command::kPage, kPageHelp, false, true},
+    {L"info", Command::kInfo, kInfoHelp, true, false, true},
+    {L"thumbnail", Command::kThumbnail, kThumbnailHelp, false, true, true},
+    {L"page", Command::kPage, kPageHelp, false, true, true},
+    {L"doctor", Command::kDoctor, kDoctorHelp, true, false, false},
 };
 
 [[noreturn]] void WrongUsage(const std::wstring& sentence, std::wstring_view command = {}) {
@@ -149,9 +166,9 @@ class OptionReader {
     const std::wstring name = argument.substr(0, equals);
     if (name == L"--json" && facts_.takesJson) {
       line.json = true;
-    } else if (name == L"--server") {
+    } else if (name == L"--server" && facts_.takesServer) {
       line.server = Value(argument, equals);
-    } else if (name == L"--size") {
+    } else if (name == L"--size" && facts_.takesServer) {
       line.size = ParseSize(Value(argument, equals), facts_.name);
     } else if ((name == L"--out" || name == L"-o") && facts_.takesOut) {
       line.out = Value(argument, equals);
@@ -169,7 +186,7 @@ class OptionReader {
   }
 
   void Check(const CommandLine& line) const {
-    if (line.files.empty()) WrongUsage(L"No file is named.", facts_.name);
+    if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is named.", facts_.name);
     if (line.command == Command::kThumbnail && line.files.size() > 1) {
       WrongUsage(L"A thumbnail is made of one file, not of " + std::to_wstring(line.files.size()) + L".",
                  facts_.name);

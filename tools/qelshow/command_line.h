@@ -7,7 +7,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-enum class Command { kHelp, kInfo, kThumbnail, kPage };
+enum class Command { kHelp, kInfo, kThumbnail, kPage, kDoctor };
 
 struct CommandLine {
   Command command = Command::kHelp;

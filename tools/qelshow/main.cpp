@@ -6,6 +6,7 @@
 #include "command_line.h"
 #include "commands.h"
 #include "console.h"
+#include "doctor.h"
 #include "failure.h"
 #include "text_tools.h"
 #include "worker.h"
@@ -19,6 +20,7 @@ int Run(const CommandLine& line) {
     case Command::kInfo: return RunInfo(line);
     case Command::kThumbnail: return RunThumbnail(line);
     case Command::kPage: return RunPage(line);
+    case Command::kDoctor: return RunDoctor(line);
   }
   return kExitUsage;
 }

@@ -104,12 +104,20 @@ class MessageReader {
   std::size_t position_ = 0;
 };
 
-/// What can be asked about a file.
-enum class Subject : std::int32_t { kDiagnosis, kTip, kColumns, kPropertySets, kPropertyStore, kThumbnail };
+/// What can be asked: about a file, and whether a registered class makes objects.
+enum class Subject : std::int32_t {
+  kDiagnosis,
+  kTip,
+  kColumns,
+  kPropertySets,
+  kPropertyStore,
+  kThumbnail,
+  kCreation
+};
 
 struct Question {
   Subject subject = Subject::kDiagnosis;
-  std::wstring path;
+  std::wstring path;      // of the file; of kCreation the class identifier
   std::int32_t size = 0;  // of a thumbnail
 };
 

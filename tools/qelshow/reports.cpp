@@ -70,12 +70,6 @@ std::wstring Dimensions(std::int32_t width, std::int32_t height) {
   return std::to_wstring(width) + L" x " + std::to_wstring(height);
 }
 
-std::wstring Padded(std::wstring_view text, std::size_t width) {
-  std::wstring padded(text);
-  if (padded.size() < width) padded.append(width - padded.size(), L' ');
-  return padded;
-}
-
 /// `text` with every line after the first moved to the right.
 std::wstring Indented(std::wstring_view text, std::size_t columns) {
   std::wstring indented;
@@ -85,23 +79,6 @@ std::wstring Indented(std::wstring_view text, std::size_t columns) {
     if (c == L'\n') indented.append(columns, L' ');
   }
   return indented;
-}
-
-/// Rows of cells in columns as wide as their widest cell, each line indented.
-std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows) {
-  std::vector<std::size_t> widths;
-  for (const auto& row : rows) {
-    widths.resize(std::max(widths.size(), row.size()));
-    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], row[i].size());
-  }
-  std::wstring text;
-  for (const auto& row : rows) {
-    std::wstring line = L"    ";
-    for (std::size_t i = 0; i < row.size(); ++i) line += Padded(row[i], widths[i] + 2);
-    line.erase(line.find_last_not_of(L' ') + 1);
-    text += line + L"\n";
-  }
-  return text;
 }
 
 std::wstring OneLine(std::wstring_view text) {

@@ -1,9 +1,45 @@
 #include "server.h"
 
+#include <cstdint>
+#include <filesystem>
+#include <fstream>
+
 #include "class_ids.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+/// For which processors a program or DLL is made; IMAGE_FILE_MACHINE_UNKNOWN if that cannot be told.
+WORD MachineOf(const std::wstring& path) {
+  std::ifstream file(std::filesystem::path(path), std::ios::binary);
+  IMAGE_DOS_HEADER start{};
+  file.read(reinterpret_cast<char*>(&start), sizeof start);
+  if (!file || start.e_magic != IMAGE_DOS_SIGNATURE) return IMAGE_FILE_MACHINE_UNKNOWN;
+  struct {
+    DWORD signature;
+    WORD machine;
+  } header{};
+  file.seekg(start.e_lfanew);
+  file.read(reinterpret_cast<char*>(&header), sizeof header);
+  return file && header.signature == IMAGE_NT_SIGNATURE ? header.machine : WORD{IMAGE_FILE_MACHINE_UNKNOWN};
+}
+
+/// Why the system does not load the DLL.
+std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
+  if (error == ERROR_MOD_NOT_FOUND && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) {
+    return L"another DLL that it needs is missing (error 126)";
+  }
+  if (error != ERROR_BAD_EXE_FORMAT) return SystemErrorText(error);
+  switch (MachineOf(path)) {
+    case IMAGE_FILE_MACHINE_AMD64:
+    case IMAGE_FILE_MACHINE_UNKNOWN: return L"it is damaged or no DLL";
+    case IMAGE_FILE_MACHINE_I386: return L"it is made for 32-bit programs, and a 64-bit one is needed";
+    default: return L"it is made for other processors, and one for x64 is needed";
+  }
+}
+
+}  // namespace
 
 std::wstring Server::Open(const std::wstring& path) {
   if (path.empty()) {
@@ -12,18 +48,19 @@ std::wstring Server::Open(const std::wstring& path) {
                                             IID_IClassFactory, reinterpret_cast<void**>(factory.Put()));
     if (SUCCEEDED(result)) return {};
     if (result == REGDB_E_CLASSNOTREG) {
-      return L"The extension is not registered on this computer: register it with \"regsvr32 "
-             L"QelShellExt.DLL\", or name the DLL with --server.";
+      return L"The extension is not registered on this computer: \"qelshow doctor\" says more, "
+             L"and --server names a DLL that is not registered.";
     }
-    return L"The registered extension cannot be loaded: " + ResultText(result) + L".";
+    return L"The registered extension cannot be loaded: " + ResultText(result) +
+           L"; \"qelshow doctor\" says more.";
   }
   const HMODULE module = LoadLibraryExW(path.c_str(), nullptr, LOAD_WITH_ALTERED_SEARCH_PATH);
   if (module == nullptr) {
-    return L"The server \"" + path + L"\" cannot be loaded: " + SystemErrorText(GetLastError()) + L".";
+    return L"The DLL \"" + path + L"\" cannot be loaded: " + LoadingProblem(path, GetLastError()) + L".";
   }
   const FARPROC procedure = GetProcAddress(module, "DllGetClassObject");
   if (procedure == nullptr) {
-    return L"The server \"" + path + L"\" is no COM server: it does not export DllGetClassObject.";
+    return L"The DLL \"" + path + L"\" is no COM server: it does not export DllGetClassObject.";
   }
   getClassObject_ = reinterpret_cast<decltype(getClassObject_)>(reinterpret_cast<void*>(procedure));
   return {};

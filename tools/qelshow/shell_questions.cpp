@@ -151,7 +151,8 @@ HRESULT ReadPropertySet(IPropertySetStorage& sets, const GUID& format, std::vect
   return S_OK;
 }
 
-/// The class that the property system is told to use for the file; null for a kind without one.
+}  // namespace
+
 const CLSID* StoreClassOf(const std::wstring& path) {
   const std::wstring extension = GetExtension(path);
   if (IsEbnExtension(extension)) return &CLSID_QelShellExtVistaEbn;
@@ -159,8 +160,6 @@ const CLSID* StoreClassOf(const std::wstring& path) {
   // .ali and .rec are of the same format as .mrc, but the property system has no class for them.
   return SameIgnoringCase(extension, L"mrc") ? &CLSID_QelShellExtVistaMrc : nullptr;
 }
-
-}  // namespace
 
 TipAnswer AskTip(const Server& server, const std::wstring& path) {
   return Guarded<TipAnswer>([&](TipAnswer& answer) {
@@ -306,6 +305,18 @@ Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int3
     thumbnail.height = facts.bmHeight;
     thumbnail.bits = facts.bmBitsPixel;
   });
+}
+
+std::wstring AskCreation(const std::wstring& clsid) {
+  CLSID id{};
+  HRESULT result = CLSIDFromString(clsid.c_str(), &id);
+  ComPtr<IUnknown> object;
+  if (SUCCEEDED(result)) {
+    result = CoCreateInstance(id, nullptr, CLSCTX_INPROC_SERVER, IID_IUnknown,
+                              reinterpret_cast<void**>(object.Put()));
+  }
+  if (SUCCEEDED(result)) return {};
+  return L"No object of the class " + clsid + L" can be made: " + ResultText(result) + L".";
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -13,6 +13,9 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
+/// The class that the property system is told to use for the file; null for a kind without one.
+const CLSID* StoreClassOf(const std::wstring& path);
+
 TipAnswer AskTip(const Server& server, const std::wstring& path);
 
 ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path);
@@ -25,5 +28,9 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
 
 /// The thumbnail for a request of `size` by `size` pixels.
 Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int32_t size);
+
+/// Makes an object of a class as any program would, through what is registered. Empty, or a sentence that
+/// says why there is none.
+std::wstring AskCreation(const std::wstring& clsid);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -2,6 +2,7 @@
 
 #include <objbase.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdio>
 #include <cwctype>
@@ -95,6 +96,34 @@ std::wstring GuidText(const GUID& guid) {
   std::array<wchar_t, 40> text{};
   StringFromGUID2(guid, text.data(), static_cast<int>(text.size()));
   return text.data();
+}
+
+std::wstring OwnPath() {
+  std::wstring path(32768, L'\0');
+  path.resize(GetModuleFileNameW(nullptr, path.data(), static_cast<DWORD>(path.size())));
+  return path;
+}
+
+std::wstring Padded(std::wstring_view text, std::size_t width) {
+  std::wstring padded(text);
+  if (padded.size() < width) padded.append(width - padded.size(), L' ');
+  return padded;
+}
+
+std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows) {
+  std::vector<std::size_t> widths;
+  for (const auto& row : rows) {
+    widths.resize(std::max(widths.size(), row.size()));
+    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], row[i].size());
+  }
+  std::wstring text;
+  for (const auto& row : rows) {
+    std::wstring line = L"    ";
+    for (std::size_t i = 0; i < row.size(); ++i) line += Padded(row[i], widths[i] + 2);
+    line.erase(line.find_last_not_of(L' ') + 1);
+    text += line + L"\n";
+  }
+  return text;
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

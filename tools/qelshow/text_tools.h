@@ -1,4 +1,4 @@
-// Small texts: conversions to and from UTF-8, and the way in which codes and identifiers are written.
+// Small texts: conversions to and from UTF-8, the way in which codes and identifiers are written, tables.
 #pragma once
 
 #include <windows.h>
@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
 
@@ -30,5 +31,14 @@ std::wstring ProcessEndText(DWORD exitCode);
 
 /// For instance {6444048F-4C8B-11D1-8B70-080036B11A03}.
 std::wstring GuidText(const GUID& guid);
+
+/// The path of this program.
+std::wstring OwnPath();
+
+/// `text` with blanks behind it, at least `width` characters in all.
+std::wstring Padded(std::wstring_view text, std::size_t width);
+
+/// Rows of cells in columns as wide as their widest cell, each line indented.
+std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -58,6 +58,7 @@ std::string AnswerTo(const Question& question, const Server& server) {
     case Subject::kPropertySets: return Packed(AskPropertySets(server, question.path));
     case Subject::kPropertyStore: return Packed(AskPropertyStore(server, question.path));
     case Subject::kThumbnail: return Packed(AskThumbnail(server, question.path, question.size));
+    case Subject::kCreation: return Packed(AskCreation(question.path));
   }
   return {};
 }
@@ -77,12 +78,6 @@ bool MakePipe(OwnedHandle& readEnd, OwnedHandle& writeEnd, const OwnedHandle& ke
   readEnd.reset(read);
   writeEnd.reset(write);
   return SetHandleInformation(kept.get(), HANDLE_FLAG_INHERIT, 0) != 0;
-}
-
-std::wstring OwnPath() {
-  std::wstring path(32768, L'\0');
-  path.resize(GetModuleFileNameW(nullptr, path.data(), static_cast<DWORD>(path.size())));
-  return path;
 }
 
 }  // namespace

@@ -1,0 +1,143 @@
+#include "doctor.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "asking.h"
+#include "console.h"
+#include "failure.h"
+#include "installation.h"
+#include "json.h"
+#include "reports.h"
+#include "text_tools.h"
+#include "worker.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+/// Has the registered extension read the files. Where it cannot be had, that is every file's problem.
+std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
+  std::vector<FileFacts> files;
+  std::optional<Worker> worker;
+  std::wstring obstacle;
+  try {
+    if (!line.files.empty()) worker.emplace(std::wstring());
+  } catch (const Failure& failure) {
+    obstacle = failure.sentence;
+  }
+  for (const std::wstring& path : line.files) {
+    const std::wstring name = std::filesystem::path(path).filename().wstring();
+    if (worker) {
+      files.push_back(AskFile(*worker, path, name, line.size));
+    } else {
+      FileFacts facts;
+      facts.path = path;
+      facts.name = name;
+      facts.verdict = Verdict::kFailed;
+      facts.problem = obstacle;
+      files.push_back(std::move(facts));
+    }
+  }
+  return files;
+}
+
+std::string ClassJson(const ExaminedClass& examined) {
+  return JsonObject()
+      .Text("name", examined.name)
+      .Text("class", GuidText(examined.clsid))
+      .TextOrNull("dll", examined.registered.dll)
+      .TextOrNull("version", examined.version)
+      .Text("condition", ConditionText(examined.condition))
+      .TextOrNull("problem", examined.problem)
+      .Take();
+}
+
+std::string HandlerJson(const ExaminedHandler& examined) {
+  return JsonObject()
+      .Text("role", examined.registered.role)
+      .Text("key", examined.registered.key)
+      .TextOrNull("class", examined.registered.registered)
+      .Text("condition", ConditionText(examined.condition))
+      .Take();
+}
+
+std::string KindJson(const ExaminedKind& kind) {
+  return JsonObject()
+      .Text("extension", kind.extension)
+      .Json("handlers", JsonArray(kind.handlers, HandlerJson))
+      .Take();
+}
+
+std::string Json(const Installation& installation, const std::vector<FileFacts>& files) {
+  return JsonObject()
+             .Number("schema", kJsonSchema)
+             .Json("classes", JsonArray(installation.classes, ClassJson))
+             .Json("kinds", JsonArray(installation.kinds, KindJson))
+             .Json("problems", JsonArray(installation.problems, JsonString))
+             .Json("files", JsonArray(files, [](const FileFacts& facts) { return JsonReport(facts, {}); }))
+             .Take() +
+         "\n";
+}
+
+std::wstring ClassesText(const std::vector<ExaminedClass>& classes) {
+  std::vector<std::vector<std::wstring>> rows = {{L"class", L"condition", L"version", L"DLL"}};
+  const auto orDash = [](const std::wstring& text) { return text.empty() ? L"-" : text; };
+  for (const ExaminedClass& examined : classes) {
+    rows.push_back({examined.name, ConditionText(examined.condition), orDash(examined.version),
+                    orDash(examined.registered.dll)});
+  }
+  return Grid(rows);
+}
+
+std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
+  std::vector<std::vector<std::wstring>> rows = {{L"kind"}};
+  for (const ExaminedKind& kind : kinds) {
+    std::vector<std::wstring> row = {kind.extension};
+    for (std::size_t i = 0; i < kind.handlers.size(); ++i) {
+      // Every kind has its handlers in the same order, some without the last.
+      if (rows.front().size() == i + 1) rows.front().push_back(kind.handlers[i].registered.role);
+      row.push_back(ConditionText(kind.handlers[i].condition));
+    }
+    rows.push_back(std::move(row));
+  }
+  return Grid(rows);
+}
+
+std::wstring FileText(const FileFacts& facts) {
+  std::wstring text = L"    " + facts.path + L": ";
+  if (facts.verdict != Verdict::kGood) return text + L"is not read. " + facts.problem + L"\n";
+  text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
+          L" pixels, frames: " + std::to_wstring(facts.frames) + L", " + facts.type + L"\n";
+  return facts.remark.empty() ? text : text + L"      " + facts.remark + L"\n";
+}
+
+std::wstring Text(const Installation& installation, const std::vector<FileFacts>& files) {
+  std::wstring text =
+      L"Classes\n" + ClassesText(installation.classes) + L"\nHandlers\n" + KindsText(installation.kinds);
+  if (!files.empty()) text += L"\nFiles\n";
+  for (const FileFacts& facts : files) text += FileText(facts);
+  if (installation.problems.empty()) return text + L"\nQelShellExt is registered and works.\n";
+  text += L"\nProblems\n";
+  for (const std::wstring& problem : installation.problems) text += L"    " + problem + L"\n";
+  return text;
+}
+
+}  // namespace
+
+int RunDoctor(const CommandLine& line) {
+  const Installation installation = ExamineInstallation();
+  const std::vector<FileFacts> files = ExamineFiles(line);
+  if (line.json) {
+    PrintUtf8(Json(installation, files));
+  } else {
+    Print(Text(installation, files));
+  }
+  int status = installation.problems.empty() ? kExitDone : kExitFailed;
+  for (const FileFacts& facts : files) status = std::max(status, static_cast<int>(facts.verdict));
+  return status;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,13 @@
+// The doctor: says why the shell does not show what it should.
+#pragma once
+
+#include "command_line.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+/// Prints how the extension is installed on this computer, whether it reads the files that the line names,
+/// and what to do about everything that is wrong. Answers the highest of the files' verdicts and, for an
+/// installation that does not work, kExitFailed.
+int RunDoctor(const CommandLine& line);
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,169 @@
+#include "installation.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <map>
+
+#include "class_ids.h"
+#include "failure.h"
+#include "same_text.h"
+#include "text_tools.h"
+#include "worker.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+bool FileExists(const std::wstring& path) {
+  return !path.empty() && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES;
+}
+
+/// What registers the extension: with the DLL that is registered, or else with the one beside this program.
+std::wstring RegisterAdvice(const std::wstring& registeredDll) {
+  std::wstring dll = registeredDll;
+  if (!FileExists(dll)) dll = std::filesystem::path(OwnPath()).replace_filename(L"QelShellExt.dll").wstring();
+  return FileExists(dll) ? L"run regsvr32 \"" + dll + L"\" as administrator"
+                         : L"run regsvr32 with the path of QelShellExt.dll as administrator, or install "
+                           L"QelShellExt again";
+}
+
+constexpr const wchar_t* kReinstall = L" Install QelShellExt again.";
+
+/// Processes, each with the DLL that it has loaded.
+using Workers = std::map<std::wstring, Worker>;
+
+/// Loads the DLL and makes an object, both in a worker process, which they may end.
+void ExamineObject(ExaminedClass& examined, Workers& workers) {
+  const std::wstring& dll = examined.registered.dll;
+  examined.condition = Condition::kDllNotLoaded;
+  try {
+    Worker& worker = workers.try_emplace(dll, dll).first->second;
+    examined.condition = Condition::kNoObject;
+    if (const auto end = worker.Ask({Subject::kCreation, GuidText(examined.clsid)}, examined.problem)) {
+      examined.problem = L"The DLL \"" + dll + L"\" ends the process in which it makes an object of the " +
+                         examined.name + L", with " + ProcessEndText(*end) + L".";
+    }
+  } catch (const Failure& failure) {
+    examined.problem = failure.sentence;
+  }
+  if (examined.problem.empty()) {
+    examined.condition = Condition::kWorks;
+  } else {
+    examined.problem += kReinstall;
+  }
+}
+
+ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& workers) {
+  const std::wstring id = GuidText(clsid);
+  ExaminedClass examined;
+  examined.name = name;
+  examined.clsid = clsid;
+  examined.registered = ReadClass(id);
+  const std::wstring& dll = examined.registered.dll;
+  if (dll.empty()) {
+    examined.condition = Condition::kNotRegistered;
+    examined.problem =
+        L"The class of the " + examined.name + L", " + id +
+        (examined.registered.exists ? L", is registered without its DLL: " : L", is not registered: ") +
+        RegisterAdvice({}) + L".";
+  } else if (!FileExists(dll)) {
+    const std::wstring reason = SystemErrorText(GetLastError());
+    examined.condition = Condition::kDllNotFound;
+    examined.problem = L"The registered DLL \"" + dll + L"\" is not found (" + reason +
+                       L"): put it back, or " + RegisterAdvice({}) + L".";
+  } else {
+    examined.version = FileVersion(dll);
+    ExamineObject(examined, workers);
+  }
+  return examined;
+}
+
+/// The end of the way of a handler: the class behind it is one of the extension's own, or it is foreign.
+Condition ConditionOf(const Handler& handler, const std::vector<ExaminedClass>& classes) {
+  if (handler.registered.empty()) return Condition::kNotRegistered;
+  if (!SameIgnoringCase(handler.registered, GuidText(handler.expected))) return Condition::kForeign;
+  return std::ranges::find(classes, handler.expected, &ExaminedClass::clsid)->condition;
+}
+
+std::wstring ForeignHandlerProblem(const std::wstring& extension, const Handler& handler,
+                                   const std::wstring& advice) {
+  const RegisteredClass foreign = ReadClass(handler.registered);
+  std::wstring text = L"The " + handler.role + L" of " + extension +
+                      L" files comes from another program's class, " + handler.registered;
+  if (!foreign.title.empty()) text += L" (" + foreign.title + L")";
+  if (!foreign.dll.empty()) text += L" in \"" + foreign.dll + L"\"";
+  text += L", registered in " + handler.key;
+  return handler.isOwnKey ? text + L": to have it from QelShellExt, " + advice + L"."
+                          : text +
+                                L", which goes before QelShellExt: to have it from QelShellExt, remove "
+                                L"that key, or assign " +
+                                extension + L" files to another program.";
+}
+
+std::wstring MissingHandlersProblem(const ExaminedKind& kind, const std::wstring& advice) {
+  std::wstring roles;
+  for (const ExaminedHandler& handler : kind.handlers) {
+    if (handler.condition != Condition::kNotRegistered || !handler.registered.registered.empty()) continue;
+    roles += (roles.empty() ? L"" : L", ") + handler.registered.role;
+  }
+  if (roles.empty()) return {};
+  return L"No handler is registered for " + kind.extension + L" files (" + roles + L"): " + advice + L".";
+}
+
+std::vector<std::wstring> FindProblems(const Installation& installation) {
+  const auto isMissing = [](const auto& examined) { return examined.condition == Condition::kNotRegistered; };
+  const auto isBare = [&](const ExaminedKind& kind) { return std::ranges::all_of(kind.handlers, isMissing); };
+  const auto& classes = installation.classes;
+  const std::wstring advice = RegisterAdvice(classes.front().registered.dll);
+  if (std::ranges::all_of(classes, isMissing) && std::ranges::all_of(installation.kinds, isBare)) {
+    return {L"QelShellExt is not registered on this computer: " + advice + L"."};
+  }
+
+  std::vector<std::wstring> problems;
+  const auto add = [&](const std::wstring& problem) {
+    // What is wrong with the DLL is wrong with each of its classes.
+    if (!problem.empty() && std::ranges::find(problems, problem) == problems.end())
+      problems.push_back(problem);
+  };
+  for (const ExaminedClass& examined : classes) add(examined.problem);
+  for (const ExaminedKind& kind : installation.kinds) {
+    add(MissingHandlersProblem(kind, advice));
+    for (const auto& [handler, condition] : kind.handlers) {
+      if (condition == Condition::kForeign) add(ForeignHandlerProblem(kind.extension, handler, advice));
+    }
+  }
+  return problems;
+}
+
+}  // namespace
+
+const wchar_t* ConditionText(Condition condition) {
+  switch (condition) {
+    case Condition::kWorks: return L"works";
+    case Condition::kNotRegistered: return L"not registered";
+    case Condition::kForeign: return L"another program";
+    case Condition::kDllNotFound: return L"DLL not found";
+    case Condition::kDllNotLoaded: return L"DLL not loaded";
+    case Condition::kNoObject: return L"no object";
+  }
+  return L"";
+}
+
+Installation ExamineInstallation() {
+  Workers workers;
+  Installation installation;
+  installation.classes = {ExamineClass(L"shell extension", CLSID_QelShellExt, workers),
+                          ExamineClass(L".ebn property store", CLSID_QelShellExtVistaEbn, workers),
+                          ExamineClass(L".raw property store", CLSID_QelShellExtVistaRaw, workers),
+                          ExamineClass(L".mrc property store", CLSID_QelShellExtVistaMrc, workers)};
+  for (const KindOfFile& kind : ReadHandlers()) {
+    ExaminedKind examined{kind.extension, {}};
+    for (const Handler& handler : kind.handlers) {
+      examined.handlers.push_back({handler, ConditionOf(handler, installation.classes)});
+    }
+    installation.kinds.push_back(std::move(examined));
+  }
+  installation.problems = FindProblems(installation);
+  return installation;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

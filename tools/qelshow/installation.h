@@ -1,0 +1,50 @@
+// How the extension is installed on this computer: follows every way on which the shell comes to it, from a
+// kind of file to its handler, the class, the DLL, an object of the class, and judges each step. The doctor
+// shows what is found.
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <vector>
+
+#include "registered_handlers.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+/// How far the way goes.
+enum class Condition { kWorks, kNotRegistered, kForeign, kDllNotFound, kDllNotLoaded, kNoObject };
+
+/// A few words, for tables and JSON.
+const wchar_t* ConditionText(Condition condition);
+
+/// One of the extension's classes.
+struct ExaminedClass {
+  std::wstring name;  // what it does
+  CLSID clsid{};
+  RegisteredClass registered;
+  std::wstring version;  // of the DLL; empty if unknown
+  Condition condition = Condition::kWorks;
+  std::wstring problem;  // a sentence for the user; empty if it works
+};
+
+struct ExaminedHandler {
+  Handler registered;
+  Condition condition = Condition::kWorks;
+};
+
+struct ExaminedKind {
+  std::wstring extension;
+  std::vector<ExaminedHandler> handlers;
+};
+
+struct Installation {
+  std::vector<ExaminedClass> classes;
+  std::vector<ExaminedKind> kinds;
+  std::vector<std::wstring> problems;  // sentences, each for another thing that is wrong and what to do
+};
+
+/// Loads the DLL in another process only.
+Installation ExamineInstallation();
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,110 @@
+#include "registered_handlers.h"
+
+#include <cstddef>
+
+#include "class_ids.h"
+#include "shell_questions.h"
+#include "text_tools.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+constexpr const wchar_t* kExtensions[] = {L".mrc", L".ali", L".rec", L".ser", L".emi", L".ebn", L".raw"};
+
+struct ShellHandler {
+  const wchar_t* role;
+  const wchar_t* key;    // below ShellEx
+  const wchar_t* rival;  // below ShellEx: a newer interface for the same, which the shell prefers
+};
+
+constexpr ShellHandler kShellHandlers[] = {
+    {L"thumbnail", L"{BB2E617C-0920-11D1-9A0B-00C04FC2D6C1}", L"{E357FCCD-A995-4576-B01F-234630154E96}"},
+    {L"info tip", L"{00021500-0000-0000-C000-000000000046}", nullptr},
+    {L"properties", L"PropertyHandler", nullptr},
+};
+
+constexpr const wchar_t* kPropertyHandlers =
+    LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
+
+/// A text in the registry, with environment variables replaced; empty without one. Without `name` it is the
+/// default value.
+std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name = nullptr) {
+  DWORD bytes = 0;
+  if (RegGetValueW(root, key.c_str(), name, RRF_RT_REG_SZ, nullptr, nullptr, &bytes) != ERROR_SUCCESS)
+    return {};
+  std::wstring text(bytes / sizeof(wchar_t), L'\0');
+  if (RegGetValueW(root, key.c_str(), name, RRF_RT_REG_SZ, nullptr, text.data(), &bytes) != ERROR_SUCCESS)
+    return {};
+  return text.c_str();
+}
+
+/// The keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, the one that counts most first:
+/// that of the type to which the user, or else a program, has assigned the extension, then its own.
+std::vector<std::wstring> PlacesOfHandlers(const std::wstring& extension) {
+  std::wstring type = TextValue(
+      HKEY_CURRENT_USER,
+      LR"(Software\Microsoft\Windows\CurrentVersion\Explorer\FileExts\)" + extension + L"\\UserChoice",
+      L"ProgId");
+  if (type.empty()) type = TextValue(HKEY_CLASSES_ROOT, extension);
+  return type.empty() ? std::vector{extension} : std::vector{type, extension};
+}
+
+Handler ReadShellHandler(const std::wstring& extension, const ShellHandler& facts) {
+  Handler handler{facts.role, CLSID_QelShellExt, {}, {}};
+  const std::wstring ownKey = extension + L"\\ShellEx\\" + facts.key;
+  for (const wchar_t* const name : {facts.rival, facts.key}) {
+    if (name == nullptr) continue;
+    for (const std::wstring& place : PlacesOfHandlers(extension)) {
+      const std::wstring key = place + L"\\ShellEx\\" + name;
+      handler.registered = TextValue(HKEY_CLASSES_ROOT, key);
+      handler.key = L"HKEY_CLASSES_ROOT\\" + key;
+      handler.isOwnKey = key == ownKey;
+      if (!handler.registered.empty()) return handler;
+    }
+  }
+  return handler;
+}
+
+}  // namespace
+
+std::vector<KindOfFile> ReadHandlers() {
+  std::vector<KindOfFile> kinds;
+  for (const std::wstring extension : kExtensions) {
+    KindOfFile kind{extension, {}};
+    for (const ShellHandler& facts : kShellHandlers) {
+      kind.handlers.push_back(ReadShellHandler(extension, facts));
+    }
+    if (const CLSID* const store = StoreClassOf(extension)) {
+      const std::wstring key = kPropertyHandlers + extension;
+      kind.handlers.push_back(
+          {L"property store", *store, TextValue(HKEY_LOCAL_MACHINE, key), L"HKEY_LOCAL_MACHINE\\" + key});
+    }
+    kinds.push_back(std::move(kind));
+  }
+  return kinds;
+}
+
+RegisteredClass ReadClass(const std::wstring& clsid) {
+  const std::wstring path = L"CLSID\\" + clsid;
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
+  RegCloseKey(key);
+  return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32")};
+}
+
+std::wstring FileVersion(const std::wstring& path) {
+  const DWORD size = GetFileVersionInfoSizeW(path.c_str(), nullptr);
+  std::vector<std::byte> block(size);
+  void* found = nullptr;
+  UINT length = 0;
+  if (size == 0 || !GetFileVersionInfoW(path.c_str(), 0, size, block.data()) ||
+      !VerQueryValueW(block.data(), L"\\", &found, &length) || length < sizeof(VS_FIXEDFILEINFO)) {
+    return {};
+  }
+  const auto& facts = *static_cast<const VS_FIXEDFILEINFO*>(found);
+  return std::to_wstring(HIWORD(facts.dwFileVersionMS)) + L"." +
+         std::to_wstring(LOWORD(facts.dwFileVersionMS)) + L"." +
+         std::to_wstring(HIWORD(facts.dwFileVersionLS));
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,41 @@
+// What the registry says of the extension: the handlers of each kind of file, and the classes behind them.
+// Read as the shell reads it, and not judged here (installation.h does that).
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <vector>
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+/// One of the ways on which the shell comes from a kind of file to a class.
+struct Handler {
+  std::wstring role;        // for instance "thumbnail"
+  CLSID expected{};         // the extension's class for it
+  std::wstring registered;  // identifier of the class that the shell takes; empty without one
+  std::wstring key;         // where it is registered; where the extension's own is to be, without one
+  bool isOwnKey = true;     // whether that is the key which registering the extension writes
+};
+
+struct KindOfFile {
+  std::wstring extension;  // with its dot
+  std::vector<Handler> handlers;
+};
+
+/// Every kind of file with the handlers that the extension has for it.
+std::vector<KindOfFile> ReadHandlers();
+
+/// A registered class; empty texts for what is not registered.
+struct RegisteredClass {
+  bool exists = false;
+  std::wstring title;
+  std::wstring dll;  // path
+};
+
+RegisteredClass ReadClass(const std::wstring& clsid);
+
+/// The version of a program or DLL, for instance "1.0.0"; empty for a file without one.
+std::wstring FileVersion(const std::wstring& path);
+
+}  // namespace Qel::Lumetra::ShellExt::Show
