@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <array>
 #include <optional>
-#include <string_view>
 
 #include "byte_order.h"
 #include "frame_reader.h"
@@ -15,7 +14,7 @@ namespace {
 
 constexpr std::uint32_t kDescriptionId = 215;
 constexpr std::int64_t kHeaderBytes = 49;
-constexpr std::string_view kMagic("QEL RawImage", 13);  // with its terminating zero
+constexpr std::array kMagic = std::to_array("QEL RawImage");  // with its terminating zero
 
 /// The kind of value is in the upper half of the code, the number of bits in the lower.
 std::optional<DataType> TypeOf(std::int32_t code) {

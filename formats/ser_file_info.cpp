@@ -88,7 +88,8 @@ void SkipDimensions(std::istream& stream, std::uint32_t count) {
 
 /// Fails the stream for an element that is not there or of an unknown type.
 SerElement ReadElement(std::istream& stream, std::uint32_t position, HeaderCheck& check) {
-  constexpr std::size_t kTypeCode = 2 * kCalibrationBytes;  // the calibrations of both axes come first
+  constexpr std::size_t kTypeCode =
+      std::size_t{2} * kCalibrationBytes;  // the calibrations of both axes come first
   constexpr std::size_t kSizeX = kTypeCode + sizeof(std::int16_t);
   constexpr std::size_t kSizeY = kSizeX + sizeof(std::uint32_t);
   constexpr std::size_t kBytes = kSizeY + sizeof(std::uint32_t);

@@ -39,9 +39,9 @@ __attribute__((always_inline)) inline void Approximate(const double* values, std
   constexpr std::uint64_t kIntegerBits = 0x4330000000000000;
   constexpr double kIntegerOffset = 4503599627370496.0 + 1023.0;
   for (std::size_t i = 0; i < count; ++i) {
-    const std::uint64_t bits = std::bit_cast<std::uint64_t>(values[i]) + (kOne - kRootOfHalf);
+    const auto bits = std::bit_cast<std::uint64_t>(values[i]) + (kOne - kRootOfHalf);
     const double k = std::bit_cast<double>((bits >> kMantissaBits) | kIntegerBits) - kIntegerOffset;
-    const double m = std::bit_cast<double>((bits & kMantissaMask) + kRootOfHalf);
+    const auto m = std::bit_cast<double>((bits & kMantissaMask) + kRootOfHalf);
     const double s = (m - 1.0) / (m + 1.0);
     const double z = s * s;
     double p = kPolynomial.back();
