@@ -129,8 +129,7 @@ void EmiParser::ReadArray() {
   const EmiItemId id = objectPath_.back();
   if (IsDataArray(id.type)) {
     const bool inImage = PathEntry(-2) == kImageObject;
-    // The array belongs to the image that was opened last.
-    if (inImage && IsPixelArray(id) && imageCount_ == 1) ReadPixelArray();
+    if (inImage && IsPixelArray(id)) ReadPixelArray();
   }
   // The byte count says where the next item is, whatever the array's width and height come to.
   SkipBytes(*stream_, byteCount);
@@ -140,7 +139,8 @@ void EmiParser::ReadPixelArray() {
   const std::int64_t start = stream_->tellg();
   const auto width = ReadLittleEndian<std::int32_t>(*stream_);
   const auto height = ReadLittleEndian<std::int32_t>(*stream_);
-  if (const auto type = ElementType(objectPath_.back().type)) {
+  // The array belongs to the image that was opened last.
+  if (const auto type = ElementType(objectPath_.back().type); type && imageCount_ == 1) {
     firstImage_ = {*type, {width, height}, stream_->tellg()};
   }
   stream_->seekg(start);

@@ -275,6 +275,15 @@ TEST(Emi, ByteCountMayLeadBackToTheWidth) {
   EXPECT_EQ(emi.Thumbnail(kWholeSize).width, 0);
 }
 
+TEST(Emi, WidthAndHeightThatAreNotThereEndTheWalk) {
+  // The array claims to have no bytes. Its width and height are read all the same.
+  const std::string empty = EmiOpening(0x49B0, 0x0610) + EmiArray(kUInt8Image, 0x0202, "") + EmiEnd();
+  const std::string opening = EmiOpening(0x49B0, 0x0610);
+  EXPECT_EQ(ImageCount(empty + opening), 1);
+  EXPECT_EQ(ImageCount(EmiImageObject(Picture()) + empty + opening), 2);
+  EXPECT_EQ(ImageCount(EmiImageObject(Picture()) + empty + opening + EmiEnd()), 3);
+}
+
 TEST(Emi, LengthsBehindTheEndOfTheFileEndTheWalk) {
   for (const std::uint32_t length : {100u, 1000u, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFF0u, 0xFFFFFFFFu}) {
     SCOPED_TRACE(length);

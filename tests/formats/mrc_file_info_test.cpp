@@ -2,8 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <istream>
 #include <limits>
 
+#include "memory_buffer.h"
 #include "mrc_file.h"
 #include "open_file.h"
 
@@ -254,13 +256,54 @@ TEST(MrcThumbnail, OnlySixteenBitPixelsAreSwapped) {
             (Bytes{3, 2, 1, 6, 5, 4, 9, 8, 7}));
 }
 
+/// A file of `sections` sections of 64 KiB, and its reader. The first section is a ramp, every other is 0.
+struct SparseStack {
+  static constexpr std::int64_t kSectionBytes = 0x10000;
+
+  static std::string Head(std::int32_t sections) {
+    MrcFile file;
+    file.nx = 256;
+    file.ny = 256;
+    file.nz = sections;
+    for (std::int64_t i = 0; i < kSectionBytes; ++i) file.pixels += static_cast<char>(i);
+    return file.Bytes();
+  }
+
+  explicit SparseStack(std::int32_t sections) : head(Head(sections)) {
+    buffer.zerosBehind = (sections - 1) * kSectionBytes;
+  }
+
+  Testing::BitmapPixels Thumbnail() const { return Testing::TakeBitmap(reader.CreateThumbnail({256, 256})); }
+
+  std::string head;
+  Testing::MemoryBuffer buffer{head};
+  std::istream stream{&buffer};
+  MrcFileInfo reader{stream, L"mrc"};
+};
+
+TEST(MrcThumbnail, SectionFarIntoAStackCostsWhatOneSectionCosts) {
+  for (const std::int32_t sections : {1, 1000, 30000}) {
+    const SparseStack stack(sections);
+    EXPECT_EQ(stack.Thumbnail().width, 256);
+    EXPECT_EQ(stack.buffer.bytesRead, 1024 + SparseStack::kSectionBytes) << sections;
+    EXPECT_EQ(stack.buffer.reads, 2);
+  }
+}
+
 TEST(MrcThumbnail, SectionBehind2GiBIsNotReached) {
-  MrcFile file = Stack(1);
-  file.nx = 0x8000;
-  file.ny = 0x4000;
-  file.nz = 8;  // the middle one is at 4 * 2^29 + 1024, which is negative in 32 bits
-  EXPECT_TRUE(IsValid(file));
-  EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);
+  EXPECT_EQ(SparseStack(2 * 0x7FFF).Thumbnail().width, 256);  // begins 64 KiB before
+  SparseStack behind(2 * 0x8000);                             // at 2 GiB, which is negative in 32 bits
+  EXPECT_TRUE(behind.reader.IsValid());
+  EXPECT_EQ(behind.Thumbnail().width, 0);
+  EXPECT_TRUE(behind.stream.fail());
+  EXPECT_EQ(behind.buffer.bytesRead, 1024);
+}
+
+TEST(MrcThumbnail, PositionOfASectionWrapsAt32Bits) {
+  // The section in the middle is said to begin at 4 GiB, which is where the first one is.
+  const auto first = SparseStack(1).Thumbnail();
+  EXPECT_EQ(SparseStack(2 * 0x10000).Thumbnail(), first);
+  EXPECT_NE(SparseStack(2 * 0x10001).Thumbnail(), first);
 }
 
 TEST(MrcThumbnail, HugeSectionsHaveNone) {

@@ -226,9 +226,10 @@ TEST(GreyThumbnail, InfinityMakesTheRestBlack) {
 }
 
 TEST(GreyThumbnail, FloatDifferencesAreFormedInSinglePrecision) {
-  // 16777216 - 1 - (-1) is 16777216 in single and 16777217 - 1 in double precision.
-  const NaiveFrame<float> frame{3, 1, {-1.0f, 16777215.0f, 8388607.5f}};
-  EXPECT_EQ(Grey(frame, {10, 10}), Testing::NaiveGreyThumbnail(frame, 10, 10));
+  // The range is 255 and the middle difference 100, both only after they are rounded to float. In double
+  // precision they would be 255.000007 and 99.999999, and the middle level 99.
+  const NaiveFrame<float> frame{3, 1, {-0.000007f, std::nextafter(100.0f, 0.0f), 255.0f}};
+  EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 100, 255}));
 }
 
 TEST(GreyThumbnail, SignedDifferencesOver31BitsWrap) {

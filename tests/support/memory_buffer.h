@@ -21,6 +21,7 @@ class MemoryBuffer : public std::streambuf {
   std::int64_t failingRead = -1;  // counted from 0; -1 for none
   Failure failure = Failure::kBringsNothing;
   bool seekable = true;
+  std::int64_t zerosBehind = 0;  // how many bytes of 0 the file has behind its own, as sparse files have
 
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
@@ -29,13 +30,15 @@ class MemoryBuffer : public std::streambuf {
  protected:
   std::streamsize xsgetn(char* target, std::streamsize count) override {
     if (count == 0) return 0;  // is no read
-    const auto size = static_cast<std::streamsize>(bytes_.size());
-    std::streamsize got = std::clamp<std::streamsize>(size - position_, 0, count);
+    const auto stored = static_cast<std::streamsize>(bytes_.size());
+    std::streamsize got = std::clamp<std::streamsize>(stored + zerosBehind - position_, 0, count);
     if (reads++ == failingRead) {
       if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
       got = failure == Failure::kBringsHalf ? got / 2 : 0;
     }
-    std::copy_n(bytes_.begin() + std::min(position_, size), got, target);
+    const std::streamsize copied = std::clamp<std::streamsize>(stored - position_, 0, got);
+    std::copy_n(bytes_.begin() + std::min(position_, stored), copied, target);
+    std::fill(target + copied, target + got, '\0');
     position_ += got;
     bytesRead += got;
     largestRead = std::max<std::int64_t>(largestRead, got);
@@ -54,7 +57,7 @@ class MemoryBuffer : public std::streambuf {
   }
 
   pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
-    const off_type base = direction == std::ios_base::end   ? static_cast<off_type>(bytes_.size())
+    const off_type base = direction == std::ios_base::end ? static_cast<off_type>(bytes_.size()) + zerosBehind
                           : direction == std::ios_base::cur ? position_
                                                             : 0;
     return seekpos(base + offset, std::ios_base::in);
