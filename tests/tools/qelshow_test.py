@@ -22,11 +22,25 @@ DONE, FAILED, USAGE, UNSUPPORTED, DAMAGED = range(5)
 
 def run(*arguments, server=SERVER, folder=None):
     """Runs qelshow; the answer has its exit status, and its output as text."""
+    result = run_for_bytes(*arguments, server=server, folder=folder)
+    result.stdout = result.stdout.decode("utf-8")
+    return result
+
+
+def run_for_bytes(*arguments, server=SERVER, folder=None):
+    """Runs qelshow; the answer has its exit status, standard output as bytes and standard error as text."""
     command = [EMULATOR, QELSHOW, *map(str, arguments)]
     if server:
         command += ["--server", server]
-    return subprocess.run(command, capture_output=True, encoding="utf-8", errors="strict", cwd=folder,
-                          stdin=subprocess.DEVNULL, env=os.environ | {"LC_ALL": "C.UTF-8"})
+    # Files, as pipes would be kept open by a desktop that Wine starts and that lives a second longer.
+    with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
+        result = subprocess.run(command, stdin=subprocess.DEVNULL, stdout=out, stderr=errors, cwd=folder,
+                                env=os.environ | {"LC_ALL": "C.UTF-8"})
+        out.seek(0)
+        errors.seek(0)
+        result.stdout = out.read()
+        result.stderr = errors.read().decode("utf-8")
+    return result
 
 
 def mrc(width=4, height=3, frames=1, mode=0, label=b"", pixels=None):
@@ -217,8 +231,7 @@ class Thumbnail(Test):
         result = run("thumbnail", path, "-o", out, "--size", "128")
         self.assertEqual((result.returncode, result.stdout, result.stderr), (DONE, "", ""))
         self.assertEqual(png_facts(out.read_bytes()), (150, 100, 8, 0))
-        piped = subprocess.run([EMULATOR, QELSHOW, "thumbnail", path, "--out", "-", "--size=128", "--server", SERVER],
-                               capture_output=True, stdin=subprocess.DEVNULL)
+        piped = run_for_bytes("thumbnail", path, "--out", "-", "--size=128")
         self.assertEqual((piped.returncode, piped.stdout), (DONE, out.read_bytes()))
 
     def test_of_a_colour_picture_is_in_colour(self):
