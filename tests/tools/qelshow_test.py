@@ -7,6 +7,8 @@ usage: qelshow_test.py EMULATOR QELSHOW SERVER FAULTY_SERVER [TEST_CLASS ...]
 import json
 import os
 import pathlib
+import pty
+import random
 import re
 import struct
 import subprocess
@@ -29,18 +31,26 @@ def run(*arguments, server=SERVER, folder=None):
 
 def run_for_bytes(*arguments, server=SERVER, folder=None):
     """Runs qelshow; the answer has its exit status, standard output as bytes and standard error as text."""
-    command = [EMULATOR, QELSHOW, *map(str, arguments)]
-    if server:
-        command += ["--server", server]
     # Files, as pipes would be kept open by a desktop that Wine starts and that lives a second longer.
     with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
-        result = subprocess.run(command, stdin=subprocess.DEVNULL, stdout=out, stderr=errors, cwd=folder,
-                                env=os.environ | {"LC_ALL": "C.UTF-8"})
+        process = start(*arguments, server=server, cwd=folder, stdout=out, stderr=errors)
+        process.wait()
         out.seek(0)
         errors.seek(0)
-        result.stdout = out.read()
-        result.stderr = errors.read().decode("utf-8")
-    return result
+        return subprocess.CompletedProcess(process.args, process.returncode, out.read(), errors.read().decode("utf-8"))
+
+
+def start(*arguments, server=SERVER, **options):
+    command = [EMULATOR, QELSHOW, *map(str, arguments), *(["--server", server] if server else [])]
+    return subprocess.Popen(command, stdin=subprocess.DEVNULL, env=os.environ | {"LC_ALL": "C.UTF-8"}, **options)
+
+
+def read_terminal(terminal):
+    """The next part of what is written to a terminal; empty when nobody can write to it any more."""
+    try:
+        return os.read(terminal, 4096).decode("utf-8", "replace")
+    except OSError:
+        return ""
 
 
 def mrc(width=4, height=3, frames=1, mode=0, label=b"", pixels=None):
@@ -441,6 +451,41 @@ class Page(Test):
             run("page", path, "--out", self.folder / out)
         for name in ("index.html", "pictures/1.png"):
             self.assertEqual((self.folder / "one" / name).read_bytes(), (self.folder / "two" / name).read_bytes())
+
+    def test_shows_on_a_terminal_how_far_it_has_come(self):
+        for name in ("a.mrc", "b.mrc", "c.mrc"):
+            self.write("in/" + name, mrc())
+        terminal, errors = pty.openpty()
+        with tempfile.TemporaryFile() as out:
+            process = start("page", self.folder / "in", "--out", self.folder / "page", stdout=out, stderr=errors)
+            os.close(errors)
+            seen = "".join(iter(lambda: read_terminal(terminal), ""))
+            self.assertEqual(process.wait(), DONE)
+            out.seek(0)
+            self.assertIn(b"3 thumbnails of 3 files", out.read())
+        os.close(terminal)
+        for part in ("[                              ] 0 of 3  a.mrc", "[==========                    ] 1 of 3  b.mrc",
+                     "[====================          ] 2 of 3  c.mrc"):
+            self.assertIn(part, seen)
+        # Nothing of it stays: at its end the line is empty.
+        self.assertRegex(re.sub("\x1b\\[[?]25[hl]", "", seen), "\r(\x1b\\[K| +\r)\\Z")
+
+    def test_takes_no_more_memory_for_more_pictures(self):
+        # Each of these pictures is a megabyte of noise, which does not shrink in a PNG file.
+        path = self.write("noise.mrc", mrc(1024, 1024, pixels=random.Random(1).randbytes(1 << 20)))
+        few, many = (self.peak_memory("page", *[path] * count, "--size", "1024", "--out", self.folder / "page")
+                     for count in (2, 32))
+        self.assertEqual(len(list((self.folder / "page" / "pictures").iterdir())), 32)
+        self.assertGreater((self.folder / "page" / "pictures" / "32.png").stat().st_size, 1000000)
+        self.assertLess(many, few + (15 << 20))
+
+    def peak_memory(self, *arguments):
+        """The largest amount of memory, in bytes, that the program takes, without that of the worker process."""
+        process = start(*arguments, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+        _, status, usage = os.wait4(process.pid, 0)
+        process.returncode = os.waitstatus_to_exitcode(status)
+        self.assertEqual(process.returncode, DONE)
+        return usage.ru_maxrss << 10
 
 
 class Doctor(Test):
