@@ -2,12 +2,18 @@
 
 #include <gtest/gtest.h>
 
+#include <type_traits>
 #include <vector>
 
+#include "allocation_meter.h"
 #include "class_factory.h"
+#include "import_patch.h"
 
 namespace Qel::Com {
 namespace {
+
+using Lumetra::ShellExt::Testing::FailingHeap;
+using Lumetra::ShellExt::Testing::ImportPatch;
 
 class CountingModule : public Module {
  public:
@@ -130,6 +136,53 @@ TYPED_TEST(ComObject, IsDestroyedWhenItsFinalConstructionFails) {
     EXPECT_EQ(answer, nullptr);
   }
   EXPECT_EQ(g_locksInDestructor, (std::vector<LONG>{1, 1}));
+  EXPECT_EQ(this->module_.GetLockCount(), 0);
+}
+
+BOOL WINAPI NoSection(CRITICAL_SECTION*, DWORD) {
+  SetLastError(ERROR_NOT_ENOUGH_MEMORY);
+  return FALSE;
+}
+BOOL WINAPI NoSectionAndNoReason(CRITICAL_SECTION*, DWORD) {
+  SetLastError(ERROR_SUCCESS);
+  return FALSE;
+}
+
+TYPED_TEST(ComObject, IsDestroyedWhenItsLockCannotBeMade) {
+  // Without threads there is no lock that could fail.
+  const bool locks = std::is_same_v<TypeParam, FreeThreaded>;
+  const ImportPatch none(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &NoSection);
+  Outer outer;
+  for (IUnknown* const aggregating : {static_cast<IUnknown*>(nullptr), static_cast<IUnknown*>(&outer)}) {
+    ComPtr<IUnknown> made;
+    EXPECT_EQ(MakeInstance<Probe<TypeParam>>(aggregating, IID_IUnknown, reinterpret_cast<void**>(made.Put())),
+              locks ? HRESULT_FROM_WIN32(ERROR_NOT_ENOUGH_MEMORY) : S_OK);
+    EXPECT_EQ(made.Get() == nullptr, locks);
+  }
+  EXPECT_EQ(g_alive, 0);
+  EXPECT_EQ(this->module_.GetLockCount(), 0);
+}
+
+TYPED_TEST(ComObject, TakesAFailureWithoutAnErrorForALock) {
+  const ImportPatch none(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount",
+                         &NoSectionAndNoReason);
+  ComPtr<CComObject<Probe<TypeParam>>> object;
+  EXPECT_EQ(MakeObject(object), S_OK);
+}
+
+TYPED_TEST(ComObject, IsNotMadeWithoutMemory) {
+  Outer outer;
+  for (IUnknown* const aggregating : {static_cast<IUnknown*>(nullptr), static_cast<IUnknown*>(&outer)}) {
+    void* answer = &answer;
+    HRESULT result = S_OK;
+    {
+      const FailingHeap heap(0, FailingHeap::Then::kRecovers);
+      result = MakeInstance<Probe<TypeParam>>(aggregating, IID_IUnknown, &answer);
+    }
+    EXPECT_EQ(result, E_OUTOFMEMORY);
+    EXPECT_EQ(answer, nullptr);
+  }
+  EXPECT_TRUE(g_locksInDestructor.empty());
   EXPECT_EQ(this->module_.GetLockCount(), 0);
 }
 

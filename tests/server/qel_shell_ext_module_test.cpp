@@ -4,6 +4,7 @@
 
 #include <array>
 
+#include "import_patch.h"
 #include "server_dll.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
@@ -114,6 +115,52 @@ TEST_F(Module, TakesSuccessWithoutAnObjectForAClassThatIsNotAvailable) {
   std::array<ObjectMapEntry, 1> faultyMap{{{&kClass, 0, &MakeFaultyFactory}}};
   CQelShellExtModule faulty(nullptr, faultyMap);
   EXPECT_EQ(GetClassObject(faulty, IID_IClassFactory), CLASS_E_CLASSNOTAVAILABLE);
+}
+
+/// Which critical section cannot be made, counted from 0, and the error that is given for it.
+int g_failingSection = 0;
+DWORD g_sectionError = ERROR_SUCCESS;
+
+BOOL WINAPI MakeSection(CRITICAL_SECTION* section, DWORD) {
+  if (g_failingSection-- == 0) {
+    SetLastError(g_sectionError);
+    return FALSE;
+  }
+  InitializeCriticalSection(section);
+  return TRUE;
+}
+
+TEST_F(Module, IsNotToBeLoadedWithoutItsLocks) {
+  const ImportPatch patch(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &MakeSection);
+  std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
+  g_sectionError = ERROR_NOT_ENOUGH_MEMORY;
+  {
+    g_failingSection = 0;
+    CQelShellExtModule module(nullptr, map);
+    EXPECT_TRUE(module.initFailed());
+    EXPECT_EQ(GetClassObject(module), E_UNEXPECTED);  // its classes have no lock
+  }
+  {
+    g_failingSection = 1;
+    CQelShellExtModule module(nullptr, map);
+    EXPECT_TRUE(module.initFailed());
+    EXPECT_EQ(GetClassObject(module), S_OK);  // its classes have one
+  }
+  {
+    g_failingSection = 2;
+    CQelShellExtModule module(nullptr, map);
+    EXPECT_FALSE(module.initFailed());
+  }
+}
+
+TEST_F(Module, TakesAFailureWithoutAnErrorForALock) {
+  const ImportPatch patch(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &MakeSection);
+  g_sectionError = ERROR_SUCCESS;
+  for (const int section : {0, 1}) {
+    g_failingSection = section;
+    const CQelShellExtModule module(nullptr, {});
+    EXPECT_FALSE(module.initFailed());
+  }
 }
 
 TEST_F(Module, CountsItsLocks) {
