@@ -41,6 +41,8 @@ class Regsvr32 : public ::testing::Test {
     // Where it runs on a real machine, this would change what the user's shell does.
     ASSERT_TRUE(GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "wine_get_version"))
         << "this test registers the DLL on the machine, so it runs in a Wine prefix only";
+    // Somebody may have looked at files with the registered DLL before.
+    ASSERT_EQ(Run({L"/s", L"/u", ServerDll::Path()}), 0u);
   }
 
   static std::uint32_t Run(std::vector<std::wstring> arguments) {
