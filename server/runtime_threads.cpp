@@ -3,20 +3,31 @@
 // The DLL is a guest in its process: it must leave nothing behind when it is unloaded, and the process may
 // load and unload it thousands of times. The library takes a thread-local slot, memory and event handles per
 // thread and an exception handler for the whole process, and gives back none but the last. The runtime uses
-// only these few of its functions: for initialisation on first use, short critical sections, and the
-// thread-local state of exceptions. Defined here, they keep the library out of the DLL; using more of it
-// (std::thread, say) makes the DLL fail to link, as these would then be defined twice.
+// only these few of its functions, for initialisation on first use and short critical sections, and besides
+// them the thread-local state of exceptions. Defined here, they keep the library out of the DLL; using more
+// of it (std::thread, say) makes the DLL fail to link, as these would then be defined twice.
+#include <cxxabi.h>
 #include <pthread.h>
 #include <windows.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
+#include <cstdlib>
+#include <exception>
+#include <new>
 
 // Frees the memory that libstdc++ sets aside for exceptions that are thrown when there is no memory. Not
 // declared in any of its headers.
 namespace __gnu_cxx {
 void __freeres();
 }
+
+// As the C++ ABI lays it down: the stack of exceptions that are handled, and how many are on their way.
+struct abi::__cxa_eh_globals {
+  void* caughtExceptions;
+  unsigned int uncaughtExceptions;
+};
 
 namespace {
 
@@ -59,31 +70,57 @@ class RuntimeLock {
 
 constinit RuntimeLock g_lock;
 
-/// The keys that are in use. Freeing one runs its destructor on the value of every thread, also of those that
-/// live on.
-class Keys {
+/// What the runtime keeps of the exceptions of each thread that has thrown one. Throwing must not need
+/// memory, least of all to say that there is none, so that the first threads find room here. The runtime's
+/// own way ends the process then.
+class ThreadExceptions {
  public:
-  ~Keys() {
-    for (std::size_t i = 0; i < count_; ++i) FlsFree(keys_[i]);
+  ThreadExceptions() : slot_(FlsAlloc(&GiveBack)) {}
+
+  /// Gives back what every thread has, also those that live on.
+  ~ThreadExceptions() {
+    FlsFree(slot_);
     __gnu_cxx::__freeres();
   }
 
-  int Create(pthread_key_t* key, void (*destructor)(void*)) {
-    g_lock.Lock();
-    const DWORD index = count_ < keys_.size() ? FlsAlloc(destructor) : FLS_OUT_OF_INDEXES;
-    if (index != FLS_OUT_OF_INDEXES) keys_[count_++] = index;
-    g_lock.Unlock();
-    *key = index;
-    return index != FLS_OUT_OF_INDEXES ? 0 : EAGAIN;
+  abi::__cxa_eh_globals* OfThisThread() const {
+    // A throw between a failed call and the question for its error must not change the answer.
+    const DWORD error = GetLastError();
+    void* state = FlsGetValue(slot_);
+    if (state == nullptr) {
+      state = Take();
+      if (state == nullptr || FlsSetValue(slot_, state) == FALSE) std::terminate();
+    }
+    SetLastError(error);
+    return static_cast<abi::__cxa_eh_globals*>(state);
   }
 
  private:
-  std::array<DWORD, 4> keys_{};
-  std::size_t count_ = 0;
+  struct Room {
+    abi::__cxa_eh_globals state;
+    std::atomic<bool> isTaken;
+  };
+
+  static void* Take() {
+    for (Room& room : g_rooms) {
+      if (!room.isTaken.exchange(true)) return new (&room.state) abi::__cxa_eh_globals{};
+    }
+    return std::calloc(1, sizeof(abi::__cxa_eh_globals));
+  }
+
+  static void WINAPI GiveBack(void* state) {
+    const auto room = std::ranges::find(g_rooms, state, [](Room& candidate) { return &candidate.state; });
+    if (room == g_rooms.end()) return std::free(state);
+    room->isTaken = false;
+  }
+
+  static constinit inline std::array<Room, 64> g_rooms{};
+
+  DWORD slot_;
 };
 
 // Made before every other static object and so destroyed after it.
-[[gnu::init_priority(101)]] Keys g_keys;
+[[gnu::init_priority(101)]] ThreadExceptions g_exceptions;
 
 // States of a pthread_once_t.
 constexpr pthread_once_t kNotRun = PTHREAD_ONCE_INIT;
@@ -140,20 +177,16 @@ int pthread_once(pthread_once_t* once, void (*run)()) {
   return 0;
 }
 
-int pthread_key_create(pthread_key_t* key, void (*destructor)(void*)) {
-  return g_keys.Create(key, destructor);
-}
-
-void* pthread_getspecific(pthread_key_t key) {
-  // A throw between a failed call and the question for its error must not change the answer.
-  const DWORD error = GetLastError();
-  void* const value = FlsGetValue(key);
-  SetLastError(error);
-  return value;
-}
-
-int pthread_setspecific(pthread_key_t key, const void* value) {
-  return FlsSetValue(key, const_cast<void*>(value)) != FALSE ? 0 : ENOMEM;
-}
-
 }  // extern "C"
+
+namespace __cxxabiv1 {
+
+__cxa_eh_globals* __cxa_get_globals() noexcept {
+  return g_exceptions.OfThisThread();
+}
+
+__cxa_eh_globals* __cxa_get_globals_fast() noexcept {
+  return g_exceptions.OfThisThread();
+}
+
+}  // namespace __cxxabiv1

@@ -1,5 +1,7 @@
 #include "shell_ext.h"
 
+#include <utility>
+
 #include "columns.h"
 #include "enum_statpropsetstg.h"
 #include "file_type_factory.h"
@@ -24,9 +26,9 @@ HRESULT CShellExt::Extract(HBITMAP* thumbnail) {
 
 HRESULT CShellExt::Load(LPCOLESTR path, DWORD) {
   OpenPath(stream_, path);
-  const std::wstring newPath = path != nullptr ? path : L"";
+  std::wstring newPath = path != nullptr ? path : L"";
   info_ = CreateFileTypeInfo(stream_, GetExtension(newPath));
-  path_ = newPath;
+  path_ = std::move(newPath);
   propertySets_.reset();
   return S_OK;
 }

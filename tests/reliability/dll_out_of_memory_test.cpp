@@ -1,0 +1,374 @@
+// The release DLL in a process whose memory runs out, at every single request that the DLL makes for memory,
+// a text, a lock or a bitmap: the result that is promised, nothing left behind, and an object that answers
+// again as soon as there is memory.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <propsys.h>
+#include <shlobj.h>
+
+#include <algorithm>
+#include <array>
+#include <exception>
+#include <functional>
+#include <new>
+#include <optional>
+#include <string>
+#include <thread>
+#include <utility>
+#include <vector>
+
+#include "bitmap_pixels.h"
+#include "process_census.h"
+#include "sample_files.h"
+#include "scarce_system.h"
+#include "scripted_stream.h"
+#include "server_dll.h"
+#include "shell_values.h"
+#include "temp_folder.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+using Then = ScarceSystem::Then;
+
+/// What a method answers; none when it ends with std::bad_alloc, as none of them catches it.
+using Result = std::optional<HRESULT>;
+constexpr Result kThrew = std::nullopt;
+constexpr Result kNoMemory = E_OUTOFMEMORY;
+constexpr Result kNoBitmap = E_FAIL;
+
+/// No larger than any sample, so that colour frames can be reduced to it as well.
+constexpr SIZE kRequest = {2, 2};
+
+/// One request of the shell.
+struct Request {
+  std::function<void()> prepare;  // what has to be there before, made while there is memory
+  std::function<HRESULT()> send;
+  std::function<void()> check;  // takes the answer to one that has succeeded
+  std::vector<Result> results;  // of one that runs out of memory
+};
+
+Result Send(const Request& request, Then then) {
+  try {
+    return request.send();
+  } catch (const std::bad_alloc&) {
+    // Without any memory the exception lies in what the DLL has set aside, enough for some hundred of them,
+    // and must not be given back to this program's heap: a reference on it is kept for good.
+    static auto* const kept = new std::vector<std::exception_ptr>();
+    if (then == Then::kStaysEmpty) kept->push_back(std::current_exception());
+    return kThrew;
+  }
+}
+
+/// Sends `request` while what the DLL asks for at its place `number` is not there. Returns whether there was
+/// such a place.
+bool FailOnce(const Request& request, std::int64_t number, Then then) {
+  request.prepare();
+  ScarceSystem::FailAt(number, then);
+  const Result result = Send(request, then);
+  const bool failed = ScarceSystem::Recover();
+  if (failed) {
+    EXPECT_NE(std::ranges::find(request.results, result), request.results.end())
+        << "place " << number << ", result " << (result ? *result : 0);
+  }
+  // The same request again, to the same object.
+  EXPECT_EQ(failed ? request.send() : result, S_OK) << "place " << number;
+  request.check();
+  return failed;
+}
+
+/// Lets every place fail, one after the other. Returns how many there are.
+int FailEverywhere(const Request& request, Then then) {
+  int places = 0;
+  while (FailOnce(request, places, then)) ++places;
+  return places;
+}
+
+/// The same, each time in a thread that has never seen an exception.
+void FailEverywhereInNewThreads(const Request& request) {
+  bool failed = true;
+  for (int number = 0; failed; ++number) {
+    std::thread([&] { failed = FailOnce(request, number, Then::kStaysEmpty); }).join();
+  }
+}
+
+class DllOutOfMemory : public ServerTest {
+ protected:
+  ~DllOutOfMemory() override { Forget(); }
+
+  /// Lets everything that `request` needs fail in every way and looks at what is left.
+  void Try(const Request& request) {
+    EXPECT_GT(FailEverywhere(request, Then::kRecovers), 0);
+    FailEverywhere(request, Then::kStaysEmpty);
+    FailEverywhereInNewThreads(request);
+    ExpectNothingLeft(request);
+  }
+
+  /// What the system takes for itself it takes once; a leak grows with every round.
+  void ExpectNothingLeft(const Request& request) {
+    const auto take = [&] {
+      FailEverywhere(request, Then::kRecovers);
+      Forget();
+      return ProcessCensus::Take();
+    };
+    ProcessCensus least = take();
+    bool grows = true;
+    for (int round = 0; round < 3 && grows; ++round) {
+      const ProcessCensus next = take();
+      grows = next.heapBlocks > least.heapBlocks || next.handles > least.handles ||
+              next.gdiObjects > least.gdiObjects;
+      least = next;
+    }
+    EXPECT_FALSE(grows) << "something is left after every round";
+    EXPECT_EQ(dll_.LockCount(), 0);
+  }
+
+  void Forget() {
+    enumerator_ = {};
+    copy_ = {};
+    storage_ = {};
+    handler_ = {};
+    object_ = {};
+  }
+
+  void WriteSample(const char* kind, const SampleFile& sample) {
+    path_ = folder_.Write(std::string("sample.") + kind, sample.bytes);
+  }
+
+  HRESULT Load() { return Ask<IPersistFile>(IID_IPersistFile)->Load(path_.c_str(), STGM_READ); }
+
+  void MakeLoaded() {
+    Forget();
+    object_ = dll_.CreateInstance<IUnknown>(kShellExtClass, IID_IUnknown);
+    EXPECT_EQ(Load(), S_OK);
+    DWORD flags = 0;
+    EXPECT_EQ(Ask<IExtractImage>(IID_IExtractImage)->GetLocation(nullptr, 0, nullptr, &kRequest, 24, &flags),
+              S_OK);
+  }
+
+  template <class Interface>
+  ComPtr<Interface> Ask(const IID& iid) {
+    return As<Interface>(object_, iid);
+  }
+
+  HRESULT Extract() {
+    const HRESULT result = Ask<IExtractImage>(IID_IExtractImage)->Extract(&bitmap_);
+    if (result == E_FAIL) {
+      EXPECT_EQ(bitmap_, nullptr);
+    }
+    return result;
+  }
+
+  TempFolder folder_;
+  ScarceSystem system_{dll_.module()};
+  std::filesystem::path path_;
+
+  ComPtr<IUnknown> object_;
+  ComPtr<IPropertyStorage> storage_;
+  ComPtr<IEnumSTATPROPSTG> enumerator_;
+  ComPtr<IEnumSTATPROPSTG> copy_;
+  ComPtr<IPropertyStore> handler_;
+  HBITMAP bitmap_ = nullptr;
+};
+
+TEST_F(DllOutOfMemory, WhileAnObjectIsMade) {
+  for (const CLSID& clsid : {kShellExtClass, kEbnHandlerClass, kRawHandlerClass, kMrcHandlerClass}) {
+    const ComPtr<IClassFactory> factory = dll_.Factory(clsid);
+    OuterObject outer;
+    for (IUnknown* const whole : {static_cast<IUnknown*>(nullptr), static_cast<IUnknown*>(&outer)}) {
+      const Request request{[&] { object_ = {}; },
+                            [&] {
+                              return factory->CreateInstance(whole, IID_IUnknown,
+                                                             reinterpret_cast<void**>(object_.Put()));
+                            },
+                            [&] { EXPECT_EQ(References(object_), 0u); },
+                            {kNoMemory}};
+      FailEverywhere(request, Then::kRecovers);
+      FailEverywhere(request, Then::kStaysEmpty);
+      FailEverywhereInNewThreads(request);
+      object_ = {};
+      EXPECT_EQ(outer.references(), 1u);
+    }
+    EXPECT_EQ(References(factory), 1u);
+  }
+}
+
+TEST_F(DllOutOfMemory, WhileAFileIsLoaded) {
+  for (const char* const kind : kFileKinds) {
+    WriteSample(kind, SampleFiles(kind).front());
+    Try({[&] {
+           Forget();
+           object_ = dll_.CreateInstance<IUnknown>(kShellExtClass, IID_IUnknown);
+         },
+         [&] {
+           try {
+             return Load();
+           } catch (const std::bad_alloc&) {
+             // It is without a file, as one whose file is not acceptable. The shell takes a new object.
+             EXPECT_EQ(Ask<IExtractImage>(IID_IExtractImage)->Extract(&bitmap_), E_FAIL);
+             throw;
+           }
+         },
+         [] {},
+         {kThrew}});
+  }
+}
+
+class DllOutOfMemoryOfKind : public DllOutOfMemory, public testing::WithParamInterface<const char*> {};
+
+TEST_P(DllOutOfMemoryOfKind, WhileAThumbnailIsMade) {
+  BitmapPixels picture;
+  Request request{[] {},
+                  [&] { return Extract(); },
+                  [&] { EXPECT_EQ(TakeBitmap(bitmap_), picture); },
+                  {kThrew, kNoBitmap}};
+  for (const SampleFile& sample : SampleFiles(GetParam())) {
+    SCOPED_TRACE(sample.name);
+    WriteSample(GetParam(), sample);
+    MakeLoaded();
+    ASSERT_EQ(Extract(), S_OK);
+    picture = TakeBitmap(bitmap_);
+    EXPECT_GT(FailEverywhere(request, Then::kRecovers), 0);
+    FailEverywhere(request, Then::kStaysEmpty);
+    FailEverywhereInNewThreads(request);
+  }
+  request.prepare = [&] { MakeLoaded(); };
+  ExpectNothingLeft(request);
+}
+
+INSTANTIATE_TEST_SUITE_P(All, DllOutOfMemoryOfKind, testing::ValuesIn(kFileKinds),
+                         [](const auto& kind) { return kind.param; });
+
+TEST_F(DllOutOfMemory, WhileATipIsMade) {
+  WriteSample("mrc", SampleFiles("mrc").front());
+  wchar_t* tip = nullptr;
+  Try({[&] { MakeLoaded(); },
+       [&] { return Ask<IQueryInfo>(IID_IQueryInfo)->GetInfoTip(QITIPF_DEFAULT, &tip); },
+       [&] {
+         EXPECT_NE(std::wstring(tip).find(L"another"), std::wstring::npos);
+         CoTaskMemFree(tip);
+       },
+       {kThrew, kNoMemory}});
+}
+
+TEST_F(DllOutOfMemory, WhileAColumnIsRead) {
+  WriteSample("mrc", SampleFiles("mrc").front());
+  SHCOLUMNDATA item{};
+  path_.native().copy(item.wszFile, std::size(item.wszFile) - 1);
+  for (const PROPERTYKEY& column : {kWidthKey, kDimensionsKey, kCommentsKey}) {
+    VARIANT value{};
+    Try({[&] { MakeLoaded(); },
+         [&] { return Ask<IColumnProvider>(IID_IColumnProvider)->GetItemData(&column, &item, &value); },
+         [&] { EXPECT_NE(TakeValue(value), Value()); },
+         {kThrew, kNoMemory}});
+  }
+}
+
+TEST_F(DllOutOfMemory, WhilePropertySetsAreBuiltAndListed) {
+  WriteSample("mrc", SampleFiles("mrc").front());
+  Try({[&] { MakeLoaded(); },
+       [&] {
+         return Ask<IPropertySetStorage>(IID_IPropertySetStorage)
+             ->Open(kImageSummary, STGM_READ, storage_.Put());
+       },
+       [&] { EXPECT_TRUE(storage_); },
+       {kThrew, kNoMemory}});
+
+  ComPtr<IEnumSTATPROPSETSTG> sets;
+  Try({[&] { MakeLoaded(); },
+       [&] { return Ask<IPropertySetStorage>(IID_IPropertySetStorage)->Enum(sets.Put()); },
+       [&] { sets = {}; },
+       {kThrew, kNoMemory}});
+}
+
+TEST_F(DllOutOfMemory, WhileAPropertySetIsRead) {
+  WriteSample("mrc", SampleFiles("mrc").front());
+  const auto open = [&] {
+    MakeLoaded();
+    EXPECT_EQ(
+        Ask<IPropertySetStorage>(IID_IPropertySetStorage)->Open(kImageSummary, STGM_READ, storage_.Put()),
+        S_OK);
+  };
+  PROPSPEC specifier{};
+  specifier.ulKind = PRSPEC_PROPID;
+  specifier.propid = kDimensionsKey.pid;
+  PROPVARIANT value{};
+  Try({open,
+       [&] { return storage_->ReadMultiple(1, &specifier, &value); },
+       [&] { EXPECT_EQ(TakeValue(value), Text(VT_BSTR, L"7 x 5")); },
+       {kNoMemory}});
+  Try({open, [&] { return storage_->Enum(enumerator_.Put()); }, [] {}, {kNoMemory}});
+  Try({[&] {
+         open();
+         EXPECT_EQ(storage_->Enum(enumerator_.Put()), S_OK);
+       },
+       [&] { return enumerator_->Clone(copy_.Put()); },
+       [] {},
+       {kNoMemory}});
+}
+
+TEST_F(DllOutOfMemory, WhileAPropertyStoreIsFilledAndRead) {
+  struct Handler {
+    CLSID clsid;
+    const char* kind;
+  };
+  for (const Handler& kind : {Handler{kMrcHandlerClass, "mrc"}, Handler{kEbnHandlerClass, "ebn"},
+                              Handler{kRawHandlerClass, "raw"}}) {
+    SCOPED_TRACE(kind.kind);
+    const std::string bytes = SampleFiles(kind.kind).front().bytes;
+    ScriptedStream stream(bytes);
+    const auto initialize = [&] {
+      stream.position = 0;
+      return As<IInitializeWithStream>(handler_, IID_IInitializeWithStream)->Initialize(&stream, STGM_READ);
+    };
+    const auto make = [&] {
+      Forget();
+      EXPECT_EQ(stream.references, 1u);
+      handler_ = dll_.CreateInstance<IPropertyStore>(kind.clsid, IID_IPropertyStore);
+    };
+    PROPVARIANT value{};
+    const auto read = [&] { return handler_->GetValue(kDimensionsKey, &value); };
+    const auto check = [&] { EXPECT_EQ(TakeValue(value).type, VT_LPWSTR); };
+    Try({make,
+         initialize,
+         [&] {
+           EXPECT_EQ(read(), S_OK);
+           check();
+         },
+         {kThrew}});
+    Try({[&] {
+           make();
+           EXPECT_EQ(initialize(), S_OK);
+         },
+         read,
+         check,
+         {kThrew, kNoMemory}});
+    EXPECT_EQ(stream.references, 1u);
+  }
+}
+
+/// A DLL that was never asked for the class object, as it is kept.
+TEST(FreshDllOutOfMemory, WhileAClassObjectIsMade) {
+  for (const Then then : {Then::kRecovers, Then::kStaysEmpty}) {
+    bool failed = true;
+    for (int number = 0; failed; ++number) {
+      const ServerDll dll;
+      const ScarceSystem system(dll.module());
+      ComPtr<IClassFactory> factory;
+      failed = FailOnce({[] {},
+                         [&] {
+                           return dll.GetClassObject(kShellExtClass, IID_IClassFactory,
+                                                     reinterpret_cast<void**>(factory.Put()));
+                         },
+                         [&] { EXPECT_EQ(References(factory), 1u); },
+                         {kNoMemory}},
+                        number, then);
+      factory = {};
+      EXPECT_EQ(dll.CanUnloadNow(), S_OK);
+    }
+  }
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,0 +1,102 @@
+#include "scarce_system.h"
+
+#include <objidl.h>
+#include <oleauto.h>
+#include <propidl.h>
+#include <shlobj.h>
+#include <shlwapi.h>
+
+#include <cstdlib>
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+constexpr std::int64_t kNever = -1;
+std::int64_t g_untilFailure = kNever;
+bool g_staysEmpty = false;
+bool g_failed = false;
+
+bool IsToFail() {
+  if (g_failed && g_staysEmpty) return true;
+  if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
+  g_failed = true;
+  return true;
+}
+
+/// Calls the function itself, or answers `kFailure` without it.
+template <auto kFunction, auto kFailure, class Result, class... Arguments>
+Result Scarce(Arguments... arguments) {
+  return IsToFail() ? static_cast<Result>(kFailure) : kFunction(arguments...);
+}
+
+template <auto kFunction, auto kFailure, class Result, class... Arguments>
+ImportPatch Patch(HMODULE module, const char* name, Result (*)(Arguments...)) {
+  return {module, name, &Scarce<kFunction, kFailure, Result, Arguments...>};
+}
+
+/// The task allocator, which may have no more.
+class ScarceAllocator final : public IMalloc {
+ public:
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void**) override { return E_NOINTERFACE; }
+  ULONG STDMETHODCALLTYPE AddRef() override { return 1; }
+  ULONG STDMETHODCALLTYPE Release() override { return 1; }
+  void* STDMETHODCALLTYPE Alloc(SIZE_T size) override { return IsToFail() ? nullptr : CoTaskMemAlloc(size); }
+  void* STDMETHODCALLTYPE Realloc(void* block, SIZE_T size) override {
+    return IsToFail() ? nullptr : CoTaskMemRealloc(block, size);
+  }
+  void STDMETHODCALLTYPE Free(void* block) override { CoTaskMemFree(block); }
+  SIZE_T STDMETHODCALLTYPE GetSize(void*) override { return static_cast<SIZE_T>(-1); }
+  int STDMETHODCALLTYPE DidAlloc(void*) override { return -1; }
+  void STDMETHODCALLTYPE HeapMinimize() override {}
+};
+
+HRESULT WINAPI GiveScarceAllocator(IMalloc** allocator) {
+  static ScarceAllocator scarce;
+  *allocator = IsToFail() ? nullptr : &scarce;
+  return *allocator != nullptr ? S_OK : E_OUTOFMEMORY;
+}
+
+BOOL WINAPI MakeScarceSection(CRITICAL_SECTION* section, DWORD spinCount) {
+  if (!IsToFail()) return InitializeCriticalSectionAndSpinCount(section, spinCount);
+  SetLastError(ERROR_OUTOFMEMORY);
+  return FALSE;
+}
+
+HBITMAP WINAPI MakeScarceBitmap(HDC dc, const BITMAPINFO* info, UINT usage, void** bits, HANDLE section,
+                                DWORD offset) {
+  if (!IsToFail()) return CreateDIBSection(dc, info, usage, bits, section, offset);
+  *bits = nullptr;
+  return nullptr;
+}
+
+}  // namespace
+
+ScarceSystem::ScarceSystem(HMODULE module)
+    : patches_{Patch<&std::malloc, nullptr>(module, "malloc", &std::malloc),
+               Patch<&std::calloc, nullptr>(module, "calloc", &std::calloc),
+               Patch<&std::realloc, nullptr>(module, "realloc", &std::realloc),
+               Patch<&SysAllocString, nullptr>(module, "SysAllocString", &SysAllocString),
+               Patch<&SHStrDupW, E_OUTOFMEMORY>(module, "SHStrDupW", &SHStrDupW),
+               Patch<&PropVariantCopy, E_OUTOFMEMORY>(module, "PropVariantCopy", &PropVariantCopy),
+               ImportPatch(module, "SHGetMalloc", &GiveScarceAllocator),
+               ImportPatch(module, "InitializeCriticalSectionAndSpinCount", &MakeScarceSection),
+               ImportPatch(module, "CreateDIBSection", &MakeScarceBitmap)} {}
+
+ScarceSystem::~ScarceSystem() {
+  Recover();
+}
+
+void ScarceSystem::FailAt(std::int64_t request, Then then) {
+  g_untilFailure = request;
+  g_staysEmpty = then == Then::kStaysEmpty;
+  g_failed = false;
+}
+
+bool ScarceSystem::Recover() {
+  const bool failed = g_failed;
+  g_untilFailure = kNever;
+  g_failed = false;
+  return failed;
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Testing
