@@ -325,6 +325,7 @@ TEST_F(ShellExtObject, LetsTheExceptionsOfReadersThrough) {
   EXPECT_THROW(object.Load(folder_.Write("bad.emi", emi.Bytes())), std::invalid_argument);
 
   SerFile ser;
+  ser.elements.resize(1);
   ser.dimensions[0].unitsLength = -1;
   const ShellExt other(dll_);
   EXPECT_THROW(other.Load(folder_.Write("bad.ser", ser.Bytes())), std::length_error);
