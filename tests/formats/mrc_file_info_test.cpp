@@ -306,6 +306,16 @@ TEST(MrcThumbnail, PositionOfASectionWrapsAt32Bits) {
   EXPECT_NE(SparseStack(2 * 0x10001).Thumbnail(), first);
 }
 
+TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
+  const auto width = [](std::int32_t mode, std::int32_t nx, std::int32_t ny) {
+    const MrcFile file{.nx = nx, .ny = ny, .mode = mode, .pixels = std::string(256, 'x')};
+    return OpenMrc(file).Thumbnail({256, 256}).width;
+  };
+  EXPECT_EQ(width(0, 1, 256), 1);
+  EXPECT_EQ(width(0, 0x1000001, 256), 0);  // 2^32 + 256 pixels
+  EXPECT_EQ(width(2, 0x1000001, 64), 0);   // 2^30 + 64 pixels, 2^32 + 256 bytes
+}
+
 TEST(MrcThumbnail, HugeSectionsHaveNone) {
   MrcFile file = Stack(1);
   for (const std::int32_t mode : {0, 1, 2, 3, 4, 6, 16}) {
