@@ -69,9 +69,10 @@ HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info) {
   return S_OK;
 }
 
-HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA& item, VARIANT* value) {
+HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* value) {
   if (column.fmtid != kImageSummarySet && column.fmtid != kSummarySet) return S_FALSE;
-  const std::optional<Metadatum> found = FindInFile(PathOf(item), column);
+  if (item == nullptr) return E_POINTER;
+  const std::optional<Metadatum> found = FindInFile(PathOf(*item), column);
   if (!found) return S_FALSE;
   if (value == nullptr) return E_POINTER;
   if (const HRESULT result = VariantClear(value); FAILED(result)) return result;

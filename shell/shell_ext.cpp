@@ -49,8 +49,7 @@ HRESULT CShellExt::GetColumnInfo(DWORD index, SHCOLUMNINFO* info) {
 }
 
 HRESULT CShellExt::GetItemData(LPCSHCOLUMNID column, LPCSHCOLUMNDATA item, VARIANT* value) {
-  if (column == nullptr || item == nullptr) return E_POINTER;
-  return ReadColumn(*column, *item, value);
+  return column != nullptr ? ReadColumn(*column, item, value) : E_POINTER;
 }
 
 HRESULT CShellExt::Open(REFFMTID set, DWORD, IPropertyStorage** storage) {

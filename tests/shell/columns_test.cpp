@@ -264,6 +264,9 @@ TEST_F(Columns, SurviveNullArguments) {
   EXPECT_EQ(provider_->GetColumnInfo(0, nullptr), E_POINTER);
   EXPECT_EQ(provider_->GetItemData(nullptr, &item, &value), E_POINTER);
   EXPECT_EQ(provider_->GetItemData(&kWidthKey, nullptr, &value), E_POINTER);
+  // For the properties of another set there is no need to look at a file.
+  const PROPERTYKEY other{kOtherSet, 3};
+  EXPECT_EQ(provider_->GetItemData(&other, nullptr, nullptr), S_FALSE);
 }
 
 TEST_F(Columns, ReadAPathThatFillsItsRoom) {
