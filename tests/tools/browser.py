@@ -121,10 +121,6 @@ class Tab:
         """The browser's own counts of what it has made and done for the page, by name."""
         return {metric["name"]: metric["value"] for metric in self.call("Performance.getMetrics")["metrics"]}
 
-    def screenshot(self):
-        """The bytes of a PNG image of what is in sight."""
-        return self.call("Page.captureScreenshot", format="png")["data"]
-
     def press(self, *keys):
         """Presses and releases keys: characters, or names such as "Enter"."""
         codes = {"Enter": 13, "Escape": 27, "Tab": 9, "ArrowLeft": 37, "ArrowUp": 38, "ArrowRight": 39,
