@@ -1,6 +1,8 @@
 // The tables of docs/formats.md against the readers and the writers of the tests; the current folder is docs.
 #include <gtest/gtest.h>
 
+#include <bit>
+#include <exception>
 #include <fstream>
 #include <map>
 #include <sstream>
@@ -8,6 +10,7 @@
 #include <vector>
 
 #include "byte_order.h"
+#include "data_type.h"
 #include "ebn_file.h"
 #include "ebn_file_info.h"
 #include "emi_file.h"
@@ -40,12 +43,12 @@ Row Cells(const std::string& line) {
   return cells;
 }
 
-/// The rows of the table in section `section` whose first column is called `column`.
+/// The rows of the table in section `section`, or before all sections, whose first column is called `column`.
 Table Documented(const std::string& section, const std::string& column) {
   std::ifstream file("formats.md");
   EXPECT_TRUE(file.is_open());
   Table table;
-  bool inSection = false;
+  bool inSection = section.empty();
   bool inTable = false;
   for (std::string line; std::getline(file, line);) {
     if (line.ends_with('\r')) line.pop_back();
@@ -60,6 +63,16 @@ Table Documented(const std::string& section, const std::string& column) {
 
 int Number(const std::string& text) {
   return std::stoi(text, nullptr, 0);
+}
+
+std::vector<std::string> Split(std::string text, const std::string& separator) {
+  std::vector<std::string> parts;
+  for (std::size_t end; (end = text.find(separator)) != std::string::npos;) {
+    parts.push_back(text.substr(0, end));
+    text.erase(0, end + separator.size());
+  }
+  parts.push_back(text);
+  return parts;
 }
 
 std::wstring Wide(const std::string& text) {
@@ -98,12 +111,92 @@ void ExpectFields(const Table& table, const std::string& bytes, const Fields& fi
   }
 }
 
+/// Numbers that a documented rule accepts and numbers that it does not, as near to each other as can be.
+struct Samples {
+  std::vector<int> accepted;
+  std::vector<int> rejected;
+};
+
+/// Rules are "7", "7 or 9", "7 to 9", "at least 7" and "at most 7".
+Samples SamplesOf(const std::string& rule) {
+  if (rule.starts_with("at least ")) {
+    const int least = Number(rule.substr(9));
+    return {{least}, {least - 1}};
+  }
+  if (rule.starts_with("at most ")) {
+    const int most = Number(rule.substr(8));
+    return {{most, most - 1}, {most + 1}};
+  }
+  if (const auto ends = Split(rule, " to "); ends.size() == 2) {
+    return {{Number(ends[0]), Number(ends[1])}, {Number(ends[0]) - 1, Number(ends[1]) + 1}};
+  }
+  Samples samples;
+  for (const std::string& value : Split(rule, " or ")) {
+    samples.accepted.push_back(Number(value));
+    samples.rejected.push_back(Number(value) - 1);
+    samples.rejected.push_back(Number(value) + 1);
+  }
+  return samples;
+}
+
+/// Bytes as a writer, for OpenFile.
+struct PlainFile {
+  std::string bytes;
+
+  std::string Bytes() const { return bytes; }
+};
+
+/// The file with `value` in the field, which is an integer.
+PlainFile WithField(std::string bytes, const Row& field, int value) {
+  const std::string& type = field[1];
+  const std::size_t size =
+      static_cast<std::size_t>(std::stoi(type.substr(type.find_first_of("0123456789")))) / 8;
+  for (std::size_t i = 0; i < size; ++i) {
+    bytes.at(static_cast<std::size_t>(Number(field[0])) + i) = static_cast<char>(value >> (8 * i));
+  }
+  return {bytes};
+}
+
+/// Whether the reader accepts in a good file what is said to be accepted in a field, and nothing else.
+/// `count` is the number of fields with a rule.
+template <class Reader, class File, class... Arguments>
+void ExpectRules(const Table& table, std::size_t count, const File& good, const Arguments&... arguments) {
+  std::size_t rules = 0;
+  for (const Row& row : table) {
+    if (row[3].empty()) continue;
+    ++rules;
+    const Samples samples = SamplesOf(row[3]);
+    for (const int value : samples.accepted) {
+      const PlainFile file = WithField(good.Bytes(), row, value);
+      EXPECT_TRUE(OpenFile<Reader>(file, arguments...)->IsValid()) << row[2] << " " << value;
+    }
+    for (const int value : samples.rejected) {
+      const PlainFile file = WithField(good.Bytes(), row, value);
+      EXPECT_FALSE(OpenFile<Reader>(file, arguments...)->IsValid()) << row[2] << " " << value;
+    }
+  }
+  EXPECT_EQ(rules, count);
+}
+
 /// Whether the reader of a file with one of the documented types answers its bits and its name.
 template <class Reader>
 void ExpectType(const OpenFile<Reader>& file, const std::string& bits, const std::string& name) {
   EXPECT_TRUE(file->IsValid()) << name;
   EXPECT_EQ(file->GetBitDepth(), Number(bits)) << name;
   EXPECT_EQ(file->GetDataTypeName(), Wide(name));
+}
+
+TEST(DocumentedNames, HaveTheirBits) {
+  std::map<std::wstring, int> bits = {{L"32 bit complex integer", 32}};  // of MRC files only
+  for (std::uint32_t value = 0; value < 32; ++value) {
+    const auto type = static_cast<DataType>(value);
+    if (BitsPerPixel(type) > 0) bits[DataTypeName(type)] = BitsPerPixel(type);
+  }
+  std::map<std::wstring, int> documented;
+  for (const Row& row : Documented("", "Name")) {
+    for (const std::string& name : Split(row[0], ", ")) documented[Wide(name)] = Number(row[1]);
+  }
+  EXPECT_EQ(documented, bits);
 }
 
 TEST(DocumentedMrc, FieldsAreWhereTheyAre) {
@@ -123,6 +216,10 @@ TEST(DocumentedMrc, FieldsAreWhereTheyAre) {
                 {"next", Value(*file.next)},
                 {"nlabl", Value(*file.nlabl)},
                 {"label", file.labels[0]}});
+}
+
+TEST(DocumentedMrc, RulesAreKept) {
+  ExpectRules<MrcFileInfo>(Documented("MRC", "Offset"), 4, MrcFile{}, std::wstring(L"mrc"));
 }
 
 TEST(DocumentedMrc, TypesAreWhatTheyAre) {
@@ -158,6 +255,10 @@ TEST(DocumentedRaw, FieldsAreWhereTheyAre) {
                 {"rowStride", Value(file.rowStride)}});
 }
 
+TEST(DocumentedRaw, RulesAreKept) {
+  ExpectRules<RawFileInfo>(Documented("RAW", "Offset"), 2, RawFile{});
+}
+
 TEST(DocumentedRaw, TypesAreWhatTheyAre) {
   const Table table = Documented("RAW", "Value class");
   EXPECT_EQ(table.size(), 12u);
@@ -190,6 +291,10 @@ TEST(DocumentedEbn, FieldsAreWhereTheyAre) {
                 {"lens", Value(file.lens)},
                 {"dNumber", Value(file.dNumber)},
                 {"kilovolts", Value(file.kilovolts)}});
+}
+
+TEST(DocumentedEbn, RulesAreKept) {
+  ExpectRules<EbnFileInfo>(Documented("EBN", "Offset"), 4, EbnFile{});
 }
 
 TEST(DocumentedEbn, TypesAreWhatTheyAre) {
@@ -248,6 +353,12 @@ TEST(DocumentedSer, FieldsAreWhereTheyAre) {
                 {"dimensionCount", Value(*file.dimensionCount)}});
 }
 
+TEST(DocumentedSer, RulesAreKept) {
+  SerFile file;
+  file.elements.resize(1);
+  ExpectRules<SerFileInfo>(Documented("SER", "Offset"), 6, file);
+}
+
 TEST(DocumentedSer, FieldsOfImagesAreWhereTheyAre) {
   Testing::SerElement element;
   element.calibrationX = {11.5, 12.5, 13};
@@ -285,20 +396,45 @@ TEST(DocumentedEmi, FieldsAreWhereTheyAre) {
       {{"magic", Value(file.magic)}, {"version", Value(file.version)}, {"ignored", Value(file.ignored)}});
 }
 
+TEST(DocumentedEmi, RulesAreKept) {
+  ExpectRules<EmiFileInfo>(Documented("EMI", "Offset"), 2, OneImageEmiFile(0x2200, 1, 1, "x"));
+}
+
+/// The number of images that are found when an image is the next item after `item`, three deep.
+int ImagesBehind(const std::string& item) {
+  const std::string items = EmiStructure(0x4000, 1, EmiStructure(0x4000, 1, item + EmiImageObject("")));
+  return OpenFile<EmiFileInfo>(EmiFile{.items = items})->GetFrameCount();
+}
+
 TEST(DocumentedEmi, ValuesAreAsLongAsTheyAre) {
-  int types = 0;
+  std::size_t scalars = 0;
+  std::map<std::string, std::uint16_t> others;
   for (const Row& row : Documented("EMI", "Type of an item")) {
-    if (row[1].empty()) continue;
-    std::istringstream list(row[0]);
-    for (std::string type; std::getline(list, type, ','); ++types) {
+    if (row[1].empty()) {
+      others[row[2].substr(0, row[2].find_first_of(":,"))] =
+          static_cast<std::uint16_t>(Number(row[0].substr(row[0].find("0x"))));
+      continue;
+    }
+    for (const std::string& type : Split(row[0], ", ")) {
       const std::string value(static_cast<std::size_t>(Number(row[1])), '\xFF');
-      const std::string item = EmiScalar(static_cast<std::uint16_t>(Number(type)), 1, value);
-      // Any other length would lead past the image or end the list before it.
-      const std::string items = EmiStructure(0x4000, 1, EmiStructure(0x4000, 1, item)) + EmiImageObject("");
-      EXPECT_EQ(OpenFile<EmiFileInfo>(EmiFile{.items = items})->GetFrameCount(), 1) << type;
+      EXPECT_EQ(ImagesBehind(EmiScalar(static_cast<std::uint16_t>(Number(type)), 1, value)), 1) << type;
+      ++scalars;
     }
   }
-  EXPECT_EQ(types, 10);
+  EXPECT_EQ(scalars, 10u);
+
+  ASSERT_EQ(others.size(), 3u);
+  const std::uint16_t text = others["a text"];
+  EXPECT_EQ(ImagesBehind(EmiArray(text, 1, "\xFF\xFF\xFF")), 1);
+  // A text at the top is an error, which tells it from other items.
+  EXPECT_THROW(OpenFile<EmiFileInfo>(EmiFile{.items = EmiArray(text, 1, "x")}), std::exception);
+  const std::uint16_t bit = others["an array"];
+  EXPECT_TRUE(std::has_single_bit(bit));
+  EXPECT_EQ(ImagesBehind(EmiArray(bit, 1, "\xFF\xFF\xFF")), 1);
+  EXPECT_EQ(ImagesBehind(EmiArray(bit | 0x4001, 1, "\xFF\xFF\xFF")), 1);
+  EXPECT_EQ(others["a list of items"], bit);
+  const auto list = static_cast<std::uint16_t>(~bit);
+  EXPECT_EQ(ImagesBehind(EmiStructure(list, 1, EmiImageObject(""))), 2);
 }
 
 TEST(DocumentedEmi, TypesAreWhatTheyAre) {
