@@ -76,6 +76,37 @@ TEST(ReleaseDll, IsProtectedAgainstOverrunsOfTheStack) {
   EXPECT_NE(bytes.find("stack smashing detected"), std::string::npos);
 }
 
+/// A text of the version resource.
+std::wstring VersionText(const std::vector<char>& resource, const std::wstring& name) {
+  void* text = nullptr;
+  UINT length = 0;
+  VerQueryValueW(resource.data(), (L"\\StringFileInfo\\040904B0\\" + name).c_str(), &text, &length);
+  return text == nullptr ? L"" : static_cast<const wchar_t*>(text);
+}
+
+TEST(ReleaseDll, TellsItsProductDescriptionAndVersion) {
+  const std::wstring path = ServerDll::Path().wstring();
+  std::vector<char> resource(GetFileVersionInfoSizeW(path.c_str(), nullptr));
+  ASSERT_TRUE(GetFileVersionInfoW(path.c_str(), 0, static_cast<DWORD>(resource.size()), resource.data()));
+  EXPECT_EQ(VersionText(resource, L"ProductName"), L"QelShellExt");
+  EXPECT_EQ(VersionText(resource, L"FileDescription"),
+            L"Thumbnails and properties of electron-microscopy images");
+  EXPECT_EQ(VersionText(resource, L"OriginalFilename"), L"QelShellExt.DLL");
+  EXPECT_EQ(VersionText(resource, L"ProductVersion"), L"" QEL_VERSION);
+  EXPECT_EQ(VersionText(resource, L"FileVersion"), L"" QEL_VERSION);
+
+  void* numbers = nullptr;
+  UINT length = 0;
+  ASSERT_TRUE(VerQueryValueW(resource.data(), L"\\", &numbers, &length));
+  const auto& fixed = *static_cast<const VS_FIXEDFILEINFO*>(numbers);
+  EXPECT_EQ(std::to_string(HIWORD(fixed.dwFileVersionMS)) + "." +
+                std::to_string(LOWORD(fixed.dwFileVersionMS)) + "." +
+                std::to_string(HIWORD(fixed.dwFileVersionLS)),
+            QEL_VERSION);
+  EXPECT_EQ(fixed.dwProductVersionMS, fixed.dwFileVersionMS);
+  EXPECT_EQ(fixed.dwProductVersionLS, fixed.dwFileVersionLS);
+}
+
 TEST(ReleaseDll, CarriesNoTimeOfItsBuild) {
   EXPECT_EQ(PortableExecutable::Read(ServerDll::Path()).timeStamp, 0u);
 }

@@ -1,7 +1,8 @@
-# Builds the DLL from a copy of the sources in another folder and compares the two byte by byte.
+# Builds the DLL from a copy of the sources in another folder, one with a name that is hard on tools, and
+# compares the two byte by byte.
 #
 # cmake -D SOURCE=FOLDER -D DLL=FILE -D WORK=FOLDER -P reproducible_test.cmake
-set(copy "${WORK}/a/folder of another name")
+set(copy "${WORK}/a/copy's folder & (ä Ω 樹)")
 set(build ${WORK}/build)
 file(REMOVE_RECURSE ${WORK})
 file(COPY ${SOURCE}/ DESTINATION "${copy}" PATTERN build EXCLUDE PATTERN .git EXCLUDE)
