@@ -1,0 +1,204 @@
+// Files that change under the release DLL: at every single read another program appends to the file, cuts it
+// short, writes over it, deletes it or takes it away. There is a thumbnail or a refusal, the object goes on
+// to answer, and a new one shows the file as it is then.
+#include <gtest/gtest.h>
+#include <io.h>
+#include <windows.h>
+
+#include <shlobj.h>
+
+#include <cerrno>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <string>
+
+#include "bitmap_pixels.h"
+#include "import_patch.h"
+#include "mrc_file.h"
+#include "server_dll.h"
+#include "shell_values.h"
+#include "temp_folder.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+/// What another program does before the read of the DLL that has this number, counted from 0.
+std::function<void()> g_interrupt;
+int g_interruptedRead = -1;
+bool g_readFails = false;
+int g_reads = 0;
+
+int InterruptedRead(int file, void* bytes, unsigned int count) {
+  if (g_reads++ == g_interruptedRead) {
+    if (g_interrupt) g_interrupt();
+    if (g_readFails) {
+      errno = EACCES;
+      return -1;
+    }
+  }
+  return _read(file, bytes, count);
+}
+
+/// A frame that takes several reads.
+std::string FrameBytes(char pixel = 'p') {
+  MrcFile file;
+  file.nx = 700;
+  file.ny = 600;
+  file.mode = 1;
+  file.labels = {"a label"};
+  file.pixels.assign(700 * 600 * 2, pixel);
+  for (std::size_t i = 0; i < file.pixels.size(); i += 999) file.pixels[i] = static_cast<char>(i / 999);
+  return file.Bytes();
+}
+
+class ChangingFile : public ServerTest {
+ protected:
+  struct Answers {
+    HRESULT extract = E_FAIL;
+    BitmapPixels picture;
+  };
+
+  /// What an object says that loads the file and shows it, while `interrupt` happens at the read `number`. It
+  /// is asked for everything else afterwards.
+  Answers Ask(int number = -1, std::function<void()> interrupt = {}, bool readFails = false) {
+    g_reads = 0;
+    g_interruptedRead = number;
+    g_interrupt = std::move(interrupt);
+    g_readFails = readFails;
+    const auto object = dll_.CreateInstance<IExtractImage>(kShellExtClass, IID_IExtractImage);
+    EXPECT_EQ(As<IPersistFile>(object, IID_IPersistFile)->Load(path_.c_str(), STGM_READ), S_OK);
+    const Answers answers = Extract(object);
+    reads_ = g_reads;
+    g_interruptedRead = -1;
+
+    // The object is in order, whatever has become of its file.
+    const Answers again = Extract(object);
+    if (answers.extract == E_FAIL) {
+      EXPECT_EQ(again.extract, E_FAIL);
+    }
+    wchar_t* tip = nullptr;
+    const HRESULT tipResult = As<IQueryInfo>(object, IID_IQueryInfo)->GetInfoTip(QITIPF_DEFAULT, &tip);
+    EXPECT_EQ(tipResult, again.extract);
+    CoTaskMemFree(tip);
+    EXPECT_EQ(References(object), 0u);
+    return answers;
+  }
+
+  static Answers Extract(const ComPtr<IExtractImage>& object) {
+    HBITMAP bitmap = nullptr;
+    const HRESULT result = object->Extract(&bitmap);
+    EXPECT_TRUE(result == S_OK || (result == E_FAIL && bitmap == nullptr));
+    return {result, TakeBitmap(bitmap)};
+  }
+
+  void Write(const std::string& bytes) {
+    std::ofstream(path_, std::ios_base::binary | std::ios_base::trunc) << bytes;
+  }
+
+  /// Does `interrupt` at every read and lets `check` see what came of it. The file is whole before, and
+  /// afterwards nobody holds it open.
+  template <class Check>
+  void InterruptEveryRead(const std::function<void()>& interrupt, bool readFails, const Check& check) {
+    Write(whole_);
+    Ask();
+    const int reads = reads_;
+    ASSERT_GT(reads, 4);
+    for (int number = 0; number < reads; ++number) {
+      SCOPED_TRACE("read " + std::to_string(number));
+      Write(whole_);
+      check(Ask(number, interrupt, readFails));
+      Write(whole_);
+      EXPECT_TRUE(IsUnused());
+      EXPECT_EQ(dll_.LockCount(), 0);
+    }
+    EXPECT_EQ(Ask().picture, picture_);
+  }
+
+  bool IsUnused() const {
+    const HANDLE file = CreateFileW(path_.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
+    if (file == INVALID_HANDLE_VALUE) return false;
+    CloseHandle(file);
+    return true;
+  }
+
+  static void ExpectAThumbnailOrNone(const Answers& answers) {
+    EXPECT_EQ(answers.picture == BitmapPixels(), answers.extract != S_OK);
+  }
+
+  const ImportPatch reading_{dll_.module(), "_read", &InterruptedRead};
+  const TempFolder folder_;
+  const std::string whole_ = FrameBytes();
+  const std::filesystem::path path_ = folder_.Write("frame.mrc", whole_);
+  int reads_ = 0;
+  const BitmapPixels picture_ = Ask().picture;
+};
+
+TEST_F(ChangingFile, ThatIsAppendedToShowsTheSame) {
+  InterruptEveryRead([&] { std::ofstream(path_, std::ios_base::binary | std::ios_base::app) << whole_; },
+                     false, [&](const Answers& answers) { EXPECT_EQ(answers.picture, picture_); });
+}
+
+TEST_F(ChangingFile, ThatIsDeletedShowsTheSame) {
+  InterruptEveryRead([&] { EXPECT_TRUE(std::filesystem::remove(path_)); }, false,
+                     [&](const Answers& answers) { EXPECT_EQ(answers.picture, picture_); });
+}
+
+TEST_F(ChangingFile, ThatIsCutShortIsRefusedOrWasReadBefore) {
+  for (const std::size_t length :
+       {std::size_t{0}, std::size_t{1}, std::size_t{1024}, whole_.size() / 2, whole_.size() - 1}) {
+    int refusals = 0;
+    InterruptEveryRead([&] { std::filesystem::resize_file(path_, length); }, false,
+                       [&](const Answers& answers) {
+                         ExpectAThumbnailOrNone(answers);
+                         if (answers.extract == E_FAIL) ++refusals;
+                       });
+    EXPECT_GT(refusals, 0) << length;
+  }
+}
+
+TEST_F(ChangingFile, ThatIsWrittenOverShowsOldOrNewPixels) {
+  const std::string other = FrameBytes('q');
+  InterruptEveryRead(
+      [&] { std::fstream(path_, std::ios_base::binary | std::ios_base::in | std::ios_base::out) << other; },
+      false,
+      [&](const Answers& answers) {
+        EXPECT_EQ(answers.extract, S_OK);
+        EXPECT_EQ(answers.picture.width, picture_.width);
+      });
+}
+
+TEST_F(ChangingFile, ThatCannotBeReadAnyMoreIsRefused) {
+  // As where another program locks a part of it, or the medium is gone.
+  InterruptEveryRead({}, true, [&](const Answers& answers) { EXPECT_EQ(answers.extract, E_FAIL); });
+}
+
+TEST_F(ChangingFile, ThatAnotherProgramHasForItselfIsRefusedUntilItLetsGo) {
+  const HANDLE own =
+      CreateFileW(path_.c_str(), GENERIC_READ | GENERIC_WRITE, 0, nullptr, OPEN_EXISTING, 0, nullptr);
+  ASSERT_NE(own, INVALID_HANDLE_VALUE);
+  EXPECT_EQ(Ask().extract, E_FAIL);
+  const auto columns = dll_.CreateInstance<IColumnProvider>(kShellExtClass, IID_IColumnProvider);
+  SHCOLUMNDATA item{};
+  path_.native().copy(item.wszFile, std::size(item.wszFile) - 1);
+  VARIANT value{};
+  EXPECT_EQ(columns->GetItemData(&kWidthKey, &item, &value), S_FALSE);
+  CloseHandle(own);
+  EXPECT_EQ(columns->GetItemData(&kWidthKey, &item, &value), S_OK);
+  EXPECT_EQ(TakeValue(value), Number(VT_I4, 700));
+  EXPECT_EQ(Ask().picture, picture_);
+}
+
+TEST_F(ChangingFile, ThatIsStillBeingWrittenIsShownWhenItIsWhole) {
+  constexpr std::size_t kPiece = 100'000;
+  std::filesystem::resize_file(path_, 0);
+  std::ofstream writer(path_, std::ios_base::binary);
+  for (std::size_t written = 0; written < whole_.size(); written += kPiece) {
+    EXPECT_EQ(Ask().extract, E_FAIL) << written;
+    writer << whole_.substr(written, kPiece) << std::flush;
+  }
+  EXPECT_EQ(Ask().picture, picture_);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing
