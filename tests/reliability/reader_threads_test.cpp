@@ -1,0 +1,69 @@
+// Readers share nothing: as many threads as there are may read files of every kind at once. Built with
+// ThreadSanitizer too (preset linux-tsan).
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <istream>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "ask_everything.h"
+#include "memory_buffer.h"
+#include "sample_files.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+struct Question {
+  std::wstring extension;
+  std::string bytes;
+};
+
+std::vector<Question> EveryQuestion() {
+  std::vector<Question> questions;
+  for (const std::string kind : kFileKinds) {
+    for (const SampleFile& sample : SampleFiles(kind)) {
+      questions.push_back({{kind.begin(), kind.end()}, sample.bytes});
+    }
+  }
+  return questions;
+}
+
+/// The sum over the bitmaps of every file, beginning with file number `first`.
+std::vector<std::uint64_t> AskAll(const std::vector<Question>& questions, std::size_t first) {
+  std::vector<std::uint64_t> sums(questions.size());
+  for (std::size_t i = 0; i < questions.size(); ++i) {
+    const std::size_t number = (first + i) % questions.size();
+    MemoryBuffer buffer(questions[number].bytes);
+    std::istream stream(&buffer);
+    const Answers answers = AskEverything(stream, questions[number].extension);
+    EXPECT_TRUE(answers.valid);
+    sums[number] = answers.bitmapSum;
+  }
+  return sums;
+}
+
+TEST(ReaderThreads, GiveTheAnswersOfOne) {
+  constexpr std::size_t kThreads = 8;
+  const std::vector<Question> questions = EveryQuestion();
+  std::vector<std::vector<std::uint64_t>> sums(kThreads);
+  std::atomic<bool> go = false;
+  std::vector<std::thread> threads;
+  for (std::size_t i = 0; i < kThreads; ++i) {
+    threads.emplace_back([&, i] {
+      while (!go) std::this_thread::yield();
+      sums[i] = AskAll(questions, i * questions.size() / kThreads);
+    });
+  }
+  go = true;
+  for (std::thread& thread : threads) thread.join();
+  // Asked last, so that what is made on first use is made by threads that want it at once.
+  const auto alone = AskAll(questions, 0);
+  for (const auto& sum : sums) EXPECT_EQ(sum, alone);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing
