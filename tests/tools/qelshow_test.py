@@ -22,26 +22,26 @@ COMMANDS = ("info", "thumbnail", "page", "doctor")
 DONE, FAILED, USAGE, UNSUPPORTED, DAMAGED = range(5)
 
 
-def run(*arguments, server=SERVER, folder=None):
+def run(*arguments, server=SERVER, folder=None, program=QELSHOW):
     """Runs qelshow; the answer has its exit status, and its output as text."""
-    result = run_for_bytes(*arguments, server=server, folder=folder)
+    result = run_for_bytes(*arguments, server=server, folder=folder, program=program)
     result.stdout = result.stdout.decode("utf-8")
     return result
 
 
-def run_for_bytes(*arguments, server=SERVER, folder=None):
+def run_for_bytes(*arguments, server=SERVER, folder=None, program=QELSHOW):
     """Runs qelshow; the answer has its exit status, standard output as bytes and standard error as text."""
     # Files, as pipes would be kept open by a desktop that Wine starts and that lives a second longer.
     with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
-        process = start(*arguments, server=server, cwd=folder, stdout=out, stderr=errors)
+        process = start(*arguments, server=server, program=program, cwd=folder, stdout=out, stderr=errors)
         process.wait()
         out.seek(0)
         errors.seek(0)
         return subprocess.CompletedProcess(process.args, process.returncode, out.read(), errors.read().decode("utf-8"))
 
 
-def start(*arguments, server=SERVER, **options):
-    command = [EMULATOR, QELSHOW, *map(str, arguments), *(["--server", server] if server else [])]
+def start(*arguments, server=SERVER, program=QELSHOW, **options):
+    command = [EMULATOR, program, *map(str, arguments), *(["--server", server] if server else [])]
     return subprocess.Popen(command, stdin=subprocess.DEVNULL, env=os.environ | {"LC_ALL": "C.UTF-8"}, **options)
 
 
@@ -512,7 +512,8 @@ class Doctor(Test):
 
     @staticmethod
     def wine(*command):
-        subprocess.run([EMULATOR, *map(str, command)], check=True, capture_output=True, stdin=subprocess.DEVNULL)
+        subprocess.run([EMULATOR, *map(str, command)], check=True, stdin=subprocess.DEVNULL,
+                       stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
 
     @classmethod
     def register(cls, *options, dll=SERVER):
@@ -612,8 +613,7 @@ class Doctor(Test):
         self.assertEqual(document["files"][0]["verdict"], "failed")
         self.assertOneSentence(document["files"][0]["problem"], "not registered")
         alone = self.write("alone/qelshow.exe", pathlib.Path(QELSHOW).read_bytes())
-        result = subprocess.run([EMULATOR, alone, "doctor"], capture_output=True, encoding="utf-8",
-                                stdin=subprocess.DEVNULL)
+        result = run("doctor", server=None, program=alone)
         self.assertEqual(result.returncode, FAILED)
         self.assertIn("with the path of QelShellExt.dll", result.stdout)
 
