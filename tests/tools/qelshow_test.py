@@ -668,6 +668,18 @@ class Doctor(Test):
             (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store"),
              (".mrc", "thumbnail"), (".mrc", "properties"), (".raw", "property store")), "not registered"))
 
+    def test_sees_that_a_class_is_disabled(self):
+        blocked = "Software\\Microsoft\\Windows\\CurrentVersion\\Shell Extensions\\Blocked"
+        keys = [f"{root}\\{blocked}" for root in ("HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER")]
+        self.addCleanup(self.set_registry, dict.fromkeys(keys))
+        self.register()
+        self.set_registry({f"{keys[0]}@{self.RAW_STORE}": "", f"{keys[1]}@{self.MRC_STORE.lower()}": "by me"})
+        document = self.assertProblems((".raw property store", "disabled", self.RAW_STORE, keys[0]),
+                                       (".mrc property store", "disabled", self.MRC_STORE, keys[1]))
+        self.assertWorksBut(document, dict.fromkeys(
+            (".raw property store", (".raw", "property store"), ".mrc property store", (".mrc", "property store")),
+            "disabled"))
+
     def test_names_the_program_that_has_taken_a_handler(self):
         foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"
         self.addCleanup(self.set_registry, {foreign: None})

@@ -74,6 +74,12 @@ ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& wor
     examined.version = FileVersion(dll);
     ExamineObject(examined, workers);
   }
+  const std::wstring& blocked = examined.registered.blocked;
+  if (examined.condition == Condition::kWorks && !blocked.empty()) {
+    examined.condition = Condition::kBlocked;
+    examined.problem = L"The class of the " + examined.name +
+                       L" is disabled in the shell: remove the value " + id + L" from " + blocked + L".";
+  }
   return examined;
 }
 
@@ -144,6 +150,7 @@ const wchar_t* ConditionText(Condition condition) {
     case Condition::kDllNotFound: return L"DLL not found";
     case Condition::kDllNotLoaded: return L"DLL not loaded";
     case Condition::kNoObject: return L"no object";
+    case Condition::kBlocked: return L"disabled";
   }
   return L"";
 }

@@ -13,7 +13,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 
 /// How far the way goes.
-enum class Condition { kWorks, kNotRegistered, kForeign, kDllNotFound, kDllNotLoaded, kNoObject };
+enum class Condition { kWorks, kNotRegistered, kForeign, kDllNotFound, kDllNotLoaded, kNoObject, kBlocked };
 
 /// A few words, for tables and JSON.
 const wchar_t* ConditionText(Condition condition);

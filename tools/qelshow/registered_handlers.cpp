@@ -38,6 +38,19 @@ std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name =
   return text.c_str();
 }
 
+/// The key by which an administrator, the user or a tool of theirs has disabled the class; empty without one.
+std::wstring BlockingKey(const std::wstring& clsid) {
+  constexpr const wchar_t* kBlocked =
+      LR"(Software\Microsoft\Windows\CurrentVersion\Shell Extensions\Blocked)";
+  const auto holds = [&](HKEY root) {
+    return RegGetValueW(root, kBlocked, clsid.c_str(), RRF_RT_ANY, nullptr, nullptr, nullptr) ==
+           ERROR_SUCCESS;
+  };
+  if (holds(HKEY_LOCAL_MACHINE)) return std::wstring(L"HKEY_LOCAL_MACHINE\\") + kBlocked;
+  if (holds(HKEY_CURRENT_USER)) return std::wstring(L"HKEY_CURRENT_USER\\") + kBlocked;
+  return {};
+}
+
 /// The keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, the one that counts most first:
 /// that of the type to which the user, or else a program, has assigned the extension, then its own.
 std::vector<std::wstring> PlacesOfHandlers(const std::wstring& extension) {
@@ -89,7 +102,8 @@ RegisteredClass ReadClass(const std::wstring& clsid) {
   HKEY key = nullptr;
   if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
   RegCloseKey(key);
-  return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32")};
+  return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32"),
+          BlockingKey(clsid)};
 }
 
 std::wstring FileVersion(const std::wstring& path) {

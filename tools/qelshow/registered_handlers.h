@@ -30,7 +30,8 @@ std::vector<KindOfFile> ReadHandlers();
 struct RegisteredClass {
   bool exists = false;
   std::wstring title;
-  std::wstring dll;  // path
+  std::wstring dll;      // path
+  std::wstring blocked;  // the key, if any, that keeps the shell from using the class
 };
 
 RegisteredClass ReadClass(const std::wstring& clsid);
