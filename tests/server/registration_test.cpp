@@ -17,6 +17,7 @@
 #include "registry_reader.h"
 #include "registry_writes.h"
 #include "same_contents.h"
+#include "scarce_system.h"
 #include "temp_folder.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
@@ -236,6 +237,24 @@ TEST_F(Registration, AFailureAtAnyChangeIsRepairedByRegisteringAgainOrCleanedUpB
       }
     }
   }
+}
+
+TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIsSome) {
+  const ScarceSystem system(server_.module());
+  const auto getsPast = [&](int place, ScarceSystem::Then then) {
+    ScarceSystem::FailAt(place, then);
+    const HRESULT result = server_.Register();
+    const bool failed = ScarceSystem::Recover();
+    EXPECT_EQ(result, failed ? E_OUTOFMEMORY : S_OK) << "place " << place;
+    return !failed;
+  };
+  int places = 0;
+  while (!getsPast(places, ScarceSystem::Then::kRecovers) && !HasFailure()) ++places;
+  EXPECT_GT(places, 100);
+  // All that is different when no memory comes back is what happens on the way out.
+  for (int place = 0; place < places; place += 10) getsPast(place, ScarceSystem::Then::kStaysEmpty);
+  ASSERT_EQ(server_.Register(), S_OK);
+  EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
 
 TEST_F(Registration, UnregisteringAgainCompletesAFailureAtAnyChange) {
