@@ -436,13 +436,17 @@ class Page(Test):
         self.assertOneSentence(result.stderr, self.folder / "in")
         self.assertFalse((self.folder / "page").exists())
 
+    def test_of_a_single_file_says_so(self):
+        result = run("page", self.write("a.mrc", mrc()), "--out", self.folder / "page")
+        self.assertTrue(result.stdout.endswith(": 1 thumbnail of 1 file\n"), result.stdout)
+
     def test_that_cannot_be_written_leaves_an_earlier_one_as_it_is(self):
         out = self.folder / "page"
         self.write("page/index.html", b"earlier")
         (out / "pictures").write_bytes(b"a file where the folder has to be")
         result = run("page", self.write("a.mrc", mrc()), "--out", out)
         self.assertEqual(result.returncode, FAILED)
-        self.assertOneSentence(result.stderr, "pictures", "cannot be written")
+        self.assertOneSentence(result.stderr, "pictures", "cannot be written: Not a directory.")
         self.assertEqual((out / "index.html").read_bytes(), b"earlier")
 
     def test_is_the_same_in_two_runs(self):

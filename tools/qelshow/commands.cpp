@@ -24,6 +24,10 @@ std::wstring FileName(const std::wstring& path) {
   return std::filesystem::path(path).filename().wstring();
 }
 
+std::wstring Counted(std::size_t count, const wchar_t* what) {
+  return std::to_wstring(count) + L" " + what + (count == 1 ? L"" : L"s");
+}
+
 /// Names a file with what is wrong with it.
 void PrintProblem(const FileFacts& facts) {
   if (!facts.problem.empty()) PrintError(facts.path + L": " + facts.problem);
@@ -97,8 +101,8 @@ int RunPage(const CommandLine& line) {
     Print(TableRow(facts, nameWidth));
   }
   page.Finish();
-  Print(L"\n" + page.path() + L": " + std::to_wstring(pictures) + L" thumbnails of " +
-        std::to_wstring(files.size()) + L" files\n");
+  Print(L"\n" + page.path() + L": " + Counted(pictures, L"thumbnail") + L" of " +
+        Counted(files.size(), L"file") + L"\n");
   return kExitDone;
 }
 

@@ -21,15 +21,18 @@ bool IsSupported(const fs::path& path) {
 void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   const std::size_t first = files.size();
   std::error_code error;
-  fs::recursive_directory_iterator entry(folder, fs::directory_options::skip_permission_denied, error);
+  // The folder that was named has to open; one below it that does not is passed over.
+  fs::directory_iterator named(folder, error);
+  fs::recursive_directory_iterator entry;
+  if (!error) entry = {folder, fs::directory_options::skip_permission_denied, error};
   for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {
     std::error_code ignored;
     if (!IsSupported(entry->path()) || !entry->is_regular_file(ignored)) continue;
     files.push_back({entry->path().wstring(), entry->path().lexically_relative(folder).wstring()});
   }
   if (error) {
-    throw Failure(L"The folder \"" + folder.wstring() + L"\" cannot be listed: " +
-                  SystemErrorText(static_cast<DWORD>(error.value())) + L".");
+    throw Failure(L"The folder \"" + folder.wstring() + L"\" cannot be listed: " + SystemErrorText(error) +
+                  L".");
   }
   std::sort(files.begin() + static_cast<std::ptrdiff_t>(first), files.end(),
             [](const ListedFile& a, const ListedFile& b) { return a.name < b.name; });

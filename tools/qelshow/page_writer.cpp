@@ -16,7 +16,9 @@ constexpr std::string_view kPlaceOfFiles = "@FILES@";
 
 constexpr const wchar_t* kPicturesFolder = L"pictures";
 
-[[noreturn]] void CannotWrite(const std::wstring& path, DWORD error) {
+/// `error` is a code of the system or of the standard library.
+template <class Error>
+[[noreturn]] void CannotWrite(const std::wstring& path, const Error& error) {
   throw Failure(L"\"" + path + L"\" cannot be written: " + SystemErrorText(error) + L".");
 }
 
@@ -37,7 +39,7 @@ OwnedHandle CreateFileAt(const std::wstring& path) {
 void MakeFolder(const std::wstring& path) {
   std::error_code error;
   std::filesystem::create_directories(path, error);
-  if (error) CannotWrite(path, static_cast<DWORD>(error.value()));
+  if (error) CannotWrite(path, error);
 }
 
 }  // namespace

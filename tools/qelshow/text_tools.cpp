@@ -50,6 +50,11 @@ std::wstring SystemErrorText(DWORD error) {
   return std::wstring(message.substr(0, last + 1)) + L" (error " + std::to_wstring(error) + L")";
 }
 
+std::wstring SystemErrorText(const std::error_code& error) {
+  if (error.category() == std::system_category()) return SystemErrorText(static_cast<DWORD>(error.value()));
+  return Wide(error.message());
+}
+
 std::wstring ResultText(HRESULT result) {
   struct Known {
     HRESULT result;

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -25,6 +26,9 @@ std::wstring ResultText(HRESULT result);
 
 /// What the system says about an error code of GetLastError, without a full stop.
 std::wstring SystemErrorText(DWORD error);
+
+/// The same of an error of the standard library, which has numbers of its own for some.
+std::wstring SystemErrorText(const std::error_code& error);
 
 /// The code with which a process ended, and its meaning where it is a known fault.
 std::wstring ProcessEndText(DWORD exitCode);
