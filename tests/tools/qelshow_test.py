@@ -210,7 +210,8 @@ class ExitStatus(Test):
             ("magic.emi", b"\x4A\x4C\0\x02\0\0\0\0", "0x4C4A", "0x4B4A"),
             ("version.emi", b"\x4A\x4B\x01\x02\0\0\0\0", "version is 0x0201"),
             ("bare.emi", b"\x4A\x4B\0\x02\0\0\0\0\0\0", "no image object"),
-            ("text.emi", b"\x4A\x4B\0\x02\0\0\0\0\x60\0\0\x01\0\0\0\0", "bad EMI object index"),
+            ("text.emi", b"\x4A\x4B\0\x02\0\0\0\0\x60\0\0\x01\0\0\0\0", "beyond byte 12", "bad EMI object index"),
+            ("length.ser", ser[:-4] + struct.pack("<IIddii", 1, 1, 0, 1, 0, -5) + b"\0", "beyond byte 58", "negative"),
         ):
             files.append((self.write(name, contents), parts))
         result = run("info", *(path for path, _ in files))

@@ -144,7 +144,9 @@ Diagnosis Diagnose(const std::wstring& path) {
     }
     if (!finding->empty()) return {Verdict::kDamaged, *finding};
   } catch (const std::exception& e) {
-    return {Verdict::kDamaged, L"The contents cannot be followed: " + Wide(e.what()) + L"."};
+    stream.clear();
+    return {Verdict::kDamaged, L"The contents cannot be followed beyond byte " +
+                                   std::to_wstring(stream.tellg()) + L": " + Wide(e.what()) + L"."};
   }
   return {};
 }
