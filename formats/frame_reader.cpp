@@ -17,7 +17,7 @@ constexpr std::int64_t kBandBytes = 256LL * 1024;
 
 // Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
 // picture is refused when it has more pixels than bytes and more than this, which bounds the memory that a
-// file of a few bytes can take to 576 KiB (a double and a grey level for each pixel).
+// file of a few bytes can take to 512 KiB (a double for each pixel).
 constexpr std::int64_t kMostSharedPixels = 64LL * 1024;
 
 // Reading band by band is given up for reading column by column when it would read the block this often, and

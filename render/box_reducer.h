@@ -19,12 +19,12 @@ namespace Qel::Lumetra::ShellExt {
 /// The pieces may be of any size and at any place, as long as the pixels of each block arrive in order (row
 /// by row, left to right) and a row of blocks is complete before the same columns of another begin.
 /// Pixels outside of the whole blocks must not be given. A factor below 1 has no blocks.
-template <class Pixel>
+///
+/// `TargetView` is an image view or something like it, of pixels of SamplesOf<Pixel>::Target.
+template <class Pixel, class TargetView = ImageView<typename SamplesOf<Pixel>::Target>>
 class BoxReducer {
  public:
-  using Target = typename SamplesOf<Pixel>::Target;
-
-  BoxReducer(std::int32_t factor, const ImageView<Target>& target)
+  BoxReducer(std::int32_t factor, const TargetView& target)
       : factor_(factor),
         reciprocal_(1.0 / WrappingProduct(factor, factor)),
         target_(target),
@@ -44,6 +44,7 @@ class BoxReducer {
 
  private:
   using Sample = typename SamplesOf<Pixel>::Sample;
+  using Target = typename SamplesOf<Pixel>::Target;
   static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
   static constexpr std::int32_t kGatheredColumns = 4096;
 
@@ -117,7 +118,7 @@ class BoxReducer {
 
   std::int32_t factor_;
   double reciprocal_;
-  ImageView<Target> target_;
+  TargetView target_;
   BlockSums sums_;
   std::vector<Pixel> gathered_;
 };

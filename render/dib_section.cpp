@@ -15,11 +15,11 @@ struct BitmapInfo {
 };
 static_assert(sizeof(BitmapInfo) == 40 + 256 * 4);
 
-std::int64_t RowStride(std::int32_t width, std::int32_t bytesPerPixel) {
+}  // namespace
+
+std::int64_t BitmapRowStride(std::int32_t width, std::int32_t bytesPerPixel) {
   return (std::int64_t{width} * bytesPerPixel + 3) & ~std::int64_t{3};
 }
-
-}  // namespace
 
 BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel) {
   const std::int64_t rowBytes = std::int64_t{width} * bytesPerPixel;
@@ -32,7 +32,7 @@ BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int3
   header.biCompression = BI_RGB;
   // The padding of the last row is not counted.
   header.biSizeImage =
-      static_cast<DWORD>((height - std::int64_t{1}) * RowStride(width, bytesPerPixel) + rowBytes);
+      static_cast<DWORD>((height - std::int64_t{1}) * BitmapRowStride(width, bytesPerPixel) + rowBytes);
   header.biXPelsPerMeter = kPixelsPerMetre;
   header.biYPelsPerMeter = kPixelsPerMetre;
   header.biClrUsed = bytesPerPixel == 1 ? kGreyLevels : 0;
@@ -50,7 +50,8 @@ void DibSection::Create(std::int32_t width, std::int32_t height, std::int32_t by
   void* bits = nullptr;
   Replace(
       CreateDIBSection(dc, reinterpret_cast<const BITMAPINFO*>(&info), DIB_RGB_COLORS, &bits, nullptr, 0));
-  bits_ = {width, height, static_cast<std::uint8_t*>(bits), bytesPerPixel, RowStride(width, bytesPerPixel)};
+  bits_ = {width, height, static_cast<std::uint8_t*>(bits), bytesPerPixel,
+           BitmapRowStride(width, bytesPerPixel)};
   DeleteDC(dc);
 }
 

@@ -17,6 +17,9 @@ inline ImageView<BitmapPixel> AsBitmapPixels(const ImageView<std::uint8_t>& bits
           bits.rowStride};
 }
 
+/// Bytes from a row of a bitmap to the next.
+std::int64_t BitmapRowStride(std::int32_t width, std::int32_t bytesPerPixel);
+
 /// The header of a top-down bitmap of 1 (grey) or 3 (colour) bytes a pixel, rows padded to 4 bytes.
 BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel);
 

@@ -12,10 +12,9 @@ namespace Qel::Lumetra::ShellExt {
 
 /// Writes the average of every whole block of `factor` by `factor` pixels of `source` into `target`, which
 /// has the size of the source divided by the factor. What is left over at the right and bottom is dropped.
-template <class Pixel, class Target>
-void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor,
-                   const ImageView<Target>& target) {
-  BoxReducer<Pixel> reducer(factor, target);
+template <class Pixel, class TargetView>
+void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor, const TargetView& target) {
+  BoxReducer<Pixel, TargetView> reducer(factor, target);
   reducer.Add(source.Part(0, 0, target.width * factor, target.height * factor), 0, 0);
 }
 

@@ -3,15 +3,12 @@
 #include <algorithm>
 #include <array>
 #include <cstring>
-#include <limits>
-#include <new>
 #include <optional>
-#include <span>
 
 #include "box_reducer.h"
 #include "dib_section.h"
 #include "downsample_box.h"
-#include "grey_levels.h"
+#include "grey_image.h"
 #include "logarithm.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -28,46 +25,11 @@ bool IsEmpty(const Reduction& reduction) {
   return reduction.size.width < 1 || reduction.size.height < 1;
 }
 
-/// Memory for `size` values that are all written before they are read.
-template <class T>
-std::unique_ptr<T[]> AllocateImage(Size2 size) {
-  const std::int64_t count = std::int64_t{size.width} * size.height;
-  if (count > std::numeric_limits<std::int32_t>::max()) throw std::bad_alloc();
-  return std::make_unique_for_overwrite<T[]>(static_cast<std::size_t>(count));
-}
-
-/// The reduced image of a grey frame, and the bitmap that becomes of it.
-template <class T>
-class GreyImage {
- public:
-  explicit GreyImage(const Reduction& reduction) : size_(reduction.size) {
-    if (!IsEmpty(reduction)) values_ = AllocateImage<T>(size_);
-  }
-
-  bool empty() const { return values_ == nullptr; }
-
-  ImageView<T> view() const { return PackedView(values_.get(), size_.width, size_.height); }
-
-  HBITMAP ToBitmap() const {
-    DibSection bitmap;
-    bitmap.CreateGrey(size_.width, size_.height);
-    if (bitmap.Bits().data != nullptr) {
-      const auto count = static_cast<std::size_t>(size_.width) * static_cast<std::size_t>(size_.height);
-      MapToGreyLevels(std::span<const T>(values_.get(), count), bitmap.Bits());
-    }
-    return bitmap.Release();
-  }
-
- private:
-  Size2 size_;
-  std::unique_ptr<T[]> values_;
-};
-
 template <class T>
 class GreyRenderer final : public FrameRenderer {
  public:
   GreyRenderer(Size2 frame, const SIZE& request)
-      : reduction_(GreyReduction(frame, request)), image_(reduction_) {
+      : reduction_(GreyReduction(frame, request)), image_(reduction_.size) {
     if (!image_.empty()) reducer_.emplace(reduction_.factor, image_.view());
   }
 
@@ -84,7 +46,7 @@ class GreyRenderer final : public FrameRenderer {
  private:
   Reduction reduction_;
   GreyImage<T> image_;
-  std::optional<BoxReducer<T>> reducer_;
+  std::optional<BoxReducer<T, SplitView<T>>> reducer_;
 };
 
 /// Turns every complex pixel into the logarithm of its squared magnitude, which is then a float frame.
@@ -204,7 +166,7 @@ std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelFormat format, Size2 frame
 template <class T>
 HBITMAP RenderGreyThumbnail(const ImageView<const T>& frame, const SIZE& request) {
   const Reduction reduction = GreyReduction({frame.width, frame.height}, request);
-  const GreyImage<T> image(reduction);
+  GreyImage<T> image(reduction.size);
   if (!image.empty()) DownsampleBox(frame, reduction.factor, image.view());
   return image.ToBitmap();
 }

@@ -1,10 +1,13 @@
 // From a reduced image of scalar values to grey levels.
 #pragma once
 
+#include <emmintrin.h>
+
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <span>
+#include <cstring>
 #include <type_traits>
 
 #include "image_view.h"
@@ -31,23 +34,26 @@ struct ValueRange {
   T minimum;
   T maximum;
 
-  explicit ValueRange(std::span<const T> values) : minimum(values.front()), maximum(values.front()) {
+  explicit ValueRange(T first) : minimum(first), maximum(first) {}
+
+  /// Takes `count` values in, which need not be aligned.
+  void Include(const std::byte* values, std::size_t count) {
     // Each lane sees every kLanes-th value. The result does not depend on it: a NaN as the first value stays
     // in every lane, any other is passed over by every lane.
-    constexpr std::size_t kLanes = 32 / sizeof(T);
+    constexpr std::size_t kLanes = 64 / sizeof(T);
     std::array<T, kLanes> low;
     std::array<T, kLanes> high;
     low.fill(minimum);
     high.fill(maximum);
     std::size_t i = 0;
-    for (; i + kLanes <= values.size(); i += kLanes) {
+    for (; i + kLanes <= count; i += kLanes) {
       for (std::size_t lane = 0; lane < kLanes; ++lane) {
-        const T value = values[i + lane];
+        const T value = Load(values, i + lane);
         low[lane] = value < low[lane] ? value : low[lane];
         high[lane] = value > high[lane] ? value : high[lane];
       }
     }
-    for (const T value : values.subspan(i)) Include(value, value);
+    for (; i < count; ++i) Include(Load(values, i), Load(values, i));
     for (std::size_t lane = 0; lane < kLanes; ++lane) Include(low[lane], high[lane]);
   }
 
@@ -65,31 +71,59 @@ struct ValueRange {
     return 255.0 / Difference(upper, minimum);
   }
 
+  /// The grey levels of `count` values, before they are truncated.
+  void Stretch(const std::byte* values, std::size_t count, double scale, double* levels) const {
+    for (std::size_t i = 0; i < count; ++i) levels[i] = Difference(Load(values, i), minimum) * scale;
+  }
+
  private:
+  static T Load(const std::byte* values, std::size_t i) {
+    T value;
+    std::memcpy(&value, values + i * sizeof(T), sizeof(T));
+    return value;
+  }
+
   void Include(T low, T high) {
     if (low < minimum) minimum = low;
     if (high > maximum) maximum = high;
   }
 };
 
-/// The low 8 bits of `level` truncated toward zero to 32 bits; 0 for what 32 bits cannot hold, NaN included.
-inline std::uint8_t ToGreyLevel(double level) {
-  const double fitting = level > -2147483649.0 && level < 2147483648.0 ? level : 0.0;
-  return static_cast<std::uint8_t>(static_cast<std::int32_t>(fitting));
+/// Writes the low 8 bits of each of `count` levels truncated toward zero to 32 bits; 0 for what 32 bits
+/// cannot hold, NaN included, which is how the processor converts. `levels` has room for a multiple of 8.
+inline void Truncate(const double* levels, std::size_t count, std::uint8_t* bytes) {
+  const auto four = [levels](std::size_t i) {
+    const __m128i two = _mm_cvttpd_epi32(_mm_loadu_pd(levels + i));
+    const __m128i others = _mm_cvttpd_epi32(_mm_loadu_pd(levels + i + 2));
+    return _mm_and_si128(_mm_unpacklo_epi64(two, others), _mm_set1_epi32(0xFF));
+  };
+  for (std::size_t i = 0; i < count; i += 8) {
+    const __m128i words = _mm_packs_epi32(four(i), four(i + 4));
+    std::uint8_t eight[8];
+    _mm_storel_epi64(reinterpret_cast<__m128i*>(eight), _mm_packus_epi16(words, words));
+    std::memcpy(bytes + i, eight, std::min<std::size_t>(count - i, 8));
+  }
 }
 
-/// Stretches an image's own range linearly to 0..255. `values` are its pixels, row by row; `bits` has its
-/// size.
-template <class T>
-void MapToGreyLevels(std::span<const T> values, const ImageView<std::uint8_t>& bits) {
-  const ValueRange<T> range(values);
+/// Stretches an image's own range linearly to 0..255. `bits` has the size of `values`, rows of which may lie
+/// in the memory of the bits: no row of grey levels must reach into a row of values further down, nor begin
+/// behind its own.
+template <class T, class View>
+void MapToGreyLevels(const View& values, const ImageView<std::uint8_t>& bits) {
+  constexpr std::int32_t kBatch = 256;
+  const auto size = [](std::int32_t count) { return static_cast<std::size_t>(count); };
+  T first;
+  std::memcpy(&first, values.At(0, 0), sizeof first);
+  ValueRange<T> range(first);
+  for (std::int32_t y = 0; y < bits.height; ++y) range.Include(values.At(0, y), size(bits.width));
+
   const double scale = range.Scale();
-  const auto width = static_cast<std::size_t>(bits.width);
+  std::array<double, kBatch> levels{};
   for (std::int32_t y = 0; y < bits.height; ++y) {
-    const T* const row = &values[static_cast<std::size_t>(y) * width];
-    auto* const levels = reinterpret_cast<std::uint8_t*>(bits.At(0, y));
-    for (std::size_t x = 0; x < width; ++x) {
-      levels[x] = ToGreyLevel(Difference(row[x], range.minimum) * scale);
+    for (std::int32_t x = 0; x < bits.width; x += kBatch) {
+      const std::int32_t count = std::min(bits.width - x, kBatch);
+      range.Stretch(values.At(x, y), size(count), scale, levels.data());
+      Truncate(levels.data(), size(count), reinterpret_cast<std::uint8_t*>(bits.At(x, y)));
     }
   }
 }
