@@ -39,10 +39,9 @@ struct SamplesOf<ColourPixel<kOrder>> {
   using Sample = std::uint8_t;
   using Target = BitmapPixel;
   static constexpr std::size_t kCount = 3;
+  static constexpr bool kSwaps = kOrder == ColourOrder::kRedFirst;
 
-  static constexpr std::size_t TargetIndex(std::size_t i) {
-    return kOrder == ColourOrder::kRedFirst ? 2 - i : i;
-  }
+  static constexpr std::size_t TargetIndex(std::size_t i) { return kSwaps ? 2 - i : i; }
 };
 
 /// For samples whose sums are exact whatever the order.
@@ -52,22 +51,34 @@ class ExactBlockSums {
   ExactBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
 
-  /// Adds dense rows of one row of blocks, whose first pixel is at column `x` of the frame.
+  /// Whether rows with this distance between pixels can be added: what lies between them counts as samples,
+  /// too, of columns that are left out in the end.
+  static bool Takes(std::int64_t pixelStride) {
+    constexpr std::int64_t kSampleBytes = sizeof(Sample);
+    return pixelStride >= kSampleBytes * std::int64_t{kSamples} && pixelStride % kSampleBytes == 0;
+  }
+
+  /// Adds rows of one row of blocks, whose first pixel is at column `x` of the frame.
   void Add(const ImageView<const Pixel>& rows, std::int32_t x) {
     columns_ = static_cast<std::size_t>(rows.width);
-    columnSums_.resize(columns_ * kSamples + kFolded - kSamples);
     for (std::int32_t y = 0; y < rows.height; y += kMostRows) {
       const std::int32_t count = std::min(kMostRows, rows.height - y);
       SumColumns(rows.Part(0, y, rows.width, count));
-      // The sums of a block's columns mostly fit into 32 bits, which makes folding them faster.
-      const bool small =
-          count <= std::numeric_limits<std::int32_t>::max() / 65536 / static_cast<std::int64_t>(factor_);
-      small ? FoldColumns<std::int32_t>(static_cast<std::size_t>(x))
-            : FoldColumns<std::int64_t>(static_cast<std::size_t>(x));
+      // The narrower the sums of a block's columns can be, the faster they are folded.
+      const auto column = static_cast<std::size_t>(x);
+      const std::size_t samples = static_cast<std::size_t>(count) * factor_;
+      if (samples <= kMostRows) {
+        FoldColumns<Lane>(column);
+      } else if (samples <= std::numeric_limits<std::int32_t>::max() / 65536) {
+        FoldColumns<std::int32_t>(column);
+      } else {
+        FoldColumns<std::int64_t>(column);
+      }
     }
   }
 
-  /// The sums of the samples of every block; the caller sets those it has used back to 0.
+  /// The sums of the samples of every block, in the order of the target's; the caller sets those it has used
+  /// back to 0.
   double* sums() { return sums_.data(); }
 
  private:
@@ -84,25 +95,31 @@ class ExactBlockSums {
   static constexpr std::size_t kFolded = kSamples == 3 ? 4 : kSamples;
 
   void SumColumns(const ImageView<const Pixel>& rows) {
+    const std::size_t step = static_cast<std::size_t>(rows.pixelStride) / sizeof(Sample);
+    const std::size_t count = (columns_ - 1) * step + kSamples;
+    columnSums_.resize(count + kFolded - kSamples);
     std::int32_t y = 0;
-    for (; y + 8 <= rows.height; y += 8) AddRows<8>(rows, y);
-    for (; y + 4 <= rows.height; y += 4) AddRows<4>(rows, y);
-    for (; y + 2 <= rows.height; y += 2) AddRows<2>(rows, y);
-    if (y < rows.height) AddRows<1>(rows, y);
+    for (; y + 8 <= rows.height; y += 8) AddRows<8>(rows, y, count);
+    for (; y + 4 <= rows.height; y += 4) AddRows<4>(rows, y, count);
+    for (; y + 2 <= rows.height; y += 2) AddRows<2>(rows, y, count);
+    if (y < rows.height) AddRows<1>(rows, y, count);
+    if (step == kSamples) return;
+    for (std::size_t column = 1; column < columns_; ++column) {
+      std::copy_n(&columnSums_[column * step], kSamples, &columnSums_[column * kSamples]);
+    }
   }
 
-  /// Adds rows to the column sums, which begin with row 0.
+  /// Adds `count` samples of rows to the column sums, which begin with row 0.
   template <std::size_t kRows>
-  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y) {
-    y == 0 ? AddRows<kRows, true>(rows, y) : AddRows<kRows, false>(rows, y);
+  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y, std::size_t count) {
+    y == 0 ? AddRows<kRows, true>(rows, y, count) : AddRows<kRows, false>(rows, y, count);
   }
 
   template <std::size_t kRows, bool kFirst>
-  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y) {
+  void AddRows(const ImageView<const Pixel>& rows, std::int32_t y, std::size_t count) {
     std::array<const std::byte*, kRows> row;
     for (const std::byte*& bytes : row) bytes = rows.At(0, y++);
     Lane* const __restrict sums = columnSums_.data();
-    const std::size_t count = columns_ * kSamples;
     for (std::size_t i = 0; i < count; ++i) {
       Lane sum = kFirst ? Lane{0} : sums[i];
       for (std::size_t r = 0; r < kRows; ++r) {
@@ -140,16 +157,37 @@ class ExactBlockSums {
   static void FoldBlocks(const Lane* __restrict lanes, double* __restrict sums, std::size_t blocks,
                          Factor factor) {
     for (std::size_t block = 0; block < blocks; ++block) {
-      std::array<Sum, kFolded> sum{};
-      for (std::size_t i = 0; i < factor; ++i) {
-        for (std::size_t sample = 0; sample < kFolded; ++sample) {
-          sum[sample] = static_cast<Sum>(sum[sample] + lanes[(block * factor + i) * kSamples + sample]);
+      if constexpr (kSamples == 3 && sizeof(Sum) <= 4) {
+        FoldColours<Sum>(lanes + block * factor * kSamples, sums + block * kSamples, factor);
+      } else {
+        std::array<Sum, kSamples> sum{};
+        for (std::size_t i = 0; i < factor; ++i) {
+          for (std::size_t sample = 0; sample < kSamples; ++sample) {
+            sum[sample] = static_cast<Sum>(sum[sample] + lanes[(block * factor + i) * kSamples + sample]);
+          }
+        }
+        for (std::size_t sample = 0; sample < kSamples; ++sample) {
+          sums[block * kSamples + SamplesOf<Pixel>::TargetIndex(sample)] += static_cast<double>(sum[sample]);
         }
       }
-      for (std::size_t sample = 0; sample < kSamples; ++sample) {
-        sums[block * kSamples + sample] += static_cast<double>(sum[sample]);
-      }
     }
+  }
+
+  /// Folds one block of colours, its channels side by side.
+  template <class Sum, class Factor>
+  static void FoldColours(const Lane* lanes, double* sums, Factor factor) {
+    __m128i sum = _mm_setzero_si128();
+    const auto widened = [](__m128i narrow) { return _mm_unpacklo_epi16(narrow, _mm_setzero_si128()); };
+    for (std::size_t i = 0; i < factor; ++i) {
+      const __m128i column = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(lanes + i * kSamples));
+      sum = sizeof(Sum) == 2 ? _mm_add_epi16(sum, column) : _mm_add_epi32(sum, widened(column));
+    }
+    if constexpr (sizeof(Sum) == 2) sum = widened(sum);
+    constexpr bool kSwaps = SamplesOf<Pixel>::kSwaps;
+    const __m128i two = kSwaps ? _mm_shuffle_epi32(sum, _MM_SHUFFLE(3, 3, 1, 2)) : sum;
+    const __m128i third = kSwaps ? sum : _mm_unpackhi_epi64(sum, sum);
+    _mm_storeu_pd(sums, _mm_add_pd(_mm_loadu_pd(sums), _mm_cvtepi32_pd(two)));
+    sums[2] += _mm_cvtsd_f64(_mm_cvtepi32_pd(third));
   }
 
   /// Folds some columns of one block; returns the column after them.
@@ -171,6 +209,11 @@ class OrderedBlockSums {
  public:
   OrderedBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(factor), sums_(static_cast<std::size_t>(blocks)) {}
+
+  /// Whether rows with this distance between pixels can be added.
+  static bool Takes(std::int64_t pixelStride) {
+    return pixelStride == static_cast<std::int64_t>(sizeof(Sample));
+  }
 
   /// Adds dense rows of one row of blocks, whose first pixel is at column `x` of the frame.
   void Add(const ImageView<const Sample>& rows, std::int32_t x) {

@@ -46,7 +46,7 @@ class BoxReducer {
   using Sample = typename SamplesOf<Pixel>::Sample;
   using Target = typename SamplesOf<Pixel>::Target;
   static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
-  static constexpr std::int32_t kGatheredColumns = 4096;
+  static constexpr std::int32_t kGathered = 16384;  // pixels
 
   static bool IsDense(const ImageView<const Pixel>& view) {
     return view.pixelStride == static_cast<std::int64_t>(sizeof(Pixel));
@@ -71,31 +71,39 @@ class BoxReducer {
   }
 
   void AddToBlockRow(const ImageView<const Pixel>& rows, std::int32_t x) {
-    if (IsDense(rows)) return sums_.Add(rows, x);
-    // Pixels that are not neighbours are gathered first, a part of a row at a time.
-    gathered_.resize(static_cast<std::size_t>(std::min(rows.width, kGatheredColumns)));
-    for (std::int32_t y = 0; y < rows.height; ++y) {
-      for (std::int32_t column = 0; column < rows.width; column += kGatheredColumns) {
-        const std::int32_t count = std::min(rows.width - column, kGatheredColumns);
-        for (std::int32_t i = 0; i < count; ++i) {
-          gathered_[static_cast<std::size_t>(i)] = rows.Load(column + i, y);
-        }
-        sums_.Add(PackedView<const Pixel>(gathered_.data(), count, 1), x + column);
+    if (BlockSums::Takes(rows.pixelStride)) return sums_.Add(rows, x);
+    // Other pixels are gathered first, as many rows at a time as there is room for.
+    const std::int32_t columns = std::min(rows.width, kGathered);
+    const std::int32_t most = kGathered / columns;
+    for (std::int32_t y = 0; y < rows.height; y += most) {
+      for (std::int32_t column = 0; column < rows.width; column += columns) {
+        sums_.Add(Gather(rows.Part(column, y, std::min(rows.width - column, columns),
+                                   std::min(rows.height - y, most))),
+                  x + column);
       }
     }
+  }
+
+  ImageView<const Pixel> Gather(const ImageView<const Pixel>& rows) {
+    gathered_.resize(static_cast<std::size_t>(kGathered));
+    Pixel* next = gathered_.data();
+    for (std::int32_t y = 0; y < rows.height; ++y) {
+      for (std::int32_t x = 0; x < rows.width; ++x) *next++ = rows.Load(x, y);
+    }
+    return PackedView<const Pixel>(gathered_.data(), rows.width, rows.height);
   }
 
   /// Stores the blocks that end within `columns` columns from column `x`, and starts their sums again.
   void StoreBlocks(std::int32_t x, std::int32_t columns, std::int32_t blockRow) {
     const std::int32_t first = x / factor_;
     const std::int32_t end = (x + columns) / factor_;
-    double* sums = sums_.sums() + static_cast<std::size_t>(first) * kSamples;
-    std::byte* target = target_.At(first, blockRow);
-    for (std::int32_t block = first; block < end; ++block, target += sizeof(Pixel)) {
-      for (std::size_t i = 0; i < kSamples; ++i) {
-        StoreSample(target, i, ToSample(*sums * reciprocal_));
-        *sums++ = 0;
-      }
+    const std::size_t count = static_cast<std::size_t>(end - first) * kSamples;
+    double* const __restrict sums = sums_.sums() + static_cast<std::size_t>(first) * kSamples;
+    std::byte* const __restrict target = target_.At(first, blockRow);
+    for (std::size_t i = 0; i < count; ++i) {
+      const Sample average = ToSample(sums[i] * reciprocal_);
+      std::memcpy(target + i * sizeof(Sample), &average, sizeof average);
+      sums[i] = 0;
     }
   }
 
