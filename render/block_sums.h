@@ -51,11 +51,12 @@ class ExactBlockSums {
   ExactBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
 
-  /// Whether rows with this distance between pixels can be added: what lies between them counts as samples,
-  /// too, of columns that are left out in the end.
+  /// Whether rows with this distance between pixels can be added. What lies between them is added as well, as
+  /// columns that are left out in the end; from some distance on it costs less to pick the pixels.
   static bool Takes(std::int64_t pixelStride) {
     constexpr std::int64_t kSampleBytes = sizeof(Sample);
-    return pixelStride >= kSampleBytes * std::int64_t{kSamples} && pixelStride % kSampleBytes == 0;
+    constexpr std::int64_t kPixelBytes = kSampleBytes * kSamples;
+    return pixelStride >= kPixelBytes && pixelStride <= 8 * kPixelBytes && pixelStride % kSampleBytes == 0;
   }
 
   /// Adds rows of one row of blocks, whose first pixel is at column `x` of the frame.

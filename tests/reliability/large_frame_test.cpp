@@ -7,6 +7,7 @@
 #include "allocation_meter.h"
 #include "bitmap_pixels.h"
 #include "file_type_factory.h"
+#include "frame_reader.h"
 #include "memory_buffer.h"
 #include "mrc_file.h"
 #include "raw_file.h"
@@ -30,11 +31,41 @@ std::int64_t PeakOfThumbnail(const std::string& head, const std::wstring& extens
 }
 
 TEST(LargeFrame, ThumbnailTakesMemoryForABandAndNotForTheFrame) {
-  constexpr std::int64_t kMost = 4 << 20;
+  constexpr std::int64_t kMost = 1 << 20;
   EXPECT_LT(PeakOfThumbnail(Testing::MrcFile{.nx = kEdge, .ny = kEdge, .mode = 2}.Bytes(), L"mrc"), kMost);
   EXPECT_LT(PeakOfThumbnail(Testing::PackedRawFile(DataType::kInt32, kEdge, kEdge, "").Bytes(), L"raw"),
             kMost);
 }
+
+/// A pixel format, and the bytes of the average of a block.
+struct Case {
+  PixelFormat format;
+  std::int64_t averageBytes;
+};
+
+class ThumbnailMemory : public testing::TestWithParam<Case> {};
+
+TEST_P(ThumbnailMemory, IsTheBandAndTheAveragesWithTheBitmapAmongThem) {
+  constexpr std::int64_t kBandBytes = 256 * 1024;
+  constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and of complex pixels in batches
+  constexpr std::int32_t kSide = 600;
+  const FrameLayout layout = PackedLayout(GetParam().format, {2 * kSide, 2 * kSide}, 0);
+  const std::string file(static_cast<std::size_t>(layout.blockBytes), '\1');
+  Testing::MemoryBuffer buffer(file);
+  std::istream stream(&buffer);
+  const Testing::HeapMeter meter;
+  const HBITMAP bitmap = ReadThumbnail(stream, layout, {kSide, kSide});
+  const std::int64_t peak = meter.Peak();
+  EXPECT_EQ(Testing::TakeBitmap(bitmap).width, kSide);
+  EXPECT_LE(peak, kSide * kSide * GetParam().averageBytes + kBandBytes + kSumsAndObjects);
+}
+
+INSTANTIATE_TEST_SUITE_P(All, ThumbnailMemory,
+                         testing::Values(Case{PixelFormat::kUInt8, 1}, Case{PixelFormat::kInt16, 2},
+                                         Case{PixelFormat::kUInt32, 4}, Case{PixelFormat::kFloat32, 4},
+                                         Case{PixelFormat::kFloat64, 8}, Case{PixelFormat::kComplexInt16, 4},
+                                         Case{PixelFormat::kComplexFloat64, 4},
+                                         Case{PixelFormat::kRgb24, 3}));
 
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt
