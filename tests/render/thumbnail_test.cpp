@@ -114,6 +114,20 @@ TYPED_TEST(EveryScalar, EqualsTheNaivePictureOverRandomShapes) {
   }
 }
 
+TYPED_TEST(EveryScalar, EqualsTheNaivePictureOfWideFrames) {
+  using T = TypeParam;
+  Random random(123);
+  for (int round = 0; round < 40; ++round) {
+    const int width = random.Between(200, 2000);
+    const int height = random.Between(1, 12);
+    const int cx = random.Between(width / 4, width);
+    const auto values = static_cast<Values>(random.Between(0, static_cast<int>(Values::kCount) - 1));
+    const auto frame = random.Frame<T>(width, height, values);
+    ASSERT_EQ(Grey(frame, {cx, height}), Testing::NaiveGreyThumbnail(frame, cx, height))
+        << width << " x " << height << " asked at " << cx << ", values " << static_cast<int>(values);
+  }
+}
+
 TYPED_TEST(EveryScalar, EqualsTheNaivePictureWithLargeBlocks) {
   using T = TypeParam;
   Random random(77);
