@@ -11,6 +11,10 @@ namespace {
 
 constexpr auto kMode = std::ios_base::in | std::ios_base::binary;
 
+// Room for any header in one read, and not more: the buffer is filled anew after each seek, which would make
+// reading the headers of many elements slower.
+constexpr std::size_t kBufferBytes = 2048;
+
 /// An open file descriptor, or -1.
 int OpenShared(const wchar_t* path) {
   const HANDLE file = CreateFileW(path, GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
@@ -28,7 +32,7 @@ void OpenPath(std::ifstream& stream, const wchar_t* path) {
     // The standard library's own open does not share deleting, so the descriptor is opened here and
     // handed to the stream's file buffer.
     if (const int descriptor = OpenShared(path); descriptor != -1) {
-      *stream.rdbuf() = __gnu_cxx::stdio_filebuf<char>(descriptor, kMode);
+      *stream.rdbuf() = __gnu_cxx::stdio_filebuf<char>(descriptor, kMode, kBufferBytes);
       if (stream.is_open()) {
         stream.clear();
         return;
