@@ -1,5 +1,6 @@
 """A headless Chromium, driven over its debugging pipe."""
 
+import base64
 import itertools
 import json
 import os
@@ -120,6 +121,10 @@ class Tab:
     def counters(self):
         """The browser's own counts of what it has made and done for the page, by name."""
         return {metric["name"]: metric["value"] for metric in self.call("Performance.getMetrics")["metrics"]}
+
+    def screenshot(self):
+        """What is in sight, as the bytes of a PNG image."""
+        return base64.b64decode(self.call("Page.captureScreenshot", format="png")["data"])
 
     def press(self, *keys):
         """Presses and releases keys: characters, or names such as "Enter"."""
