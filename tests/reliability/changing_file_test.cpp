@@ -47,7 +47,7 @@ std::string FrameBytes(char pixel = 'p') {
   file.ny = 600;
   file.mode = 1;
   file.labels = {"a label"};
-  file.pixels.assign(700 * 600 * 2, pixel);
+  file.pixels.assign(std::size_t{700} * 600 * 2, pixel);
   for (std::size_t i = 0; i < file.pixels.size(); i += 999) file.pixels[i] = static_cast<char>(i / 999);
   return file.Bytes();
 }
@@ -68,7 +68,7 @@ class ChangingFile : public ServerTest {
     g_readFails = readFails;
     const auto object = dll_.CreateInstance<IExtractImage>(kShellExtClass, IID_IExtractImage);
     EXPECT_EQ(As<IPersistFile>(object, IID_IPersistFile)->Load(path_.c_str(), STGM_READ), S_OK);
-    const Answers answers = Extract(object);
+    Answers answers = Extract(object);
     reads_ = g_reads;
     g_interruptedRead = -1;
 
