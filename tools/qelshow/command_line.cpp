@@ -95,18 +95,18 @@ file of no supported kind, 4 a damaged file; of several the highest
 
 struct CommandFacts {
   const wchar_t* name;
-  Command command;
   const wchar_t* help;
+  Command command;
   bool takesJson;
   bool takesOut;
   bool takesServer;  // and asks it about files
 };
 
 constexpr CommandFacts kCommands[] = {
-    {L"info", Command::kInfo, kInfoHelp, true, false, true},
-    {L"thumbnail", Command::kThumbnail, kThumbnailHelp, false, true, true},
-    {L"page", Command::kPage, kPageHelp, false, true, true},
-    {L"doctor", Command::kDoctor, kDoctorHelp, true, false, false},
+    {L"info", kInfoHelp, Command::kInfo, true, false, true},
+    {L"thumbnail", kThumbnailHelp, Command::kThumbnail, false, true, true},
+    {L"page", kPageHelp, Command::kPage, false, true, true},
+    {L"doctor", kDoctorHelp, Command::kDoctor, true, false, false},
 };
 
 [[noreturn]] void WrongUsage(const std::wstring& sentence, std::wstring_view command = {}) {

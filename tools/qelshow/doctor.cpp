@@ -99,7 +99,7 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
     for (std::size_t i = 0; i < kind.handlers.size(); ++i) {
       // Every kind has its handlers in the same order, some without the last.
       if (rows.front().size() == i + 1) rows.front().push_back(kind.handlers[i].registered.role);
-      row.push_back(ConditionText(kind.handlers[i].condition));
+      row.emplace_back(ConditionText(kind.handlers[i].condition));
     }
     rows.push_back(std::move(row));
   }

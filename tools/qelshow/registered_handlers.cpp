@@ -1,6 +1,7 @@
 #include "registered_handlers.h"
 
 #include <cstddef>
+#include <cwchar>
 
 #include "class_ids.h"
 #include "shell_questions.h"
@@ -35,7 +36,8 @@ std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name =
   std::wstring text(bytes / sizeof(wchar_t), L'\0');
   if (RegGetValueW(root, key.c_str(), name, RRF_RT_REG_SZ, nullptr, text.data(), &bytes) != ERROR_SUCCESS)
     return {};
-  return text.c_str();
+  text.resize(std::wcslen(text.c_str()));
+  return text;
 }
 
 /// The key by which an administrator, the user or a tool of theirs has disabled the class; empty without one.
