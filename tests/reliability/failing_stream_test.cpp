@@ -10,6 +10,7 @@
 #include "bitmap_pixels.h"
 #include "file_kind_test.h"
 #include "memory_buffer.h"
+#include "raw_file.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
@@ -29,8 +30,8 @@ struct OpenSample {
     reader = CreateFileTypeInfo(stream, extension);
   }
 
-  BitmapPixels Thumbnail() const {
-    return Testing::TakeBitmap(reader->CreateThumbnail(Testing::kSmallRequest));
+  BitmapPixels Thumbnail(const SIZE& request = Testing::kSmallRequest) const {
+    return Testing::TakeBitmap(reader->CreateThumbnail(request));
   }
 
   MemoryBuffer buffer;
@@ -87,6 +88,38 @@ TEST_P(FailingStream, ThatCannotBePositionedIsNoFault) {
     const auto answers = Testing::AskEverything(stream, extension_);
     EXPECT_EQ(answers.wrong, "");
     EXPECT_EQ(answers.bitmaps, 0);
+  }
+}
+
+/// Frames that are larger than the reader's buffer: of several bands, of rows that are larger than it, and
+/// one whose columns lie one after the other in the file.
+TEST(FailingStreamOfALargeFrame, AtAnyReadGivesNoThumbnailAndIsOverAfterIt) {
+  struct Shape {
+    std::int32_t width, height, pixelStride, rowStride;
+    SIZE request;
+  };
+  constexpr Shape kShapes[] = {
+      {700, 900, 1, 700, {2, 2}}, {300'000, 8, 1, 300'000, {75'000, 4}}, {100, 6000, 6000, 1, {10, 600}}};
+  for (const Shape& shape : kShapes) {
+    SCOPED_TRACE(std::to_string(shape.width) + " x " + std::to_string(shape.height));
+    auto file = Testing::PackedRawFile(DataType::kUInt8, shape.width, shape.height, "");
+    file.pixelStride = shape.pixelStride;
+    file.rowStride = shape.rowStride;
+    file.pixels.assign(static_cast<std::size_t>(shape.width) * static_cast<std::size_t>(shape.height), 'p');
+    const SampleFile sample{"large", file.Bytes()};
+    const OpenSample whole(sample, L"raw", -1, Failure::kBringsNothing);
+    const std::int64_t readsOfHeader = whole.buffer.reads;
+    const BitmapPixels picture = whole.Thumbnail(shape.request);
+    ASSERT_NE(picture, BitmapPixels());
+    const std::int64_t reads = whole.buffer.reads;
+    EXPECT_GT(reads, readsOfHeader + 2);
+    for (std::int64_t i = readsOfHeader; i < reads; ++i) {
+      OpenSample open(sample, L"raw", i, Failure::kBringsHalf);
+      EXPECT_EQ(open.Thumbnail(shape.request), BitmapPixels()) << i;
+      EXPECT_TRUE(open.stream.fail());
+      open.stream.clear();
+      EXPECT_EQ(open.Thumbnail(shape.request), picture) << i;
+    }
   }
 }
 
