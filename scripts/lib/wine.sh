@@ -1,9 +1,10 @@
 # The Wine in which Windows programs of the project run: a prefix of its own in the build folder, quiet, and
-# without anything that would reach into the user's desktop.
+# without anything that would reach into the user's desktop. A script that needs another prefix names it in
+# QEL_WINEPREFIX before it sources this.
 # shellcheck shell=bash
 . "$(dirname "${BASH_SOURCE[0]}")/common.sh"
 
-export WINEPREFIX=$root/build/wine
+export WINEPREFIX=${QEL_WINEPREFIX-$root/build/wine}
 export WINEARCH=win64
 export LC_ALL=C.UTF-8 # in another character set Wine mangles the letters of paths
 export WINEDEBUG=-all
@@ -18,7 +19,7 @@ wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }
 wine_alone() {
   [[ ${QEL_ALONE_IN-} != "$WINEPREFIX" ]] || return 0
   mkdir -p "$root/build"
-  local lock=$root/build/wine.lock
+  local lock=$WINEPREFIX.lock
   flock --nonblock "$lock" true || progress "Waiting for another script that uses Wine"
   QEL_ALONE_IN=$WINEPREFIX exec flock --close "$lock" "$0" "$@"
 }
@@ -26,6 +27,7 @@ wine_alone() {
 # Makes the prefix if there is none yet.
 wine_make_prefix() {
   [[ ! -f $WINEPREFIX/.complete ]] || return 0
+  "$root/scripts/setup" wine
   progress "Making a Wine prefix"
   mkdir -p "$WINEPREFIX"
   # Rarely the first boot of a new prefix fails; the second one then completes it.

@@ -1,0 +1,370 @@
+#!/usr/bin/env python3
+"""Makes the packages and uses them as an administrator does, in a Wine prefix of their own.
+
+usage: package_test.py SOURCES BUILD EXTENSION_USER [TEST_CLASS ...]
+
+BUILD is the folder of the preset windows. The environment names the prefix (with_own_prefix).
+"""
+
+import contextlib
+import hashlib
+import os
+import pathlib
+import re
+import shutil
+import struct
+import subprocess
+import sys
+import tempfile
+import unittest
+import zipfile
+
+SOURCES, BUILD, EXTENSION_USER = map(pathlib.Path, sys.argv[1:4])
+
+FILES = ("NOTICES.txt", "QelShellExt.dll", "README.txt", "qelshow.exe")
+PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
+EPOCH = "1700000000"
+
+# In full: else Wine starts one more program, which looks for them.
+SYSTEM, REGEDIT = "C:\\windows\\system32\\", r"C:\windows\regedit.exe"
+
+# What msiexec answers, as far as Linux sees it.
+DONE, FAILED, RESTART_NEEDED = 0, 1603 & 0xFF, 3010 & 0xFF
+
+
+def make_packages(out, build=BUILD, epoch=EPOCH, **options):
+    environment = os.environ | {"SOURCE_DATE_EPOCH": epoch} | options.pop("environment", {})
+    return subprocess.run([SOURCES / "packaging" / "make_packages.py", build, out], check=True, text=True,
+                          stdin=subprocess.DEVNULL, capture_output=True, env=environment, **options)
+
+
+def package(out, ending=".msi"):
+    """The one package in a folder."""
+    [path] = (path for path in out.glob("*" + ending) if ending != ".zip" or "symbols" not in path.name)
+    return path
+
+
+def copy_build(folder):
+    """What packages are made of, and no more."""
+    folder.mkdir()
+    for name in ("CMakeCache.txt", *PROGRAMS, *(f"{program}.debug" for program in PROGRAMS)):
+        shutil.copyfile(BUILD / name, folder / name)
+    shutil.copytree(BUILD / "server" / "registry", folder / "server" / "registry",
+                    ignore=lambda _, names: [name for name in names if not name.endswith(".rgs")])
+    return folder
+
+
+def next_version(build):
+    """Makes the build one of a version that is higher by one, with a DLL that says so."""
+    cache = build / "CMakeCache.txt"
+    text = cache.read_text()
+    version = re.search(r"^CMAKE_PROJECT_VERSION:STATIC=(.*)$", text, re.MULTILINE)[1]
+    major, minor, patch = map(int, version.split("."))
+    cache.write_text(text.replace(f"VERSION:STATIC={version}", f"VERSION:STATIC={major}.{minor}.{patch + 1}"))
+    dll = bytearray((build / "QelShellExt.dll").read_bytes())
+    fixed_info = dll.index(struct.pack("<I", 0xFEEF04BD))
+    struct.pack_into("<2I", dll, fixed_info + 8, major << 16 | minor, (patch + 1) << 16)
+    (build / "QelShellExt.dll").write_bytes(dll)
+    return build
+
+
+def digest(path):
+    return hashlib.sha256(path.read_bytes()).hexdigest()
+
+
+class Test(unittest.TestCase):
+    maxDiff = None
+
+    def setUp(self):
+        folder = tempfile.TemporaryDirectory()
+        self.addCleanup(folder.cleanup)
+        self.folder = pathlib.Path(folder.name)
+
+
+class Contents(Test):
+    @classmethod
+    def setUpClass(cls):
+        folder = tempfile.TemporaryDirectory()
+        cls.addClassCleanup(folder.cleanup)
+        cls.out = pathlib.Path(folder.name)
+        cls.told = make_packages(cls.out).stderr
+
+    def test_are_the_same_whoever_makes_them_wherever_and_whenever(self):
+        first, second = self.out, self.folder / "second"
+        make_packages(second, copy_build(self.folder / "another folder"), umask=0o077, cwd="/",
+                      environment={"TZ": "Asia/Tokyo", "LC_ALL": "C"})
+        self.assertEqual(sorted(path.name for path in first.iterdir()),
+                         sorted(path.name for path in second.iterdir()))
+        for path in first.iterdir():
+            self.assertEqual(digest(path), digest(second / path.name), path.name)
+
+    def test_hold_what_was_built_and_its_sums(self):
+        sums = dict(reversed(line.split()) for line in (self.out / "SHA256SUMS").read_text().splitlines())
+        self.assertEqual(sums, {path.name: digest(path) for path in self.out.iterdir() if path.name != "SHA256SUMS"})
+        self.assertEqual(len(sums), 3)
+        archive = package(self.out, ".zip")
+        with zipfile.ZipFile(archive) as files:
+            self.assertEqual(files.namelist(), [f"{archive.stem}/{name}" for name in FILES])
+            for program in PROGRAMS:
+                self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
+
+    def test_symbols_tell_the_line_of_an_address_in_the_released_dll(self):
+        symbols = package(self.out, "-symbols.zip")
+        with zipfile.ZipFile(symbols) as files:
+            files.extractall(self.folder)
+        debug = self.folder / symbols.stem / "QelShellExt.dll.debug"
+        names = subprocess.run(["x86_64-w64-mingw32-nm", debug], check=True, capture_output=True, text=True).stdout
+        address = re.search(r"^([0-9a-f]+) T DllRegisterServer$", names, re.MULTILINE)[1]
+        dll = self.folder / "QelShellExt.dll"
+        shutil.copyfile(BUILD / dll.name, dll)
+        shutil.move(debug, self.folder)  # where the reference in the DLL finds it
+        line = subprocess.run(["x86_64-w64-mingw32-addr2line", "-e", dll, address], check=True, capture_output=True,
+                              text=True).stdout
+        self.assertRegex(line, r"/server/\w+\.(cpp|h):\d+$")
+        self.assertNotIn(str(SOURCES), line)
+
+    def test_are_signed_where_there_is_a_certificate(self):
+        self.assertIn("Not signing", self.told)
+        key, certificate, both, password = (self.folder / name for name in ("key", "certificate", "both", "password"))
+        password.write_text("open sesame")
+        for command in (
+            ("req", "-x509", "-newkey", "rsa:2048", "-nodes", "-keyout", key, "-out", certificate, "-days", "2",
+             "-subj", "/CN=Nobody", "-addext", "extendedKeyUsage=codeSigning"),
+            ("pkcs12", "-export", "-inkey", key, "-in", certificate, "-out", both, "-passout", f"file:{password}"),
+        ):
+            subprocess.run(["openssl", *command], check=True, capture_output=True)
+        out = self.folder / "signed"
+        # A time at which the certificate is good.
+        result = make_packages(out, epoch=str(int(certificate.stat().st_mtime) + 60),
+                               environment={"QEL_SIGN_PKCS12": str(both), "QEL_SIGN_PASSWORD_FILE": str(password)})
+        self.assertEqual(result.stderr, "")
+        with zipfile.ZipFile(package(out, ".zip")) as files:
+            for name in PROGRAMS:
+                (self.folder / name).write_bytes(files.read(f"{package(out, '.zip').stem}/{name}"))
+        for path in (package(out), *(self.folder / name for name in PROGRAMS)):
+            subprocess.run(["osslsigncode", "verify", "-CAfile", certificate, "-in", path], check=True,
+                           capture_output=True)
+        with self.assertRaises(subprocess.CalledProcessError):
+            subprocess.run(["osslsigncode", "verify", "-CAfile", certificate, "-in", package(self.out)],
+                           check=True, capture_output=True)
+
+
+class Prefix:
+    """A machine with Wine for Windows, which can be as it was before."""
+
+    def __init__(self):
+        self.path = pathlib.Path(os.environ["WINEPREFIX"])
+        self.drive = self.path / "drive_c"
+        self.installed = self.drive / "Program Files" / "QelShellExt"
+        self.shut_down()
+        if not (self.path / "new").exists():
+            self.save("new")
+
+    def save(self, state):
+        """Keeps the registry of the machine, which is shut down."""
+        (self.path / state).mkdir(exist_ok=True)
+        for hive in self.path.glob("*.reg"):
+            shutil.copyfile(hive, self.path / state / hive.name)
+
+    def renew(self, state):
+        self.shut_down()
+        for hive in (self.path / state).iterdir():
+            shutil.copyfile(hive, self.path / hive.name)
+        shutil.rmtree(self.installed, ignore_errors=True)
+        shutil.rmtree(self.drive / "windows" / "Installer", ignore_errors=True)
+        self.start()
+
+    def start(self):
+        for command in (("wineserver", "-p"), ("wine", "wineboot")):
+            # Wine's services inherit pipes and would keep whoever reads them waiting.
+            subprocess.run(command, check=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
+                           stderr=subprocess.DEVNULL)
+        # Rarely, on a busy machine, Wine cannot start the first program yet.
+        for _ in range(5):
+            if self.run(SYSTEM + "cmd.exe", "/c", "exit 0").returncode == 0:
+                break
+
+    def shut_down(self):
+        for option in ("-k", "-w"):
+            subprocess.run(["wineserver", option], stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+
+    def restart(self):
+        self.shut_down()
+        self.start()
+
+    @staticmethod
+    def run(*arguments):
+        # A file, as a pipe would be kept open by a desktop that Wine starts and that lives a second longer.
+        with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
+            result = subprocess.run(["wine", *map(str, arguments)], stdin=subprocess.DEVNULL, stdout=out,
+                                    stderr=errors)
+            for file in (out, errors):
+                file.seek(0)
+            result.stdout, result.stderr = out.read(), errors.read()
+        return result
+
+    def msiexec(self, *arguments):
+        return self.run(SYSTEM + "msiexec.exe", "/qn", *arguments)
+
+    def qelshow(self, *arguments):
+        return self.run(self.installed / "qelshow.exe", *arguments)
+
+    def registry(self):
+        """The lines of HKEY_LOCAL_MACHINE\\Software, each with its key."""
+        with tempfile.TemporaryDirectory() as folder:
+            out = pathlib.Path(folder) / "out.reg"
+            self.run(REGEDIT, "/E", out, r"HKEY_LOCAL_MACHINE\Software").check_returncode()
+            text = out.read_text("utf-16")
+        lines, key = set(), ""
+        for line in text.replace("\\\n  ", "").splitlines()[1:]:
+            if line.startswith("["):
+                key = line[len(r"[HKEY_LOCAL_MACHINE\Software"):-1]
+                lines.add(key)
+            elif line:
+                lines.add(f"{key} : {line}")
+        return lines
+
+    @contextlib.contextmanager
+    def program_that_uses_the_extension(self):
+        """Answers a function that ends the program and answers its exit status."""
+        process = subprocess.Popen(["wine", EXTENSION_USER], stdin=subprocess.PIPE, stdout=subprocess.PIPE,
+                                   stderr=subprocess.DEVNULL)
+        try:
+            assert process.stdout.readline().strip() == b"using"
+            yield lambda: (process.communicate(b"\n"), process.returncode)[1]
+        finally:
+            process.kill()
+            process.communicate()
+
+
+# Where Windows Installer keeps what it has installed. Some of its keys stay, empty.
+BOOKKEEPING = (r"\Classes\Installer", r"\Microsoft\Windows\CurrentVersion\Installer")
+UNINSTALL = r"\Microsoft\Windows\CurrentVersion\Uninstall"
+
+# Of other programs, in the same keys: an empty key goes with what is removed from it.
+OTHERS = r"""REGEDIT4
+
+[HKEY_LOCAL_MACHINE\Software\Classes\.raw]
+"Content Type"="image/x-other"
+
+[HKEY_LOCAL_MACHINE\Software\Classes\.mrc\ShellEx\{8895B1C6-B41F-4C1C-A562-0D564250836F}]
+@="another handler"
+
+[HKEY_LOCAL_MACHINE\Software\Classes\Wow6432Node\CLSID\{0B5A2D0C-7F0E-4C57-9E61-0A5B0F3D5A11}]
+@="another class"
+
+[HKEY_LOCAL_MACHINE\Software\Microsoft\Windows\CurrentVersion\Shell Extensions\Approved]
+"another"="program"
+"""
+
+
+def without(lines, *keys):
+    keys = tuple(key.lower() for key in keys)
+    return {line for line in lines if not line.lower().startswith(keys)}
+
+
+class Installation(Test):
+    @classmethod
+    def setUpClass(cls):
+        folder = tempfile.TemporaryDirectory()
+        cls.addClassCleanup(folder.cleanup)
+        cls.out, cls.next_out = (pathlib.Path(folder.name) / name for name in ("out", "next out"))
+        make_packages(cls.out)
+        cls.next_build = next_version(copy_build(pathlib.Path(folder.name) / "next build"))
+        make_packages(cls.next_out, cls.next_build)
+        cls.msi, cls.next_msi = package(cls.out), package(cls.next_out)
+        cls.prefix = Prefix()
+        cls.addClassCleanup(cls.prefix.shut_down)
+        cls.prefix.renew("new")
+        others = pathlib.Path(folder.name) / "others.reg"
+        others.write_text(OTHERS)
+        cls.prefix.run(REGEDIT, "/S", others).check_returncode()
+        cls.before = cls.prefix.registry()
+        cls.prefix.shut_down()
+        cls.prefix.save("shared")
+
+    def setUp(self):
+        super().setUp()
+        self.prefix.renew("shared")
+        self.image = self.folder / "image.mrc"
+        self.image.write_bytes(struct.pack("<4i", 16, 12, 1, 0).ljust(1024, b"\0") + bytes(range(16 * 12)))
+
+    def install(self, msi, *properties, status=DONE):
+        result = self.prefix.msiexec("/i", msi, *properties)
+        self.assertEqual(result.returncode, status, result)
+
+    def remove(self, msi):
+        result = self.prefix.msiexec("/x", msi)
+        self.assertEqual(result.returncode, DONE, result)
+
+    def ours(self):
+        """What has come into the registry, but for what the installer has for itself."""
+        after = self.prefix.registry()
+        self.assertEqual(self.before - after, set())
+        return without(after - self.before, *BOOKKEEPING, UNINSTALL)
+
+    def assertWorks(self):
+        doctor = self.prefix.qelshow("doctor", self.image)
+        self.assertEqual(doctor.returncode, 0, doctor.stdout.decode())
+        thumbnail = self.prefix.qelshow("thumbnail", self.image, "-o", "-")
+        self.assertEqual((thumbnail.returncode, thumbnail.stdout[:8]), (0, b"\x89PNG\r\n\x1a\n"))
+        built = self.prefix.qelshow("thumbnail", self.image, "-o", "-", "--server", BUILD / "QelShellExt.dll")
+        self.assertEqual(thumbnail.stdout, built.stdout)
+
+    def assertRemoved(self):
+        after = without(self.prefix.registry(), *BOOKKEEPING)
+        self.assertEqual(after ^ without(self.before, *BOOKKEEPING), set())
+        self.assertFalse(self.prefix.installed.exists())
+
+    def test_writes_what_registering_writes_and_removes_it_again(self):
+        self.install(self.msi)
+        installed = self.ours()
+        self.assertEqual(sorted(path.name for path in self.prefix.installed.iterdir()), sorted(FILES))
+        self.assertWorks()
+        self.remove(self.msi)
+        self.assertRemoved()
+
+        self.prefix.installed.mkdir()
+        shutil.copyfile(BUILD / "QelShellExt.dll", self.prefix.installed / "QelShellExt.dll")
+        dll = r"C:\Program Files\QelShellExt\QelShellExt.dll"
+        self.assertEqual(self.prefix.run(SYSTEM + "regsvr32.exe", "/s", dll).returncode, 0)
+        self.assertEqual(installed ^ self.ours(), set())
+
+    def test_an_extension_can_be_left_to_others(self):
+        self.install(self.msi, "ADDLOCAL=ALL", "REMOVE=raw")
+        fewer = self.ours()
+        self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())
+        self.install(self.msi, "ADDLOCAL=raw")
+        everything = self.ours()
+        # All that has come is of .raw: below its keys, or of its class.
+        self.assertEqual(fewer - everything, set())
+        self.assertGreater(len(everything - fewer), 20)
+        for line in everything - fewer:
+            self.assertRegex(line, r"\\\.raw|\{E217E970-5E2E-11E1-B86C-0800200C9A66\}")
+        self.install(self.msi, "REMOVE=raw")
+        self.assertEqual(self.ours() ^ fewer, set())
+        self.remove(self.msi)
+        self.assertRemoved()
+
+    def test_an_upgrade_replaces_a_dll_that_is_in_use(self):
+        self.install(self.msi)
+        installed = self.ours()
+        with self.prefix.program_that_uses_the_extension() as end:
+            self.install(self.next_msi, status=RESTART_NEEDED)
+            self.assertEqual(end(), 0)
+        self.prefix.restart()
+        self.assertEqual(digest(self.prefix.installed / "QelShellExt.dll"),
+                         digest(self.next_build / "QelShellExt.dll"))
+        self.assertEqual(sorted(path.name for path in self.prefix.installed.iterdir()), sorted(FILES))
+        self.assertEqual(installed ^ self.ours(), set())
+        self.assertWorks()
+
+        self.install(self.msi, status=FAILED)  # an older version
+        self.assertEqual(digest(self.prefix.installed / "QelShellExt.dll"),
+                         digest(self.next_build / "QelShellExt.dll"))
+        self.remove(self.next_msi)
+        self.assertRemoved()
+
+
+if __name__ == "__main__":
+    unittest.main(argv=[sys.argv[0], *sys.argv[4:]], verbosity=2)

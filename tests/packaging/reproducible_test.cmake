@@ -1,0 +1,34 @@
+# Makes the packages from a copy of the sources in another folder, one with a name that is hard on tools, compiled anew,
+# and compares them byte by byte with those made of this build.
+#
+# cmake -D SOURCE=FOLDER -D BUILD=FOLDER -D WORK=FOLDER -P reproducible_test.cmake
+set(copy "${WORK}/a/copy's folder & (ä Ω 樹)")
+file(REMOVE_RECURSE ${WORK})
+file(GLOB sources RELATIVE ${SOURCE} ${SOURCE}/*)
+list(REMOVE_ITEM sources .git build)
+foreach(item ${sources})
+  file(COPY ${SOURCE}/${item} DESTINATION "${copy}")
+endforeach()
+
+set(ENV{SOURCE_DATE_EPOCH} 1700000000)
+set(ENV{CCACHE_DISABLE} 1)
+foreach(command
+    "${SOURCE}/packaging/make_packages.py;${BUILD};${WORK}/first"
+    "${copy}/scripts/package;--out;${WORK}/second")
+  execute_process(COMMAND ${command} COMMAND_ERROR_IS_FATAL ANY)
+endforeach()
+
+file(STRINGS ${WORK}/first/SHA256SUMS packages)
+list(TRANSFORM packages REPLACE "^[0-9a-f]+  " "")
+list(LENGTH packages count)
+if(NOT count EQUAL 3)
+  message(FATAL_ERROR "There are ${count} packages: ${packages}.")
+endif()
+foreach(package ${packages})
+  file(SHA256 ${WORK}/first/${package} first)
+  file(SHA256 ${WORK}/second/${package} second)
+  if(NOT first STREQUAL second)
+    message(FATAL_ERROR "${WORK}/second/${package} differs from that in ${WORK}/first.")
+  endif()
+endforeach()
+file(REMOVE_RECURSE ${WORK})
