@@ -48,6 +48,8 @@ class Documents(unittest.TestCase):
     def test_tell_of_the_version_that_is_built(self):
         versions = re.findall(r"(?m)^## \[([\d.]+)\]", (PROJECT / "CHANGELOG.md").read_text("utf-8"))
         self.assertEqual(versions[0], VERSION)
+        packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / "README.md").read_text("utf-8"))
+        self.assertEqual(set(packages), {VERSION})
 
 
 if __name__ == "__main__":
