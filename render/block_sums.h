@@ -220,7 +220,16 @@ class OrderedBlockSums {
   void Add(const ImageView<const Sample>& rows, std::int32_t x) {
     std::int32_t column = 0;
     if (x % factor_ != 0) column = AddPart(rows, x, 0, std::min(rows.width, factor_ - x % factor_));
-    while ((rows.width - column) / kSideBySide >= factor_) column = AddBlocks(rows, x, column);
+    const std::int32_t blocks = (rows.width - column) / factor_ / kSideBySide * kSideBySide;
+    double* const sums = sums_.data() + (x + column) / factor_;
+    // With the factor known to the compiler, small blocks are added faster.
+    switch (factor_) {
+      case 2: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 2>(), sums); break;
+      case 3: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 3>(), sums); break;
+      case 4: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 4>(), sums); break;
+      default: AddBlocks(rows, column, blocks, factor_, sums); break;
+    }
+    column += blocks * factor_;
     while (column < rows.width) column = AddPart(rows, x, column, std::min(rows.width - column, factor_));
   }
 
@@ -251,17 +260,26 @@ class OrderedBlockSums {
     return static_cast<double>(sample);
   }
 
-  /// Adds all columns of kSideBySide neighbouring blocks; returns the column after them.
-  std::int32_t AddBlocks(const ImageView<const Sample>& rows, std::int32_t x, std::int32_t column) {
+  /// Adds all columns of neighbouring blocks from a column on, kSideBySide at a time.
+  template <class Factor>
+  static void AddBlocks(const ImageView<const Sample>& rows, std::int32_t column, std::int32_t blocks,
+                        Factor factor, double* sums) {
+    for (std::int32_t block = 0; block < blocks; block += kSideBySide, sums += kSideBySide) {
+      AddSideBySide(rows, column + block * factor, factor, sums);
+    }
+  }
+
+  template <class Factor>
+  static void AddSideBySide(const ImageView<const Sample>& rows, std::int32_t column, Factor factor,
+                            double* sums) {
     constexpr std::size_t kPairs = kSideBySide / 2;
-    double* const sums = &sums_[static_cast<std::size_t>((x + column) / factor_)];
     __m128d chain[kPairs];
     for (std::size_t pair = 0; pair < kPairs; ++pair) chain[pair] = _mm_loadu_pd(sums + 2 * pair);
-    const std::size_t blockBytes = static_cast<std::size_t>(factor_) * sizeof(Sample);
+    const std::size_t blockBytes = static_cast<std::size_t>(factor) * sizeof(Sample);
     for (std::int32_t y = 0; y < rows.height; ++y) {
       const std::byte* bytes = rows.At(column, y);
       std::int32_t i = 0;
-      for (; i + 2 <= factor_; i += 2, bytes += 2 * sizeof(Sample)) {
+      for (; i + 2 <= factor; i += 2, bytes += 2 * sizeof(Sample)) {
         for (std::size_t pair = 0; pair < kPairs; ++pair) {
           const __m128d left = LoadTwo(bytes + 2 * pair * blockBytes);
           const __m128d right = LoadTwo(bytes + (2 * pair + 1) * blockBytes);
@@ -269,7 +287,7 @@ class OrderedBlockSums {
           chain[pair] = _mm_add_pd(chain[pair], _mm_unpackhi_pd(left, right));
         }
       }
-      if (i < factor_) {
+      if (i < factor) {
         for (std::size_t pair = 0; pair < kPairs; ++pair) {
           chain[pair] = _mm_add_pd(chain[pair], _mm_set_pd(LoadOne(bytes + (2 * pair + 1) * blockBytes),
                                                            LoadOne(bytes + 2 * pair * blockBytes)));
@@ -277,7 +295,6 @@ class OrderedBlockSums {
       }
     }
     for (std::size_t pair = 0; pair < kPairs; ++pair) _mm_storeu_pd(sums + 2 * pair, chain[pair]);
-    return column + kSideBySide * factor_;
   }
 
   /// Adds some columns of one block; returns the column after them.
