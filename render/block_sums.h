@@ -104,10 +104,21 @@ class ExactBlockSums {
     for (; y + 4 <= rows.height; y += 4) AddRows<4>(rows, y, count);
     for (; y + 2 <= rows.height; y += 2) AddRows<2>(rows, y, count);
     if (y < rows.height) AddRows<1>(rows, y, count);
-    if (step == kSamples) return;
-    for (std::size_t column = 1; column < columns_; ++column) {
-      std::copy_n(&columnSums_[column * step], kSamples, &columnSums_[column * kSamples]);
+    if (step != kSamples) LeaveOutColumnsBetween(step);
+  }
+
+  void LeaveOutColumnsBetween(std::size_t step) {
+    Lane* const sums = columnSums_.data();
+    std::size_t column = 1;
+    if constexpr (sizeof(Lane) == 4) {
+      // Two interleaved images are the common case.
+      for (column = 0; step == 2 && column + 4 < columns_; column += 4) {
+        const __m128 a = _mm_loadu_ps(reinterpret_cast<const float*>(sums + 2 * column));
+        const __m128 b = _mm_loadu_ps(reinterpret_cast<const float*>(sums + 2 * column + 4));
+        _mm_storeu_ps(reinterpret_cast<float*>(sums + column), _mm_shuffle_ps(a, b, _MM_SHUFFLE(2, 0, 2, 0)));
+      }
     }
+    for (; column < columns_; ++column) std::copy_n(sums + column * step, kSamples, sums + column * kSamples);
   }
 
   /// Adds `count` samples of rows to the column sums, which begin with row 0.
