@@ -92,8 +92,8 @@ class ExactBlockSums {
                                   std::conditional_t<std::is_signed_v<Sample>, std::int16_t, std::uint16_t>,
                                   std::int32_t>;
   static constexpr std::int32_t kMostRows = sizeof(Sample) == 1 ? 255 : 32767;
-  // Three channels are folded as four lanes, which the processor adds at once; the fourth is not used.
-  static constexpr std::size_t kFolded = kSamples == 3 ? 4 : kSamples;
+  // Three channels are folded with their neighbours in a vector, so that lanes behind the last are read.
+  static constexpr std::size_t kFolded = kSamples == 3 ? 8 : kSamples;
 
   void SumColumns(const ImageView<const Pixel>& rows) {
     const std::size_t step = static_cast<std::size_t>(rows.pixelStride) / sizeof(Sample);
@@ -215,13 +215,20 @@ class ExactBlockSums {
   /// Folds one block of colours, its channels side by side.
   template <class Sum, class Factor>
   static void FoldColours(const Lane* lanes, double* sums, Factor factor) {
-    __m128i sum = _mm_setzero_si128();
+    const auto load = [lanes](std::size_t i) {
+      return _mm_loadu_si128(reinterpret_cast<const __m128i*>(lanes + i * kSamples));
+    };
     const auto widened = [](__m128i narrow) { return _mm_unpacklo_epi16(narrow, _mm_setzero_si128()); };
-    for (std::size_t i = 0; i < factor; ++i) {
-      const __m128i column = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(lanes + i * kSamples));
-      sum = sizeof(Sum) == 2 ? _mm_add_epi16(sum, column) : _mm_add_epi32(sum, widened(column));
+    __m128i sum = _mm_setzero_si128();
+    if constexpr (sizeof(Sum) == 2) {
+      // Two columns at a time, the second in the lanes behind the first.
+      for (std::size_t i = 0; i + 2 <= factor; i += 2) sum = _mm_add_epi16(sum, load(i));
+      sum = _mm_add_epi16(sum, _mm_srli_si128(sum, kSamples * sizeof(Lane)));
+      if (factor % 2 != 0) sum = _mm_add_epi16(sum, load(factor - 1));
+      sum = widened(sum);
+    } else {
+      for (std::size_t i = 0; i < factor; ++i) sum = _mm_add_epi32(sum, widened(load(i)));
     }
-    if constexpr (sizeof(Sum) == 2) sum = widened(sum);
     constexpr bool kSwaps = SamplesOf<Pixel>::kSwaps;
     const __m128i two = kSwaps ? _mm_shuffle_epi32(sum, _MM_SHUFFLE(3, 3, 1, 2)) : sum;
     const __m128i third = kSwaps ? sum : _mm_unpackhi_epi64(sum, sum);
