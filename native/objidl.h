@@ -1,28 +1,16 @@
 // Stand-in for the platform's header of COM interfaces: the byte stream, which core reads through and tests
-// implement. Layouts and results are the platform's own.
+// implement, and the making of objects of registered classes, of which there are none. Layouts and results
+// are the platform's own.
 #pragma once
 
+#include <unknwn.h>
 #include <windows.h>
 
 #include <cstdint>
 
-#define STDMETHODCALLTYPE
-
-constexpr HRESULT S_FALSE = 1;
-constexpr HRESULT E_NOTIMPL = static_cast<HRESULT>(0x80004001);
-constexpr HRESULT E_NOINTERFACE = static_cast<HRESULT>(0x80004002);
-constexpr HRESULT E_FAIL = static_cast<HRESULT>(0x80004005);
 constexpr HRESULT STG_E_ACCESSDENIED = static_cast<HRESULT>(0x80030005);
 constexpr HRESULT STG_E_READFAULT = static_cast<HRESULT>(0x8003001E);
-
-struct GUID {
-  std::uint32_t Data1;
-  std::uint16_t Data2;
-  std::uint16_t Data3;
-  std::uint8_t Data4[8];
-};
-using IID = GUID;
-using REFIID = const IID&;
+constexpr HRESULT REGDB_E_CLASSNOTREG = static_cast<HRESULT>(0x80040154);
 
 union LARGE_INTEGER {
   std::int64_t QuadPart;
@@ -32,15 +20,6 @@ union ULARGE_INTEGER {
 };
 
 struct STATSTG;
-
-struct IUnknown {
-  virtual HRESULT QueryInterface(REFIID iid, void** object) = 0;
-  virtual ULONG AddRef() = 0;
-  virtual ULONG Release() = 0;
-
- protected:
-  ~IUnknown() = default;
-};
 
 struct ISequentialStream : IUnknown {
   virtual HRESULT Read(void* bytes, ULONG count, ULONG* read) = 0;
@@ -65,3 +44,17 @@ struct IStream : ISequentialStream {
  protected:
   ~IStream() = default;
 };
+
+struct IGlobalInterfaceTable : IUnknown {
+ protected:
+  ~IGlobalInterfaceTable() = default;
+};
+
+inline constexpr CLSID CLSID_StdGlobalInterfaceTable = {0x323, 0, 0, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
+inline constexpr IID IID_IGlobalInterfaceTable = {0x146, 0, 0, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
+constexpr DWORD CLSCTX_INPROC_SERVER = 1;
+
+inline HRESULT CoCreateInstance(REFCLSID, IUnknown*, DWORD, REFIID, void** object) {
+  *object = nullptr;
+  return REGDB_E_CLASSNOTREG;
+}

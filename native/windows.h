@@ -1,5 +1,5 @@
-// Stand-in for the platform's header where core, render and formats are built natively: only what those
-// layers and their tests use, with the platform's own names, layouts and results. Bitmaps are blocks of
+// Stand-in for the platform's header where layers are built natively: only what these layers and their tests
+// use, with the platform's own names, layouts and results. Bitmaps are blocks of
 // memory, handles of files are file descriptors.
 #pragma once
 
@@ -15,14 +15,24 @@ using UINT = unsigned int;
 using HRESULT = std::int32_t;
 using HANDLE = void*;
 
+constexpr BOOL FALSE = 0;
+constexpr BOOL TRUE = 1;
+
 constexpr HRESULT S_OK = 0;
+constexpr HRESULT S_FALSE = 1;
+constexpr HRESULT E_FAIL = static_cast<HRESULT>(0x80004005);
+constexpr HRESULT E_UNEXPECTED = static_cast<HRESULT>(0x8000FFFF);
 constexpr HRESULT E_ACCESSDENIED = static_cast<HRESULT>(0x80070005);
+constexpr HRESULT E_OUTOFMEMORY = static_cast<HRESULT>(0x8007000E);
 constexpr HRESULT E_INVALIDARG = static_cast<HRESULT>(0x80070057);
 constexpr bool SUCCEEDED(HRESULT result) {
   return result >= 0;
 }
 constexpr bool FAILED(HRESULT result) {
   return result < 0;
+}
+constexpr HRESULT HRESULT_FROM_WIN32(DWORD error) {
+  return error == 0 ? S_OK : static_cast<HRESULT>(0x80070000 | (error & 0xFFFF));
 }
 
 struct HINSTANCE__;
@@ -57,6 +67,24 @@ constexpr DWORD FILE_ATTRIBUTE_NORMAL = 0x80;
 HANDLE CreateFileW(const wchar_t* path, DWORD access, DWORD share, void* security, DWORD creation,
                    DWORD attributes, HANDLE pattern);
 BOOL CloseHandle(HANDLE file);
+
+constexpr DWORD ERROR_NOT_ENOUGH_MEMORY = 8;
+
+struct CRITICAL_SECTION {
+  void* mutex;
+};
+
+/// Fails only without memory.
+BOOL InitializeCriticalSectionAndSpinCount(CRITICAL_SECTION* section, DWORD spinCount);
+void EnterCriticalSection(CRITICAL_SECTION* section);
+void LeaveCriticalSection(CRITICAL_SECTION* section);
+void DeleteCriticalSection(CRITICAL_SECTION* section);
+
+/// That of a critical section that could not be made, as nothing else is asked for its error.
+DWORD GetLastError();
+
+void* EncodePointer(void* pointer);
+void* DecodePointer(void* pointer);
 
 // gdi32
 struct RGBQUAD {
