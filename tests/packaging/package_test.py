@@ -343,8 +343,35 @@ class Installation(Test):
             self.assertRegex(line, r"\\\.raw|\{E217E970-5E2E-11E1-B86C-0800200C9A66\}")
         self.install(self.msi, "REMOVE=raw")
         self.assertEqual(self.ours() ^ fewer, set())
+        self.assertWorks()
         self.remove(self.msi)
         self.assertRemoved()
+
+    def advice(self, status):
+        """What the doctor says to run with msiexec, each the arguments behind the product."""
+        doctor = self.prefix.qelshow("doctor")
+        text = doctor.stdout.decode()
+        self.assertEqual(doctor.returncode, status, text)
+        self.assertNotIn("regsvr32", text)  # it would register what was left out
+        return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
+
+    def test_what_the_doctor_says_to_run_puts_the_registration_right(self):
+        self.install(self.msi)
+        everything = self.ours()
+        self.install(self.msi, "REMOVE=raw")
+        fewer = self.ours()
+        key = r"HKLM\Software\Classes\.ser\ShellEx\PropertyHandler"
+        self.prefix.run(SYSTEM + "reg.exe", "delete", key, "/f").check_returncode()
+        self.assertNotEqual(self.ours(), fewer)
+
+        (product, add), (_, repair) = self.advice(status=1)
+        self.assertEqual((add, repair), ("ADDLOCAL=raw", "REINSTALL=ALL"))
+        self.install(product, repair)
+        self.assertEqual(self.ours() ^ fewer, set())
+        self.assertEqual(self.advice(status=0), [(product, add)])
+        self.install(product, add)
+        self.assertEqual(self.ours() ^ everything, set())
+        self.assertEqual(self.advice(status=0), [])
 
     def test_an_upgrade_replaces_a_dll_that_is_in_use(self):
         self.install(self.msi)

@@ -673,6 +673,63 @@ class Doctor(Test):
             (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store"),
              (".mrc", "thumbnail"), (".mrc", "properties"), (".raw", "property store")), "not registered"))
 
+    def leave_out(self, kind, *classes):
+        """Takes a kind out of the registration, as an installation without it does."""
+        self.set_registry(dict.fromkeys([f"{self.CLASSES}.{kind}\\ShellEx", self.PROPERTY_STORES + "." + kind,
+                                         *(f"{self.CLASSES}CLSID\\{clsid}" for clsid in classes)]))
+
+    def left_out(self, document):
+        """What is told of the kinds that were left out, by kind."""
+        return {kind["extension"]: kind["leftOut"] for kind in document["kinds"] if kind["leftOut"]}
+
+    def test_takes_a_kind_that_was_left_out_for_no_fault(self):
+        self.register()
+        self.leave_out("raw", self.RAW_STORE)
+        self.leave_out("ser")
+        result, document = self.doctor()
+        self.assertEqual((result.returncode, document["problems"]), (DONE, []))
+        told = self.left_out(document)
+        self.assertEqual(list(told), [".ser", ".raw"])
+        for kind, sentence in told.items():
+            self.assertOneSentence(sentence, f"Nothing of QelShellExt is registered for {kind} files",
+                                   f'run regsvr32 "Z:{SERVER}"'.replace("/", "\\"))
+        missing = [".raw property store", (".raw", "property store")] + [
+            (kind, role) for kind in told for role in ("thumbnail", "info tip", "properties")]
+        self.assertWorksBut(document, dict.fromkeys(missing, "not registered"))
+
+    def test_tells_of_a_file_whose_kind_was_left_out_that_windows_does_not_ask(self):
+        self.register()
+        self.leave_out("ser")
+        self.leave_out("raw", self.RAW_STORE)
+        file = self.write("a.raw", raw(4, 4, 0, 8, bytes(16)))
+        result = run("doctor", file, server=None)
+        self.assertEqual((result.returncode, result.stderr), (FAILED, ""))
+        self.assertRegex(result.stdout, r"a\.raw: is read, 4 x 4 .*\n +Windows does not ask QelShellExt for \.raw files")
+        self.assertRegex(result.stdout, r"Left to other programs\n +Nothing .*\.ser files.*\n +Nothing .*\.raw files")
+        result, document = self.doctor(self.write("a.mrc", mrc()))
+        self.assertEqual((result.returncode, document["files"][0]["remark"]), (DONE, None))
+        result, document = self.doctor(file)
+        self.assertIn(".raw", document["files"][0]["remark"])
+        self.assertEqual((result.returncode, document["files"][0]["verdict"]), (FAILED, "good"))
+
+    def test_names_the_program_to_which_a_kind_was_left(self):
+        foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"
+        thumbnail = self.CLASSES + ".raw\\" + self.THUMBNAIL
+        self.addCleanup(self.set_registry, {foreign: None, thumbnail: None})
+        self.register()
+        self.leave_out("raw", self.RAW_STORE)
+        self.set_registry({foreign: "Stack Peeker", foreign + "\\InprocServer32": "C:\\peek.dll", thumbnail: self.FOREIGN})
+        result, document = self.doctor()
+        self.assertEqual((result.returncode, document["problems"]), (DONE, []))
+        self.assertOneSentence(self.left_out(document)[".raw"], "Stack Peeker", self.FOREIGN, "C:\\peek.dll")
+        self.assertEqual(self.conditions(document)[".raw", "thumbnail"], "another program")
+
+    def test_takes_a_kind_for_damaged_of_which_something_is_left(self):
+        self.register()
+        self.leave_out("raw")
+        document = self.assertProblem(".raw", "(thumbnail, info tip, properties, property store)")
+        self.assertEqual(self.left_out(document), {})
+
     def test_sees_that_a_class_is_disabled(self):
         blocked = "Software\\Microsoft\\Windows\\CurrentVersion\\Shell Extensions\\Blocked"
         keys = [f"{root}\\{blocked}" for root in ("HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER")]

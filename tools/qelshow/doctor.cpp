@@ -44,6 +44,22 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
   return files;
 }
 
+/// Remarks on each file of a kind that was left to other programs. Answers whether there is one that would be
+/// shown otherwise.
+bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& files) {
+  bool found = false;
+  for (FileFacts& facts : files) {
+    const auto kind = std::ranges::find(installation.kinds, L"." + facts.kind, &ExaminedKind::extension);
+    if (facts.verdict != Verdict::kGood || kind == installation.kinds.end() || kind->leftOut.empty())
+      continue;
+    facts.remark += (facts.remark.empty() ? L"Windows does not ask QelShellExt for "
+                                          : L" Windows does not ask QelShellExt for ") +
+                    kind->extension + L" files, which are left to other programs.";
+    found = true;
+  }
+  return found;
+}
+
 std::string ClassJson(const ExaminedClass& examined) {
   return JsonObject()
       .Text("name", examined.name)
@@ -68,6 +84,7 @@ std::string KindJson(const ExaminedKind& kind) {
   return JsonObject()
       .Text("extension", kind.extension)
       .Json("handlers", JsonArray(kind.handlers, HandlerJson))
+      .TextOrNull("leftOut", kind.leftOut)
       .Take();
 }
 
@@ -119,6 +136,11 @@ std::wstring Text(const Installation& installation, const std::vector<FileFacts>
       L"Classes\n" + ClassesText(installation.classes) + L"\nHandlers\n" + KindsText(installation.kinds);
   if (!files.empty()) text += L"\nFiles\n";
   for (const FileFacts& facts : files) text += FileText(facts);
+  std::wstring leftOut;
+  for (const ExaminedKind& kind : installation.kinds) {
+    if (!kind.leftOut.empty()) leftOut += L"    " + kind.leftOut + L"\n";
+  }
+  if (!leftOut.empty()) text += L"\nLeft to other programs\n" + leftOut;
   if (installation.problems.empty()) return text + L"\nQelShellExt is registered and works.\n";
   text += L"\nProblems\n";
   for (const std::wstring& problem : installation.problems) text += L"    " + problem + L"\n";
@@ -129,13 +151,14 @@ std::wstring Text(const Installation& installation, const std::vector<FileFacts>
 
 int RunDoctor(const CommandLine& line) {
   const Installation installation = ExamineInstallation();
-  const std::vector<FileFacts> files = ExamineFiles(line);
+  std::vector<FileFacts> files = ExamineFiles(line);
+  const bool isAnyLeftOut = RemarkOnLeftOut(installation, files);
   if (line.json) {
     PrintUtf8(Json(installation, files));
   } else {
     Print(Text(installation, files));
   }
-  int status = installation.problems.empty() ? kExitDone : kExitFailed;
+  int status = installation.problems.empty() && !isAnyLeftOut ? kExitDone : kExitFailed;
   for (const FileFacts& facts : files) status = std::max(status, static_cast<int>(facts.verdict));
   return status;
 }

@@ -7,7 +7,7 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 /// Prints how the extension is installed on this computer, whether it reads the files that the line names,
 /// and what to do about everything that is wrong. Answers the highest of the files' verdicts and, for an
-/// installation that does not work, kExitFailed.
+/// installation that does not work, or has left the kind of a file out, kExitFailed.
 int RunDoctor(const CommandLine& line);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

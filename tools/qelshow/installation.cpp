@@ -17,13 +17,24 @@ bool FileExists(const std::wstring& path) {
   return !path.empty() && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES;
 }
 
-/// What registers the extension: with the DLL that is registered, or else with the one beside this program.
+/// What registers the extension, with the DLL that is registered, or else with the one beside this program.
+/// What the installer has installed, it is to register itself: regsvr32 would register what was left out too,
+/// and the installer would leave that behind.
 std::wstring RegisterAdvice(const std::wstring& registeredDll) {
+  const std::wstring product = InstalledProduct();
+  if (!product.empty()) return L"run msiexec /i " + product + L" REINSTALL=ALL as administrator";
   std::wstring dll = registeredDll;
   if (!FileExists(dll)) dll = std::filesystem::path(OwnPath()).replace_filename(L"QelShellExt.dll").wstring();
   return FileExists(dll) ? L"run regsvr32 \"" + dll + L"\" as administrator"
                          : L"run regsvr32 with the path of QelShellExt.dll as administrator, or install "
                            L"QelShellExt again";
+}
+
+/// What registers a kind of file that was left out. The installer calls it as its extension without the dot.
+std::wstring AddAdvice(const std::wstring& extension, const std::wstring& registeredDll) {
+  const std::wstring product = InstalledProduct();
+  if (product.empty()) return RegisterAdvice(registeredDll);
+  return L"run msiexec /i " + product + L" ADDLOCAL=" + extension.substr(1) + L" as administrator";
 }
 
 constexpr const wchar_t* kReinstall = L" Install QelShellExt again.";
@@ -83,21 +94,30 @@ ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& wor
   return examined;
 }
 
+const ExaminedClass& FindClass(const std::vector<ExaminedClass>& classes, const CLSID& clsid) {
+  return *std::ranges::find(classes, clsid, &ExaminedClass::clsid);
+}
+
 /// The end of the way of a handler: the class behind it is one of the extension's own, or it is foreign.
 Condition ConditionOf(const Handler& handler, const std::vector<ExaminedClass>& classes) {
   if (handler.registered.empty()) return Condition::kNotRegistered;
   if (!SameIgnoringCase(handler.registered, GuidText(handler.expected))) return Condition::kForeign;
-  return std::ranges::find(classes, handler.expected, &ExaminedClass::clsid)->condition;
+  return FindClass(classes, handler.expected).condition;
+}
+
+/// A class of another program, with what the registry says of it.
+std::wstring ForeignClassText(const std::wstring& clsid) {
+  const RegisteredClass foreign = ReadClass(clsid);
+  std::wstring text = L"another program's class, " + clsid;
+  if (!foreign.title.empty()) text += L" (" + foreign.title + L")";
+  if (!foreign.dll.empty()) text += L" in \"" + foreign.dll + L"\"";
+  return text;
 }
 
 std::wstring ForeignHandlerProblem(const std::wstring& extension, const Handler& handler,
                                    const std::wstring& advice) {
-  const RegisteredClass foreign = ReadClass(handler.registered);
-  std::wstring text = L"The " + handler.role + L" of " + extension +
-                      L" files comes from another program's class, " + handler.registered;
-  if (!foreign.title.empty()) text += L" (" + foreign.title + L")";
-  if (!foreign.dll.empty()) text += L" in \"" + foreign.dll + L"\"";
-  text += L", registered in " + handler.key;
+  const std::wstring text = L"The " + handler.role + L" of " + extension + L" files comes from " +
+                            ForeignClassText(handler.registered) + L", registered in " + handler.key;
   return handler.isOwnKey ? text + L": to have it from QelShellExt, " + advice + L"."
                           : text +
                                 L", which goes before QelShellExt: to have it from QelShellExt, remove "
@@ -115,6 +135,34 @@ std::wstring MissingHandlersProblem(const ExaminedKind& kind, const std::wstring
   return L"No handler is registered for " + kind.extension + L" files (" + roles + L"): " + advice + L".";
 }
 
+/// Whether nothing of the extension is registered for this kind: no handler leads to it, and the class that
+/// only this kind has is not there.
+bool HasNothing(const ExaminedKind& kind, const std::vector<ExaminedClass>& classes) {
+  return std::ranges::none_of(kind.handlers, [&](const ExaminedHandler& examined) {
+    const Handler& handler = examined.registered;
+    return SameIgnoringCase(handler.registered, GuidText(handler.expected)) ||
+           (handler.expected != CLSID_QelShellExt && FindClass(classes, handler.expected).registered.exists);
+  });
+}
+
+/// An extension that is registered, but for some kinds of file not at all, has been left out there.
+void FindLeftOut(Installation& installation) {
+  const ExaminedClass& extension = FindClass(installation.classes, CLSID_QelShellExt);
+  const auto hasNothing = [&](const ExaminedKind& kind) { return HasNothing(kind, installation.classes); };
+  if (!extension.registered.exists || std::ranges::all_of(installation.kinds, hasNothing)) return;
+  for (ExaminedKind& kind : installation.kinds) {
+    if (!hasNothing(kind)) continue;
+    std::wstring text = L"Nothing of QelShellExt is registered for " + kind.extension + L" files";
+    for (const auto& [handler, condition] : kind.handlers) {
+      if (condition != Condition::kForeign) continue;
+      text += L", whose " + handler.role + L" comes from " + ForeignClassText(handler.registered);
+      break;
+    }
+    kind.leftOut = text + L": if they are to be shown by it, " +
+                   AddAdvice(kind.extension, extension.registered.dll) + L".";
+  }
+}
+
 std::vector<std::wstring> FindProblems(const Installation& installation) {
   const auto isMissing = [](const auto& examined) { return examined.condition == Condition::kNotRegistered; };
   const auto isBare = [&](const ExaminedKind& kind) { return std::ranges::all_of(kind.handlers, isMissing); };
@@ -130,8 +178,16 @@ std::vector<std::wstring> FindProblems(const Installation& installation) {
     if (!problem.empty() && std::ranges::find(problems, problem) == problems.end())
       problems.push_back(problem);
   };
-  for (const ExaminedClass& examined : classes) add(examined.problem);
+  const auto isLeftOut = [&](const ExaminedClass& examined) {
+    return std::ranges::any_of(installation.kinds, [&](const ExaminedKind& kind) {
+      return !kind.leftOut.empty() && kind.handlers.back().registered.expected == examined.clsid;
+    });
+  };
+  for (const ExaminedClass& examined : classes) {
+    if (examined.clsid == CLSID_QelShellExt || !isLeftOut(examined)) add(examined.problem);
+  }
   for (const ExaminedKind& kind : installation.kinds) {
+    if (!kind.leftOut.empty()) continue;
     add(MissingHandlersProblem(kind, advice));
     for (const auto& [handler, condition] : kind.handlers) {
       if (condition == Condition::kForeign) add(ForeignHandlerProblem(kind.extension, handler, advice));
@@ -163,12 +219,13 @@ Installation ExamineInstallation() {
                           ExamineClass(L".raw property store", CLSID_QelShellExtVistaRaw, workers),
                           ExamineClass(L".mrc property store", CLSID_QelShellExtVistaMrc, workers)};
   for (const KindOfFile& kind : ReadHandlers()) {
-    ExaminedKind examined{kind.extension, {}};
+    ExaminedKind examined{kind.extension, {}, {}};
     for (const Handler& handler : kind.handlers) {
       examined.handlers.push_back({handler, ConditionOf(handler, installation.classes)});
     }
     installation.kinds.push_back(std::move(examined));
   }
+  FindLeftOut(installation);
   installation.problems = FindProblems(installation);
   return installation;
 }

@@ -36,6 +36,9 @@ struct ExaminedHandler {
 struct ExaminedKind {
   std::wstring extension;
   std::vector<ExaminedHandler> handlers;
+  // A sentence for the user, if nothing at all of the extension is registered for this kind, as when it was
+  // left to other programs at the installation. That is no problem.
+  std::wstring leftOut;
 };
 
 struct Installation {

@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cwchar>
+#include <iterator>
 
 #include "class_ids.h"
 #include "shell_questions.h"
@@ -23,6 +24,8 @@ constexpr ShellHandler kShellHandlers[] = {
     {L"info tip", L"{00021500-0000-0000-C000-000000000046}", nullptr},
     {L"properties", L"PropertyHandler", nullptr},
 };
+
+constexpr std::size_t kMostKeyCharacters = 255;  // of the name of a key, which is Windows' own limit
 
 constexpr const wchar_t* kPropertyHandlers =
     LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
@@ -106,6 +109,27 @@ RegisteredClass ReadClass(const std::wstring& clsid) {
   RegCloseKey(key);
   return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32"),
           BlockingKey(clsid)};
+}
+
+std::wstring InstalledProduct() {
+  const std::wstring uninstall = LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\Uninstall)";
+  std::wstring product;
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(HKEY_LOCAL_MACHINE, uninstall.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
+  wchar_t name[kMostKeyCharacters + 1];
+  for (DWORD i = 0; product.empty() && RegEnumKeyW(key, i, name, std::size(name)) == ERROR_SUCCESS; ++i) {
+    const std::wstring entry = uninstall + L"\\" + name;
+    DWORD byInstaller = 0;
+    DWORD bytes = sizeof(byInstaller);
+    if (TextValue(HKEY_LOCAL_MACHINE, entry, L"DisplayName") == L"QelShellExt" &&
+        RegGetValueW(HKEY_LOCAL_MACHINE, entry.c_str(), L"WindowsInstaller", RRF_RT_REG_DWORD, nullptr,
+                     &byInstaller, &bytes) == ERROR_SUCCESS &&
+        byInstaller != 0) {
+      product = name;
+    }
+  }
+  RegCloseKey(key);
+  return product;
 }
 
 std::wstring FileVersion(const std::wstring& path) {

@@ -36,6 +36,10 @@ struct RegisteredClass {
 
 RegisteredClass ReadClass(const std::wstring& clsid);
 
+/// The product code under which Windows Installer has installed the extension, with its braces; empty
+/// without.
+std::wstring InstalledProduct();
+
 /// The version of a program or DLL, for instance "1.0.0"; empty for a file without one.
 std::wstring FileVersion(const std::wstring& path);
 
