@@ -39,6 +39,9 @@ class MrcHeader {
   /// count as 0.
   const std::optional<HeaderFault>& fault() const { return check_.fault(); }
 
+  /// Whether it is read as one that a big-endian machine wrote.
+  bool isSwapped() const { return swapped_; }
+
   Size2 size() const { return {Word(kNx), Word(kNy)}; }
   std::int32_t sections() const { return Word(kNz); }
   MrcPixelType pixelType() const;

@@ -132,6 +132,7 @@ class CommandLine(Test):
             (("thumbnail", "a.mrc", "b.mrc", "-o", "-"), "one file", "2"),
             (("page", "a.mrc"), "--out"),
             (("page", "a.mrc", "--json", "--out", "x"), '"--json"'),
+            (("page", "a.mrc", "--out", "-"), "standard output"),
             (("doctor", "--server", "a.dll"), '"--server"'),
             (("doctor", "--size=8"), '"--size=8"'),
         ):
@@ -148,7 +149,6 @@ class CommandLine(Test):
             self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
             self.assertOneSentence(result.stderr, server)
 
-
     def test_what_is_wrong_with_a_server_is_told(self):
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         machine = struct.unpack_from("<i", dll, 60)[0] + 4
@@ -164,6 +164,14 @@ class CommandLine(Test):
                 result = run("info", self.write("a.mrc", mrc()), server=str(server))
                 self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
                 self.assertOneSentence(result.stderr, server, part)
+
+    def test_a_pattern_stands_for_the_files_that_it_matches(self):
+        # Shells of Windows leave that to the program.
+        for name in ("ä 1.mrc", "ä 2.mrc", "ä 3.ali"):
+            self.write(name, mrc())
+        files = self.info(str(self.folder / "*.mrc"), str(self.folder / "?3.ali"), str(self.folder / "??3.ali"))
+        self.assertEqual([(file["name"], file["verdict"]) for file in files],
+                         [("ä 1.mrc", "good"), ("ä 2.mrc", "good"), ("?3.ali", "failed"), ("ä 3.ali", "good")])
 
 
 class ExitStatus(Test):
@@ -193,6 +201,7 @@ class ExitStatus(Test):
             ("ny.ali", mrc(height=-5, pixels=b""), "ny is -5"),
             ("nz.rec", mrc(frames=0), "nz is 0"),
             ("mode.mrc", mrc(mode=17), "mode is 17", "0 to 16"),
+            ("swapped.mrc", mrc(0x7FFFFFFF, 0x7FFFFFFF, 0x7FFFFFFF, pixels=b""), "nx is -129", "read as big-endian"),
             ("short.mrc", mrc()[:1000], "1000 bytes"),
             ("empty.mrc", b"", "0 bytes"),
             ("cut.mrc", mrc(200, 100, 3)[:41000], "41024", "41000 bytes"),
@@ -436,6 +445,20 @@ class Page(Test):
         self.assertEqual(result.returncode, UNSUPPORTED)
         self.assertOneSentence(result.stderr, self.folder / "in")
         self.assertFalse((self.folder / "page").exists())
+
+    def test_of_nothing_that_can_be_shown_is_not_made(self):
+        gone, text = self.folder / "gone.mrc", self.write("notes.txt", b"notes")
+        for paths, status, *parts in (
+            ((gone,), FAILED, gone, "cannot be opened"),
+            ((text, gone), FAILED, gone, "cannot be opened"),
+            ((self.folder / "no folder",), FAILED, "no folder", "cannot be opened"),
+            ((text,), UNSUPPORTED, text, ".mrc"),
+        ):
+            with self.subTest(paths=paths):
+                result = run("page", *paths, "--out", self.folder / "page")
+                self.assertEqual((result.returncode, result.stdout), (status, ""))
+                self.assertOneSentence(result.stderr, *parts)
+                self.assertFalse((self.folder / "page").exists())
 
     def test_of_a_single_file_says_so(self):
         result = run("page", self.write("a.mrc", mrc()), "--out", self.folder / "page")

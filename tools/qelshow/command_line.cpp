@@ -194,6 +194,9 @@ class OptionReader {
     if (facts_.takesOut && line.out.empty()) {
       WrongUsage(L"The option --out, which says where to write, is missing.", facts_.name);
     }
+    if (line.command == Command::kPage && line.out == L"-") {
+      WrongUsage(L"A page is a folder of files, which cannot be written to standard output.", facts_.name);
+    }
   }
 
   const CommandFacts& facts_;

@@ -76,11 +76,6 @@ int RunThumbnail(const CommandLine& line) {
 
 int RunPage(const CommandLine& line) {
   const std::vector<ListedFile> files = ListFiles(line.files);
-  if (files.empty()) {
-    throw Failure(
-        L"\"" + line.files.front() + L"\" holds no .mrc, .ali, .rec, .ser, .emi, .ebn or .raw file.",
-        ExitStatus(Verdict::kUnsupported));
-  }
   Worker worker(line.server);
   PageWriter page(line.out);
   constexpr std::size_t kMostNameWidth = 40;

@@ -34,8 +34,9 @@ std::wstring NumberText(std::int64_t value, std::string_view rule) {
   return text.str();
 }
 
-Finding FaultText(const HeaderFault& fault) {
-  Finding text = L"The header is not acceptable: ";
+Finding FaultText(const HeaderFault& fault, bool isSwapped) {
+  Finding text =
+      isSwapped ? L"The header, read as big-endian, is not acceptable: " : L"The header is not acceptable: ";
   if (fault.value) {
     text += Wide(fault.field) + L" is " + NumberText(*fault.value, fault.rule) + L" and must be ";
   } else {
@@ -48,12 +49,14 @@ std::wstring Bytes(std::int64_t count) {
   return std::to_wstring(count) + (count == 1 ? L" byte" : L" bytes");
 }
 
-/// The part that all kinds have in common, as far as parsing the header: `end` is the size of the file.
-Finding ExplainHeader(const std::istream& stream, const std::optional<HeaderFault>& fault, std::int64_t end) {
+/// The part that all kinds have in common, as far as parsing the header: `end` is the size of the file. A
+/// header that is read as big-endian is `isSwapped`.
+Finding ExplainHeader(const std::istream& stream, const std::optional<HeaderFault>& fault, std::int64_t end,
+                      bool isSwapped = false) {
   if (stream.eof()) {
     return L"The file ends before its header and index do: it has only " + Bytes(end) + L".";
   }
-  if (fault) return FaultText(*fault);
+  if (fault) return FaultText(*fault, isSwapped);
   return {};
 }
 
@@ -76,7 +79,7 @@ Finding ExplainFrame(const FrameLayout& frame, std::int64_t end) {
 
 Finding ExplainMrc(std::istream& stream, std::int64_t end) {
   const MrcHeader header(stream);
-  const Finding finding = ExplainHeader(stream, header.fault(), end);
+  const Finding finding = ExplainHeader(stream, header.fault(), end, header.isSwapped());
   return finding.empty() ? ExplainFrame(header.Section(header.sections() / 2), end) : finding;
 }
 

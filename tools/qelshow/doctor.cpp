@@ -52,9 +52,9 @@ bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& f
     const auto kind = std::ranges::find(installation.kinds, L"." + facts.kind, &ExaminedKind::extension);
     if (facts.verdict != Verdict::kGood || kind == installation.kinds.end() || kind->leftOut.empty())
       continue;
-    facts.remark += (facts.remark.empty() ? L"Windows does not ask QelShellExt for "
-                                          : L" Windows does not ask QelShellExt for ") +
-                    kind->extension + L" files, which are left to other programs.";
+    if (!facts.remark.empty()) facts.remark += L" ";
+    facts.remark += L"Windows does not ask QelShellExt for " + kind->extension +
+                    L" files, which are left to other programs.";
     found = true;
   }
   return found;

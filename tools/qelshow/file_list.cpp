@@ -1,9 +1,13 @@
 #include "file_list.h"
 
+#include <windows.h>
+
 #include <algorithm>
 #include <filesystem>
+#include <system_error>
 
 #include "failure.h"
+#include "file_facts.h"
 #include "file_type_factory.h"
 #include "text_tools.h"
 
@@ -38,6 +42,19 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
             [](const ListedFile& a, const ListedFile& b) { return a.name < b.name; });
 }
 
+/// Of these paths none is, or holds, a file that can be shown.
+[[noreturn]] void NothingToShow(const std::vector<std::wstring>& paths) {
+  for (const std::wstring& path : paths) {
+    if (GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) continue;
+    throw Failure(L"\"" + path + L"\" cannot be opened: " + SystemErrorText(GetLastError()) + L".");
+  }
+  const std::wstring& first = paths.front();
+  std::error_code ignored;
+  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" holds no" : L"\" is no") +
+                    L" .mrc, .ali, .rec, .ser, .emi, .ebn or .raw file.",
+                static_cast<int>(Verdict::kUnsupported));
+}
+
 }  // namespace
 
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {
@@ -50,6 +67,11 @@ std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {
       files.push_back({path, fs::path(path).filename().wstring()});
     }
   }
+  const auto canBeShown = [](const ListedFile& file) {
+    std::error_code ignored;
+    return IsSupported(file.path) && fs::exists(file.path, ignored);
+  };
+  if (std::ranges::none_of(files, canBeShown)) NothingToShow(paths);
   return files;
 }
 

@@ -13,7 +13,7 @@ struct ListedFile {
 
 /// The files named, and of the folders named all files of the supported kinds, also in folders below them,
 /// ordered by name. A path that does not exist is kept as a file, so that it is reported. Throws Failure for
-/// a folder that cannot be listed.
+/// a folder that cannot be listed, and if nothing is there that can be shown.
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

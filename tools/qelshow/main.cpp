@@ -41,6 +41,10 @@ int Main(const std::vector<std::wstring>& arguments) {
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt::Show
 
+/// Tells the C runtime of mingw-w64 to replace patterns on the command line by the files that they match, as
+/// shells of Windows leave that to the programs.
+int _dowildcard = -1;
+
 int wmain(int count, wchar_t** arguments) {
   return Qel::Lumetra::ShellExt::Show::Main({arguments + 1, arguments + count});
 }
