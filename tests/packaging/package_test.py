@@ -330,23 +330,6 @@ class Installation(Test):
         self.assertEqual(self.prefix.run(SYSTEM + "regsvr32.exe", "/s", dll).returncode, 0)
         self.assertEqual(installed ^ self.ours(), set())
 
-    def test_an_extension_can_be_left_to_others(self):
-        self.install(self.msi, "ADDLOCAL=ALL", "REMOVE=raw")
-        fewer = self.ours()
-        self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())
-        self.install(self.msi, "ADDLOCAL=raw")
-        everything = self.ours()
-        # All that has come is of .raw: below its keys, or of its class.
-        self.assertEqual(fewer - everything, set())
-        self.assertGreater(len(everything - fewer), 20)
-        for line in everything - fewer:
-            self.assertRegex(line, r"\\\.raw|\{E217E970-5E2E-11E1-B86C-0800200C9A66\}")
-        self.install(self.msi, "REMOVE=raw")
-        self.assertEqual(self.ours() ^ fewer, set())
-        self.assertWorks()
-        self.remove(self.msi)
-        self.assertRemoved()
-
     def advice(self, status):
         """What the doctor says to run with msiexec, each the arguments behind the product."""
         doctor = self.prefix.qelshow("doctor")
@@ -355,23 +338,52 @@ class Installation(Test):
         self.assertNotIn("regsvr32", text)  # it would register what was left out
         return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
 
-    def test_what_the_doctor_says_to_run_puts_the_registration_right(self):
-        self.install(self.msi)
-        everything = self.ours()
-        self.install(self.msi, "REMOVE=raw")
+    def test_an_extension_can_be_left_to_others(self):
+        self.install(self.msi, "ADDLOCAL=ALL", "REMOVE=raw")
         fewer = self.ours()
+        self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())
+        # What the doctor says puts right what is missing and no more, and adds what was left out.
         key = r"HKLM\Software\Classes\.ser\ShellEx\PropertyHandler"
         self.prefix.run(SYSTEM + "reg.exe", "delete", key, "/f").check_returncode()
-        self.assertNotEqual(self.ours(), fewer)
-
         (product, add), (_, repair) = self.advice(status=1)
         self.assertEqual((add, repair), ("ADDLOCAL=raw", "REINSTALL=ALL"))
         self.install(product, repair)
         self.assertEqual(self.ours() ^ fewer, set())
         self.assertEqual(self.advice(status=0), [(product, add)])
         self.install(product, add)
-        self.assertEqual(self.ours() ^ everything, set())
         self.assertEqual(self.advice(status=0), [])
+        everything = self.ours()
+        # All that has come is of .raw: below its keys, or of its class.
+        self.assertEqual(fewer - everything, set())
+        self.assertGreater(len(everything - fewer), 20)
+        for line in everything - fewer:
+            self.assertRegex(line, r"\\\.raw|\{E217E970-5E2E-11E1-B86C-0800200C9A66\}")
+        self.install(self.msi, "REMOVE=raw")
+        self.assertEqual(self.ours() ^ fewer, set())
+        self.remove(self.msi)
+        self.assertRemoved()
+
+    def test_the_readme_s_commands_install_them_find_what_is_wrong_with_a_file_and_remove_them(self):
+        text = (SOURCES / "README.md").read_text("utf-8")
+        commands = re.findall(r"(?m)^    (scripts/wine .*)$", text)
+        self.assertEqual(len(commands), 3)
+        self.image.write_bytes(struct.pack("<4i", 16, 12, 1, 99).ljust(1024, b"\0"))
+        files = {f"build/package/{self.msi.name}": self.msi, "build/samples/damaged.mrc": self.image}
+        environment = os.environ | {"QEL_WINEPREFIX": str(self.prefix.path)}
+        results = []
+        for command in commands:
+            for name, path in files.items():
+                command = command.replace(name, str(path))
+            with tempfile.TemporaryFile() as out:
+                status = subprocess.run(["sh", "-c", command], cwd=SOURCES, env=environment, stdin=subprocess.DEVNULL,
+                                        stdout=out, stderr=out).returncode
+                out.seek(0)
+                results.append((status, out.read().decode()))
+        (installed, _), (found, told), (removed, _) = results
+        self.assertEqual((installed, found, removed), (DONE, 4, DONE), results)
+        self.assertIn(f"{self.image}: is not read. The header is not acceptable: mode is 99", told)
+        self.assertIn("QelShellExt is registered and works.", told)
+        self.assertRemoved()
 
     def test_an_upgrade_replaces_a_dll_that_is_in_use(self):
         self.install(self.msi)

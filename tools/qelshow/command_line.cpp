@@ -75,7 +75,7 @@ those in the folders below it too.
   --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
 
 exit status: 0 the page is written, whatever it says about single files,
-1 failed, 2 wrong command line, 3 no file of a supported kind
+1 failed, 2 wrong command line, 3 no file of a supported kind, so no page
 )";
 
 constexpr const wchar_t* kDoctorHelp =
@@ -85,12 +85,14 @@ Says whether the extension works on this computer: for each kind of file which
 handlers are registered, whether their DLL is found and loads, its version, and
 whether objects of its classes can be made; and whether the registered extension
 reads each file. What is wrong is told with its reason and what to do about it.
+A kind of file that was left to other programs is no fault.
 
   --json  print one JSON document: {"schema": 1, "classes": [...],
           "kinds": [...], "problems": [...], "files": [...]}
 
-exit status: 0 everything works, 1 something does not, 2 wrong command line, 3 a
-file of no supported kind, 4 a damaged file; of several the highest
+exit status: 0 everything works, 1 something does not, or a file is of a kind
+that was left to other programs, 2 wrong command line, 3 a file of no supported
+kind, 4 a damaged file; of several the highest
 )";
 
 struct CommandFacts {

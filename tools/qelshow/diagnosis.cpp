@@ -129,7 +129,8 @@ Diagnosis Diagnose(const std::wstring& path) {
   if (attributes == INVALID_FILE_ATTRIBUTES) {
     return {Verdict::kFailed, L"The file cannot be opened: " + SystemErrorText(GetLastError()) + L"."};
   }
-  if ((attributes & FILE_ATTRIBUTE_DIRECTORY) != 0) return {Verdict::kFailed, L"This is a folder."};
+  if ((attributes & FILE_ATTRIBUTE_DIRECTORY) != 0)
+    return {Verdict::kFailed, L"This is a folder; \"qelshow page\" shows the files in it."};
 
   std::ifstream stream;
   OpenPath(stream, path.c_str());
