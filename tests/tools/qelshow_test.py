@@ -130,7 +130,8 @@ class CommandLine(Test):
             (("info", "a.mrc", "--size", "12x"), '"12x"'),
             (("thumbnail", "a.mrc"), "--out"),
             (("thumbnail", "a.mrc", "b.mrc", "-o", "-"), "one file", "2"),
-            (("page", "a.mrc"), "--out"),
+            (("page", "a.mrc", "--out="), '"--out="', "value"),
+            (("page", "a.mrc", "--out", ""), '"--out"', "value"),
             (("page", "a.mrc", "--json", "--out", "x"), '"--json"'),
             (("page", "a.mrc", "--out", "-"), "standard output"),
             (("doctor", "--server", "a.dll"), '"--server"'),
@@ -459,6 +460,14 @@ class Page(Test):
                 self.assertEqual((result.returncode, result.stdout), (status, ""))
                 self.assertOneSentence(result.stderr, *parts)
                 self.assertFalse((self.folder / "page").exists())
+
+    def test_goes_where_one_is_and_says_where_if_no_folder_is_named(self):
+        self.write("in/a.mrc", mrc())
+        result = run("page", "in", folder=self.folder)
+        self.assertEqual((result.returncode, result.stderr), (DONE, ""))
+        page = self.folder / "qelshow-page" / "index.html"
+        self.assertEqual([file["name"] for file in self.files_of(page)], ["a.mrc"])
+        self.assertIn(f"Z:{page}".replace("/", "\\") + ": 1 thumbnail", result.stdout)
 
     def test_of_a_single_file_says_so(self):
         result = run("page", self.write("a.mrc", mrc()), "--out", self.folder / "page")

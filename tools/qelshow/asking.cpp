@@ -11,13 +11,6 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-std::wstring AbsolutePath(const std::wstring& path) {
-  std::wstring absolute(GetFullPathNameW(path.c_str(), 0, nullptr, nullptr), L'\0');
-  absolute.resize(
-      GetFullPathNameW(path.c_str(), static_cast<DWORD>(absolute.size()), absolute.data(), nullptr));
-  return absolute.empty() ? path : absolute;
-}
-
 std::uint64_t FileBytes(const std::wstring& path) {
   WIN32_FILE_ATTRIBUTE_DATA data{};
   if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &data)) return 0;

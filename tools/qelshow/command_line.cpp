@@ -10,6 +10,8 @@ namespace {
 
 constexpr std::int32_t kMostSize = 4096;
 
+constexpr const wchar_t* kPageFolder = L"qelshow-page";
+
 constexpr const wchar_t* kHelp =
     LR"(qelshow shows what the QelShellExt extension shows to the Windows shell.
 
@@ -63,14 +65,15 @@ kind, 4 a damaged file
 )";
 
 constexpr const wchar_t* kPageHelp =
-    LR"(usage: qelshow page FOLDER|FILE... --out DIR [--server PATH] [--size N]
+    LR"(usage: qelshow page FOLDER|FILE... [--out DIR] [--server PATH] [--size N]
 
 Writes DIR\index.html, a page of the files' thumbnails with everything else that
 the shell learns about them, and prints a table of the files. The page needs
 nothing but its folder. Of a folder, all files of the supported kinds are shown,
 those in the folders below it too.
 
-  -o, --out DIR  the folder of the page; made if it is missing
+  -o, --out DIR  the folder of the page, made if it is missing; else
+                 qelshow-page in the current folder
   --server PATH  ask this QelShellExt.DLL instead of the registered one
   --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
 
@@ -182,17 +185,24 @@ class OptionReader {
 
   /// The value of an option: behind the equals sign, or the next argument.
   std::wstring Value(const std::wstring& argument, std::size_t equals) {
-    if (equals != std::wstring::npos) return argument.substr(equals + 1);
-    if (next_ == arguments_.size()) WrongUsage(L"\"" + argument + L"\" needs a value.", facts_.name);
-    return arguments_[next_++];
+    std::wstring value;
+    if (equals != std::wstring::npos) {
+      value = argument.substr(equals + 1);
+    } else if (next_ < arguments_.size()) {
+      value = arguments_[next_++];
+    }
+    if (value.empty()) WrongUsage(L"\"" + argument + L"\" needs a value.", facts_.name);
+    return value;
   }
 
-  void Check(const CommandLine& line) const {
+  /// Completes the line, or finds that it cannot be carried out.
+  void Check(CommandLine& line) const {
     if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is named.", facts_.name);
     if (line.command == Command::kThumbnail && line.files.size() > 1) {
       WrongUsage(L"A thumbnail is made of one file, not of " + std::to_wstring(line.files.size()) + L".",
                  facts_.name);
     }
+    if (line.command == Command::kPage && line.out.empty()) line.out = kPageFolder;
     if (facts_.takesOut && line.out.empty()) {
       WrongUsage(L"The option --out, which says where to write, is missing.", facts_.name);
     }

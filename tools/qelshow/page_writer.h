@@ -11,6 +11,7 @@
 #include <string_view>
 
 #include "file_facts.h"
+#include "text_tools.h"
 #include "worker.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -25,8 +26,8 @@ class PageWriter {
   /// Without this, no page appears in the folder, and one of an earlier run stays.
   void Finish();
 
-  /// Where the page is.
-  const std::wstring& path() const { return path_; }
+  /// Where the page is, with all its folders.
+  std::wstring path() const { return AbsolutePath(path_); }
 
  private:
   void Write(std::string_view text);

@@ -103,6 +103,13 @@ std::wstring GuidText(const GUID& guid) {
   return text.data();
 }
 
+std::wstring AbsolutePath(const std::wstring& path) {
+  std::wstring absolute(GetFullPathNameW(path.c_str(), 0, nullptr, nullptr), L'\0');
+  absolute.resize(
+      GetFullPathNameW(path.c_str(), static_cast<DWORD>(absolute.size()), absolute.data(), nullptr));
+  return absolute.empty() ? path : absolute;
+}
+
 std::wstring OwnPath() {
   std::wstring path(32768, L'\0');
   path.resize(GetModuleFileNameW(nullptr, path.data(), static_cast<DWORD>(path.size())));

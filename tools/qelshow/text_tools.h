@@ -36,6 +36,9 @@ std::wstring ProcessEndText(DWORD exitCode);
 /// For instance {6444048F-4C8B-11D1-8B70-080036B11A03}.
 std::wstring GuidText(const GUID& guid);
 
+/// The full path of what `path` names.
+std::wstring AbsolutePath(const std::wstring& path);
+
 /// The path of this program.
 std::wstring OwnPath();
 
