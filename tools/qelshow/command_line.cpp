@@ -24,6 +24,8 @@ commands:
   doctor [FILE...]       whether the extension works, and if not, why
   COMMAND --help         more about a command
 
+FILE can be a pattern, such as *.mrc.
+
 options of info, thumbnail and page:
   --server PATH  ask this QelShellExt.DLL instead of the registered one
   --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)

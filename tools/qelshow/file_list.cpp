@@ -46,7 +46,8 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
 [[noreturn]] void NothingToShow(const std::vector<std::wstring>& paths) {
   for (const std::wstring& path : paths) {
     if (GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) continue;
-    throw Failure(L"\"" + path + L"\" cannot be opened: " + SystemErrorText(GetLastError()) + L".");
+    const std::wstring reason = SystemErrorText(GetLastError());
+    throw Failure(L"\"" + path + L"\" cannot be opened: " + reason + L".");
   }
   const std::wstring& first = paths.front();
   std::error_code ignored;
