@@ -6,7 +6,6 @@
 
 #include <filesystem>
 #include <functional>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -211,34 +210,6 @@ TEST_F(Registration, WorksInTheSystemsLocaleAndRestoresTheThreads) {
   // That it is restored, here and after every failure, is checked when the test ends.
 }
 
-// The registrar's own tests fail at every single change, here one in five has to do: each round takes
-// thousands of calls of the registry.
-TEST_F(Registration, AFailureAtAnyChangeIsRepairedByRegisteringAgainOrCleanedUpByUnregistering) {
-  const RegistryContents complete = ExpectedAfterRegistering(ServerDll::Path());
-  const RegistryContents leftOver = ExpectedAfterUnregistering();
-  ASSERT_EQ(Observe(&DllRegistration::Register, Allow), S_OK);
-  const std::size_t changes = writes_;
-  ASSERT_GT(changes, 200u);
-  ASSERT_EQ(server_.Unregister(), S_OK);
-  g_notifications.clear();
-
-  for (std::size_t i = 0; i < changes; i += 5) {
-    for (const bool repairs : {true, false}) {
-      ASSERT_EQ(Observe(&DllRegistration::Register, FailAt(i)), E_ACCESSDENIED);
-      ASSERT_EQ(writes_, i + 1);
-      ASSERT_TRUE(g_notifications.empty());
-      if (repairs) {
-        ASSERT_EQ(server_.Register(), S_OK);
-        ASSERT_TRUE(Same(registry_.Contents(), complete)) << "change " << i;
-      }
-      ASSERT_EQ(server_.Unregister(), S_OK);
-      if (!repairs) {
-        ASSERT_EQ(Without(registry_.Contents(), leftOver), RegistryContents{}) << "change " << i;
-      }
-    }
-  }
-}
-
 TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIsSome) {
   const ScarceSystem system(server_.module());
   const auto getsPast = [&](int place, ScarceSystem::Then then) {
@@ -257,21 +228,8 @@ TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIs
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
 
-TEST_F(Registration, UnregisteringAgainCompletesAFailureAtAnyChange) {
-  ASSERT_EQ(server_.Register(), S_OK);
-  ASSERT_EQ(Observe(&DllRegistration::Unregister, Allow), S_OK);
-  const std::size_t changes = writes_;
-  for (std::size_t i = 0; i < changes; ++i) {
-    ASSERT_EQ(server_.Register(), S_OK);
-    ASSERT_EQ(Observe(&DllRegistration::Unregister, FailAt(i)), E_ACCESSDENIED);
-    ASSERT_EQ(server_.Unregister(), S_OK);
-    ASSERT_EQ(Without(registry_.Contents(), ExpectedAfterUnregistering()), RegistryContents{})
-        << "change " << i;
-  }
-}
-
-// What a process leaves that dies is what one leaves whose change fails, as nothing is written after a
-// failure; so a few deaths are enough here.
+// Threads die at every change in interrupted_registration_test; that whole processes leave no more behind is
+// seen at a few.
 TEST_F(Registration, WhatAProcessLeftThatDiedIsRepairedOrCleanedUpLikewise) {
   const std::filesystem::path program =
       ServerDll::Path().parent_path() / L"tests" / L"dying_registration.exe";

@@ -1,0 +1,156 @@
+// A registration that fails or dies, at every single one of its changes of the registry, and what the next
+// one makes of it.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <shlobj.h>
+
+#include <cstddef>
+#include <functional>
+#include <string>
+#include <utility>
+
+#include "dll_registration.h"
+#include "expected_registration.h"
+#include "import_patch.h"
+#include "registry_reader.h"
+#include "registry_writes.h"
+#include "same_contents.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+/// How often the DLL told the shell of a change.
+int g_notifications = 0;
+
+void WINAPI CountNotification(LONG, UINT, const void*, const void*) {
+  ++g_notifications;
+}
+
+/// A call that can be abandoned, as every call is in a process that is killed: nothing more of it runs, no
+/// destructor either, and what it has open stays open. It has a stack of its own, which then goes.
+class AbandonableCall {
+ public:
+  explicit AbandonableCall(std::function<void()> call)
+      : call_(std::move(call)),
+        caller_(ConvertThreadToFiber(nullptr)),
+        fiber_(CreateFiber(0, &Start, this)) {}
+
+  ~AbandonableCall() {
+    DeleteFiber(fiber_);
+    ConvertFiberToThread();
+  }
+
+  AbandonableCall(const AbandonableCall&) = delete;
+  AbandonableCall& operator=(const AbandonableCall&) = delete;
+
+  /// Returns whether the call has come to its end.
+  bool Run() {
+    const LCID locale = GetThreadLocale();
+    SwitchToFiber(fiber_);
+    SetThreadLocale(locale);  // which goes with a process
+    return isDone_;
+  }
+
+  /// For the call itself. Does not return.
+  void Abandon() { SwitchToFiber(caller_); }
+
+ private:
+  static void WINAPI Start(void* self) {
+    auto& call = *static_cast<AbandonableCall*>(self);
+    call.call_();
+    call.isDone_ = true;
+    SwitchToFiber(call.caller_);
+  }
+
+  std::function<void()> call_;
+  bool isDone_ = false;
+  void* caller_;
+  void* fiber_;
+};
+
+class InterruptedRegistration : public ::testing::Test {
+ protected:
+  using EntryPoint = HRESULT (DllRegistration::*)() const;
+
+  enum class End { kFailure, kDeath };
+
+  /// Interrupts a registration at every change, twice: to be cleaned up by unregistering, and to be repaired
+  /// by registering again.
+  void InterruptEveryRegistration(End end) {
+    const std::size_t changes = CountChanges(&DllRegistration::Register);
+    ASSERT_GT(changes, 250u);
+    for (std::size_t i = 0; i < changes && !HasFailure(); ++i) {
+      SCOPED_TRACE("change " + std::to_string(i));
+      registry_.Clear();
+      Interrupt(end, &DllRegistration::Register, i);
+      ExpectUnregisteringCleansUp();
+      Interrupt(end, &DllRegistration::Register, i);
+      ASSERT_EQ(server_.Register(), S_OK);
+      EXPECT_TRUE(Same(registry_.Contents(), complete_));
+    }
+  }
+
+  void InterruptEveryUnregistration(End end) {
+    ASSERT_EQ(server_.Register(), S_OK);
+    const std::size_t changes = CountChanges(&DllRegistration::Unregister);
+    ASSERT_GT(changes, 50u);
+    for (std::size_t i = 0; i < changes && !HasFailure(); ++i) {
+      SCOPED_TRACE("change " + std::to_string(i));
+      ASSERT_EQ(server_.Register(), S_OK);
+      Interrupt(end, &DllRegistration::Unregister, i);
+      ExpectUnregisteringCleansUp();
+    }
+  }
+
+ private:
+  std::size_t CountChanges(EntryPoint entryPoint) {
+    const RegistryWrites writes(server_.module(), [](std::size_t) -> LSTATUS { return ERROR_SUCCESS; });
+    EXPECT_EQ((server_.*entryPoint)(), S_OK);
+    return writes.count();
+  }
+
+  /// Calls `entryPoint`, whose change `number`, counted from 0, is its end: no further one comes after it.
+  void Interrupt(End end, EntryPoint entryPoint, std::size_t number) {
+    AbandonableCall call([&] { EXPECT_EQ((server_.*entryPoint)(), E_ACCESSDENIED); });
+    const RegistryWrites writes(server_.module(), [&](std::size_t change) -> LSTATUS {
+      if (change != number) return ERROR_SUCCESS;
+      if (end == End::kDeath) call.Abandon();
+      return ERROR_ACCESS_DENIED;
+    });
+    g_notifications = 0;
+    EXPECT_EQ(call.Run(), end == End::kFailure);
+    EXPECT_EQ(writes.count(), number + 1);
+    EXPECT_EQ(g_notifications, 0);
+  }
+
+  void ExpectUnregisteringCleansUp() {
+    ASSERT_EQ(server_.Unregister(), S_OK);
+    EXPECT_EQ(Without(registry_.Contents(), leftOver_), RegistryContents{});
+  }
+
+  const RegistryContents complete_ = ExpectedAfterRegistering(ServerDll::Path());
+  const RegistryContents leftOver_ = ExpectedAfterUnregistering();
+  PrivateRegistry registry_;
+  DllRegistration server_;
+  const ImportPatch notify_{server_.module(), "SHChangeNotify", &CountNotification};
+};
+
+TEST_F(InterruptedRegistration, ThatFailedIsRepairedOrCleanedUp) {
+  InterruptEveryRegistration(End::kFailure);
+}
+
+TEST_F(InterruptedRegistration, ThatDiedIsRepairedOrCleanedUp) {
+  InterruptEveryRegistration(End::kDeath);
+}
+
+TEST_F(InterruptedRegistration, UnregisteringCompletesOneThatFailed) {
+  InterruptEveryUnregistration(End::kFailure);
+}
+
+TEST_F(InterruptedRegistration, UnregisteringCompletesOneThatDied) {
+  InterruptEveryUnregistration(End::kDeath);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing
