@@ -193,6 +193,7 @@ def make_packages(build, out, epoch):
     project = Project(build)
     signing = Signing(os.environ, epoch)
     out.mkdir(parents=True, exist_ok=True)
+    out = out.resolve()  # wixl runs in another folder
     name = f"QelShellExt-{project.version}-x64"
     packages = [out / f"{name}.msi", out / f"{name}.zip", out / f"{name}-symbols.zip"]
     with tempfile.TemporaryDirectory() as folder:
@@ -216,4 +217,7 @@ def make_packages(build, out, epoch):
 if __name__ == "__main__":
     if len(sys.argv) != 3:
         sys.exit("usage: make_packages.py BUILD OUT")
-    make_packages(pathlib.Path(sys.argv[1]), pathlib.Path(sys.argv[2]), int(os.environ["SOURCE_DATE_EPOCH"]))
+    try:
+        make_packages(pathlib.Path(sys.argv[1]), pathlib.Path(sys.argv[2]), int(os.environ["SOURCE_DATE_EPOCH"]))
+    except OSError as error:
+        fail(f"{error.filename}: {error.strerror}")

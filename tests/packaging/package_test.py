@@ -91,7 +91,7 @@ class Contents(Test):
 
     def test_are_the_same_whoever_makes_them_wherever_and_whenever(self):
         first, second = self.out, self.folder / "second"
-        make_packages(second, copy_build(self.folder / "another folder"), umask=0o077, cwd="/",
+        make_packages(second.relative_to("/"), copy_build(self.folder / "another folder"), umask=0o077, cwd="/",
                       environment={"TZ": "Asia/Tokyo", "LC_ALL": "C"})
         self.assertEqual(sorted(path.name for path in first.iterdir()),
                          sorted(path.name for path in second.iterdir()))
@@ -107,6 +107,15 @@ class Contents(Test):
             self.assertEqual(files.namelist(), [f"{archive.stem}/{name}" for name in FILES])
             for program in PROGRAMS:
                 self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
+
+    def test_that_cannot_be_made_are_told_in_one_sentence(self):
+        file = self.folder / "file"
+        file.touch()
+        for build, out, name in ((BUILD, file, file), (BUILD, file / "below", file), (file, self.folder / "out", file)):
+            with self.subTest(build=build, out=out), self.assertRaises(subprocess.CalledProcessError) as caught:
+                make_packages(out, build)
+            told = caught.exception.stderr.replace(self.told, "")
+            self.assertRegex(told, rf"\Apackage: {re.escape(str(name))}.*: .+\n\Z")
 
     def test_symbols_tell_the_line_of_an_address_in_the_released_dll(self):
         symbols = package(self.out, "-symbols.zip")
