@@ -117,6 +117,20 @@ class Contents(Test):
             told = caught.exception.stderr.replace(self.told, "")
             self.assertRegex(told, rf"\Apackage: {re.escape(str(name))}.*: .+\n\Z")
 
+    def test_hold_resources_that_are_made_again_when_anything_in_them_changes(self):
+        def ninja(*arguments):
+            return subprocess.run(["ninja", "-C", BUILD, "-t", *arguments], check=True, capture_output=True,
+                                  text=True).stdout
+        targets = re.findall(r"(?m)^((?:server|tools)/.+\.rc\.obj): ", ninja("targets", "all"))
+        self.assertEqual(len(targets), 4)
+        for target in targets:
+            inputs = ninja("query", target)
+            script = re.search(r"(?m)^    (/.+\.rc)$", inputs)[1]
+            inputs += ninja("deps", target)
+            for name in re.findall(r'(?m)^(?:#include|.*(?:RCDATA|REGISTRY)) "(.+)"$', pathlib.Path(script).read_text()):
+                with self.subTest(target=target, name=name):
+                    self.assertRegex(inputs, rf"(?m)(^ *|/){re.escape(name)}$")
+
     def test_symbols_tell_the_line_of_an_address_in_the_released_dll(self):
         symbols = package(self.out, "-symbols.zip")
         with zipfile.ZipFile(symbols) as files:
