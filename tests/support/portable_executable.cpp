@@ -41,6 +41,10 @@ class Image {
     return AtOffset<Struct>(Offset(address));
   }
 
+  std::string Bytes(const IMAGE_SECTION_HEADER& section) const {
+    return bytes_.substr(section.PointerToRawData, section.SizeOfRawData);
+  }
+
   std::string Text(std::size_t address) const { return bytes_.c_str() + Offset(address); }
 
  private:
@@ -110,6 +114,7 @@ PortableExecutable PortableExecutable::Read(const std::filesystem::path& path) {
   for (const IMAGE_SECTION_HEADER& section : image.sections()) {
     const auto* const name = reinterpret_cast<const char*>(section.Name);
     module.sections.push_back({{name, strnlen(name, sizeof section.Name)}, section.Characteristics});
+    if (module.sections.back().name == ".text") module.code = image.Bytes(section);
   }
   ReadExports(image, module);
   ReadImports(image, module);

@@ -21,6 +21,7 @@ struct PortableExecutable {
   std::uint16_t dllCharacteristics = 0;
   std::uint32_t timeStamp = 0;
   std::vector<Section> sections;
+  std::string code;                                      // the bytes of the section .text
   std::string exportedName;                              // of the module
   std::vector<std::string> exports;                      // in their order
   std::map<std::string, std::set<std::string>> imports;  // functions by module, names in lower case
