@@ -10,6 +10,7 @@
 #include <array>
 #include <exception>
 #include <string>
+#include <vector>
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -28,6 +29,16 @@ void AskForThumbnail(IExtractImage& image) {
     image.Extract(&bitmap);
     if (bitmap != nullptr) DeleteObject(bitmap);
   }
+}
+
+void AskForItself(IPersistFile& file, const std::filesystem::path& path) {
+  CLSID clsid{};
+  file.GetClassID(&clsid);
+  file.IsDirty();
+  file.Save(path.c_str(), FALSE);
+  file.SaveCompleted(path.c_str());
+  wchar_t* current = nullptr;
+  file.GetCurFile(&current);
 }
 
 void AskForInfoTip(IQueryInfo& info) {
@@ -53,46 +64,70 @@ void AskForColumns(IColumnProvider& columns, const std::filesystem::path& path) 
   }
 }
 
+/// Uses an enumerator up, as well as a copy of it, and returns what it lists.
+template <class Stat, class Enumerator>
+std::vector<Stat> List(Enumerator& enumerator) {
+  ComPtr<Enumerator> copy;
+  enumerator.Clone(copy.Put());
+  std::vector<Stat> stats(kMany);
+  ULONG count = 0;
+  if (copy) copy->Next(kMany, stats.data(), &count);
+  enumerator.Skip(1);
+  enumerator.Reset();
+  enumerator.Next(kMany, stats.data(), &count);
+  stats.resize(count);
+  return stats;
+}
+
+void ChangeProperty(IPropertyStorage& storage, const PROPSPEC& id) {
+  PROPVARIANT value{};
+  storage.WriteMultiple(1, &id, &value, PID_FIRST_USABLE);
+  storage.DeleteMultiple(1, &id);
+  wchar_t text[] = L"name";
+  wchar_t* name = nullptr;
+  storage.ReadPropertyNames(1, &id.propid, &name);
+  CoTaskMemFree(name);
+  name = text;
+  storage.WritePropertyNames(1, &id.propid, &name);
+  storage.DeletePropertyNames(1, &id.propid);
+}
+
 void ReadProperties(IPropertyStorage& storage) {
   ComPtr<IEnumSTATPROPSTG> properties;
   storage.Enum(properties.Put());
   if (!properties) return;
-  ComPtr<IEnumSTATPROPSTG> copy;
-  properties->Clone(copy.Put());
-  std::array<STATPROPSTG, kMany> stats{};
-  ULONG count = 0;
-  properties->Next(kMany, stats.data(), &count);
-  properties->Skip(1);
-  properties->Reset();
-  for (ULONG i = 0; i < count; ++i) {
+  for (const STATPROPSTG& stat : List<STATPROPSTG>(*properties.Get())) {
     PROPSPEC id{};
     id.ulKind = PRSPEC_PROPID;
-    id.propid = stats[i].propid;
+    id.propid = stat.propid;
     PROPVARIANT value{};
     storage.ReadMultiple(1, &id, &value);
     PropVariantClear(&value);
+    ChangeProperty(storage, id);
   }
   STATPROPSETSTG stat{};
   storage.Stat(&stat);
+  storage.SetTimes(nullptr, nullptr, nullptr);
+  storage.SetClass(CLSID_NULL);
   storage.Commit(0);
+  storage.Revert();
 }
 
 void AskForPropertySets(IPropertySetStorage& storage) {
   ComPtr<IEnumSTATPROPSETSTG> sets;
   storage.Enum(sets.Put());
   if (!sets) return;
-  std::array<STATPROPSETSTG, kMany> stats{};
-  ULONG count = 0;
-  sets->Next(kMany, stats.data(), &count);
-  for (ULONG i = 0; i < count; ++i) {
+  for (const STATPROPSETSTG& stat : List<STATPROPSETSTG>(*sets.Get())) {
     ComPtr<IPropertyStorage> set;
-    storage.Open(stats[i].fmtid, STGM_READ, set.Put());
+    storage.Open(stat.fmtid, STGM_READ, set.Put());
     if (set) ReadProperties(*set.Get());
-    storage.Delete(stats[i].fmtid);
+    ComPtr<IPropertyStorage> made;
+    storage.Create(stat.fmtid, nullptr, 0, STGM_READWRITE, made.Put());
+    storage.Delete(stat.fmtid);
   }
 }
 
-void AskForProperties(IPropertyStore& store) {
+void AskForProperties(IPropertyStore& store, IPropertyStoreCapabilities& capabilities) {
   DWORD count = 0;
   store.GetCount(&count);
   for (DWORD i = 0; i < kMany; ++i) {
@@ -101,6 +136,7 @@ void AskForProperties(IPropertyStore& store) {
     PROPVARIANT value{};
     store.GetValue(key, &value);
     store.SetValue(key, value);
+    capabilities.IsPropertyWritable(key);
     PropVariantClear(&value);
   }
   store.Commit();
@@ -120,10 +156,14 @@ int CountExceptions(Requests requests) {
 
 int MakeEveryRequest(const ServerDll& dll, const std::filesystem::path& path) {
   int exceptions = 0;
+  const ComPtr<IClassFactory> factory = dll.Factory(kShellExtClass);
+  factory->LockServer(TRUE);
+  factory->LockServer(FALSE);
   const auto object = dll.CreateInstance<IUnknown>(kShellExtClass, IID_IUnknown);
   for (int load = 0; load < 2; ++load) {
     exceptions +=
         CountExceptions([&] { As<IPersistFile>(object, IID_IPersistFile)->Load(path.c_str(), STGM_READ); });
+    AskForItself(*As<IPersistFile>(object, IID_IPersistFile).Get(), path);
     AskForThumbnail(*As<IExtractImage>(object, IID_IExtractImage).Get());
     AskForInfoTip(*As<IQueryInfo>(object, IID_IQueryInfo).Get());
     AskForPropertySets(*As<IPropertySetStorage>(object, IID_IPropertySetStorage).Get());
@@ -139,7 +179,8 @@ int MakeEveryRequest(const ServerDll& dll, const std::filesystem::path& path) {
     exceptions += CountExceptions([&] {
       As<IInitializeWithStream>(outer.inner, IID_IInitializeWithStream)->Initialize(stream.Get(), STGM_READ);
     });
-    AskForProperties(*As<IPropertyStore>(outer.inner, IID_IPropertyStore).Get());
+    AskForProperties(*As<IPropertyStore>(outer.inner, IID_IPropertyStore).Get(),
+                     *As<IPropertyStoreCapabilities>(outer.inner, IID_IPropertyStoreCapabilities).Get());
   }
   return exceptions;
 }

@@ -13,6 +13,7 @@
 #include "dll_registration.h"
 #include "expected_registration.h"
 #include "import_patch.h"
+#include "process_census.h"
 #include "registry_reader.h"
 #include "registry_writes.h"
 #include "same_contents.h"
@@ -208,6 +209,22 @@ TEST_F(Registration, WorksInTheSystemsLocaleAndRestoresTheThreads) {
   ASSERT_FALSE(seen.empty());
   for (const LCID locale : seen) EXPECT_EQ(locale, GetSystemDefaultLCID());
   // That it is restored, here and after every failure, is checked when the test ends.
+}
+
+TEST_F(Registration, LeavesNothingInTheProcess) {
+  const auto takeAfter = [this](int rounds) {
+    for (int i = 0; i < rounds; ++i) {
+      EXPECT_EQ(Observe(&DllRegistration::Register, Allow), S_OK);
+      EXPECT_EQ(Observe(&DllRegistration::Unregister, FailAt(5)), E_ACCESSDENIED);
+      EXPECT_EQ(Observe(&DllRegistration::Unregister, Allow), S_OK);
+      g_notifications.clear();
+    }
+    return ProcessCensus::Take();
+  };
+  const ProcessCensus before = takeAfter(2);
+  const ProcessCensus after = takeAfter(3);
+  EXPECT_LE(after.handles, before.handles);
+  EXPECT_LE(after.heapBlocks, before.heapBlocks);
 }
 
 TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIsSome) {
