@@ -239,6 +239,27 @@ class ExitStatus(Test):
         self.assertOneSentence(result.stderr, path, "mode is 17")
         self.assertFalse((self.folder / "out.png").exists())
 
+    def test_what_cannot_be_printed_is_a_failure(self):
+        path = self.write("a.mrc", mrc())
+        for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-"),
+                          ("page", path, "--out", self.folder / "page")):
+            with self.subTest(arguments=arguments), open("/dev/full", "wb") as full, tempfile.TemporaryFile() as errors:
+                self.assertEqual(start(*arguments, stdout=full, stderr=errors).wait(), FAILED)
+                errors.seek(0)
+                self.assertOneSentence(errors.read().decode(), "Standard output cannot be written: Disk full")
+
+    def test_that_nobody_reads_what_is_printed_is_no_failure(self):
+        path = self.write("a.mrc", mrc())
+        for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-")):
+            reading, writing = os.pipe()
+            os.close(reading)
+            with self.subTest(arguments=arguments), tempfile.TemporaryFile() as errors:
+                process = start(*arguments, stdout=writing, stderr=errors)
+                os.close(writing)
+                self.assertEqual(process.wait(), DONE)
+                errors.seek(0)
+                self.assertEqual(errors.read(), b"")
+
     def test_a_folder_is_no_file(self):
         result = run("info", self.folder)
         self.assertEqual(result.returncode, FAILED)

@@ -68,8 +68,8 @@ int RunThumbnail(const CommandLine& line) {
   if (png.empty()) return ExitStatus(facts.verdict);
   if (line.out != L"-") {
     WriteFileAt(line.out, png.data(), png.size());
-  } else if (!WriteBytes(GetStdHandle(STD_OUTPUT_HANDLE), png.data(), png.size())) {
-    throw Failure(L"Standard output cannot be written: " + SystemErrorText(GetLastError()) + L".");
+  } else {
+    PrintBytes(png.data(), png.size());
   }
   return kExitDone;
 }

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "failure.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -12,14 +13,28 @@ bool IsConsole(HANDLE handle) {
   return GetConsoleMode(handle, &mode) != 0;
 }
 
-void PrintTo(DWORD which, std::wstring_view text) {
+/// Answers whether all of it is written.
+bool PrintTo(DWORD which, std::wstring_view text) {
   const HANDLE target = GetStdHandle(which);
   if (IsConsole(target)) {
     DWORD written = 0;
-    WriteConsoleW(target, text.data(), static_cast<DWORD>(text.size()), &written, nullptr);
-  } else {
-    const std::string utf8 = Utf8(text);
-    WriteBytes(target, utf8.data(), utf8.size());
+    return WriteConsoleW(target, text.data(), static_cast<DWORD>(text.size()), &written, nullptr) != 0;
+  }
+  const std::string utf8 = Utf8(text);
+  return WriteBytes(target, utf8.data(), utf8.size());
+}
+
+/// Standard output has or has not taken what was written to it.
+void RequirePrinted(bool isWritten) {
+  if (isWritten) return;
+  const DWORD error = GetLastError();
+  switch (error) {
+    case ERROR_BROKEN_PIPE:  // a pipe at whose other end there is nobody
+    case ERROR_NO_DATA:
+    case ERROR_PIPE_NOT_CONNECTED:
+    case ERROR_INVALID_HANDLE:  // no standard output at all, as of a service
+      return;
+    default: throw Failure(L"Standard output cannot be written: " + SystemErrorText(error) + L".");
   }
 }
 
@@ -40,16 +55,19 @@ bool WriteBytes(HANDLE target, const void* bytes, std::size_t size) {
 }
 
 void Print(std::wstring_view text) {
-  PrintTo(STD_OUTPUT_HANDLE, text);
+  RequirePrinted(PrintTo(STD_OUTPUT_HANDLE, text));
 }
 
 void PrintUtf8(std::string_view text) {
-  const HANDLE target = GetStdHandle(STD_OUTPUT_HANDLE);
-  if (IsConsole(target)) {
+  if (IsConsole(GetStdHandle(STD_OUTPUT_HANDLE))) {
     Print(Wide(text));
   } else {
-    WriteBytes(target, text.data(), text.size());
+    PrintBytes(text.data(), text.size());
   }
+}
+
+void PrintBytes(const void* bytes, std::size_t size) {
+  RequirePrinted(WriteBytes(GetStdHandle(STD_OUTPUT_HANDLE), bytes, size));
 }
 
 void PrintError(std::wstring_view sentence) {

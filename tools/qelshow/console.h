@@ -12,11 +12,15 @@ namespace Qel::Lumetra::ShellExt::Show {
 /// Answers whether all bytes were taken; the system's last error says why not.
 bool WriteBytes(HANDLE target, const void* bytes, std::size_t size);
 
-/// Writes to standard output. A reader that went away is not an error of this program.
+/// Writes to standard output. Throws Failure if it cannot be written, here and below; that nobody reads it,
+/// or not to its end, is not an error of this program.
 void Print(std::wstring_view text);
 
 /// Writes UTF-8 to standard output.
 void PrintUtf8(std::string_view text);
+
+/// Writes bytes to standard output as they are.
+void PrintBytes(const void* bytes, std::size_t size);
 
 /// Writes a sentence and a line end to standard error.
 void PrintError(std::wstring_view sentence);
