@@ -44,10 +44,12 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
 
 /// Of these paths none is, or holds, a file that can be shown.
 [[noreturn]] void NothingToShow(const std::vector<std::wstring>& paths) {
-  for (const std::wstring& path : paths) {
-    if (GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) continue;
+  const auto isMissing = [](const std::wstring& path) {
+    return GetFileAttributesW(path.c_str()) == INVALID_FILE_ATTRIBUTES;
+  };
+  if (const auto missing = std::ranges::find_if(paths, isMissing); missing != paths.end()) {
     const std::wstring reason = SystemErrorText(GetLastError());
-    throw Failure(L"\"" + path + L"\" cannot be opened: " + reason + L".");
+    throw Failure(L"\"" + *missing + L"\" cannot be opened: " + reason + L".");
   }
   const std::wstring& first = paths.front();
   std::error_code ignored;
