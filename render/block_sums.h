@@ -65,16 +65,7 @@ class ExactBlockSums {
     for (std::int32_t y = 0; y < rows.height; y += kMostRows) {
       const std::int32_t count = std::min(kMostRows, rows.height - y);
       SumColumns(rows.Part(0, y, rows.width, count));
-      // The narrower the sums of a block's columns can be, the faster they are folded.
-      const auto column = static_cast<std::size_t>(x);
-      const std::size_t samples = static_cast<std::size_t>(count) * factor_;
-      if (samples <= kMostRows) {
-        FoldColumns<Lane>(column);
-      } else if (samples <= std::numeric_limits<std::int32_t>::max() / 65536) {
-        FoldColumns<std::int32_t>(column);
-      } else {
-        FoldColumns<std::int64_t>(column);
-      }
+      FoldColumns(static_cast<std::size_t>(x), static_cast<std::size_t>(count) * factor_);
     }
   }
 
@@ -168,6 +159,15 @@ class ExactBlockSums {
       _mm_storeu_si128(reinterpret_cast<__m128i*>(sums + i + 4), high);
     }
     return i;
+  }
+
+  /// Folds with sums that have room for `samples` samples, and no more: the narrower, the faster.
+  void FoldColumns(std::size_t x, std::size_t samples) {
+    if constexpr (sizeof(Lane) < sizeof(std::int32_t)) {
+      if (samples <= kMostRows) return FoldColumns<Lane>(x);
+    }
+    if (samples <= std::numeric_limits<std::int32_t>::max() / 65536) return FoldColumns<std::int32_t>(x);
+    FoldColumns<std::int64_t>(x);
   }
 
   template <class Sum>

@@ -10,18 +10,18 @@ namespace Qel::Lumetra::ShellExt {
 namespace {
 
 struct Row {
-  std::uint32_t value;
   const wchar_t* name;
+  std::uint32_t value;
   std::int32_t bits;
 };
 
 constexpr Row kRows[] = {
-    {0, L"8 bit unsigned", 8},         {1, L"16 bit unsigned", 16},
-    {2, L"32 bit unsigned", 32},       {4, L"8 bit signed", 8},
-    {5, L"16 bit signed", 16},         {6, L"32 bit signed", 32},
-    {8, L"32 bit float", 32},          {9, L"64 bit float", 64},
-    {10, L"64 bit complex float", 64}, {13, L"128 bit complex float", 128},
-    {16, L"24 bit RGB", 24},           {18, L"24 bit BGR", 24},
+    {L"8 bit unsigned", 0, 8},         {L"16 bit unsigned", 1, 16},
+    {L"32 bit unsigned", 2, 32},       {L"8 bit signed", 4, 8},
+    {L"16 bit signed", 5, 16},         {L"32 bit signed", 6, 32},
+    {L"32 bit float", 8, 32},          {L"64 bit float", 9, 64},
+    {L"64 bit complex float", 10, 64}, {L"128 bit complex float", 13, 128},
+    {L"24 bit RGB", 16, 24},           {L"24 bit BGR", 18, 24},
 };
 
 TEST(DataType, HasItsNameAndBits) {

@@ -62,7 +62,7 @@ TEST(Extensions, AreComparedWholeAndWithoutCase) {
   };
   for (const Row& row : rows) {
     const wchar_t first = row.extension[0];
-    const wchar_t upper = static_cast<wchar_t>(first - L'a' + L'A');
+    const auto upper = static_cast<wchar_t>(first - L'a' + L'A');
     EXPECT_TRUE(row.test(row.extension));
     EXPECT_TRUE(row.test(upper + row.extension.substr(1)));
     EXPECT_FALSE(row.test(L""));
