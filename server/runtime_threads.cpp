@@ -159,6 +159,7 @@ int pthread_cond_broadcast(pthread_cond_t*) {
   return 0;
 }
 
+// NOLINTNEXTLINE(readability-*): declared by the system, with names and types of its own.
 int pthread_once(pthread_once_t* once, void (*run)()) {
   std::atomic_ref state(*once);
   if (state == kDone) return 0;

@@ -54,7 +54,7 @@ HRESULT WindowsRegistry::SetValue(RegistryRoot root, const std::wstring& path, c
   if (const auto* number = std::get_if<std::uint32_t>(&data)) {
     return set(REG_DWORD, number, sizeof(*number));
   }
-  const std::wstring& text = std::get<std::wstring>(data);
+  const auto& text = std::get<std::wstring>(data);
   return set(REG_SZ, text.c_str(), (text.size() + 1) * sizeof(wchar_t));
 }
 

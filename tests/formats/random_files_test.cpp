@@ -109,10 +109,10 @@ void ExpectPicture(Random& random, const OpenFile<Reader>& file, const NaiveFram
 constexpr int kRounds = 60;
 
 // One instance of a test for every pixel type of a file kind.
-template <class T, int kCode>
+template <class T, int kNumber>
 struct TypeCode {
   using Pixel = T;
-  static constexpr int code = kCode;
+  static constexpr int kCode = kNumber;
 };
 
 template <class T>
@@ -125,7 +125,7 @@ TYPED_TEST_SUITE(RandomMrc, MrcTypes);
 
 TYPED_TEST(RandomMrc, EqualsTheNaivePicture) {
   using T = typename TypeParam::Pixel;
-  Random random(TypeParam::code);
+  Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
     NaiveFrame<T> stored = frame;  // from the bottom
@@ -137,7 +137,7 @@ TYPED_TEST(RandomMrc, EqualsTheNaivePicture) {
     file.nx = frame.width;
     file.ny = frame.height;
     file.nz = random.Between(1, 6);
-    file.mode = TypeParam::code;
+    file.mode = TypeParam::kCode;
     file.order = random.OneIn(2) ? ByteOrder::kLittleEndian : ByteOrder::kBigEndian;
     file.extendedHeader = Noise(random, 300);
     const std::string pixels = PixelBytes(stored, sizeof(T) == 2 ? file.order : ByteOrder::kLittleEndian);
@@ -158,11 +158,11 @@ TYPED_TEST_SUITE(RandomEbn, EbnTypes);
 
 TYPED_TEST(RandomEbn, EqualsTheNaivePicture) {
   using T = typename TypeParam::Pixel;
-  Random random(TypeParam::code);
+  Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
     EbnFile file;
-    file.typeCode = TypeParam::code;
+    file.typeCode = TypeParam::kCode;
     file.width = frame.width;
     file.height = frame.height;
     file.afterHeader = Noise(random, 50);
@@ -183,7 +183,7 @@ TYPED_TEST_SUITE(RandomSer, SerTypes);
 
 TYPED_TEST(RandomSer, EqualsTheNaivePicture) {
   using T = typename TypeParam::Pixel;
-  Random random(TypeParam::code);
+  Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
     SerFile file;
@@ -192,7 +192,7 @@ TYPED_TEST(RandomSer, EqualsTheNaivePicture) {
     file.dimensions.resize(static_cast<std::size_t>(random.Between(0, 3)));
     for (SerDimension& dimension : file.dimensions) dimension.units = Noise(random, 30);
     file.elements.resize(static_cast<std::size_t>(random.Between(1, 4)));
-    file.elements[0].typeCode = TypeParam::code;
+    file.elements[0].typeCode = TypeParam::kCode;
     file.elements[0].width = static_cast<std::uint32_t>(frame.width);
     file.elements[0].height = static_cast<std::uint32_t>(frame.height);
     file.elements[0].pixels = PixelBytes(frame);
@@ -229,11 +229,11 @@ std::string RandomItems(Random& random, int most) {
 
 TYPED_TEST(RandomEmi, EqualsTheNaivePicture) {
   using T = typename TypeParam::Pixel;
-  Random random(TypeParam::code);
+  Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
     const std::string picture =
-        EmiPixelArray(TypeParam::code, static_cast<std::uint32_t>(frame.width),
+        EmiPixelArray(TypeParam::kCode, static_cast<std::uint32_t>(frame.width),
                       static_cast<std::uint32_t>(frame.height), PixelBytes(frame) + Noise(random, 20));
     const std::string image = EmiImageObject(RandomItems(random, 4) + picture + RandomItems(random, 4));
     const std::string another = EmiImageObject(EmiPixelArray(0x2202, 1, 1, "x"));
@@ -268,8 +268,8 @@ void Spread(Random& random, RawFile& file) {
   file.offset = random.Between(0, 30) - std::min(right, 0) - std::min(down, 0);
 
   const std::string packed = file.pixels;
-  file.pixels.assign(
-      static_cast<std::size_t>(file.offset + std::max(right, 0) + std::max(down, 0) + pixelBytes), '\xAA');
+  const std::int32_t fileBytes = file.offset + std::max(right, 0) + std::max(down, 0) + pixelBytes;
+  file.pixels.assign(static_cast<std::size_t>(fileBytes), '\xAA');
   for (std::int32_t y = 0; y < file.height; ++y) {
     for (std::int32_t x = 0; x < file.width; ++x) {
       std::copy_n(packed.begin() + (y * file.width + x) * pixelBytes, pixelBytes,
@@ -280,10 +280,10 @@ void Spread(Random& random, RawFile& file) {
 
 TYPED_TEST(RandomRaw, EqualsTheNaivePicture) {
   using T = typename TypeParam::Pixel;
-  Random random(TypeParam::code);
+  Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
-    RawFile file = PackedRawFile(DataType{TypeParam::code}, frame.width, frame.height, PixelBytes(frame));
+    RawFile file = PackedRawFile(DataType{TypeParam::kCode}, frame.width, frame.height, PixelBytes(frame));
     if (!random.OneIn(3)) Spread(random, file);
     if (random.OneIn(2)) file.pixels += Noise(random, 40);
     ExpectPicture(random, OpenFile<RawFileInfo>(file), frame);

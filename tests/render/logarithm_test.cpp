@@ -21,7 +21,7 @@ void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
   std::vector<float> logarithms(values.size());
   body(values.data(), values.size(), logarithms.data());
   for (std::size_t i = 0; i < values.size(); ++i) {
-    const float expected = static_cast<float>(std::log(values[i]));
+    const auto expected = static_cast<float>(std::log(values[i]));
     if (std::isnan(expected)) {
       ASSERT_TRUE(std::isnan(logarithms[i])) << values[i];
     } else {

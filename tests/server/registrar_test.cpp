@@ -158,10 +158,12 @@ TEST_F(Registrar, StopsAtTheFirstFailureAndReturnsIt) {
 class CarriedScripts : public ::testing::Test {
  protected:
   /// In the order of registration.
-  const std::vector<std::string> kRunByRegistration = {"module", "shell_ext", "ebn", "raw", "mrc"};
+  static inline const std::vector<std::string> kRunByRegistration = {"module", "shell_ext", "ebn", "raw",
+                                                                     "mrc"};
   /// In the order of unregistration.
-  const std::vector<std::string> kRunByUnregistration = {"shell_ext", "ebn", "raw", "mrc", "module"};
-  const std::wstring kPath = L"C:\\QelShellExt.DLL";
+  static inline const std::vector<std::string> kRunByUnregistration = {"shell_ext", "ebn", "raw", "mrc",
+                                                                       "module"};
+  static inline const std::wstring kPath = L"C:\\QelShellExt.DLL";
 
   static const std::string& Read(const std::string& name) {
     static std::map<std::string, std::string> scripts;

@@ -9,15 +9,15 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-std::atomic<std::int64_t> blocks{0};
-std::atomic<std::int64_t> bytes{0};
-std::atomic<std::int64_t> peak{0};
-std::atomic<std::int64_t> largest{0};
+std::atomic<std::int64_t> g_blocks{0};
+std::atomic<std::int64_t> g_bytes{0};
+std::atomic<std::int64_t> g_peak{0};
+std::atomic<std::int64_t> g_largest{0};
 
 constexpr std::int64_t kNever = -1;
-thread_local std::int64_t untilFailure = kNever;
-thread_local bool staysFull = false;
-thread_local bool failed = false;
+thread_local std::int64_t g_untilFailure = kNever;
+thread_local bool g_staysFull = false;
+thread_local bool g_failed = false;
 
 std::int64_t SizeOf(void* block) {
 #ifdef _WIN32
@@ -34,9 +34,9 @@ void Raise(std::atomic<std::int64_t>& most, std::int64_t value) {
 }
 
 bool IsToFail() {
-  if (failed && staysFull) return true;
-  if (untilFailure == kNever || untilFailure-- > 0) return false;
-  failed = true;
+  if (g_failed && g_staysFull) return true;
+  if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
+  g_failed = true;
   return true;
 }
 
@@ -45,51 +45,51 @@ void* Allocate(std::size_t size) {
   void* const block = std::malloc(size);
   if (block == nullptr) return nullptr;
   const std::int64_t got = SizeOf(block);
-  ++blocks;
-  Raise(peak, bytes += got);
-  Raise(largest, got);
+  ++g_blocks;
+  Raise(g_peak, g_bytes += got);
+  Raise(g_largest, got);
   return block;
 }
 
 void Free(void* block) {
   if (block == nullptr) return;
-  --blocks;
-  bytes -= SizeOf(block);
+  --g_blocks;
+  g_bytes -= SizeOf(block);
   std::free(block);
 }
 
 }  // namespace
 
 HeapUse CurrentHeapUse() {
-  return {blocks, bytes};
+  return {g_blocks, g_bytes};
 }
 
-HeapMeter::HeapMeter() : before_(bytes) {
-  peak = before_;
-  largest = 0;
+HeapMeter::HeapMeter() : before_(g_bytes) {
+  g_peak = before_;
+  g_largest = 0;
 }
 
 std::int64_t HeapMeter::Peak() const {
-  return peak - before_;
+  return g_peak - before_;
 }
 
 std::int64_t HeapMeter::Largest() const {
-  return largest;
+  return g_largest;
 }
 
 FailingHeap::FailingHeap(std::int64_t allocation, Then then) {
-  untilFailure = allocation;
-  staysFull = then == Then::kStaysFull;
-  failed = false;
+  g_untilFailure = allocation;
+  g_staysFull = then == Then::kStaysFull;
+  g_failed = false;
 }
 
 FailingHeap::~FailingHeap() {
-  untilFailure = kNever;
-  failed = false;
+  g_untilFailure = kNever;
+  g_failed = false;
 }
 
 bool FailingHeap::Failed() const {
-  return failed;
+  return g_failed;
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

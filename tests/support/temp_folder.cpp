@@ -21,7 +21,7 @@ TempFolder::~TempFolder() {
 }
 
 std::filesystem::path TempFolder::Write(const std::filesystem::path& name, std::string_view bytes) const {
-  const std::filesystem::path path = path_ / name;
+  std::filesystem::path path = path_ / name;
   std::filesystem::create_directories(path.parent_path());
   std::ofstream file(path, std::ios::binary);
   file.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));

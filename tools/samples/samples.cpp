@@ -143,9 +143,10 @@ std::string MrcTruncated() {
 
 std::string AliTiltSeries() {
   constexpr int kViews = 11;
+  constexpr int kUntilted = kViews / 2;
   std::string pixels;
   for (int view = 0; view < kViews; ++view) {
-    const double tilt = (view - kViews / 2) / (kViews / 2.0) * 0.9;
+    const double tilt = (view - kUntilted) / (kViews / 2.0) * 0.9;
     pixels += Pixels<std::uint8_t>(BottomUp(TiltedView(256, 256, tilt, 9)), 255);
   }
   MrcFile file =
