@@ -278,6 +278,7 @@ TEST_F(Unloading, LeavesNothingInOtherThreads) {
     SignalObjectAndWait(go, done, INFINITE, FALSE);
     std::thread([&] { MakeEveryRequest(loaded, path); }).join();
     EXPECT_EQ(loaded.CanUnloadNow(), S_OK);
+    dll = nullptr;
   };
   for (const auto& path : files) cycle(path);
 
@@ -294,7 +295,6 @@ TEST_F(Unloading, LeavesNothingInOtherThreads) {
   }
   EXPECT_TRUE(nothingLeft);
 
-  dll = nullptr;
   SetEvent(go);
   living.join();
   CloseHandle(go);

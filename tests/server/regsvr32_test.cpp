@@ -45,7 +45,7 @@ class Regsvr32 : public ::testing::Test {
     ASSERT_EQ(Run({L"/s", L"/u", ServerDll::Path()}), 0u);
   }
 
-  static std::uint32_t Run(std::vector<std::wstring> arguments) {
+  static std::uint32_t Run(const std::vector<std::wstring>& arguments) {
     std::array<wchar_t, MAX_PATH> system{};
     GetSystemDirectoryW(system.data(), MAX_PATH);
     return RunProcess(std::filesystem::path(system.data()) / L"regsvr32.exe", arguments);
