@@ -47,7 +47,7 @@ class SystemAnswers : public ServerTest {
   static std::wstring TipOf(const Object& object) {
     wchar_t* tip = nullptr;
     EXPECT_EQ(As<IQueryInfo>(object, IID_IQueryInfo)->GetInfoTip(QITIPF_DEFAULT, &tip), S_OK);
-    const std::wstring text = tip != nullptr ? tip : L"<none>";
+    std::wstring text = tip != nullptr ? tip : L"<none>";
     CoTaskMemFree(tip);
     return text;
   }
@@ -413,7 +413,7 @@ TEST_F(SystemAnswers, ThereIsNoThumbnailWithoutABitmap) {
     const SIZE size{5, 3};
     DWORD flags = 0;
     EXPECT_EQ(image->GetLocation(nullptr, 0, nullptr, &size, 24, &flags), S_OK);
-    HBITMAP bitmap = reinterpret_cast<HBITMAP>(0x1234);
+    auto bitmap = reinterpret_cast<HBITMAP>(0x1234);
     EXPECT_EQ(image->Extract(&bitmap), E_FAIL);
     EXPECT_EQ(bitmap, nullptr);
   }

@@ -46,7 +46,7 @@ std::size_t CountSlots(Allocate allocate, Free free) {
   for (std::size_t i = 0; i < count; ++i) free(taken[i]);
   return kLimit - count;
 }
-static_assert(TLS_OUT_OF_INDEXES == FLS_OUT_OF_INDEXES);
+static_assert(TLS_OUT_OF_INDEXES == FLS_OUT_OF_INDEXES);  // NOLINT(misc-redundant-expression): it is not
 
 // The GDI handles of all processes as the process block refers to them: GetGuiResources answers 0 under some
 // versions of Wine.

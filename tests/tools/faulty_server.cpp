@@ -27,7 +27,7 @@ class FaultyServerModule final : public Com::Module {
   LONG locks_ = 0;
 };
 
-FaultyServerModule module;
+FaultyServerModule g_module;
 
 class FaultyObject : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPersistFile, IQueryInfo> {
  public:

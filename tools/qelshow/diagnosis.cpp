@@ -97,7 +97,7 @@ Finding ExplainEbn(std::istream& stream, std::int64_t end) {
 
 Finding ExplainSer(std::istream& stream, std::int64_t end) {
   const SerParser parser(stream);
-  const Finding finding = ExplainHeader(stream, parser.fault(), end);
+  Finding finding = ExplainHeader(stream, parser.fault(), end);
   if (!finding.empty()) return finding;
   if (!parser.isImageSeries())
     return L"This is a series of lines (data type id 0x4120), which have no picture.";
@@ -106,7 +106,7 @@ Finding ExplainSer(std::istream& stream, std::int64_t end) {
 
 Finding ExplainEmi(std::istream& stream, std::int64_t end) {
   const EmiParser parser(stream);
-  const Finding finding = ExplainHeader(stream, parser.fault(), end);
+  Finding finding = ExplainHeader(stream, parser.fault(), end);
   if (!finding.empty()) return finding;
   if (parser.imageCount() == 0) return L"The file holds no image object.";
   return ExplainFrame(parser.FirstFrame(), end);

@@ -35,12 +35,11 @@ std::string JsonString(std::wstring_view text) {
       json += "\\n";
     } else if (c == L'\r') {
       json += "\\r";
-    } else if (c < 0x20 || c == L'<' || c == 0x2028 || c == 0x2029) {
-      json += Escape(c);
     } else if (IsHighSurrogate(c) && i + 1 < text.size() && IsLowSurrogate(text[i + 1])) {
       json += Utf8(text.substr(i, 2));
       ++i;
-    } else if (IsHighSurrogate(c) || IsLowSurrogate(c)) {
+    } else if (c < 0x20 || c == L'<' || c == 0x2028 || c == 0x2029 || IsHighSurrogate(c) ||
+               IsLowSurrogate(c)) {
       json += Escape(c);
     } else if (c < 0x80) {
       json += static_cast<char>(c);
