@@ -65,7 +65,7 @@ std::string Utf8(const wchar_t* wide) {
 
 HANDLE CreateFileW(const wchar_t* path, DWORD, DWORD, void*, DWORD, DWORD, HANDLE) {
   const int descriptor = open(Utf8(path).c_str(), O_RDONLY | O_CLOEXEC);
-  struct stat status {};
+  struct stat status{};
   if (descriptor == -1) return INVALID_HANDLE_VALUE;
   // The platform opens no folders this way.
   if (fstat(descriptor, &status) != 0 || S_ISDIR(status.st_mode)) {

@@ -126,7 +126,7 @@ TEST(EbnComment, AlwaysHasTheVoltage) {
 
 /// What a header with `stored` in `field` has in front of the voltage. A code of -n is stored as -(n + 0.5)
 /// or a little less, one of n as n.
-std::wstring TextOf(double EbnFile::*field, double stored) {
+std::wstring TextOf(double EbnFile::* field, double stored) {
   EbnFile file;
   file.*field = stored;
   const std::wstring comment = CommentOf(file);
@@ -137,7 +137,7 @@ std::wstring TextOf(double EbnFile::*field, double stored) {
 
 TEST(EbnComment, KnowsEveryCode) {
   struct Row {
-    double EbnFile::*field;
+    double EbnFile::* field;
     int code;
     const wchar_t* text;
   };

@@ -82,8 +82,8 @@ BitmapPixels NaivePicture(const NaiveFrame<NaiveComplex<T>>& frame, int cx, int 
   return NaiveComplexThumbnail(frame, cx, cy);
 }
 template <class Colour>
-requires std::is_base_of_v<NaiveColour, Colour> BitmapPixels NaivePicture(const NaiveFrame<Colour>& frame,
-                                                                          int cx, int cy) {
+  requires std::is_base_of_v<NaiveColour, Colour>
+BitmapPixels NaivePicture(const NaiveFrame<Colour>& frame, int cx, int cy) {
   return NaiveColourThumbnail({frame.width, frame.height, {frame.values.begin(), frame.values.end()}}, cx,
                               cy);
 }

@@ -283,11 +283,9 @@ TYPED_TEST(EveryComplex, EqualsTheNaivePictureOverRandomShapes) {
       frame.values.push_back({random.Value<T>(values, i == 0), random.Value<T>(values, i == 0)});
     }
     const auto [pixelStride, rowStride] = RandomStrides<ComplexPixel<T>>(random, width);
-    const auto stored =
-        Store<ComplexPixel<T>>(frame, pixelStride, rowStride, static_cast<std::size_t>(random.Between(0, 7)),
-                               [](const NaiveComplex<T>& value) {
-                                 return ComplexPixel<T>{value.re, value.im};
-                               });
+    const auto stored = Store<ComplexPixel<T>>(
+        frame, pixelStride, rowStride, static_cast<std::size_t>(random.Between(0, 7)),
+        [](const NaiveComplex<T>& value) { return ComplexPixel<T>{value.re, value.im}; });
     ASSERT_EQ(TakeBitmap(RenderComplexThumbnail<T>(stored.view(), {cx, cy})),
               Testing::NaiveComplexThumbnail(frame, cx, cy))
         << width << " x " << height << " asked at " << cx << " x " << cy;

@@ -234,13 +234,13 @@ TEST_F(SystemsLines, ShowUtcWhereTheLocalTimeIsNotKnown) {
 TEST_F(SystemsLines, LeaveTheDateOutWhereAnyStepToItFails) {
   const std::wstring expected = std::wstring(kFirstLines) + kSizeLine + kCommentLine;
   {
-    const auto system = Answer(
-        "FileTimeToSystemTime", +[](const FILETIME*, LPSYSTEMTIME) -> BOOL WINAPI { return FALSE; });
+    const auto system =
+        Answer("FileTimeToSystemTime", +[](const FILETIME*, LPSYSTEMTIME) -> BOOL WINAPI { return FALSE; });
     EXPECT_EQ(TipOf(object_), expected);
   }
   for (const char* const step : {"GetDateFormatW", "GetTimeFormatW"}) {
-    const auto format = Answer(
-        step, +[](LCID, DWORD, const SYSTEMTIME*, LPCWSTR, LPWSTR, int) -> int WINAPI { return 0; });
+    const auto format =
+        Answer(step, +[](LCID, DWORD, const SYSTEMTIME*, LPCWSTR, LPWSTR, int) -> int WINAPI { return 0; });
     EXPECT_EQ(TipOf(object_), expected) << step;
   }
 }
@@ -252,8 +252,8 @@ TEST_F(SystemsLines, SurviveADateThatFillsItsRoom) {
 }
 
 TEST_F(SystemsLines, LeaveTheSizeOutWhereItCannotBeFormatted) {
-  const auto size = Answer(
-      "StrFormatByteSizeW", +[](LONGLONG, LPWSTR, UINT) -> LPWSTR WINAPI { return nullptr; });
+  const auto size =
+      Answer("StrFormatByteSizeW", +[](LONGLONG, LPWSTR, UINT) -> LPWSTR WINAPI { return nullptr; });
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kDateLine + kCommentLine);
 }
 
@@ -292,8 +292,7 @@ ExhaustedAllocator g_allocator;
 
 TEST_F(SystemAnswers, TipNeedsAnAllocator) {
   const Object object = LoadImage();
-  const auto none = Answer(
-      "SHGetMalloc", +[](IMalloc**) -> HRESULT WINAPI { return kFailure; });
+  const auto none = Answer("SHGetMalloc", +[](IMalloc**) -> HRESULT WINAPI { return kFailure; });
   EXPECT_EQ(RefusedTip(object), kFailure);
   EXPECT_EQ(RefusedTip(Load(L"invalid.mrc", MrcFile{.nx = 0}.Bytes())), E_FAIL);
 }
@@ -363,8 +362,8 @@ TEST_F(SystemAnswers, ReadingAPropertyReturnsTheFailureOfItsCopy) {
     specifier.propid = 3;
   }
   PROPVARIANT values[2] = {};
-  const auto copy = Answer(
-      "PropVariantCopy", +[](PROPVARIANT*, const PROPVARIANT*) -> HRESULT WINAPI { return kFailure; });
+  const auto copy =
+      Answer("PropVariantCopy", +[](PROPVARIANT*, const PROPVARIANT*) -> HRESULT WINAPI { return kFailure; });
   EXPECT_EQ(storage->ReadMultiple(2, specifiers, values), kFailure);
 }
 
@@ -372,8 +371,7 @@ TEST_F(SystemAnswers, PropertyStoreIsEmptyHandedWithoutMemoryForAText) {
   ScriptedStream stream(MrcFile{}.Bytes());
   const auto store = dll_.CreateInstance<IPropertyStore>(kMrcHandlerClass, IID_IPropertyStore);
   As<IInitializeWithStream>(store, IID_IInitializeWithStream)->Initialize(&stream, STGM_READ);
-  const auto text = Answer(
-      "SHStrDupW", +[](LPCWSTR, LPWSTR*) -> HRESULT WINAPI { return kFailure; });
+  const auto text = Answer("SHStrDupW", +[](LPCWSTR, LPWSTR*) -> HRESULT WINAPI { return kFailure; });
   for (const PROPERTYKEY& key : {kDimensionsKey, kCommentsKey}) {
     PROPVARIANT value;
     std::memset(&value, 0x5A, sizeof value);

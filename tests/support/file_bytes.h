@@ -21,7 +21,8 @@ class FileBytes {
 
   /// An integer, or a float or double as its IEEE bits.
   template <class Number>
-  requires std::is_arithmetic_v<Number> FileBytes& Put(Number number) {
+    requires std::is_arithmetic_v<Number>
+  FileBytes& Put(Number number) {
     if constexpr (std::floating_point<Number>) {
       using Bits = std::conditional_t<sizeof(Number) == 4, std::uint32_t, std::uint64_t>;
       return Put(std::bit_cast<Bits>(number));

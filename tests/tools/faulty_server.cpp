@@ -66,8 +66,8 @@ class FaultyObject : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IP
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt::Testing
 
-extern "C" HRESULT __declspec(dllexport) STDAPICALLTYPE
-    DllGetClassObject(REFCLSID clsid, REFIID iid, void** classObject) {
+extern "C" HRESULT __declspec(dllexport) STDAPICALLTYPE DllGetClassObject(REFCLSID clsid, REFIID iid,
+                                                                          void** classObject) {
   using namespace Qel;
   *classObject = nullptr;
   if (clsid == Lumetra::ShellExt::CLSID_QelShellExtVistaEbn) {
