@@ -8,7 +8,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-constexpr std::int32_t kMostSize = 4096;
+constexpr std::int32_t kMaxSize = 4096;
 
 constexpr const wchar_t* kPageFolder = L"qelshow-page";
 
@@ -131,7 +131,7 @@ CommandLine HelpLine(const wchar_t* text) {
 std::int32_t ParseSize(const std::wstring& text, std::wstring_view command) {
   wchar_t* end = nullptr;
   const long size = std::wcstol(text.c_str(), &end, 10);
-  if (text.empty() || *end != L'\0' || size < 1 || size > kMostSize) {
+  if (text.empty() || *end != L'\0' || size < 1 || size > kMaxSize) {
     WrongUsage(L"--size takes a number from 1 to 4096, not \"" + text + L"\".", command);
   }
   return static_cast<std::int32_t>(size);

@@ -5,9 +5,9 @@
 #include <algorithm>
 #include <filesystem>
 
-#include "asking.h"
 #include "console.h"
 #include "failure.h"
+#include "file_inspection.h"
 #include "file_list.h"
 #include "page_writer.h"
 #include "reports.h"
@@ -44,7 +44,7 @@ int RunInfo(const CommandLine& line) {
   if (line.json) PrintUtf8("{\"schema\":" + std::to_string(kJsonSchema) + ",\"files\":[");
   for (const std::wstring& path : line.files) {
     progress.Show(count, FileName(path));
-    const FileFacts facts = AskFile(worker, path, FileName(path), line.size);
+    const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
     progress.Hide();
     if (line.json) {
       PrintUtf8((count > 0 ? ",\n" : "\n") + JsonReport(facts, {}));
@@ -62,7 +62,7 @@ int RunInfo(const CommandLine& line) {
 int RunThumbnail(const CommandLine& line) {
   Worker worker(line.server);
   const std::wstring& path = line.files.front();
-  const FileFacts facts = AskFile(worker, path, FileName(path), line.size);
+  const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
   PrintProblem(facts);
   const auto& png = facts.thumbnail.png;
   if (png.empty()) return ExitStatus(facts.verdict);
@@ -78,10 +78,10 @@ int RunPage(const CommandLine& line) {
   const std::vector<ListedFile> files = ListFiles(line.files);
   Worker worker(line.server);
   PageWriter page(line.out);
-  constexpr std::size_t kMostNameWidth = 40;
+  constexpr std::size_t kMaxNameWidth = 40;
   std::size_t nameWidth = 4;
   for (const ListedFile& file : files) nameWidth = std::max(nameWidth, file.name.size());
-  nameWidth = std::min(nameWidth, kMostNameWidth);
+  nameWidth = std::min(nameWidth, kMaxNameWidth);
 
   Print(TableHeading(nameWidth));
   ProgressBar progress(files.size());
@@ -89,7 +89,7 @@ int RunPage(const CommandLine& line) {
   std::size_t pictures = 0;
   for (const ListedFile& file : files) {
     progress.Show(count++, file.name);
-    const FileFacts facts = AskFile(worker, file.path, file.name, line.size);
+    const FileFacts facts = InspectFile(worker, file.path, file.name, line.size);
     page.Add(facts);
     if (!facts.thumbnail.png.empty()) ++pictures;
     progress.Hide();

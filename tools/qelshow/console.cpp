@@ -41,11 +41,11 @@ void RequirePrinted(bool isWritten) {
 }  // namespace
 
 bool WriteBytes(HANDLE target, const void* bytes, std::size_t size) {
-  constexpr std::size_t kMostAtOnce = 1 << 20;
+  constexpr std::size_t kMaxPart = 1 << 20;
   const char* next = static_cast<const char*>(bytes);
   while (size > 0) {
     DWORD written = 0;
-    if (!WriteFile(target, next, static_cast<DWORD>(std::min(size, kMostAtOnce)), &written, nullptr)) {
+    if (!WriteFile(target, next, static_cast<DWORD>(std::min(size, kMaxPart)), &written, nullptr)) {
       return false;
     }
     next += written;

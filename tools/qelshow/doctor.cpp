@@ -6,9 +6,9 @@
 #include <string>
 #include <vector>
 
-#include "asking.h"
 #include "console.h"
 #include "failure.h"
+#include "file_inspection.h"
 #include "installation.h"
 #include "json.h"
 #include "reports.h"
@@ -31,7 +31,7 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
   for (const std::wstring& path : line.files) {
     const std::wstring name = std::filesystem::path(path).filename().wstring();
     if (worker) {
-      files.push_back(AskFile(*worker, path, name, line.size));
+      files.push_back(InspectFile(*worker, path, name, line.size));
     } else {
       FileFacts facts;
       facts.path = path;

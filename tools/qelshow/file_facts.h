@@ -1,5 +1,5 @@
 // Everything that a shell learns about one file from the extension, as plain data: made by the worker process
-// that asks (shell_questions.h), carried to the parent process (message.h), shown by the reports.
+// that asks (shell_requests.h), carried to the parent process (message.h), shown by the reports.
 #pragma once
 
 #include <cstdint>

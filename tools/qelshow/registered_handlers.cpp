@@ -5,7 +5,7 @@
 #include <iterator>
 
 #include "class_ids.h"
-#include "shell_questions.h"
+#include "shell_requests.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -25,7 +25,7 @@ constexpr ShellHandler kShellHandlers[] = {
     {L"properties", L"PropertyHandler", nullptr},
 };
 
-constexpr std::size_t kMostKeyCharacters = 255;  // of the name of a key, which is Windows' own limit
+constexpr std::size_t kMaxKeyCharacters = 255;  // of the name of a key, which is Windows' own limit
 
 constexpr const wchar_t* kPropertyHandlers =
     LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
@@ -116,7 +116,7 @@ std::wstring InstalledProduct() {
   std::wstring product;
   HKEY key = nullptr;
   if (RegOpenKeyExW(HKEY_LOCAL_MACHINE, uninstall.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
-  wchar_t name[kMostKeyCharacters + 1];
+  wchar_t name[kMaxKeyCharacters + 1];
   for (DWORD i = 0; product.empty() && RegEnumKeyW(key, i, name, std::size(name)) == ERROR_SUCCESS; ++i) {
     const std::wstring entry = uninstall + L"\\" + name;
     DWORD byInstaller = 0;

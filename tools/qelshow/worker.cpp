@@ -6,9 +6,9 @@
 #include <cstdint>
 
 #include "diagnosis.h"
+#include "extension_client.h"
 #include "failure.h"
-#include "server.h"
-#include "shell_questions.h"
+#include "shell_requests.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -50,15 +50,15 @@ bool Receive(HANDLE pipe, std::string& message) {
   return ReadAll(pipe, message.data(), message.size());
 }
 
-std::string AnswerTo(const Question& question, const Server& server) {
+std::string AnswerTo(const Question& question, const ExtensionClient& client) {
   switch (question.subject) {
     case Subject::kDiagnosis: return Packed(Diagnose(question.path));
-    case Subject::kTip: return Packed(AskTip(server, question.path));
-    case Subject::kColumns: return Packed(AskColumns(server, question.path));
-    case Subject::kPropertySets: return Packed(AskPropertySets(server, question.path));
-    case Subject::kPropertyStore: return Packed(AskPropertyStore(server, question.path));
-    case Subject::kThumbnail: return Packed(AskThumbnail(server, question.path, question.size));
-    case Subject::kCreation: return Packed(AskCreation(question.path));
+    case Subject::kTip: return Packed(RequestTip(client, question.path));
+    case Subject::kColumns: return Packed(RequestColumns(client, question.path));
+    case Subject::kPropertySets: return Packed(RequestPropertySets(client, question.path));
+    case Subject::kPropertyStore: return Packed(RequestPropertyStore(client, question.path));
+    case Subject::kThumbnail: return Packed(RequestThumbnail(client, question.path, question.size));
+    case Subject::kCreation: return Packed(RequestObject(question.path));
   }
   return {};
 }
@@ -92,10 +92,10 @@ int RunWorker() {
 
   std::string message;
   if (!Receive(input, message)) return 1;
-  Server server;
-  if (!Send(output, Packed(server.Open(Unpacked<std::wstring>(message))))) return 1;
+  ExtensionClient client;
+  if (!Send(output, Packed(client.Open(Unpacked<std::wstring>(message))))) return 1;
   while (Receive(input, message)) {
-    if (!Send(output, AnswerTo(Unpacked<Question>(message), server))) return 1;
+    if (!Send(output, AnswerTo(Unpacked<Question>(message), client))) return 1;
   }
   return 0;
 }
@@ -125,7 +125,7 @@ void Worker::Start() {
   childOutput.reset();
 
   std::string reply;
-  if (!Send(toProcess_.get(), Packed(serverPath_)) || !Receive(fromProcess_.get(), reply)) {
+  if (!Send(toProcess_.get(), Packed(dllPath_)) || !Receive(fromProcess_.get(), reply)) {
     throw Failure(L"The extension ends its process with " + ProcessEndText(Finish()) +
                   L" while it is loaded.");
   }

@@ -31,9 +31,9 @@ using OwnedHandle = std::unique_ptr<HANDLE, HandleCloser>;
 
 class Worker {
  public:
-  /// `serverPath` names the DLL; empty means the registered server. Throws Failure when the server cannot be
-  /// opened.
-  explicit Worker(std::wstring serverPath) : serverPath_(std::move(serverPath)) { Start(); }
+  /// Starts a process that loads the DLL at `dllPath`, or the registered one if that is empty. Throws Failure
+  /// if the process cannot start or the DLL does not load.
+  explicit Worker(std::wstring dllPath) : dllPath_(std::move(dllPath)) { Start(); }
 
   /// Fills `answer`, or answers the code with which the process ended instead; then a new process has been
   /// started for the next question.
@@ -53,7 +53,7 @@ class Worker {
   /// Waits for the end of the process, whose pipes are broken, and answers its exit code.
   DWORD Finish();
 
-  std::wstring serverPath_;
+  std::wstring dllPath_;
   OwnedHandle process_;
   OwnedHandle toProcess_;
   OwnedHandle fromProcess_;

@@ -1,4 +1,4 @@
-#include "shell_questions.h"
+#include "shell_requests.h"
 
 #include <propidl.h>
 #include <propsys.h>
@@ -26,7 +26,7 @@ constexpr GUID kImageSummarySet = {
     0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
 
 /// The bound of a list that the extension ends itself.
-constexpr DWORD kMostItems = 64;
+constexpr DWORD kMaxItems = 64;
 
 /// A PROPVARIANT that is cleared.
 struct OwnedValue : PROPVARIANT {
@@ -53,12 +53,12 @@ std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
   return std::wstring(L"The extension gives no ") + what + L": " + ResultText(result) + L".";
 }
 
-/// Runs `question`; an exception that leaves the extension becomes the answer's problem.
-template <class Answer, class Ask>
-Answer Guarded(Ask question) {
+/// Runs `request`; an exception that leaves the extension becomes the answer's problem.
+template <class Answer, class Request>
+Answer Guarded(Request request) {
   Answer answer;
   try {
-    question(answer);
+    request(answer);
   } catch (const std::exception& e) {
     answer.problem = L"The extension throws \"" + Wide(e.what()) + L"\".";
   } catch (...) {
@@ -74,9 +74,9 @@ HRESULT QueryFor(const ComPtr<Object>& object, ComPtr<Interface>& answer) {
 
 /// A fresh object that was given the path, as the shell prepares it.
 template <class Interface>
-HRESULT LoadFile(const Server& server, const std::wstring& path, ComPtr<Interface>& object) {
+HRESULT LoadFile(const ExtensionClient& client, const std::wstring& path, ComPtr<Interface>& object) {
   ComPtr<IPersistFile> file;
-  HRESULT result = server.Create(CLSID_QelShellExt, file);
+  HRESULT result = client.Create(CLSID_QelShellExt, file);
   if (SUCCEEDED(result)) result = file->Load(path.c_str(), STGM_READ);
   if (SUCCEEDED(result)) {
     result = QueryFor(file, object);
@@ -161,10 +161,10 @@ const CLSID* StoreClassOf(const std::wstring& path) {
   return SameIgnoringCase(extension, L"mrc") ? &CLSID_QelShellExtVistaMrc : nullptr;
 }
 
-TipAnswer AskTip(const Server& server, const std::wstring& path) {
+TipAnswer RequestTip(const ExtensionClient& client, const std::wstring& path) {
   return Guarded<TipAnswer>([&](TipAnswer& answer) {
     ComPtr<IQueryInfo> info;
-    HRESULT result = LoadFile(server, path, info);
+    HRESULT result = LoadFile(client, path, info);
     wchar_t* text = nullptr;
     if (SUCCEEDED(result)) result = info->GetInfoTip(0, &text);
     if (result == S_OK && text != nullptr) {
@@ -176,10 +176,10 @@ TipAnswer AskTip(const Server& server, const std::wstring& path) {
   });
 }
 
-ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
+ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstring& path) {
   return Guarded<ListAnswer<Column>>([&](ListAnswer<Column>& answer) {
     ComPtr<IColumnProvider> provider;
-    HRESULT result = server.Create(CLSID_QelShellExt, provider);
+    HRESULT result = client.Create(CLSID_QelShellExt, provider);
     SHCOLUMNINIT folder{};
     if (SUCCEEDED(result)) result = provider->Initialize(&folder);
     if (FAILED(result)) {
@@ -197,7 +197,7 @@ ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
     file.dwFileAttributes = FILE_ATTRIBUTE_NORMAL;
 
     SHCOLUMNINFO info{};
-    for (DWORD index = 0; index < kMostItems; ++index) {
+    for (DWORD index = 0; index < kMaxItems; ++index) {
       result = provider->GetColumnInfo(index, &info);
       if (result != S_OK) break;
       Column column;
@@ -215,10 +215,10 @@ ListAnswer<Column> AskColumns(const Server& server, const std::wstring& path) {
   });
 }
 
-ListAnswer<Property> AskPropertySets(const Server& server, const std::wstring& path) {
+ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const std::wstring& path) {
   return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
     ComPtr<IPropertySetStorage> sets;
-    HRESULT result = LoadFile(server, path, sets);
+    HRESULT result = LoadFile(client, path, sets);
     ComPtr<IEnumSTATPROPSETSTG> enumerator;
     if (SUCCEEDED(result)) result = sets->Enum(enumerator.Put());
     STATPROPSETSTG entry{};
@@ -230,7 +230,7 @@ ListAnswer<Property> AskPropertySets(const Server& server, const std::wstring& p
   });
 }
 
-ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& path) {
+ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const std::wstring& path) {
   return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
     const CLSID* const clsid = StoreClassOf(path);
     if (clsid == nullptr) {
@@ -239,7 +239,7 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
       return;
     }
     ComPtr<IInitializeWithStream> handler;
-    HRESULT result = server.Create(*clsid, handler);
+    HRESULT result = client.Create(*clsid, handler);
     ComPtr<IStream> stream;
     if (SUCCEEDED(result)) {
       result = SHCreateStreamOnFileEx(path.c_str(), STGM_READ | STGM_SHARE_DENY_NONE, FILE_ATTRIBUTE_NORMAL,
@@ -256,7 +256,7 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
     }
     // GetCount answers 0 by design, so the keys are asked for until there are no more.
     PROPERTYKEY key{};
-    for (DWORD index = 0; index < kMostItems && store->GetAt(index, &key) == S_OK; ++index) {
+    for (DWORD index = 0; index < kMaxItems && store->GetAt(index, &key) == S_OK; ++index) {
       Property property;
       const KnownProperty* const known = FindProperty(key.fmtid, key.pid);
       property.name = known == nullptr ? L"" : known->canonicalName;
@@ -276,11 +276,11 @@ ListAnswer<Property> AskPropertyStore(const Server& server, const std::wstring& 
   });
 }
 
-Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int32_t size) {
+Thumbnail RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size) {
   return Guarded<Thumbnail>([&](Thumbnail& thumbnail) {
     thumbnail.request = size;
     ComPtr<IExtractImage> extractor;
-    HRESULT result = LoadFile(server, path, extractor);
+    HRESULT result = LoadFile(client, path, extractor);
     if (SUCCEEDED(result)) {
       wchar_t location[MAX_PATH] = L"";
       DWORD priority = 0;
@@ -307,7 +307,7 @@ Thumbnail AskThumbnail(const Server& server, const std::wstring& path, std::int3
   });
 }
 
-std::wstring AskCreation(const std::wstring& clsid) {
+std::wstring RequestObject(const std::wstring& clsid) {
   CLSID id{};
   HRESULT result = CLSIDFromString(clsid.c_str(), &id);
   ComPtr<IUnknown> object;

@@ -1,4 +1,4 @@
-#include "server.h"
+#include "extension_client.h"
 
 #include <cstdint>
 #include <filesystem>
@@ -41,7 +41,7 @@ std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
 
 }  // namespace
 
-std::wstring Server::Open(const std::wstring& path) {
+std::wstring ExtensionClient::Open(const std::wstring& path) {
   if (path.empty()) {
     ComPtr<IClassFactory> factory;
     const HRESULT result = CoGetClassObject(CLSID_QelShellExt, CLSCTX_INPROC_SERVER, nullptr,
@@ -66,7 +66,7 @@ std::wstring Server::Open(const std::wstring& path) {
   return {};
 }
 
-HRESULT Server::Create(const CLSID& clsid, const IID& iid, void** object) const {
+HRESULT ExtensionClient::Create(const CLSID& clsid, const IID& iid, void** object) const {
   if (getClassObject_ == nullptr) {
     return CoCreateInstance(clsid, nullptr, CLSCTX_INPROC_SERVER, iid, object);
   }

@@ -1,4 +1,4 @@
-#include "asking.h"
+#include "file_inspection.h"
 
 #include <windows.h>
 
@@ -21,9 +21,9 @@ std::wstring Square(std::int32_t size) {
   return std::to_wstring(size) + L" x " + std::to_wstring(size);
 }
 
-/// Asks, and makes the end of the process the answer's problem.
+/// Fills `answer`; if the process ends instead, that becomes the answer's problem.
 template <class Answer>
-void Ask(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
+void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
   if (const auto end = worker.Ask({subject, path}, answer)) {
     answer.problem = std::wstring(L"Asked for ") + what + L", the extension ends its process with " +
                      ProcessEndText(*end) + L".";
@@ -48,9 +48,9 @@ std::wstring PixelType(const std::wstring& tip) {
   return end == std::wstring::npos ? std::wstring() : line.substr(end + 2);
 }
 
-/// Asks for the thumbnail. A colour picture smaller than the request ends the process; such a file is asked
-/// again at its own size, so that it can be shown, with a remark.
-void AskThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
+/// Requests the thumbnail. A colour picture smaller than the request ends the process; then a thumbnail of
+/// the frame's own size is requested, with a remark.
+void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
   const auto end = worker.Ask({Subject::kThumbnail, path, size}, facts.thumbnail);
   facts.thumbnail.request = size;
   if (!end) return;
@@ -68,7 +68,7 @@ void AskThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, F
 
 }  // namespace
 
-FileFacts AskFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size) {
+FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size) {
   FileFacts facts;
   facts.path = path;
   facts.name = name;
@@ -89,16 +89,16 @@ FileFacts AskFile(Worker& worker, const std::wstring& path, const std::wstring& 
         facts.propertyStore.problem = diagnosis.sentence;
     return facts;
   }
-  Ask(worker, Subject::kTip, absolute, L"the tip", facts.tip);
-  Ask(worker, Subject::kColumns, absolute, L"the columns", facts.columns);
-  Ask(worker, Subject::kPropertySets, absolute, L"the property sets", facts.propertySets);
-  Ask(worker, Subject::kPropertyStore, absolute, L"the property store", facts.propertyStore);
+  Fill(worker, Subject::kTip, absolute, L"the tip", facts.tip);
+  Fill(worker, Subject::kColumns, absolute, L"the columns", facts.columns);
+  Fill(worker, Subject::kPropertySets, absolute, L"the property sets", facts.propertySets);
+  Fill(worker, Subject::kPropertyStore, absolute, L"the property store", facts.propertyStore);
   facts.width = Number(facts.columns, 3);
   facts.height = Number(facts.columns, 4);
   facts.bitDepth = Number(facts.columns, 7);
   facts.frames = Number(facts.columns, 12);
   facts.type = PixelType(facts.tip.text);
-  AskThumbnail(worker, absolute, size, facts);
+  FillThumbnail(worker, absolute, size, facts);
 
   // What the extension shows counts, whatever this program's readers think of the file.
   if (!facts.thumbnail.png.empty()) {

@@ -1,4 +1,4 @@
-// The extension as this program reaches it: the registered server, or a DLL named by its path.
+// Loads the extension, as it is registered or from the DLL at a path, and creates its objects.
 #pragma once
 
 #include <windows.h>
@@ -14,13 +14,13 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 using Com::ComPtr;
 
-class Server {
+class ExtensionClient {
  public:
-  /// `path` names the DLL; empty means the registered server. COM must be initialised. Answers a sentence for
-  /// the user when the server cannot be had, and is of no use then.
+  /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. Returns a
+  /// sentence for the user if that fails, after which no object can be created.
   std::wstring Open(const std::wstring& path);
 
-  /// A new object of the class, seen through one of its interfaces.
+  /// Creates an object of the class and queries it for the interface.
   template <class Interface>
   HRESULT Create(const CLSID& clsid, ComPtr<Interface>& object) const {
     return Create(clsid, Com::kInterfaceId<Interface>, reinterpret_cast<void**>(object.Put()));
