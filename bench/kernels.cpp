@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "data_type.h"
 #include "frame_renderer.h"
 #include "logarithm.h"
 
@@ -29,35 +30,35 @@ void Fill(std::vector<std::byte>& band) {
   }
 }
 
-void FillBand(PixelFormat format, std::vector<std::byte>& band) {
-  switch (format) {
-    case PixelFormat::kFloat32:
-    case PixelFormat::kComplexFloat32: return Fill<float>(band);
-    case PixelFormat::kFloat64:
-    case PixelFormat::kComplexFloat64: return Fill<double>(band);
+void FillBand(DataType type, std::vector<std::byte>& band) {
+  switch (type) {
+    case DataType::kFloat32:
+    case DataType::kComplexFloat32: return Fill<float>(band);
+    case DataType::kFloat64:
+    case DataType::kComplexFloat64: return Fill<double>(band);
     default: return Fill<std::uint8_t>(band);  // every pattern of bytes is as good as any other for integers
   }
 }
 
-void Kernel(benchmark::State& state, PixelFormat format, Size2 frame) {
+void Kernel(benchmark::State& state, DataType type, Size2 frame) {
   const auto edge = static_cast<LONG>(state.range(0));
-  const auto renderer = MakeFrameRenderer(format, frame, SIZE{edge, edge});
+  const auto renderer = MakeFrameRenderer(PixelTypeOf(type).tag, frame, SIZE{edge, edge});
   const std::int32_t factor = renderer->reduction().factor;
   const std::int32_t width = renderer->reduction().size.width * factor;
   const std::int32_t height = renderer->reduction().size.height * factor;
-  const std::int64_t rowBytes = std::int64_t{frame.width} * BytesPerPixel(format);
+  const std::int64_t rowBytes = std::int64_t{frame.width} * PixelTypeOf(type).bytes();
   // Whole rows of blocks where they fit, else the rows of one row of blocks in parts.
   const auto fitting = static_cast<std::int32_t>(kBandBytes / rowBytes);
   const std::int32_t bandRows = std::max(fitting / factor, 1) * factor;
   std::vector<std::byte> band(static_cast<std::size_t>(fitting * rowBytes));
-  FillBand(format, band);
+  FillBand(type, band);
 
   for (auto iteration : state) {
     for (std::int32_t top = 0; top < height; top += bandRows) {
       const std::int32_t end = std::min(top + bandRows, height);
       for (std::int32_t y = top; y < end;) {
         const std::int32_t rows = std::min(fitting, end - y);
-        renderer->Add({0, y, {width, rows, band.data(), BytesPerPixel(format), rowBytes}});
+        renderer->Add({0, y, {width, rows, band.data(), PixelTypeOf(type).bytes(), rowBytes}});
         y += rows;
       }
     }
@@ -79,9 +80,9 @@ void Logarithms(benchmark::State& state, decltype(LogarithmsToFloat) body) {
   state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(values.size()));
 }
 
-void Register(const char* name, PixelFormat format, Size2 frame) {
+void Register(const char* name, DataType type, Size2 frame) {
   auto* const kernel =
-      benchmark::RegisterBenchmark(name, [=](benchmark::State& state) { Kernel(state, format, frame); });
+      benchmark::RegisterBenchmark(name, [=](benchmark::State& state) { Kernel(state, type, frame); });
   for (const int edge : {96, 256, 1024}) kernel->Arg(edge);
 }
 
@@ -90,16 +91,16 @@ void Register(const char* name, PixelFormat format, Size2 frame) {
 
 int main(int argc, char** argv) {
   using namespace Qel::Lumetra::ShellExt;
-  Bench::Register("uint8", PixelFormat::kUInt8, {8192, 8192});
-  Bench::Register("int16", PixelFormat::kInt16, {4096, 4096});
-  Bench::Register("uint16", PixelFormat::kUInt16, {4096, 4096});
-  Bench::Register("uint16 5760x4092", PixelFormat::kUInt16, {5760, 4092});
-  Bench::Register("rgb", PixelFormat::kRgb24, {4096, 4096});
-  Bench::Register("int32", PixelFormat::kInt32, {4096, 4096});
-  Bench::Register("float32", PixelFormat::kFloat32, {4096, 4096});
-  Bench::Register("float64", PixelFormat::kFloat64, {4096, 4096});
-  Bench::Register("complex64", PixelFormat::kComplexFloat32, {4096, 4096});
-  Bench::Register("complex128", PixelFormat::kComplexFloat64, {2048, 2048});
+  Bench::Register("uint8", DataType::kUInt8, {8192, 8192});
+  Bench::Register("int16", DataType::kInt16, {4096, 4096});
+  Bench::Register("uint16", DataType::kUInt16, {4096, 4096});
+  Bench::Register("uint16 5760x4092", DataType::kUInt16, {5760, 4092});
+  Bench::Register("rgb", DataType::kRgb24, {4096, 4096});
+  Bench::Register("int32", DataType::kInt32, {4096, 4096});
+  Bench::Register("float32", DataType::kFloat32, {4096, 4096});
+  Bench::Register("float64", DataType::kFloat64, {4096, 4096});
+  Bench::Register("complex64", DataType::kComplexFloat32, {4096, 4096});
+  Bench::Register("complex128", DataType::kComplexFloat64, {2048, 2048});
   benchmark::RegisterBenchmark("logarithms/SSE2", Bench::Logarithms, LogarithmsToFloatBaseline);
   if (HasAvx2()) benchmark::RegisterBenchmark("logarithms/AVX2", Bench::Logarithms, LogarithmsToFloatAvx2);
   benchmark::Initialize(&argc, argv);

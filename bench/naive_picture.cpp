@@ -55,48 +55,36 @@ BitmapPixels Colour(std::ifstream& file, const PixelPlaces& places, const SIZE& 
   return NaiveColourThumbnail(frame, request.cx, request.cy);
 }
 
-}  // namespace
-
-PixelFormat PixelFormatNamed(const std::string& name) {
-  static const std::map<std::string, PixelFormat> kFormats = {
-      {"uint8", PixelFormat::kUInt8},
-      {"uint16", PixelFormat::kUInt16},
-      {"uint32", PixelFormat::kUInt32},
-      {"int8", PixelFormat::kInt8},
-      {"int16", PixelFormat::kInt16},
-      {"int32", PixelFormat::kInt32},
-      {"float32", PixelFormat::kFloat32},
-      {"float64", PixelFormat::kFloat64},
-      {"complexint16", PixelFormat::kComplexInt16},
-      {"complex64", PixelFormat::kComplexFloat32},
-      {"complex128", PixelFormat::kComplexFloat64},
-      {"rgb", PixelFormat::kRgb24},
-      {"bgr", PixelFormat::kBgr24},
-  };
-  const auto found = kFormats.find(name);
-  if (found == kFormats.end()) throw std::runtime_error("there is no pixel format '" + name + "'");
-  return found->second;
+BitmapPixels Rgb(std::ifstream& file, const PixelPlaces& places, const SIZE& request) {
+  return Colour(file, places, request, false);
 }
 
+BitmapPixels Bgr(std::ifstream& file, const PixelPlaces& places, const SIZE& request) {
+  return Colour(file, places, request, true);
+}
+
+}  // namespace
+
 BitmapPixels NaivePicture(const std::wstring& path, const PixelPlaces& places, const SIZE& request) {
+  static const std::map<std::string, decltype(&Rgb)> kPictures = {
+      {"uint8", Grey<std::uint8_t>},
+      {"uint16", Grey<std::uint16_t>},
+      {"uint32", Grey<std::uint32_t>},
+      {"int8", Grey<std::int8_t>},
+      {"int16", Grey<std::int16_t>},
+      {"int32", Grey<std::int32_t>},
+      {"float32", Grey<float>},
+      {"float64", Grey<double>},
+      {"complex64", Complex<float>},
+      {"complexint16", Complex<std::int16_t>},
+      {"complex128", Complex<double>},
+      {"rgb", Rgb},
+      {"bgr", Bgr},
+  };
+  const auto picture = kPictures.find(places.pixel);
+  if (picture == kPictures.end()) throw std::runtime_error("there is no pixel type '" + places.pixel + "'");
   std::ifstream file(std::filesystem::path(path), std::ios_base::binary);
-  if (!file) return {};
-  switch (places.format) {
-    case PixelFormat::kUInt8: return Grey<std::uint8_t>(file, places, request);
-    case PixelFormat::kUInt16: return Grey<std::uint16_t>(file, places, request);
-    case PixelFormat::kUInt32: return Grey<std::uint32_t>(file, places, request);
-    case PixelFormat::kInt8: return Grey<std::int8_t>(file, places, request);
-    case PixelFormat::kInt16: return Grey<std::int16_t>(file, places, request);
-    case PixelFormat::kInt32: return Grey<std::int32_t>(file, places, request);
-    case PixelFormat::kFloat32: return Grey<float>(file, places, request);
-    case PixelFormat::kFloat64: return Grey<double>(file, places, request);
-    case PixelFormat::kComplexInt16: return Complex<std::int16_t>(file, places, request);
-    case PixelFormat::kComplexFloat32: return Complex<float>(file, places, request);
-    case PixelFormat::kComplexFloat64: return Complex<double>(file, places, request);
-    case PixelFormat::kRgb24: return Colour(file, places, request, false);
-    case PixelFormat::kBgr24: return Colour(file, places, request, true);
-  }
-  return {};
+  return file ? picture->second(file, places, request) : BitmapPixels{};
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Bench

@@ -145,7 +145,7 @@ std::string WriteBitmap(const Words& words) {
 }
 
 std::string WriteNaive(const Words& words) {
-  const PixelPlaces places{PixelFormatNamed(words.at(2)),
+  const PixelPlaces places{words.at(2),
                            {std::stoi(words.at(3)), std::stoi(words.at(4))},
                            std::stoll(words.at(5)),
                            std::stoll(words.at(6)),

@@ -1,9 +1,11 @@
-// The vocabulary of pixel types that the RAW, EBN, SER and EMI readers share, with the name and the bit
-// count that the shell shows for each. The MRC family numbers its pixel types itself (mrc_file_info.h).
+// The vocabulary of pixel types that the RAW, EBN, SER and EMI readers share. The MRC family numbers its
+// pixel types itself (mrc_file_info.h).
 #pragma once
 
 #include <cstdint>
 #include <string>
+
+#include "pixel_type.h"
 
 namespace Qel::Lumetra::ShellExt {
 
@@ -22,6 +24,9 @@ enum class DataType : std::uint32_t {
   kRgb24 = 16,
   kBgr24 = 18,
 };
+
+/// The unknown type for a value that is not listed.
+PixelType PixelTypeOf(DataType type);
 
 /// The display name, for instance "16 bit signed"; "Unknown" for a value that is not listed.
 std::wstring DataTypeName(DataType type);

@@ -113,7 +113,7 @@ EbnParser::EbnParser(std::istream& stream) : stream_(&stream) {
 }
 
 FrameLayout EbnParser::Frame() const {
-  return PackedLayout(PixelFormatOf(dataType_).value(), size_, dataOffset_);
+  return PackedLayout(PixelTypeOf(dataType_), size_, dataOffset_);
 }
 
 EbnFileInfo::EbnFileInfo(std::istream& stream) : parser_(stream) {}

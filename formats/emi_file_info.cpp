@@ -157,8 +157,7 @@ std::int32_t EmiParser::imageCount() const {
 }
 
 FrameLayout EmiParser::FirstFrame() const {
-  return PackedLayout(PixelFormatOf(firstImage_.dataType).value(), firstImage_.size,
-                      firstImage_.dataPosition);
+  return PackedLayout(PixelTypeOf(firstImage_.dataType), firstImage_.size, firstImage_.dataPosition);
 }
 
 EmiFileInfo::EmiFileInfo(std::istream& stream) : parser_(stream) {}

@@ -2,10 +2,8 @@
 #pragma once
 
 #include <cstdint>
-#include <optional>
 
-#include "data_type.h"
-#include "pixel.h"
+#include "pixel_type.h"
 #include "size2.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -14,7 +12,7 @@ namespace Qel::Lumetra::ShellExt {
 /// blockPosition + firstPixel + x * pixelStride + y * rowStride. All bytes of the frame lie in the
 /// blockBytes bytes from blockPosition; a layout with a pixel outside of them cannot be read.
 struct FrameLayout {
-  PixelFormat format = PixelFormat::kUInt8;
+  PixelType type;
   Size2 size;
   std::int64_t blockPosition = 0;
   std::int64_t blockBytes = 0;
@@ -24,11 +22,8 @@ struct FrameLayout {
   bool swapBytes = false;  // 16-bit pixels with the high byte first
 };
 
-/// The stored form of pixels of a shared type; none for a type that is unknown.
-std::optional<PixelFormat> PixelFormatOf(DataType type);
-
 /// Rows one after the other without padding, from the top, beginning at file offset `position`.
-FrameLayout PackedLayout(PixelFormat format, Size2 size, std::int64_t position);
+FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t position);
 
 /// The same rows, the first of them at the bottom of the picture.
 FrameLayout FlippedVertically(const FrameLayout& layout);

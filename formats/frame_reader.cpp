@@ -43,7 +43,7 @@ bool IsReadable(const FrameLayout& layout) {
       layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
   const std::int64_t last =
       layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
-  return first >= 0 && last + BytesPerPixel(layout.format) <= layout.blockBytes;
+  return first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
 }
 
 /// Whether the stream holds the layout's block, so that a file cut short is refused before any work. The
@@ -71,7 +71,7 @@ class BandReader {
         factor_(renderer.reduction().factor),
         width_(renderer.reduction().size.width * factor_),
         height_(renderer.reduction().size.height * factor_),
-        pixelBytes_(BytesPerPixel(layout.format)),
+        pixelBytes_(layout.type.bytes()),
         pixelStep_(std::abs(layout.pixelStride)),
         rowStep_(std::abs(layout.rowStride)) {
     Allocate(std::min(kBandBytes, layout.blockBytes));
@@ -233,7 +233,8 @@ class BandReader {
 
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request) {
   if (!IsReadable(layout) || !HoldsBlock(stream, layout)) return nullptr;
-  const auto renderer = MakeFrameRenderer(layout.format, layout.size, request);
+  const auto renderer = MakeFrameRenderer(layout.type.tag, layout.size, request);
+  if (renderer == nullptr) return nullptr;
   const Reduction& reduction = renderer->reduction();
   const bool hasBlocks = reduction.factor > 0 && reduction.size.width > 0 && reduction.size.height > 0;
   if (hasBlocks && !BandReader(stream, layout, *renderer).ReadFrame()) return nullptr;

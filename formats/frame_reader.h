@@ -12,8 +12,9 @@ namespace Qel::Lumetra::ShellExt {
 /// Reads one frame and renders it (frame_renderer.h); the bitmap is the caller's. Memory does not depend on
 /// the size of the frame: it is read in bands, in the order of the file where the picture allows it.
 ///
-/// Answers null for a frame without pixels, for a layout that places a pixel outside of its block, and when
-/// the stream does not hold the whole block or fails; a short stream is left failed, as by a short read.
+/// Returns null for a frame without pixels or of an unknown pixel type, for a layout that places a pixel
+/// outside of its block, and when the stream does not hold the whole block or fails; a short stream is left
+/// failed, as by a short read.
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

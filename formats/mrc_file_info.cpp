@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "byte_order.h"
+#include "data_type.h"
 #include "frame_reader.h"
 #include "same_text.h"
 #include "text.h"
@@ -17,21 +18,16 @@ constexpr std::int32_t kMostLabels = 10;
 constexpr std::size_t kLabelBytes = 80;
 constexpr std::uint32_t kLastMode = 16;
 
-struct PixelTypeFacts {
-  PixelFormat format;
-  const wchar_t* name;
-  std::int32_t bits;
-};
-
-PixelTypeFacts FactsOf(MrcPixelType type) {
+PixelType PixelTypeOf(MrcPixelType type) {
   switch (type) {
-    case MrcPixelType::kUInt8: return {PixelFormat::kUInt8, L"8 bit unsigned", 8};
-    case MrcPixelType::kInt16: return {PixelFormat::kInt16, L"16 bit signed", 16};
-    case MrcPixelType::kFloat32: return {PixelFormat::kFloat32, L"32 bit float", 32};
-    case MrcPixelType::kComplexInt16: return {PixelFormat::kComplexInt16, L"32 bit complex integer", 32};
-    case MrcPixelType::kComplexFloat32: return {PixelFormat::kComplexFloat32, L"64 bit complex float", 64};
-    case MrcPixelType::kUInt16: return {PixelFormat::kUInt16, L"16 bit unsigned", 16};
-    case MrcPixelType::kRgb24: return {PixelFormat::kRgb24, L"24 bit RGB", 24};
+    case MrcPixelType::kUInt8: return PixelTypeOf(DataType::kUInt8);
+    case MrcPixelType::kInt16: return PixelTypeOf(DataType::kInt16);
+    case MrcPixelType::kFloat32: return PixelTypeOf(DataType::kFloat32);
+    case MrcPixelType::kComplexInt16:
+      return PixelType::Of<ComplexPixel<std::int16_t>>(L"32 bit complex integer");
+    case MrcPixelType::kComplexFloat32: return PixelTypeOf(DataType::kComplexFloat32);
+    case MrcPixelType::kUInt16: return PixelTypeOf(DataType::kUInt16);
+    case MrcPixelType::kRgb24: return PixelTypeOf(DataType::kRgb24);
   }
   return {};
 }
@@ -110,18 +106,16 @@ std::string MrcHeader::Labels() const {
 }
 
 FrameLayout MrcHeader::Section(std::int32_t section) const {
-  const MrcPixelType type = pixelType();
-  const PixelFormat format = FactsOf(type).format;
+  const PixelType type = PixelTypeOf(pixelType());
   // Sizes and positions are 32-bit and wrap: a section beyond 2 GiB is not reached.
-  const std::int32_t frameBytes =
-      WrappingProduct(WrappingProduct(size().width, size().height), BytesPerPixel(format));
+  const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size().width, size().height), type.bytes());
   const std::int32_t position =
       WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
-  FrameLayout layout = FlippedVertically(PackedLayout(format, size(), position));
+  FrameLayout layout = FlippedVertically(PackedLayout(type, size(), position));
   layout.blockBytes = frameBytes;
   // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they
   // are.
-  layout.swapBytes = swapped_ && (type == MrcPixelType::kInt16 || type == MrcPixelType::kUInt16);
+  layout.swapBytes = swapped_ && type.bits == 16;
   return layout;
 }
 
@@ -148,11 +142,11 @@ std::int32_t MrcFileInfo::GetFrameCount() const {
 }
 
 std::int32_t MrcFileInfo::GetBitDepth() const {
-  return FactsOf(header_.pixelType()).bits;
+  return PixelTypeOf(header_.pixelType()).bits;
 }
 
 std::wstring MrcFileInfo::GetDataTypeName() const {
-  return FactsOf(header_.pixelType()).name;
+  return PixelTypeOf(header_.pixelType()).name;
 }
 
 std::wstring MrcFileInfo::GetComment() const {

@@ -66,7 +66,7 @@ RawHeader::RawHeader(std::istream& stream) : stream_(&stream) {
 }
 
 FrameLayout RawHeader::Frame() const {
-  return {.format = PixelFormatOf(dataType_).value(),
+  return {.type = PixelTypeOf(dataType_),
           .size = size_,
           .blockPosition = kHeaderBytes,
           .blockBytes = Extent(),

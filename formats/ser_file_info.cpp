@@ -149,8 +149,7 @@ void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
 }
 
 FrameLayout SerParser::FirstFrame() const {
-  return PackedLayout(PixelFormatOf(firstElement_.dataType).value(), firstElement_.size,
-                      firstElement_.dataPosition);
+  return PackedLayout(PixelTypeOf(firstElement_.dataType), firstElement_.size, firstElement_.dataPosition);
 }
 
 SerFileInfo::SerFileInfo(std::istream& stream) : parser_(stream) {}

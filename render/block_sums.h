@@ -37,7 +37,7 @@ struct SamplesOf {
 template <ColourOrder kOrder>
 struct SamplesOf<ColourPixel<kOrder>> {
   using Sample = std::uint8_t;
-  using Target = BitmapPixel;
+  using Target = BgrPixel;
   static constexpr std::size_t kCount = 3;
   static constexpr bool kSwaps = kOrder == ColourOrder::kRedFirst;
 

@@ -12,9 +12,8 @@
 namespace Qel::Lumetra::ShellExt {
 
 /// The bits of a 24-bit bitmap as pixels.
-inline ImageView<BitmapPixel> AsBitmapPixels(const ImageView<std::uint8_t>& bits) {
-  return {bits.width, bits.height, reinterpret_cast<BitmapPixel*>(bits.data), bits.pixelStride,
-          bits.rowStride};
+inline ImageView<BgrPixel> AsBgrPixels(const ImageView<std::uint8_t>& bits) {
+  return {bits.width, bits.height, reinterpret_cast<BgrPixel*>(bits.data), bits.pixelStride, bits.rowStride};
 }
 
 /// Bytes from a row of a bitmap to the next.

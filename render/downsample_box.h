@@ -23,7 +23,7 @@ void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor, co
 template <ColourOrder kOrder>
 void DownsampleBoxRgb(const ImageView<const ColourPixel<kOrder>>& source, std::int32_t factor,
                       const ImageView<std::uint8_t>& bits) {
-  DownsampleBox(source, factor, AsBitmapPixels(bits));
+  DownsampleBox(source, factor, AsBgrPixels(bits));
 }
 
 }  // namespace Qel::Lumetra::ShellExt

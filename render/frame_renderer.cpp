@@ -101,7 +101,7 @@ class ColourRenderer final : public FrameRenderer {
  public:
   ColourRenderer(Size2 frame, const SIZE& request) : reduction_(ColourReduction(frame, request)) {
     bitmap_.CreateColour(reduction_.size.width, reduction_.size.height);
-    if (bitmap_.Bits().data != nullptr) reducer_.emplace(reduction_.factor, AsBitmapPixels(bitmap_.Bits()));
+    if (bitmap_.Bits().data != nullptr) reducer_.emplace(reduction_.factor, AsBgrPixels(bitmap_.Bits()));
   }
 
   const Reduction& reduction() const override { return reduction_; }
@@ -118,49 +118,30 @@ class ColourRenderer final : public FrameRenderer {
   std::optional<BoxReducer<ColourPixel<kOrder>>> reducer_;
 };
 
-template <class Renderer>
-std::unique_ptr<FrameRenderer> Make(Size2 frame, const SIZE& request) {
-  return std::make_unique<Renderer>(frame, request);
+template <class T>
+std::unique_ptr<FrameRenderer> Make(std::type_identity<T>, Size2 frame, const SIZE& request) {
+  return std::make_unique<GreyRenderer<T>>(frame, request);
+}
+
+template <class T>
+std::unique_ptr<FrameRenderer> Make(std::type_identity<ComplexPixel<T>>, Size2 frame, const SIZE& request) {
+  return std::make_unique<ComplexRenderer<T>>(frame, request);
+}
+
+template <ColourOrder kOrder>
+std::unique_ptr<FrameRenderer> Make(std::type_identity<ColourPixel<kOrder>>, Size2 frame,
+                                    const SIZE& request) {
+  return std::make_unique<ColourRenderer<kOrder>>(frame, request);
+}
+
+std::unique_ptr<FrameRenderer> Make(std::monostate, Size2, const SIZE&) {
+  return nullptr;
 }
 
 }  // namespace
 
-std::int32_t BytesPerPixel(PixelFormat format) {
-  switch (format) {
-    case PixelFormat::kUInt8:
-    case PixelFormat::kInt8: return 1;
-    case PixelFormat::kUInt16:
-    case PixelFormat::kInt16: return 2;
-    case PixelFormat::kRgb24:
-    case PixelFormat::kBgr24: return 3;
-    case PixelFormat::kUInt32:
-    case PixelFormat::kInt32:
-    case PixelFormat::kFloat32:
-    case PixelFormat::kComplexInt16: return 4;
-    case PixelFormat::kFloat64:
-    case PixelFormat::kComplexFloat32: return 8;
-    case PixelFormat::kComplexFloat64: return 16;
-  }
-  return 0;
-}
-
-std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelFormat format, Size2 frame, const SIZE& request) {
-  switch (format) {
-    case PixelFormat::kUInt8: return Make<GreyRenderer<std::uint8_t>>(frame, request);
-    case PixelFormat::kUInt16: return Make<GreyRenderer<std::uint16_t>>(frame, request);
-    case PixelFormat::kUInt32: return Make<GreyRenderer<std::uint32_t>>(frame, request);
-    case PixelFormat::kInt8: return Make<GreyRenderer<std::int8_t>>(frame, request);
-    case PixelFormat::kInt16: return Make<GreyRenderer<std::int16_t>>(frame, request);
-    case PixelFormat::kInt32: return Make<GreyRenderer<std::int32_t>>(frame, request);
-    case PixelFormat::kFloat32: return Make<GreyRenderer<float>>(frame, request);
-    case PixelFormat::kFloat64: return Make<GreyRenderer<double>>(frame, request);
-    case PixelFormat::kComplexInt16: return Make<ComplexRenderer<std::int16_t>>(frame, request);
-    case PixelFormat::kComplexFloat32: return Make<ComplexRenderer<float>>(frame, request);
-    case PixelFormat::kComplexFloat64: return Make<ComplexRenderer<double>>(frame, request);
-    case PixelFormat::kRgb24: return Make<ColourRenderer<ColourOrder::kRedFirst>>(frame, request);
-    case PixelFormat::kBgr24: return Make<ColourRenderer<ColourOrder::kBlueFirst>>(frame, request);
-  }
-  return nullptr;
+std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelTag pixel, Size2 frame, const SIZE& request) {
+  return std::visit([&](auto tag) { return Make(tag, frame, request); }, pixel);
 }
 
 template <class T>

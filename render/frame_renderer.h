@@ -12,12 +12,12 @@
 #include <memory>
 
 #include "image_view.h"
-#include "pixel.h"
+#include "pixel_type.h"
 #include "reduction.h"
 
 namespace Qel::Lumetra::ShellExt {
 
-/// A rectangle of a frame's pixels in memory, of the pixel format that its receiver was made for.
+/// A rectangle of a frame's pixels in memory, of the pixel type that its receiver was made for.
 struct FramePiece {
   std::int32_t x = 0;  // place in the frame of the first pixel, in picture coordinates (row 0 is the top)
   std::int32_t y = 0;
@@ -40,9 +40,10 @@ class FrameRenderer {
   virtual HBITMAP Finish() = 0;
 };
 
-/// The renderer for frames of `format` and `frame` pixels. Faults for a request that cannot be divided by
-/// (reduction.h); throws std::bad_alloc when there is no memory for the reduced image.
-std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelFormat format, Size2 frame, const SIZE& request);
+/// Makes the renderer for a frame of this size and type of pixel; null for a pixel that cannot be rendered.
+/// Faults for a request that cannot be divided by (reduction.h); throws std::bad_alloc when there is no
+/// memory for the reduced image.
+std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelTag pixel, Size2 frame, const SIZE& request);
 
 /// A grey bitmap of 8 bits a pixel of a frame of one of the eight scalar types: the box average, its own
 /// range of values stretched linearly to 0..255.

@@ -1,4 +1,4 @@
-// Streamed frames of every pixel format and layout against the naive picture of the same bytes.
+// Streamed frames of every pixel type and layout against the naive picture of the same bytes.
 #include "frame_reader.h"
 
 #include <gtest/gtest.h>
@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "bitmap_pixels.h"
+#include "data_type.h"
 #include "memory_buffer.h"
 #include "naive_thumbnail.h"
 #include "random_values.h"
@@ -23,12 +24,29 @@ using Testing::NaiveFrame;
 using Testing::Random;
 using Testing::TakeBitmap;
 
-constexpr PixelFormat kFormats[] = {
-    PixelFormat::kUInt8,          PixelFormat::kUInt16,         PixelFormat::kUInt32,
-    PixelFormat::kInt8,           PixelFormat::kInt16,          PixelFormat::kInt32,
-    PixelFormat::kFloat32,        PixelFormat::kFloat64,        PixelFormat::kComplexInt16,
-    PixelFormat::kComplexFloat32, PixelFormat::kComplexFloat64, PixelFormat::kRgb24,
-    PixelFormat::kBgr24};
+const PixelType kUInt8 = PixelTypeOf(DataType::kUInt8);
+const PixelType kUInt16 = PixelTypeOf(DataType::kUInt16);
+const PixelType kInt16 = PixelTypeOf(DataType::kInt16);
+const PixelType kInt32 = PixelTypeOf(DataType::kInt32);
+const PixelType kFloat32 = PixelTypeOf(DataType::kFloat32);
+const PixelType kComplexFloat32 = PixelTypeOf(DataType::kComplexFloat32);
+const PixelType kRgb24 = PixelTypeOf(DataType::kRgb24);
+
+const PixelType kTypes[] = {
+    kUInt8,
+    kUInt16,
+    PixelTypeOf(DataType::kUInt32),
+    PixelTypeOf(DataType::kInt8),
+    kInt16,
+    kInt32,
+    kFloat32,
+    PixelTypeOf(DataType::kFloat64),
+    PixelType::Of<ComplexPixel<std::int16_t>>(L"complex int16"),
+    kComplexFloat32,
+    PixelTypeOf(DataType::kComplexFloat64),
+    kRgb24,
+    PixelTypeOf(DataType::kBgr24),
+};
 
 /// The bytes of a file: `before` bytes of something else, then the block.
 std::string RandomFile(Random& random, std::int64_t before, std::int64_t blockBytes) {
@@ -55,48 +73,41 @@ NaiveFrame<T> Decode(const std::string& file, const FrameLayout& layout) {
   return frame;
 }
 
-template <class T>
-BitmapPixels NaiveGrey(const std::string& file, const FrameLayout& layout, int cx, int cy) {
-  return Testing::NaiveGreyThumbnail(Decode<T>(file, layout), cx, cy);
-}
+struct NaivePictureOf {
+  const std::string& file;
+  const FrameLayout& layout;
+  SIZE request;
 
-template <class T>
-BitmapPixels NaiveComplex(const std::string& file, const FrameLayout& layout, int cx, int cy) {
-  return Testing::NaiveComplexThumbnail(Decode<Testing::NaiveComplex<T>>(file, layout), cx, cy);
-}
-
-BitmapPixels NaivePicture(const std::string& file, const FrameLayout& layout, int cx, int cy) {
-  switch (layout.format) {
-    case PixelFormat::kUInt8: return NaiveGrey<std::uint8_t>(file, layout, cx, cy);
-    case PixelFormat::kUInt16: return NaiveGrey<std::uint16_t>(file, layout, cx, cy);
-    case PixelFormat::kUInt32: return NaiveGrey<std::uint32_t>(file, layout, cx, cy);
-    case PixelFormat::kInt8: return NaiveGrey<std::int8_t>(file, layout, cx, cy);
-    case PixelFormat::kInt16: return NaiveGrey<std::int16_t>(file, layout, cx, cy);
-    case PixelFormat::kInt32: return NaiveGrey<std::int32_t>(file, layout, cx, cy);
-    case PixelFormat::kFloat32: return NaiveGrey<float>(file, layout, cx, cy);
-    case PixelFormat::kFloat64: return NaiveGrey<double>(file, layout, cx, cy);
-    case PixelFormat::kComplexInt16: return NaiveComplex<std::int16_t>(file, layout, cx, cy);
-    case PixelFormat::kComplexFloat32: return NaiveComplex<float>(file, layout, cx, cy);
-    case PixelFormat::kComplexFloat64: return NaiveComplex<double>(file, layout, cx, cy);
-    case PixelFormat::kRgb24:
-    case PixelFormat::kBgr24: {
-      NaiveFrame<Testing::NaiveColour> frame = Decode<Testing::NaiveColour>(file, layout);
-      if (layout.format == PixelFormat::kBgr24) {
-        for (Testing::NaiveColour& colour : frame.values) std::swap(colour[0], colour[2]);
-      }
-      return Testing::NaiveColourThumbnail(frame, cx, cy);
-    }
+  template <class T>
+  BitmapPixels operator()(std::type_identity<T>) const {
+    return Testing::NaiveGreyThumbnail(Decode<T>(file, layout), request.cx, request.cy);
   }
-  return {};
-}
+
+  template <class T>
+  BitmapPixels operator()(std::type_identity<ComplexPixel<T>>) const {
+    const auto frame = Decode<Testing::NaiveComplex<T>>(file, layout);
+    return Testing::NaiveComplexThumbnail(frame, request.cx, request.cy);
+  }
+
+  template <ColourOrder kOrder>
+  BitmapPixels operator()(std::type_identity<ColourPixel<kOrder>>) const {
+    auto frame = Decode<Testing::NaiveColour>(file, layout);
+    if (kOrder == ColourOrder::kBlueFirst) {
+      for (Testing::NaiveColour& colour : frame.values) std::swap(colour[0], colour[2]);
+    }
+    return Testing::NaiveColourThumbnail(frame, request.cx, request.cy);
+  }
+
+  BitmapPixels operator()(std::monostate) const { return {}; }
+};
 
 /// A layout whose pixels need not touch: columns right of each other or, if `byColumn`, below each other.
 /// Those of a small frame may share their bytes.
-FrameLayout RandomLayout(Random& random, PixelFormat format, Size2 size, bool byColumn) {
+FrameLayout RandomLayout(Random& random, const PixelType& type, Size2 size, bool byColumn) {
   FrameLayout layout;
-  layout.format = format;
+  layout.type = type;
   layout.size = size;
-  const std::int64_t pixelBytes = BytesPerPixel(format);
+  const std::int64_t pixelBytes = type.bytes();
   std::int64_t& inner = byColumn ? layout.rowStride : layout.pixelStride;
   std::int64_t& outer = byColumn ? layout.pixelStride : layout.rowStride;
   inner = pixelBytes + (random.OneIn(3) ? random.Between(0, 9) : 0);
@@ -119,8 +130,9 @@ FrameLayout RandomLayout(Random& random, PixelFormat format, Size2 size, bool by
 void CompareWithTheNaivePicture(Random& random, const FrameLayout& layout, int cx, int cy) {
   const std::string file = RandomFile(random, layout.blockPosition, layout.blockBytes);
   std::istringstream stream(file);
-  ASSERT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {cx, cy})), NaivePicture(file, layout, cx, cy))
-      << "format " << static_cast<int>(layout.format) << ", " << layout.size.width << " x "
+  ASSERT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {cx, cy})),
+            std::visit(NaivePictureOf{file, layout, {cx, cy}}, layout.type.tag))
+      << layout.type.bits << " bits (" << layout.type.tag.index() << "), " << layout.size.width << " x "
       << layout.size.height << " asked at " << cx << " x " << cy << ", strides " << layout.pixelStride
       << " and " << layout.rowStride;
   EXPECT_TRUE(stream.good());
@@ -130,8 +142,8 @@ TEST(FrameReader, EqualsTheNaivePictureOverRandomLayouts) {
   Random random(1);
   for (int round = 0; round < 1500; ++round) {
     const Size2 size{random.Between(1, 90), random.Between(1, 90)};
-    const PixelFormat format = kFormats[random.Between(0, static_cast<int>(std::size(kFormats)) - 1)];
-    const FrameLayout layout = RandomLayout(random, format, size, random.OneIn(4));
+    const PixelType& type = kTypes[random.Between(0, static_cast<int>(std::size(kTypes)) - 1)];
+    const FrameLayout layout = RandomLayout(random, type, size, random.OneIn(4));
     CompareWithTheNaivePicture(random, layout, random.Between(1, size.width), random.Between(1, 100));
     if (HasFatalFailure()) return;
   }
@@ -142,8 +154,8 @@ TEST(FrameReader, EqualsTheNaivePictureForFramesLargerThanTheBand) {
   const Size2 shapes[] = {{700, 300}, {300, 700},  {90000, 4}, {200000, 2},
                           {4, 90000}, {2, 200000}, {512, 512}};
   for (const Size2& size : shapes) {
-    for (const PixelFormat format : kFormats) {
-      const FrameLayout layout = RandomLayout(random, format, size, random.OneIn(2));
+    for (const PixelType& type : kTypes) {
+      const FrameLayout layout = RandomLayout(random, type, size, random.OneIn(2));
       const int f = std::max(1, std::min(size.width, size.height) / random.Between(1, 3));
       CompareWithTheNaivePicture(random, layout, std::max(1, size.width / f), std::max(1, size.height / f));
       if (HasFatalFailure()) return;
@@ -154,10 +166,9 @@ TEST(FrameReader, EqualsTheNaivePictureForFramesLargerThanTheBand) {
 TEST(FrameReader, BlockRowsLargerThanTheBandAreSummedFromTheTop) {
   // 2000 floats a row and a factor of 100: a row of blocks has 800,000 bytes.
   Random random(3);
-  for (const PixelFormat format :
-       {PixelFormat::kFloat32, PixelFormat::kInt32, PixelFormat::kComplexFloat32}) {
+  for (const PixelType& type : {kFloat32, kInt32, kComplexFloat32}) {
     for (const bool bottomUp : {false, true}) {
-      FrameLayout layout = PackedLayout(format, {2000, 201}, 17);
+      FrameLayout layout = PackedLayout(type, {2000, 201}, 17);
       if (bottomUp) layout = FlippedVertically(layout);
       CompareWithTheNaivePicture(random, layout, 20, 2);
       if (HasFatalFailure()) return;
@@ -169,7 +180,7 @@ TEST(FrameReader, ReadsEachByteOfTheWholeBlocksOnce) {
   const std::string file(2'000'000, '\1');
   MemoryBuffer buffer(file);
   std::istream stream(&buffer);
-  const FrameLayout layout = FlippedVertically(PackedLayout(PixelFormat::kInt16, {1000, 999}, 100));
+  const FrameLayout layout = FlippedVertically(PackedLayout(kInt16, {1000, 999}, 100));
   EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {100, 100})).height, 99);
   EXPECT_EQ(buffer.bytesRead, 1000 * 990 * 2);
   EXPECT_LE(buffer.largestRead, 256 * 1024);
@@ -180,26 +191,26 @@ TEST(FrameReader, ReadsColumnsOnceWhenRowsLieAcrossTheFile) {
   const std::string file(2'000'000, '\1');
   MemoryBuffer buffer(file);
   std::istream stream(&buffer);
-  FrameLayout layout = PackedLayout(PixelFormat::kInt16, {1000, 1000}, 0);
+  FrameLayout layout = PackedLayout(kInt16, {1000, 1000}, 0);
   std::swap(layout.pixelStride, layout.rowStride);
   EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {100, 100})).width, 100);
   EXPECT_EQ(buffer.bytesRead, 2'000'000);
 }
 
 /// Pixels as far apart as from row to row, so that neither rows nor columns lie together.
-FrameLayout InterleavedLayout(PixelFormat format, std::int32_t edge, std::int64_t stride) {
-  return {.format = format,
+FrameLayout InterleavedLayout(const PixelType& type, std::int32_t edge, std::int64_t stride) {
+  return {.type = type,
           .size = {edge, edge},
           .blockPosition = 10,
-          .blockBytes = 2 * (edge - 1) * stride + BytesPerPixel(format),
+          .blockBytes = 2 * (edge - 1) * stride + type.bytes(),
           .pixelStride = stride,
           .rowStride = stride};
 }
 
 TEST(FrameReader, ReadsInterleavedRowsAndColumnsAtOnce) {
   Random random(4);
-  for (const PixelFormat format : {PixelFormat::kUInt8, PixelFormat::kFloat32, PixelFormat::kRgb24}) {
-    FrameLayout layout = InterleavedLayout(format, 300, 2000);
+  for (const PixelType& type : {kUInt8, kFloat32, kRgb24}) {
+    FrameLayout layout = InterleavedLayout(type, 300, 2000);
     CompareWithTheNaivePicture(random, layout, 30, 30);
     layout.firstPixel = (300 - 1) * layout.rowStride;
     layout.rowStride = -layout.rowStride;
@@ -216,7 +227,7 @@ TEST(FrameReader, ReadsInterleavedRowsAndColumnsAtOnce) {
 }
 
 TEST(FrameReader, RefusesInterleavedRowsAndColumnsOfALargeBlock) {
-  const FrameLayout layout = InterleavedLayout(PixelFormat::kUInt8, 3000, 3000);
+  const FrameLayout layout = InterleavedLayout(kUInt8, 3000, 3000);
   ASSERT_GT(layout.blockBytes, 16 * 1024 * 1024);
   const std::string file(static_cast<std::size_t>(layout.blockPosition + layout.blockBytes), '\1');
   MemoryBuffer buffer(file);
@@ -227,7 +238,7 @@ TEST(FrameReader, RefusesInterleavedRowsAndColumnsOfALargeBlock) {
 }
 
 TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
-  const FrameLayout layout = PackedLayout(PixelFormat::kFloat32, {600, 600}, 0);
+  const FrameLayout layout = PackedLayout(kFloat32, {600, 600}, 0);
   const std::string file(std::size_t{600} * 600 * 4, '\0');
   std::int64_t reads = 0;
   {
@@ -248,7 +259,7 @@ TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
 
 TEST(FrameReader, ABlockThatIsNotWholeIsRefusedBeforeAnyRead) {
   // The last row would be dropped by the reduction, and is wanted all the same.
-  const FrameLayout layout = PackedLayout(PixelFormat::kUInt8, {100, 101}, 10);
+  const FrameLayout layout = PackedLayout(kUInt8, {100, 101}, 10);
   for (const std::size_t size : {0u, 9u, 10u, 10u + 100u * 100u, 10u + 100u * 101u - 1u}) {
     const std::string file(size, '\0');
     MemoryBuffer buffer(file);
@@ -263,17 +274,23 @@ TEST(FrameReader, ABlockThatIsNotWholeIsRefusedBeforeAnyRead) {
 
 TEST(FrameReader, AFrameWithoutPixelsHasNoBitmap) {
   std::istringstream stream(std::string(1000, '\0'));
-  for (const PixelFormat format : {PixelFormat::kUInt8, PixelFormat::kRgb24}) {
+  for (const PixelType& type : {kUInt8, kRgb24}) {
     for (const Size2& size : {Size2{0, 0}, Size2{0, 5}, Size2{5, 0}, Size2{-5, -5}, Size2{-300, 300}}) {
-      EXPECT_EQ(ReadThumbnail(stream, PackedLayout(format, size, 0), {96, 96}), nullptr);
+      EXPECT_EQ(ReadThumbnail(stream, PackedLayout(type, size, 0), {96, 96}), nullptr);
     }
   }
   EXPECT_TRUE(stream.good());
 }
 
+TEST(FrameReader, AFrameOfUnknownPixelsHasNoBitmap) {
+  std::istringstream stream(std::string(1000, '\0'));
+  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelTypeOf(DataType{3}), {5, 5}, 0), {96, 96}), nullptr);
+  EXPECT_TRUE(stream.good());
+}
+
 TEST(FrameReader, APixelOutsideOfTheBlockHasNoBitmap) {
   std::istringstream stream(std::string(1000, '\0'));
-  const FrameLayout packed = PackedLayout(PixelFormat::kUInt16, {4, 4}, 100);
+  const FrameLayout packed = PackedLayout(kUInt16, {4, 4}, 100);
   ASSERT_NE(TakeBitmap(ReadThumbnail(stream, packed, {8, 8})).width, 0);
   const auto refused = [&stream](const FrameLayout& layout) {
     return ReadThumbnail(stream, layout, {8, 8}) == nullptr;
@@ -293,18 +310,18 @@ TEST(FrameReader, APixelOutsideOfTheBlockHasNoBitmap) {
   layout.blockBytes = 31;
   EXPECT_TRUE(refused(layout));
   // 65536 * 65536 pixels wrap to none.
-  EXPECT_TRUE(refused(PackedLayout(PixelFormat::kUInt8, {65536, 65536}, 0)));
+  EXPECT_TRUE(refused(PackedLayout(kUInt8, {65536, 65536}, 0)));
 }
 
 TEST(FrameReader, ANegativePositionFailsTheStream) {
   std::istringstream stream(std::string(1000, '\0'));
-  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelFormat::kUInt8, {4, 4}, -1), {8, 8}), nullptr);
+  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(kUInt8, {4, 4}, -1), {8, 8}), nullptr);
   EXPECT_TRUE(stream.fail());
 }
 
 TEST(FrameReader, PixelsThatShareTheirBytesAreReadUpToALimit) {
   std::istringstream stream(std::string(16, '\3'));
-  FrameLayout layout{.format = PixelFormat::kUInt16, .size = {256, 256}, .blockPosition = 0, .blockBytes = 2};
+  FrameLayout layout{.type = kUInt16, .size = {256, 256}, .blockPosition = 0, .blockBytes = 2};
   EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {128, 128})).width, 128);
   layout.size.width = 257;
   EXPECT_EQ(ReadThumbnail(stream, layout, {128, 128}), nullptr);
@@ -313,7 +330,7 @@ TEST(FrameReader, PixelsThatShareTheirBytesAreReadUpToALimit) {
 TEST(FrameReader, AFailedStreamGivesNoBitmap) {
   std::istringstream stream(std::string(1000, '\0'));
   stream.setstate(std::ios_base::failbit);
-  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelFormat::kUInt8, {4, 4}, 0), {8, 8}), nullptr);
+  EXPECT_EQ(ReadThumbnail(stream, PackedLayout(kUInt8, {4, 4}, 0), {8, 8}), nullptr);
 }
 
 }  // namespace

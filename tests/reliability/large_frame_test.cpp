@@ -6,6 +6,7 @@
 
 #include "allocation_meter.h"
 #include "bitmap_pixels.h"
+#include "data_type.h"
 #include "file_type_factory.h"
 #include "frame_reader.h"
 #include "memory_buffer.h"
@@ -37,9 +38,9 @@ TEST(LargeFrame, ThumbnailTakesMemoryForABandAndNotForTheFrame) {
             kMost);
 }
 
-/// A pixel format, and the bytes of the average of a block.
+/// A pixel type, and the bytes of the average of a block.
 struct Case {
-  PixelFormat format;
+  PixelType type;
   std::int64_t averageBytes;
 };
 
@@ -49,7 +50,7 @@ TEST_P(ThumbnailMemory, IsTheBandAndTheAveragesWithTheBitmapAmongThem) {
   constexpr std::int64_t kBandBytes = 256 * 1024;
   constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and of complex pixels in batches
   constexpr std::int32_t kSide = 600;
-  const FrameLayout layout = PackedLayout(GetParam().format, {2 * kSide, 2 * kSide}, 0);
+  const FrameLayout layout = PackedLayout(GetParam().type, {2 * kSide, 2 * kSide}, 0);
   const std::string file(static_cast<std::size_t>(layout.blockBytes), '\1');
   Testing::MemoryBuffer buffer(file);
   std::istream stream(&buffer);
@@ -60,12 +61,13 @@ TEST_P(ThumbnailMemory, IsTheBandAndTheAveragesWithTheBitmapAmongThem) {
   EXPECT_LE(peak, kSide * kSide * GetParam().averageBytes + kBandBytes + kSumsAndObjects);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, ThumbnailMemory,
-                         testing::Values(Case{PixelFormat::kUInt8, 1}, Case{PixelFormat::kInt16, 2},
-                                         Case{PixelFormat::kUInt32, 4}, Case{PixelFormat::kFloat32, 4},
-                                         Case{PixelFormat::kFloat64, 8}, Case{PixelFormat::kComplexInt16, 4},
-                                         Case{PixelFormat::kComplexFloat64, 4},
-                                         Case{PixelFormat::kRgb24, 3}));
+INSTANTIATE_TEST_SUITE_P(
+    All, ThumbnailMemory,
+    testing::Values(Case{PixelTypeOf(DataType::kUInt8), 1}, Case{PixelTypeOf(DataType::kInt16), 2},
+                    Case{PixelTypeOf(DataType::kUInt32), 4}, Case{PixelTypeOf(DataType::kFloat32), 4},
+                    Case{PixelTypeOf(DataType::kFloat64), 8},
+                    Case{PixelType::Of<ComplexPixel<std::int16_t>>(L"complex int16"), 4},
+                    Case{PixelTypeOf(DataType::kComplexFloat64), 4}, Case{PixelTypeOf(DataType::kRgb24), 3}));
 
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt

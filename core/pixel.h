@@ -1,4 +1,4 @@
-// The ways in which a pixel can be stored in a frame, and their C++ types.
+// C++ types of pixels that are more than one number, laid out as a file stores them.
 #pragma once
 
 #include <cstdint>
@@ -20,25 +20,7 @@ struct ColourPixel {
   std::uint8_t channel[3];
 };
 
-using BitmapPixel = ColourPixel<ColourOrder::kBlueFirst>;
-
-enum class PixelFormat {
-  kUInt8,
-  kUInt16,
-  kUInt32,
-  kInt8,
-  kInt16,
-  kInt32,
-  kFloat32,
-  kFloat64,
-  kComplexInt16,
-  kComplexFloat32,
-  kComplexFloat64,
-  kRgb24,
-  kBgr24,
-};
-
-/// Bytes of one pixel in the file.
-std::int32_t BytesPerPixel(PixelFormat format);
+using RgbPixel = ColourPixel<ColourOrder::kRedFirst>;
+using BgrPixel = ColourPixel<ColourOrder::kBlueFirst>;
 
 }  // namespace Qel::Lumetra::ShellExt
