@@ -11,6 +11,7 @@ Every way reads the pixels where they lie in the file, and makes the values of a
 import ctypes
 import sys
 import time
+from ctypes.util import find_library
 
 import mrcfile
 import numpy
@@ -104,7 +105,7 @@ class Magick:
     """ImageMagick through its C interface."""
 
     def __init__(self):
-        self._wand = ctypes.CDLL("libMagickWand-6.Q16.so.6")
+        self._wand = ctypes.CDLL(find_library("MagickWand-7.Q16") or find_library("MagickWand-6.Q16"))
         self._wand.NewMagickWand.restype = ctypes.c_void_p
         self._wand.MagickWandGenesis()
 

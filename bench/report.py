@@ -72,8 +72,8 @@ def machine():
         "Wine": _first_line("wine", "--version"),
         "numpy": _package("python3-numpy"),
         "mrcfile": _package("python3-mrcfile"),
-        "libvips": _package("libvips42"),
-        "ImageMagick": _package("libmagickwand-6.q16-6"),
+        "libvips": _package("libvips-tools"),
+        "ImageMagick": _package("imagemagick"),
         "load at the start": f"{os.getloadavg()[0]:.1f}",
     }
 

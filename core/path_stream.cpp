@@ -4,6 +4,7 @@
 #include <io.h>
 #include <windows.h>
 
+#include <cstdint>
 #include <ext/stdio_filebuf.h>
 
 namespace Qel::Lumetra::ShellExt {
