@@ -7,14 +7,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Ids of the module's string table (string_table.inc).
-enum StringId : std::uint32_t {
-#define QEL_STRING(name, id, text) name = (id),
-#include "string_table.inc"
-#undef QEL_STRING
-};
-
-/// The text of the module's string table, cut at 255 characters; empty for an id that it does not hold.
+/// Returns a text of the module's string table, cut at 255 characters; empty for an id that is not in the
+/// table. The ids that this code uses are in string_ids.h.
 std::wstring LoadResourceString(std::uint32_t id);
 
 /// Widens byte by byte with sign extension to 16 bits: 0x00..0x7F stay, 0x80..0xFF become U+FF80..U+FFFF.

@@ -1,12 +1,9 @@
-// Files and the string table, on POSIX.
+// Files, on POSIX.
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <windows.h>
 
-#include <algorithm>
-#include <cstring>
-#include <cwchar>
 #include <string>
 
 #include "io.h"
@@ -15,23 +12,9 @@ extern "C" {
 IMAGE_DOS_HEADER __ImageBase{};
 }
 
-int LoadStringW(HINSTANCE, UINT id, wchar_t* buffer, int size) {
-  struct Entry {
-    UINT id;
-    const wchar_t* text;
-  };
-  static constexpr Entry kTable[] = {
-#define QEL_STRING(name, id, text) {id, L##text},
-#include "string_table.inc"
-#undef QEL_STRING
-  };
-  const auto* const entry = std::find_if(std::begin(kTable), std::end(kTable),
-                                         [id](const Entry& candidate) { return candidate.id == id; });
-  if (entry == std::end(kTable) || size <= 0) return 0;
-  const std::size_t length = std::min(std::wcslen(entry->text), static_cast<std::size_t>(size) - 1);
-  std::wmemcpy(buffer, entry->text, length);
-  buffer[length] = L'\0';
-  return static_cast<int>(length);
+// Native programs carry no resources.
+int LoadStringW(HINSTANCE, UINT, wchar_t*, int) {
+  return 0;
 }
 
 namespace {

@@ -204,7 +204,7 @@ def make_packages(build, out, epoch):
         for text in TEXTS:
             # For editors that know no other line ends.
             (content / text).write_bytes((HERE / text).read_bytes().replace(b"\n", b"\r\n"))
-        make_msi(content, build / "server" / "registry", project, epoch, packages[0])
+        make_msi(content, build / "registration" / "scripts", project, epoch, packages[0])
         signing.sign(packages[0])
         make_zip(packages[1], [content / name for name in (*PROGRAMS, *TEXTS)], epoch)
         make_zip(packages[2], [build / f"{program}.debug" for program in PROGRAMS], epoch)

@@ -1,6 +1,6 @@
-"""What DllRegisterServer writes, read from the same scripts (server/registry), for the installer package.
+"""What DllRegisterServer writes, read from the same scripts (registration/scripts), for the installer package.
 
-The language of the scripts is told in server/registry_script.h. The scripts are the project's own and have passed its
+The language of the scripts is told in registration/registry_script.h. The scripts are the project's own and have passed its
 tests, so a text that is none is not explained here, it only fails.
 """
 

@@ -3,8 +3,8 @@
 #include <array>
 
 #include "class_ids.h"
+#include "property_store.h"
 #include "shell_ext.h"
-#include "shell_ext_vista.h"
 
 namespace Qel::Lumetra::ShellExt {
 

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
 #include <cwchar>
 #include <fstream>
 #include <iterator>
@@ -12,6 +13,7 @@
 #include "file_type_factory.h"
 #include "metadata.h"
 #include "path_stream.h"
+#include "string_ids.h"
 #include "text.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -23,7 +25,7 @@ struct Column {
   VARTYPE declaredType;
   UINT width;  // in characters
   DWORD state;
-  StringId title;
+  std::uint32_t title;
 };
 
 constexpr DWORD kText = SHCOLSTATE_TYPE_STR;
@@ -32,12 +34,12 @@ constexpr DWORD kShownText = SHCOLSTATE_TYPE_STR | SHCOLSTATE_ONBYDEFAULT;
 
 /// In the order of kListedProperties.
 constexpr std::array<Column, kListedProperties.size()> kColumns{{
-    {VT_I4, 5, kHiddenText, kWidthTitle},
-    {VT_I4, 5, kHiddenText, kHeightTitle},
-    {VT_UI4, 5, kText, kBitDepthTitle},
-    {VT_UI4, 5, kText, kFrameCountTitle},
-    {VT_LPWSTR, 20, kShownText, kDimensionsLabel},
-    {VT_LPWSTR, 30, kShownText, kCommentsTitle},
+    {VT_I4, 5, kHiddenText, IDS_WIDTH},
+    {VT_I4, 5, kHiddenText, IDS_HEIGHT},
+    {VT_UI4, 5, kText, IDS_BIT_DEPTH},
+    {VT_UI4, 5, kText, IDS_FRAME_COUNT},
+    {VT_LPWSTR, 20, kShownText, IDS_DIMENSIONS},
+    {VT_LPWSTR, 30, kShownText, IDS_COMMENTS},
 }};
 
 std::wstring PathOf(const SHCOLUMNDATA& item) {

@@ -9,6 +9,7 @@
 
 #include "com_ptr.h"
 #include "metadata.h"
+#include "string_ids.h"
 #include "text.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -16,7 +17,7 @@ namespace {
 
 constexpr int kTextRoom = 256;  // wide characters of a date and time or of a size
 
-std::wstring Label(StringId id) {
+std::wstring Label(std::uint32_t id) {
   return LoadResourceString(id) + L": ";
 }
 
@@ -45,19 +46,19 @@ std::wstring FileLines(const std::wstring& path) {
   if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &attributes)) return {};
   std::wstring lines;
   if (const std::wstring time = LocalTime(attributes.ftLastWriteTime); !time.empty()) {
-    lines += L"\r\n" + Label(kDateModifiedLabel) + time;
+    lines += L"\r\n" + Label(IDS_DATE_MODIFIED) + time;
   }
   // The size is shown modulo 4 GiB: its high half is left out, and that is meant to stay so.
   std::array<wchar_t, kTextRoom> size{};
   if (StrFormatByteSizeW(std::int64_t{attributes.nFileSizeLow}, size.data(), kTextRoom) != nullptr) {
-    lines += L"\r\n" + Label(kSizeLabel) + size.data();
+    lines += L"\r\n" + Label(IDS_SIZE) + size.data();
   }
   return lines;
 }
 
 std::wstring TipText(const FileTypeInfo& file, const std::wstring& path) {
-  std::wstring text = Label(kDimensionsLabel) + TipDimensions(file);
-  text += L"\r\n" + Label(kTypeLabel) + file.GetTypeDescription();
+  std::wstring text = Label(IDS_DIMENSIONS) + TipDimensions(file);
+  text += L"\r\n" + Label(IDS_TYPE) + file.GetTypeDescription();
   text += FileLines(path);
   if (const std::wstring comment = file.GetComment(); !comment.empty()) text += L"\r\n" + comment;
   return text;

@@ -2,6 +2,7 @@
 
 #include <shlwapi.h>
 
+#include "string_ids.h"
 #include "text.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -92,7 +93,7 @@ std::optional<Metadatum> FindMetadatum(View view, const FileTypeInfo& file, cons
 std::wstring TipDimensions(const FileTypeInfo& file) {
   const std::int32_t frames = file.GetFrameCount();
   std::wstring text;
-  if (frames > 1) text = std::to_wstring(frames) + L" " + LoadResourceString(kImagesWord) + L" ";
+  if (frames > 1) text = std::to_wstring(frames) + L" " + LoadResourceString(IDS_IMAGES) + L" ";
   // The tip is read by people only, hence the multiplication sign and not the letter of the properties.
   return text + L"(" + Join(file.GetDimensions(), L" \u00D7 ") + L") " + file.GetDataTypeName();
 }

@@ -1,7 +1,7 @@
 // How a metadatum of an image file becomes what the shell shows: the one place that knows.
 //
 // The shell asks in four ways: the info tip (info_tip.h), the columns of its Details view (columns.h), the
-// property sets (property_sets.h) and the property stores (shell_ext_vista.h). They give the same facts in
+// property sets (property_sets.h) and the property stores (property_store.h). They give the same facts in
 // different forms, on purpose; metadata.cpp shows the differences side by side, with the reason of each.
 #pragma once
 

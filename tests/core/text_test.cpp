@@ -7,28 +7,6 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-TEST(LoadResourceString, AnswersWhatTheTableHolds) {
-  EXPECT_EQ(LoadResourceString(100), L"QelShellExt");
-  EXPECT_EQ(LoadResourceString(200), L"Dimensions");
-  EXPECT_EQ(LoadResourceString(201), L"Size");
-  EXPECT_EQ(LoadResourceString(202), L"Type");
-  EXPECT_EQ(LoadResourceString(203), L"images");
-  EXPECT_EQ(LoadResourceString(204), L"Date Modified");
-  EXPECT_EQ(LoadResourceString(205), L"Comments");
-  EXPECT_EQ(LoadResourceString(206), L"Width");
-  EXPECT_EQ(LoadResourceString(207), L"Height");
-  EXPECT_EQ(LoadResourceString(208), L"Frame Count");
-  EXPECT_EQ(LoadResourceString(209), L"Bit Depth");
-}
-
-TEST(LoadResourceString, IsEmptyForAllOtherIds) {
-  for (std::uint32_t id = 0; id < 1000; ++id) {
-    if (id == 100 || (id >= 200 && id <= 209)) continue;
-    EXPECT_EQ(LoadResourceString(id), L"") << id;
-  }
-  EXPECT_EQ(LoadResourceString(0xFFFFFFFF), L"");
-}
-
 TEST(WidenComment, KeepsTheLowerHalfOfTheBytes) {
   for (int byte = 0; byte < 0x80; ++byte) {
     EXPECT_EQ(WidenComment(std::string(1, static_cast<char>(byte))),

@@ -49,7 +49,7 @@ def copy_build(folder):
     folder.mkdir()
     for name in ("CMakeCache.txt", *PROGRAMS, *(f"{program}.debug" for program in PROGRAMS)):
         shutil.copyfile(BUILD / name, folder / name)
-    shutil.copytree(BUILD / "server" / "registry", folder / "server" / "registry",
+    shutil.copytree(BUILD / "registration" / "scripts", folder / "registration" / "scripts",
                     ignore=lambda _, names: [name for name in names if not name.endswith(".rgs")])
     return folder
 
@@ -121,7 +121,7 @@ class Contents(Test):
         def ninja(*arguments):
             return subprocess.run(["ninja", "-C", BUILD, "-t", *arguments], check=True, capture_output=True,
                                   text=True).stdout
-        targets = re.findall(r"(?m)^((?:server|tools)/.+\.rc\.obj): ", ninja("targets", "all"))
+        targets = re.findall(r"(?m)^((?:registration|server|tools)/.+\.rc\.obj): ", ninja("targets", "all"))
         self.assertEqual(len(targets), 4)
         for target in targets:
             inputs = ninja("query", target)

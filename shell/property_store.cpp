@@ -1,4 +1,4 @@
-#include "shell_ext_vista.h"
+#include "property_store.h"
 
 #include <cstddef>
 #include <cstring>
