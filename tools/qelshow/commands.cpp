@@ -9,6 +9,7 @@
 #include "failure.h"
 #include "file_inspection.h"
 #include "file_list.h"
+#include "json_records.h"
 #include "page_writer.h"
 #include "reports.h"
 #include "text_tools.h"
@@ -47,7 +48,7 @@ int RunInfo(const CommandLine& line) {
     const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
     progress.Hide();
     if (line.json) {
-      PrintUtf8((count > 0 ? ",\n" : "\n") + JsonReport(facts, {}));
+      PrintUtf8((count > 0 ? ",\n" : "\n") + Json(facts).dump());
     } else {
       Print((count > 0 ? L"\n" : L"") + TextReport(facts));
     }
@@ -64,7 +65,7 @@ int RunThumbnail(const CommandLine& line) {
   const std::wstring& path = line.files.front();
   const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
   PrintProblem(facts);
-  const auto& png = facts.thumbnail.png;
+  const auto& png = facts.png;
   if (png.empty()) return ExitStatus(facts.verdict);
   if (line.out != L"-") {
     WriteFileAt(line.out, png.data(), png.size());
@@ -91,7 +92,7 @@ int RunPage(const CommandLine& line) {
     progress.Show(count++, file.name);
     const FileFacts facts = InspectFile(worker, file.path, file.name, line.size);
     page.Add(facts);
-    if (!facts.thumbnail.png.empty()) ++pictures;
+    if (!facts.png.empty()) ++pictures;
     progress.Hide();
     Print(TableRow(facts, nameWidth));
   }

@@ -10,12 +10,32 @@
 #include "failure.h"
 #include "file_inspection.h"
 #include "installation.h"
-#include "json.h"
-#include "reports.h"
+#include "json_records.h"
 #include "text_tools.h"
 #include "worker.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
+
+static void to_json(Json& json, const ExaminedClass& examined) {
+  json = {{"name", examined.name},
+          {"class", GuidText(examined.clsid)},
+          {"dll", examined.registered.dll},
+          {"version", examined.version},
+          {"condition", ConditionText(examined.condition)},
+          {"problem", examined.problem}};
+}
+
+static void to_json(Json& json, const ExaminedHandler& examined) {
+  json = {{"role", examined.registered.role},
+          {"key", examined.registered.key},
+          {"class", examined.registered.registered},
+          {"condition", ConditionText(examined.condition)}};
+}
+
+static void to_json(Json& json, const ExaminedKind& kind) {
+  json = {{"extension", kind.extension}, {"handlers", kind.handlers}, {"leftOut", kind.leftOut}};
+}
+
 namespace {
 
 /// Has the registered extension read the files. Where it cannot be had, that is every file's problem.
@@ -60,43 +80,12 @@ bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& f
   return found;
 }
 
-std::string ClassJson(const ExaminedClass& examined) {
-  return JsonObject()
-      .Text("name", examined.name)
-      .Text("class", GuidText(examined.clsid))
-      .TextOrNull("dll", examined.registered.dll)
-      .TextOrNull("version", examined.version)
-      .Text("condition", ConditionText(examined.condition))
-      .TextOrNull("problem", examined.problem)
-      .Take();
-}
-
-std::string HandlerJson(const ExaminedHandler& examined) {
-  return JsonObject()
-      .Text("role", examined.registered.role)
-      .Text("key", examined.registered.key)
-      .TextOrNull("class", examined.registered.registered)
-      .Text("condition", ConditionText(examined.condition))
-      .Take();
-}
-
-std::string KindJson(const ExaminedKind& kind) {
-  return JsonObject()
-      .Text("extension", kind.extension)
-      .Json("handlers", JsonArray(kind.handlers, HandlerJson))
-      .TextOrNull("leftOut", kind.leftOut)
-      .Take();
-}
-
-std::string Json(const Installation& installation, const std::vector<FileFacts>& files) {
-  return JsonObject()
-             .Number("schema", kJsonSchema)
-             .Json("classes", JsonArray(installation.classes, ClassJson))
-             .Json("kinds", JsonArray(installation.kinds, KindJson))
-             .Json("problems", JsonArray(installation.problems, JsonString))
-             .Json("files", JsonArray(files, [](const FileFacts& facts) { return JsonReport(facts, {}); }))
-             .Take() +
-         "\n";
+Json Document(const Installation& installation, const std::vector<FileFacts>& files) {
+  return {{"schema", kJsonSchema},
+          {"classes", installation.classes},
+          {"kinds", installation.kinds},
+          {"problems", installation.problems},
+          {"files", files}};
 }
 
 std::wstring ClassesText(const std::vector<ExaminedClass>& classes) {
@@ -154,7 +143,7 @@ int RunDoctor(const CommandLine& line) {
   std::vector<FileFacts> files = ExamineFiles(line);
   const bool isAnyLeftOut = RemarkOnLeftOut(installation, files);
   if (line.json) {
-    PrintUtf8(Json(installation, files));
+    PrintUtf8(Document(installation, files).dump() + "\n");
   } else {
     Print(Text(installation, files));
   }

@@ -1,12 +1,21 @@
-// Everything that a shell learns about one file from the extension, as plain data: made by the worker process
-// that asks (shell_requests.h), carried to the parent process (message.h), shown by the reports.
+// Everything that a shell learns about one file from the extension, as plain data: collected by the worker
+// process (shell_requests.h), sent to the parent process (json_records.h), shown by the reports.
 #pragma once
 
 #include <cstdint>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
+
+/// A text that may be missing, which is the empty text; null in JSON.
+struct OptionalText : std::wstring {
+  using std::wstring::wstring;
+  using std::wstring::operator=;
+  OptionalText() = default;
+  OptionalText(std::wstring text) : std::wstring(std::move(text)) {}
+};
 
 /// How a file is judged, in the order of severity. The values are the exit statuses of the program.
 enum class Verdict : std::int32_t {
@@ -22,17 +31,18 @@ struct Diagnosis {
   std::wstring sentence;  // empty for a good file
 };
 
-/// An answer that is a list. `problem` says in a sentence why there is none, and is empty otherwise.
+/// An answer that is a list. The `problem` of this and of other answers is a sentence that says why there is
+/// none.
 template <class Item>
 struct ListAnswer {
   std::vector<Item> items;
-  std::wstring problem;
+  OptionalText problem;
 };
 
 /// The tip, as the shell would show it.
 struct TipAnswer {
-  std::wstring text;
-  std::wstring problem;
+  OptionalText text;
+  OptionalText problem;
 };
 
 /// A column of the Details view. Types are names such as "VT_I4".
@@ -43,28 +53,33 @@ struct Column {
   std::uint32_t id = 0;
   std::uint32_t characters = 0;  // default width
   std::uint32_t state = 0;       // SHCOLSTATE flags
-  std::wstring declaredType;
-  std::wstring deliveredType;
+  std::wstring declared;
+  OptionalText delivered;
   std::wstring value;
-  std::wstring problem;  // why nothing was delivered
+  OptionalText problem;
 };
 
 struct Property {
-  std::wstring name;  // canonical name, or a plain word where there is none
+  OptionalText name;  // canonical name, or a plain word where there is none
   std::wstring set;   // format id
   std::uint32_t id = 0;
-  std::wstring type;
+  OptionalText type;
   std::wstring value;
-  std::wstring problem;  // why nothing was delivered
+  OptionalText problem;
 };
 
 struct Thumbnail {
   std::int32_t request = 0;  // both sides of the square that was asked for
   std::int32_t width = 0;
   std::int32_t height = 0;
-  std::int32_t bits = 0;  // of one pixel
+  std::int32_t bitsPerPixel = 0;
+  OptionalText picture;  // where it was written, relative to the document
+  OptionalText problem;
+};
+
+struct ThumbnailAnswer {
+  Thumbnail thumbnail;
   std::vector<std::uint8_t> png;
-  std::wstring problem;  // why there is no picture
 };
 
 struct FileFacts {
@@ -73,17 +88,18 @@ struct FileFacts {
   std::wstring kind;  // the extension in small letters
   std::uint64_t bytes = 0;
   Verdict verdict = Verdict::kGood;
-  std::wstring problem;  // one sentence for everything but a good file
-  std::wstring remark;   // one sentence worth knowing about a file, good or not
+  OptionalText problem;  // one sentence for everything but a good file
+  OptionalText remark;   // one sentence worth knowing about a file, good or not
 
   // What the columns and the tip say; 0 or empty when they say nothing.
   std::int32_t width = 0;
   std::int32_t height = 0;
   std::int32_t frames = 0;
   std::int32_t bitDepth = 0;
-  std::wstring type;
+  OptionalText type;
 
   Thumbnail thumbnail;
+  std::vector<std::uint8_t> png;  // of the thumbnail; not in the document
   TipAnswer tip;
   ListAnswer<Column> columns;
   ListAnswer<Property> propertySets;

@@ -33,7 +33,7 @@ void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar
 /// The number that a column delivered; 0 without one.
 std::int32_t Number(const ListAnswer<Column>& columns, std::uint32_t id) {
   for (const Column& column : columns.items) {
-    if (column.id == id && column.deliveredType == L"VT_I4") {
+    if (column.id == id && column.delivered == L"VT_I4") {
       return static_cast<std::int32_t>(std::wcstol(column.value.c_str(), nullptr, 10));
     }
   }
@@ -51,17 +51,20 @@ std::wstring PixelType(const std::wstring& tip) {
 /// Requests the thumbnail. A colour picture smaller than the request ends the process; then a thumbnail of
 /// the frame's own size is requested, with a remark.
 void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
-  const auto end = worker.Ask({Subject::kThumbnail, path, size}, facts.thumbnail);
+  ThumbnailAnswer answer;
+  const auto end = worker.Ask({Subject::kThumbnail, path, size}, answer);
+  facts.thumbnail = std::move(answer.thumbnail);
   facts.thumbnail.request = size;
+  facts.png = std::move(answer.png);
   if (!end) return;
   const std::wstring fault = L"Asked for a thumbnail of " + Square(size) +
                              L" pixels, the extension ends its process with " + ProcessEndText(*end);
   const std::int32_t ownSize = std::max(facts.width, facts.height);
   facts.thumbnail.problem = fault + L".";
   if (ownSize < 1 || ownSize >= size) return;
-  Thumbnail smaller;
-  if (worker.Ask({Subject::kThumbnail, path, ownSize}, smaller) || smaller.png.empty()) return;
-  facts.thumbnail = std::move(smaller);
+  if (worker.Ask({Subject::kThumbnail, path, ownSize}, answer) || answer.png.empty()) return;
+  facts.thumbnail = std::move(answer.thumbnail);
+  facts.png = std::move(answer.png);
   facts.remark =
       fault + L"; the picture shown was asked for at " + Square(ownSize) + L", the frame's own size.";
 }
@@ -101,7 +104,7 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   FillThumbnail(worker, absolute, size, facts);
 
   // What the extension shows counts, whatever this program's readers think of the file.
-  if (!facts.thumbnail.png.empty()) {
+  if (!facts.png.empty()) {
     facts.verdict = Verdict::kGood;
     facts.problem.clear();
   } else if (facts.verdict == Verdict::kGood) {

@@ -198,7 +198,7 @@ std::vector<std::wstring> FindProblems(const Installation& installation) {
 
 }  // namespace
 
-const wchar_t* ConditionText(Condition condition) {
+std::wstring ConditionText(Condition condition) {
   switch (condition) {
     case Condition::kWorks: return L"works";
     case Condition::kNotRegistered: return L"not registered";
@@ -208,7 +208,7 @@ const wchar_t* ConditionText(Condition condition) {
     case Condition::kNoObject: return L"no object";
     case Condition::kBlocked: return L"disabled";
   }
-  return L"";
+  return {};
 }
 
 Installation ExamineInstallation() {

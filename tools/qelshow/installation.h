@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "file_facts.h"
 #include "registered_handlers.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -16,16 +17,16 @@ namespace Qel::Lumetra::ShellExt::Show {
 enum class Condition { kWorks, kNotRegistered, kForeign, kDllNotFound, kDllNotLoaded, kNoObject, kBlocked };
 
 /// A few words, for tables and JSON.
-const wchar_t* ConditionText(Condition condition);
+std::wstring ConditionText(Condition condition);
 
 /// One of the extension's classes.
 struct ExaminedClass {
   std::wstring name;  // what it does
   CLSID clsid{};
   RegisteredClass registered;
-  std::wstring version;  // of the DLL; empty if unknown
+  OptionalText version;  // of the DLL
   Condition condition = Condition::kWorks;
-  std::wstring problem;  // a sentence for the user; empty if it works
+  OptionalText problem;  // a sentence for the user
 };
 
 struct ExaminedHandler {
@@ -38,7 +39,7 @@ struct ExaminedKind {
   std::vector<ExaminedHandler> handlers;
   // A sentence for the user, if nothing at all of the extension is registered for this kind, as when it was
   // left to other programs at the installation. That is no problem.
-  std::wstring leftOut;
+  OptionalText leftOut;
 };
 
 struct Installation {

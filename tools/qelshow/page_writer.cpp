@@ -4,12 +4,14 @@
 
 #include "console.h"
 #include "failure.h"
+#include "json_records.h"
 #include "page_resource.h"
-#include "reports.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
+
+using Com::OwnedHandle;
 
 /// Where the JSON document stands in the template.
 constexpr std::string_view kPlaceOfFiles = "@FILES@";
@@ -22,6 +24,12 @@ template <class Error>
   throw Failure(L"\"" + path + L"\" cannot be written: " + SystemErrorText(error) + L".");
 }
 
+/// JSON that can stand in a script element of the page: without '<', which would be able to end the element.
+std::string InScript(std::string json) {
+  for (std::size_t i = 0; (i = json.find('<', i)) != std::string::npos;) json.replace(i, 1, "\\u003c");
+  return json;
+}
+
 std::string_view Template() {
   const HRSRC resource =
       FindResourceW(nullptr, MAKEINTRESOURCEW(IDR_PAGE), MAKEINTRESOURCEW(10));  // RT_RCDATA
@@ -30,10 +38,10 @@ std::string_view Template() {
 }
 
 OwnedHandle CreateFileAt(const std::wstring& path) {
-  const HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, FILE_SHARE_READ, nullptr, CREATE_ALWAYS,
-                                  FILE_ATTRIBUTE_NORMAL, nullptr);
-  if (file == INVALID_HANDLE_VALUE) CannotWrite(path, GetLastError());
-  return OwnedHandle(file);
+  OwnedHandle file(CreateFileW(path.c_str(), GENERIC_WRITE, FILE_SHARE_READ, nullptr, CREATE_ALWAYS,
+                               FILE_ATTRIBUTE_NORMAL, nullptr));
+  if (!file) CannotWrite(path, GetLastError());
+  return file;
 }
 
 void MakeFolder(const std::wstring& path) {
@@ -46,7 +54,7 @@ void MakeFolder(const std::wstring& path) {
 
 void WriteFileAt(const std::wstring& path, const void* bytes, std::size_t size) {
   const OwnedHandle file = CreateFileAt(path);
-  if (!WriteBytes(file.get(), bytes, size)) CannotWrite(path, GetLastError());
+  if (!WriteBytes(file.Get(), bytes, size)) CannotWrite(path, GetLastError());
 }
 
 PageWriter::PageWriter(const std::wstring& folder)
@@ -63,26 +71,27 @@ PageWriter::PageWriter(const std::wstring& folder)
 }
 
 void PageWriter::Add(const FileFacts& facts) {
-  std::wstring picture;
   ++count_;
-  if (!facts.thumbnail.png.empty()) {
-    picture = std::wstring(kPicturesFolder) + L"/" + std::to_wstring(count_) + L".png";
-    WriteFileAt(folder_ + L"\\" + picture, facts.thumbnail.png.data(), facts.thumbnail.png.size());
+  Json record = facts;
+  if (!facts.png.empty()) {
+    const std::wstring picture = std::wstring(kPicturesFolder) + L"/" + std::to_wstring(count_) + L".png";
+    WriteFileAt(folder_ + L"\\" + picture, facts.png.data(), facts.png.size());
+    record["thumbnail"]["picture"] = picture;
   }
-  Write((count_ > 1 ? ",\n" : "\n") + JsonReport(facts, picture));
+  Write((count_ > 1 ? ",\n" : "\n") + InScript(record.dump()));
 }
 
 void PageWriter::Finish() {
   Write("\n]}");
   Write(templateEnd_);
-  file_.reset();
+  file_.Reset();
   if (!MoveFileExW(unfinishedPath_.c_str(), path_.c_str(), MOVEFILE_REPLACE_EXISTING)) {
     CannotWrite(path_, GetLastError());
   }
 }
 
 void PageWriter::Write(std::string_view text) {
-  if (!WriteBytes(file_.get(), text.data(), text.size())) CannotWrite(unfinishedPath_, GetLastError());
+  if (!WriteBytes(file_.Get(), text.data(), text.size())) CannotWrite(unfinishedPath_, GetLastError());
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

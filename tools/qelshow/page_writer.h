@@ -11,8 +11,8 @@
 #include <string_view>
 
 #include "file_facts.h"
+#include "handle_owner.h"
 #include "text_tools.h"
-#include "worker.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 
@@ -35,7 +35,7 @@ class PageWriter {
   std::wstring folder_;
   std::wstring path_;
   std::wstring unfinishedPath_;
-  OwnedHandle file_;
+  Com::OwnedHandle file_;
   std::string_view templateEnd_;  // what follows the files
   std::size_t count_ = 0;
 };

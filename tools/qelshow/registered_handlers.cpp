@@ -5,6 +5,7 @@
 #include <iterator>
 
 #include "class_ids.h"
+#include "handle_owner.h"
 #include "shell_requests.h"
 #include "text_tools.h"
 
@@ -104,20 +105,19 @@ std::vector<KindOfFile> ReadHandlers() {
 
 RegisteredClass ReadClass(const std::wstring& clsid) {
   const std::wstring path = L"CLSID\\" + clsid;
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
-  RegCloseKey(key);
+  Com::OwnedKey key;
+  if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, key.Put()) != ERROR_SUCCESS) return {};
   return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32"),
           BlockingKey(clsid)};
 }
 
 std::wstring InstalledProduct() {
   const std::wstring uninstall = LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\Uninstall)";
-  std::wstring product;
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_LOCAL_MACHINE, uninstall.c_str(), 0, KEY_READ, &key) != ERROR_SUCCESS) return {};
+  Com::OwnedKey key;
+  if (RegOpenKeyExW(HKEY_LOCAL_MACHINE, uninstall.c_str(), 0, KEY_READ, key.Put()) != ERROR_SUCCESS)
+    return {};
   wchar_t name[kMaxKeyCharacters + 1];
-  for (DWORD i = 0; product.empty() && RegEnumKeyW(key, i, name, std::size(name)) == ERROR_SUCCESS; ++i) {
+  for (DWORD i = 0; RegEnumKeyW(key.Get(), i, name, std::size(name)) == ERROR_SUCCESS; ++i) {
     const std::wstring entry = uninstall + L"\\" + name;
     DWORD byInstaller = 0;
     DWORD bytes = sizeof(byInstaller);
@@ -125,11 +125,10 @@ std::wstring InstalledProduct() {
         RegGetValueW(HKEY_LOCAL_MACHINE, entry.c_str(), L"WindowsInstaller", RRF_RT_REG_DWORD, nullptr,
                      &byInstaller, &bytes) == ERROR_SUCCESS &&
         byInstaller != 0) {
-      product = name;
+      return name;
     }
   }
-  RegCloseKey(key);
-  return product;
+  return {};
 }
 
 std::wstring FileVersion(const std::wstring& path) {

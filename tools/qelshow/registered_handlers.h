@@ -7,13 +7,15 @@
 #include <string>
 #include <vector>
 
+#include "file_facts.h"
+
 namespace Qel::Lumetra::ShellExt::Show {
 
 /// One of the ways on which the shell comes from a kind of file to a class.
 struct Handler {
   std::wstring role;        // for instance "thumbnail"
   CLSID expected{};         // the extension's class for it
-  std::wstring registered;  // identifier of the class that the shell takes; empty without one
+  OptionalText registered;  // identifier of the class that the shell takes
   std::wstring key;         // where it is registered; where the extension's own is to be, without one
   bool isOwnKey = true;     // whether that is the key which registering the extension writes
 };
@@ -30,7 +32,7 @@ std::vector<KindOfFile> ReadHandlers();
 struct RegisteredClass {
   bool exists = false;
   std::wstring title;
-  std::wstring dll;      // path
+  OptionalText dll;      // path
   std::wstring blocked;  // the key, if any, that keeps the shell from using the class
 };
 

@@ -4,66 +4,13 @@
 #include <cwchar>
 #include <vector>
 
-#include "json.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-const char* VerdictName(Verdict verdict) {
-  switch (verdict) {
-    case Verdict::kGood: return "good";
-    case Verdict::kFailed: return "failed";
-    case Verdict::kUnsupported: return "unsupported";
-    case Verdict::kDamaged: return "damaged";
-  }
-  return "";
-}
-
-std::string ThumbnailJson(const Thumbnail& thumbnail, std::wstring_view picture) {
-  return JsonObject()
-      .Number("request", thumbnail.request)
-      .Number("width", thumbnail.width)
-      .Number("height", thumbnail.height)
-      .Number("bitsPerPixel", thumbnail.bits)
-      .TextOrNull("picture", picture)
-      .TextOrNull("problem", thumbnail.problem)
-      .Take();
-}
-
-std::string TipJson(const TipAnswer& tip) {
-  return JsonObject().TextOrNull("text", tip.text).TextOrNull("problem", tip.problem).Take();
-}
-
-std::string ColumnJson(const Column& column) {
-  return JsonObject()
-      .Number("index", column.index)
-      .Text("title", column.title)
-      .Text("set", column.set)
-      .Number("id", column.id)
-      .Number("characters", column.characters)
-      .Number("state", column.state)
-      .Text("declared", column.declaredType)
-      .TextOrNull("delivered", column.deliveredType)
-      .Text("value", column.value)
-      .TextOrNull("problem", column.problem)
-      .Take();
-}
-
-std::string PropertyJson(const Property& property) {
-  return JsonObject()
-      .TextOrNull("name", property.name)
-      .Text("set", property.set)
-      .Number("id", property.id)
-      .TextOrNull("type", property.type)
-      .Text("value", property.value)
-      .TextOrNull("problem", property.problem)
-      .Take();
-}
-
-template <class Item, class ToJson>
-std::string ListJson(const ListAnswer<Item>& list, ToJson toJson) {
-  return JsonObject().Json("items", JsonArray(list.items, toJson)).TextOrNull("problem", list.problem).Take();
+std::wstring OrDash(const std::wstring& text) {
+  return text.empty() ? L"-" : text;
 }
 
 std::wstring Dimensions(std::int32_t width, std::int32_t height) {
@@ -97,9 +44,8 @@ std::wstring ColumnsText(const ListAnswer<Column>& columns) {
   std::vector<std::vector<std::wstring>> rows = {
       {L"title", L"identifier", L"declared", L"delivered", L"value"}};
   for (const Column& column : columns.items) {
-    rows.push_back({column.title, column.set + L" " + std::to_wstring(column.id), column.declaredType,
-                    column.deliveredType.empty() ? L"-" : column.deliveredType,
-                    ValueOrProblem(column.value, column.problem)});
+    rows.push_back({column.title, column.set + L" " + std::to_wstring(column.id), column.declared,
+                    OrDash(column.delivered), ValueOrProblem(column.value, column.problem)});
   }
   return Grid(rows);
 }
@@ -107,8 +53,7 @@ std::wstring ColumnsText(const ListAnswer<Column>& columns) {
 std::wstring PropertiesText(const ListAnswer<Property>& properties) {
   std::vector<std::vector<std::wstring>> rows = {{L"name", L"identifier", L"type", L"value"}};
   for (const Property& property : properties.items) {
-    rows.push_back({property.name, property.set + L" " + std::to_wstring(property.id),
-                    property.type.empty() ? L"-" : property.type,
+    rows.push_back({property.name, property.set + L" " + std::to_wstring(property.id), OrDash(property.type),
                     ValueOrProblem(property.value, property.problem)});
   }
   return Grid(rows);
@@ -121,34 +66,12 @@ std::wstring Section(const wchar_t* title, const Answer& answer, const std::wstr
 }
 
 std::wstring ThumbnailText(const Thumbnail& thumbnail) {
-  if (thumbnail.png.empty()) return L"none";
-  return Dimensions(thumbnail.width, thumbnail.height) + L", " + std::to_wstring(thumbnail.bits) +
+  if (thumbnail.width == 0) return L"none";
+  return Dimensions(thumbnail.width, thumbnail.height) + L", " + std::to_wstring(thumbnail.bitsPerPixel) +
          L" bits per pixel, asked for at " + Dimensions(thumbnail.request, thumbnail.request);
 }
 
 }  // namespace
-
-std::string JsonReport(const FileFacts& facts, std::wstring_view picture) {
-  return JsonObject()
-      .Text("path", facts.path)
-      .Text("name", facts.name)
-      .Text("kind", facts.kind)
-      .Number("bytes", static_cast<std::int64_t>(facts.bytes))
-      .Json("verdict", std::string("\"") + VerdictName(facts.verdict) + "\"")
-      .TextOrNull("problem", facts.problem)
-      .TextOrNull("remark", facts.remark)
-      .Number("width", facts.width)
-      .Number("height", facts.height)
-      .Number("frames", facts.frames)
-      .Number("bitDepth", facts.bitDepth)
-      .TextOrNull("type", facts.type)
-      .Json("thumbnail", ThumbnailJson(facts.thumbnail, picture))
-      .Json("tip", TipJson(facts.tip))
-      .Json("columns", ListJson(facts.columns, ColumnJson))
-      .Json("propertySets", ListJson(facts.propertySets, PropertyJson))
-      .Json("propertyStore", ListJson(facts.propertyStore, PropertyJson))
-      .Take();
-}
 
 std::wstring TextReport(const FileFacts& facts) {
   std::wstring text = facts.path + L"\n";
@@ -185,9 +108,9 @@ std::wstring TableHeading(std::size_t nameWidth) {
 std::wstring TableRow(const FileFacts& facts, std::size_t nameWidth) {
   const bool known = facts.width > 0;
   return TableLine(nameWidth, facts.name, known ? Dimensions(facts.width, facts.height) : L"-",
-                   known ? std::to_wstring(facts.frames) : L"-", facts.type.empty() ? L"-" : facts.type,
-                   facts.thumbnail.png.empty() ? L"none: " + facts.problem
-                                               : Dimensions(facts.thumbnail.width, facts.thumbnail.height));
+                   known ? std::to_wstring(facts.frames) : L"-", OrDash(facts.type),
+                   facts.png.empty() ? L"none: " + facts.problem
+                                     : Dimensions(facts.thumbnail.width, facts.thumbnail.height));
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,4 +1,5 @@
-// The ways in which the facts of a file are written: as JSON, as text for a reader, as a row of a table.
+// The facts of a file as text for a reader and as a row of a table. As JSON they are written by
+// json_records.h.
 #pragma once
 
 #include <cstddef>
@@ -8,13 +9,6 @@
 #include "file_facts.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
-
-/// The version of the JSON that JsonReport writes. It changes when a member is renamed, removed or given
-/// another meaning; a new member does not change it.
-inline constexpr int kJsonSchema = 1;
-
-/// `picture` is where the thumbnail was written, relative to the document; empty if nowhere.
-std::string JsonReport(const FileFacts& facts, std::wstring_view picture);
 
 /// Everything about the file, as lines.
 std::wstring TextReport(const FileFacts& facts);

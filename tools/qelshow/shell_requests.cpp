@@ -8,11 +8,11 @@
 
 #include <algorithm>
 #include <exception>
-#include <memory>
 #include <string_view>
 
 #include "class_ids.h"
 #include "file_type_factory.h"
+#include "handle_owner.h"
 #include "png.h"
 #include "same_text.h"
 #include "text_tools.h"
@@ -28,43 +28,32 @@ constexpr GUID kImageSummarySet = {
 /// The bound of a list that the extension ends itself.
 constexpr DWORD kMaxItems = 64;
 
-/// A PROPVARIANT that is cleared.
-struct OwnedValue : PROPVARIANT {
-  OwnedValue() { PropVariantInit(this); }
-  ~OwnedValue() { PropVariantClear(this); }
-  OwnedValue(const OwnedValue&) = delete;
-  OwnedValue& operator=(const OwnedValue&) = delete;
-};
-
-/// A VARIANT that is cleared.
-struct OwnedVariant : VARIANT {
-  OwnedVariant() { VariantInit(this); }
-  ~OwnedVariant() { VariantClear(this); }
+/// A PROPVARIANT or VARIANT that is cleared.
+template <class Variant, auto init, auto clear>
+struct OwnedVariant : Variant {
+  OwnedVariant() { init(this); }
+  ~OwnedVariant() { clear(this); }
   OwnedVariant(const OwnedVariant&) = delete;
   OwnedVariant& operator=(const OwnedVariant&) = delete;
 };
 
-struct BitmapDeleter {
-  using pointer = HBITMAP;
-  void operator()(HBITMAP bitmap) const { DeleteObject(bitmap); }
-};
+using PropertyValue = OwnedVariant<PROPVARIANT, &PropVariantInit, &PropVariantClear>;
+using ColumnValue = OwnedVariant<VARIANT, &VariantInit, &VariantClear>;
 
 std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
   return std::wstring(L"The extension gives no ") + what + L": " + ResultText(result) + L".";
 }
 
-/// Runs `request`; an exception that leaves the extension becomes the answer's problem.
-template <class Answer, class Request>
-Answer Guarded(Request request) {
-  Answer answer;
+/// Runs `request`; an exception that leaves the extension becomes the problem.
+template <class Request>
+void Guard(std::wstring& problem, Request request) {
   try {
-    request(answer);
+    request();
   } catch (const std::exception& e) {
-    answer.problem = L"The extension throws \"" + Wide(e.what()) + L"\".";
+    problem = L"The extension throws \"" + Wide(e.what()) + L"\".";
   } catch (...) {
-    answer.problem = L"The extension throws an exception of an unknown type.";
+    problem = L"The extension throws an exception of an unknown type.";
   }
-  return answer;
 }
 
 template <class Object, class Interface>
@@ -110,10 +99,10 @@ const KnownProperty* FindProperty(const GUID& set, DWORD id) {
 
 /// The value of a column, or why there is none.
 void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDATA& file, Column& column) {
-  OwnedVariant value;
+  ColumnValue value;
   const HRESULT result = provider.GetItemData(&id, &file, &value);
   if (result == S_OK) {
-    column.deliveredType = TypeName(value.vt);
+    column.delivered = TypeName(value.vt);
     column.value = ValueText(value);
   } else {
     column.problem = ResultText(result);
@@ -138,7 +127,7 @@ HRESULT ReadPropertySet(IPropertySetStorage& sets, const GUID& format, std::vect
     PROPSPEC specifier{};
     specifier.ulKind = PRSPEC_PROPID;
     specifier.propid = entry.propid;
-    OwnedValue value;
+    PropertyValue value;
     const HRESULT read = storage->ReadMultiple(1, &specifier, &value);
     if (read == S_OK) {
       property.type = TypeName(value.vt);
@@ -162,7 +151,8 @@ const CLSID* StoreClassOf(const std::wstring& path) {
 }
 
 TipAnswer RequestTip(const ExtensionClient& client, const std::wstring& path) {
-  return Guarded<TipAnswer>([&](TipAnswer& answer) {
+  TipAnswer answer;
+  Guard(answer.problem, [&] {
     ComPtr<IQueryInfo> info;
     HRESULT result = LoadFile(client, path, info);
     wchar_t* text = nullptr;
@@ -174,10 +164,12 @@ TipAnswer RequestTip(const ExtensionClient& client, const std::wstring& path) {
     }
     CoTaskMemFree(text);
   });
+  return answer;
 }
 
 ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstring& path) {
-  return Guarded<ListAnswer<Column>>([&](ListAnswer<Column>& answer) {
+  ListAnswer<Column> answer;
+  Guard(answer.problem, [&] {
     ComPtr<IColumnProvider> provider;
     HRESULT result = client.Create(CLSID_QelShellExt, provider);
     SHCOLUMNINIT folder{};
@@ -207,16 +199,18 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
       column.id = info.scid.pid;
       column.characters = info.cChars;
       column.state = info.csFlags;
-      column.declaredType = TypeName(info.vt);
+      column.declared = TypeName(info.vt);
       FillValue(*provider.Get(), info.scid, file, column);
       answer.items.push_back(std::move(column));
     }
     if (answer.items.empty()) answer.problem = NoAnswer(L"columns", result);
   });
+  return answer;
 }
 
 ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const std::wstring& path) {
-  return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
+  ListAnswer<Property> answer;
+  Guard(answer.problem, [&] {
     ComPtr<IPropertySetStorage> sets;
     HRESULT result = LoadFile(client, path, sets);
     ComPtr<IEnumSTATPROPSETSTG> enumerator;
@@ -228,10 +222,12 @@ ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const st
     }
     if (FAILED(result)) answer.problem = NoAnswer(L"property sets", result);
   });
+  return answer;
 }
 
 ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const std::wstring& path) {
-  return Guarded<ListAnswer<Property>>([&](ListAnswer<Property>& answer) {
+  ListAnswer<Property> answer;
+  Guard(answer.problem, [&] {
     const CLSID* const clsid = StoreClassOf(path);
     if (clsid == nullptr) {
       answer.problem = L"There is no property store for ." + Lowered(GetExtension(path)) +
@@ -262,7 +258,7 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
       property.name = known == nullptr ? L"" : known->canonicalName;
       property.set = GuidText(key.fmtid);
       property.id = key.pid;
-      OwnedValue value;
+      PropertyValue value;
       result = store->GetValue(key, &value);
       if (SUCCEEDED(result)) {
         property.type = TypeName(value.vt);
@@ -274,11 +270,14 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
     }
     if (answer.items.empty()) answer.problem = NoAnswer(L"property store", result);
   });
+  return answer;
 }
 
-Thumbnail RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size) {
-  return Guarded<Thumbnail>([&](Thumbnail& thumbnail) {
-    thumbnail.request = size;
+ThumbnailAnswer RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size) {
+  ThumbnailAnswer answer;
+  Thumbnail& thumbnail = answer.thumbnail;
+  thumbnail.request = size;
+  Guard(thumbnail.problem, [&] {
     ComPtr<IExtractImage> extractor;
     HRESULT result = LoadFile(client, path, extractor);
     if (SUCCEEDED(result)) {
@@ -288,23 +287,23 @@ Thumbnail RequestThumbnail(const ExtensionClient& client, const std::wstring& pa
       const SIZE request = {size, size};
       result = extractor->GetLocation(location, MAX_PATH, &priority, &request, 32, &flags);
     }
-    HBITMAP handle = nullptr;
-    if (SUCCEEDED(result)) result = extractor->Extract(&handle);
-    const std::unique_ptr<HBITMAP, BitmapDeleter> bitmap(handle);
+    Com::OwnedBitmap bitmap;
+    if (SUCCEEDED(result)) result = extractor->Extract(bitmap.Put());
     BITMAP facts{};
-    if (FAILED(result) || GetObjectW(bitmap.get(), sizeof facts, &facts) == 0) {
+    if (FAILED(result) || GetObjectW(bitmap.Get(), sizeof facts, &facts) == 0) {
       thumbnail.problem = NoAnswer(L"thumbnail", result);
       return;
     }
-    result = EncodePng(bitmap.get(), thumbnail.png);
+    result = EncodePng(bitmap.Get(), answer.png);
     if (FAILED(result)) {
       thumbnail.problem = L"The thumbnail cannot be written as PNG: " + ResultText(result) + L".";
       return;
     }
     thumbnail.width = facts.bmWidth;
     thumbnail.height = facts.bmHeight;
-    thumbnail.bits = facts.bmBitsPixel;
+    thumbnail.bitsPerPixel = facts.bmBitsPixel;
   });
+  return answer;
 }
 
 std::wstring RequestObject(const std::wstring& clsid) {

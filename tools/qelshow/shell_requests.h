@@ -27,7 +27,7 @@ ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const st
 ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const std::wstring& path);
 
 /// The thumbnail for a request of `size` by `size` pixels.
-Thumbnail RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
+ThumbnailAnswer RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
 
 /// Makes an object of a class as any program would, through what is registered. Empty, or a sentence that
 /// says why there is none.

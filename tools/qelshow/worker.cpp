@@ -4,7 +4,9 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <vector>
 
+#include "console.h"
 #include "diagnosis.h"
 #include "extension_client.h"
 #include "failure.h"
@@ -14,51 +16,46 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-bool WriteAll(HANDLE pipe, const char* bytes, std::size_t size) {
-  while (size > 0) {
-    DWORD written = 0;
-    const auto part = static_cast<DWORD>(std::min<std::size_t>(size, 1 << 20));
-    if (!WriteFile(pipe, bytes, part, &written, nullptr) || written == 0) return false;
-    bytes += written;
-    size -= written;
-  }
-  return true;
-}
+using Com::OwnedHandle;
 
-bool ReadAll(HANDLE pipe, char* bytes, std::size_t size) {
+bool ReadAll(HANDLE pipe, void* bytes, std::size_t size) {
+  char* next = static_cast<char*>(bytes);
   while (size > 0) {
     DWORD read = 0;
     const auto part = static_cast<DWORD>(std::min<std::size_t>(size, 1 << 20));
-    if (!ReadFile(pipe, bytes, part, &read, nullptr) || read == 0) return false;
-    bytes += read;
+    if (!ReadFile(pipe, next, part, &read, nullptr) || read == 0) return false;
+    next += read;
     size -= read;
   }
   return true;
 }
 
 /// A message is preceded by its length.
-bool Send(HANDLE pipe, const std::string& message) {
-  const std::uint64_t size = message.size();
-  return WriteAll(pipe, reinterpret_cast<const char*>(&size), sizeof size) &&
-         WriteAll(pipe, message.data(), message.size());
+bool Send(HANDLE pipe, const Json& message) {
+  const std::vector<std::uint8_t> bytes = Json::to_cbor(message);
+  const std::uint64_t size = bytes.size();
+  return WriteBytes(pipe, &size, sizeof size) && WriteBytes(pipe, bytes.data(), bytes.size());
 }
 
-bool Receive(HANDLE pipe, std::string& message) {
+bool Receive(HANDLE pipe, Json& message) {
   std::uint64_t size = 0;
-  if (!ReadAll(pipe, reinterpret_cast<char*>(&size), sizeof size)) return false;
-  message.resize(static_cast<std::size_t>(size));
-  return ReadAll(pipe, message.data(), message.size());
+  if (!ReadAll(pipe, &size, sizeof size)) return false;
+  std::vector<std::uint8_t> bytes(static_cast<std::size_t>(size));
+  if (!ReadAll(pipe, bytes.data(), bytes.size())) return false;
+  message = Json::from_cbor(bytes);
+  return true;
 }
 
-std::string AnswerTo(const Question& question, const ExtensionClient& client) {
+Json AnswerTo(const Question& question, ExtensionClient& client) {
   switch (question.subject) {
-    case Subject::kDiagnosis: return Packed(Diagnose(question.path));
-    case Subject::kTip: return Packed(RequestTip(client, question.path));
-    case Subject::kColumns: return Packed(RequestColumns(client, question.path));
-    case Subject::kPropertySets: return Packed(RequestPropertySets(client, question.path));
-    case Subject::kPropertyStore: return Packed(RequestPropertyStore(client, question.path));
-    case Subject::kThumbnail: return Packed(RequestThumbnail(client, question.path, question.size));
-    case Subject::kCreation: return Packed(RequestObject(question.path));
+    case Subject::kLoading: return client.Open(question.path);
+    case Subject::kDiagnosis: return Diagnose(question.path);
+    case Subject::kTip: return RequestTip(client, question.path);
+    case Subject::kColumns: return RequestColumns(client, question.path);
+    case Subject::kPropertySets: return RequestPropertySets(client, question.path);
+    case Subject::kPropertyStore: return RequestPropertyStore(client, question.path);
+    case Subject::kThumbnail: return RequestThumbnail(client, question.path, question.size);
+    case Subject::kCreation: return RequestObject(question.path);
   }
   return {};
 }
@@ -72,12 +69,8 @@ LONG WINAPI EndProcess(EXCEPTION_POINTERS* fault) {
 /// A pipe of which the child process inherits one end.
 bool MakePipe(OwnedHandle& readEnd, OwnedHandle& writeEnd, const OwnedHandle& kept) {
   SECURITY_ATTRIBUTES inheritable = {sizeof inheritable, nullptr, TRUE};
-  HANDLE read = nullptr;
-  HANDLE write = nullptr;
-  if (!CreatePipe(&read, &write, &inheritable, 0)) return false;
-  readEnd.reset(read);
-  writeEnd.reset(write);
-  return SetHandleInformation(kept.get(), HANDLE_FLAG_INHERIT, 0) != 0;
+  return CreatePipe(readEnd.Put(), writeEnd.Put(), &inheritable, 0) &&
+         SetHandleInformation(kept.Get(), HANDLE_FLAG_INHERIT, 0) != 0;
 }
 
 }  // namespace
@@ -90,12 +83,10 @@ int RunWorker() {
   // The shell asks from a single-threaded apartment.
   if (FAILED(CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED))) return 1;
 
-  std::string message;
-  if (!Receive(input, message)) return 1;
   ExtensionClient client;
-  if (!Send(output, Packed(client.Open(Unpacked<std::wstring>(message))))) return 1;
+  Json message;
   while (Receive(input, message)) {
-    if (!Send(output, AnswerTo(Unpacked<Question>(message), client))) return 1;
+    if (!Send(output, AnswerTo(message.get<Question>(), client))) return 1;
   }
   return 0;
 }
@@ -109,8 +100,8 @@ void Worker::Start() {
   STARTUPINFOW startup{};
   startup.cb = sizeof startup;
   startup.dwFlags = STARTF_USESTDHANDLES;
-  startup.hStdInput = childInput.get();
-  startup.hStdOutput = childOutput.get();
+  startup.hStdInput = childInput.Get();
+  startup.hStdOutput = childOutput.Get();
   startup.hStdError = GetStdHandle(STD_ERROR_HANDLE);
   const std::wstring program = OwnPath();
   std::wstring command = L"\"" + program + L"\" " + kWorkerArgument;
@@ -119,34 +110,38 @@ void Worker::Start() {
                       &process)) {
     throw Failure(L"The program cannot start itself again: " + SystemErrorText(GetLastError()) + L".");
   }
-  CloseHandle(process.hThread);
-  process_.reset(process.hProcess);
-  childInput.reset();
-  childOutput.reset();
+  const OwnedHandle thread(process.hThread);
+  process_ = OwnedHandle(process.hProcess);
+  childInput.Reset();
+  childOutput.Reset();
 
-  std::string reply;
-  if (!Send(toProcess_.get(), Packed(dllPath_)) || !Receive(fromProcess_.get(), reply)) {
+  Json reply;
+  if (!Exchange({Subject::kLoading, dllPath_}, reply)) {
     throw Failure(L"The extension ends its process with " + ProcessEndText(Finish()) +
                   L" while it is loaded.");
   }
-  const auto problem = Unpacked<std::wstring>(reply);
+  const auto problem = reply.get<std::wstring>();
   if (!problem.empty()) throw Failure(problem);
 }
 
-std::optional<DWORD> Worker::Transmit(const std::string& message, std::string& reply) {
-  if (Send(toProcess_.get(), message) && Receive(fromProcess_.get(), reply)) return std::nullopt;
+bool Worker::Exchange(const Question& question, Json& reply) {
+  return Send(toProcess_.Get(), question) && Receive(fromProcess_.Get(), reply);
+}
+
+std::optional<DWORD> Worker::Transmit(const Question& question, Json& reply) {
+  if (Exchange(question, reply)) return std::nullopt;
   const DWORD end = Finish();
   Start();
   return end;
 }
 
 DWORD Worker::Finish() {
-  toProcess_.reset();
-  fromProcess_.reset();
-  WaitForSingleObject(process_.get(), INFINITE);
+  toProcess_.Reset();
+  fromProcess_.Reset();
+  WaitForSingleObject(process_.Get(), INFINITE);
   DWORD exitCode = 0;
-  GetExitCodeProcess(process_.get(), &exitCode);
-  process_.reset();
+  GetExitCodeProcess(process_.Get(), &exitCode);
+  process_.Reset();
   return exitCode;
 }
 

@@ -8,12 +8,13 @@
 
 #include <windows.h>
 
-#include <memory>
 #include <optional>
 #include <string>
 #include <utility>
 
-#include "message.h"
+#include "handle_owner.h"
+#include "json_records.h"
+#include "question.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 
@@ -22,12 +23,6 @@ inline constexpr const wchar_t* kWorkerArgument = L"--worker";
 
 /// The main function of the worker process: answers questions from standard input until it is closed.
 int RunWorker();
-
-struct HandleCloser {
-  using pointer = HANDLE;
-  void operator()(HANDLE handle) const { CloseHandle(handle); }
-};
-using OwnedHandle = std::unique_ptr<HANDLE, HandleCloser>;
 
 class Worker {
  public:
@@ -39,24 +34,27 @@ class Worker {
   /// started for the next question.
   template <class Answer>
   std::optional<DWORD> Ask(const Question& question, Answer& answer) {
-    std::string reply;
-    if (const auto end = Transmit(Packed(question), reply)) return end;
-    answer = Unpacked<Answer>(reply);
+    Json reply;
+    if (const auto end = Transmit(question, reply)) return end;
+    reply.get_to(answer);
     return std::nullopt;
   }
 
  private:
   void Start();
 
-  std::optional<DWORD> Transmit(const std::string& message, std::string& reply);
+  /// Returns whether the process has answered.
+  bool Exchange(const Question& question, Json& reply);
+
+  std::optional<DWORD> Transmit(const Question& question, Json& reply);
 
   /// Waits for the end of the process, whose pipes are broken, and answers its exit code.
   DWORD Finish();
 
   std::wstring dllPath_;
-  OwnedHandle process_;
-  OwnedHandle toProcess_;
-  OwnedHandle fromProcess_;
+  Com::OwnedHandle process_;
+  Com::OwnedHandle toProcess_;
+  Com::OwnedHandle fromProcess_;
 };
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,0 +1,89 @@
+// How the records of this program are written: as JSON in documents for other programs, as CBOR in the
+// messages between the program and its worker process. One description of a record serves both.
+#pragma once
+
+#include <cstdint>
+#include <nlohmann/json.hpp>
+#include <string>
+#include <vector>
+
+#include "file_facts.h"
+#include "question.h"
+#include "text_tools.h"
+
+/// A text is a UTF-8 string. Half of a surrogate pair, which UTF-8 cannot express, becomes U+FFFD.
+template <>
+struct nlohmann::adl_serializer<std::wstring> {
+  static void to_json(nlohmann::json& json, const std::wstring& text) {
+    json = Qel::Lumetra::ShellExt::Show::Utf8(text);
+  }
+  static void from_json(const nlohmann::json& json, std::wstring& text) {
+    text = Qel::Lumetra::ShellExt::Show::Wide(json.get_ref<const std::string&>());
+  }
+};
+
+namespace Qel::Lumetra::ShellExt::Show {
+
+using Json = nlohmann::json;
+
+/// The version of the documents. It changes when a member is renamed, removed or given another meaning; a new
+/// member does not change it.
+inline constexpr int kJsonSchema = 1;
+
+inline void to_json(Json& json, const OptionalText& text) {
+  if (!text.empty()) json = Utf8(text);
+}
+
+inline void from_json(const Json& json, OptionalText& text) {
+  text = json.is_null() ? std::wstring() : json.get<std::wstring>();
+}
+
+NLOHMANN_JSON_SERIALIZE_ENUM(Verdict, {{Verdict::kGood, "good"},
+                                       {Verdict::kFailed, "failed"},
+                                       {Verdict::kUnsupported, "unsupported"},
+                                       {Verdict::kDamaged, "damaged"}})
+
+template <class Item>
+void to_json(Json& json, const ListAnswer<Item>& answer) {
+  json = {{"items", answer.items}, {"problem", answer.problem}};
+}
+
+template <class Item>
+void from_json(const Json& json, ListAnswer<Item>& answer) {
+  json.at("items").get_to(answer.items);
+  json.at("problem").get_to(answer.problem);
+}
+
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Diagnosis, verdict, sentence)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(TipAnswer, text, problem)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, state, declared, delivered,
+                                   value, problem)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Property, name, set, id, type, value, problem)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, picture, problem)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, verdict, problem, remark, width,
+                                   height, frames, bitDepth, type, thumbnail, tip, columns, propertySets,
+                                   propertyStore)
+
+inline void to_json(Json& json, const ThumbnailAnswer& answer) {
+  json = {{"thumbnail", answer.thumbnail}, {"png", Json::binary(answer.png)}};
+}
+
+inline void from_json(const Json& json, ThumbnailAnswer& answer) {
+  json.at("thumbnail").get_to(answer.thumbnail);
+  answer.png = json.at("png").get_binary();
+}
+
+inline void to_json(Json& json, const Question& question) {
+  // A path goes as its code units, because UTF-8 cannot express every name of a file.
+  const std::vector<std::uint16_t> path(question.path.begin(), question.path.end());
+  json = {{"subject", question.subject}, {"path", path}, {"size", question.size}};
+}
+
+inline void from_json(const Json& json, Question& question) {
+  json.at("subject").get_to(question.subject);
+  const auto path = json.at("path").get<std::vector<std::uint16_t>>();
+  question.path.assign(path.begin(), path.end());
+  json.at("size").get_to(question.size);
+}
+
+}  // namespace Qel::Lumetra::ShellExt::Show
