@@ -1,154 +1,103 @@
-"""A headless Chromium, driven over its debugging pipe."""
+"""A headless Chromium, driven by Selenium."""
 
-import base64
-import itertools
 import json
-import os
-import subprocess
-import tempfile
 
-# No window, no profile of the user's, no shared memory of a container's small /dev/shm, and nothing that would
-# reach for a network by itself.
-ARGUMENTS = ("--headless", "--no-sandbox", "--disable-gpu", "--disable-dev-shm-usage", "--disable-quic", "--no-first-run",
-             "--disable-sync", "--disable-background-networking", "--disable-component-update", "--disable-default-apps",
-             "--disable-extensions", "--hide-scrollbars", "--force-device-scale-factor=1", "--lang=en-US",
-             "--remote-debugging-pipe")
+from selenium import webdriver
+from selenium.webdriver.chrome.service import Service
+from selenium.webdriver.common.keys import Keys
+
+# No window, no shared memory of a container's small /dev/shm, and nothing that would reach for a network by itself.
+ARGUMENTS = ("--headless", "--no-sandbox", "--disable-gpu", "--disable-dev-shm-usage", "--disable-quic",
+             "--disable-background-networking", "--disable-component-update", "--hide-scrollbars",
+             "--force-device-scale-factor=1", "--lang=en-US")
+
+KEYS = {"Enter": Keys.ENTER, "Escape": Keys.ESCAPE, "Tab": Keys.TAB, "Home": Keys.HOME, "End": Keys.END,
+        "ArrowLeft": Keys.ARROW_LEFT, "ArrowUp": Keys.ARROW_UP, "ArrowRight": Keys.ARROW_RIGHT,
+        "ArrowDown": Keys.ARROW_DOWN}
 
 
 class Browser:
-    """The process, which shows one tab at a time."""
+    """The process, which shows the tab that was opened last."""
 
     def __init__(self):
-        self._ids = itertools.count(1)
-        self._profile = tempfile.TemporaryDirectory(ignore_cleanup_errors=True)
-        self._from_browser, browser_out = os.pipe()
-        browser_in, self._to_browser = os.pipe()
-
-        def place_pipes():  # the browser reads from descriptor 3 and writes to 4
-            spare_in, spare_out = os.dup(browser_in), os.dup(browser_out)
-            os.dup2(spare_in, 3)
-            os.dup2(spare_out, 4)
-
-        self._process = subprocess.Popen(
-            ["chromium", *ARGUMENTS, f"--user-data-dir={self._profile.name}"],
-            preexec_fn=place_pipes, close_fds=False, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
-            stderr=subprocess.DEVNULL)
-        os.close(browser_in)
-        os.close(browser_out)
-        self._buffer = b""
-        self._tabs = {}
+        options = webdriver.ChromeOptions()
+        options.binary_location = "/usr/bin/chromium"
+        for argument in ARGUMENTS:
+            options.add_argument(argument)
+        options.set_capability("goog:loggingPrefs", {"browser": "ALL", "performance": "ALL"})
+        self._driver = webdriver.Chrome(service=Service("/usr/bin/chromedriver"), options=options)
+        self._blank = self._driver.current_window_handle
 
     def close(self):
-        os.close(self._to_browser)  # which ends the browser
-        try:
-            self._process.wait(timeout=30)
-        except subprocess.TimeoutExpired:
-            self._process.kill()
-            self._process.wait()
-        os.close(self._from_browser)
-        self._profile.cleanup()
+        self._driver.quit()
 
     def open(self, url, width=1200, height=900, dark=False):
-        """A new tab, when its page is loaded."""
-        target = self.call(None, "Target.createTarget", url="about:blank")["targetId"]
-        session = self.call(None, "Target.attachToTarget", targetId=target, flatten=True)["sessionId"]
-        tab = self._tabs[session] = Tab(self, target, session)
-        tab.load(url, width, height, dark)
-        return tab
-
-    def call(self, session, method, **parameters):
-        """Calls a method of the debugging protocol."""
-        number = next(self._ids)
-        message = {"id": number, "method": method, "params": parameters} | ({"sessionId": session} if session else {})
-        os.write(self._to_browser, json.dumps(message).encode() + b"\0")
-        while True:
-            answer = self.receive()
-            if answer.get("id") == number:
-                if "error" in answer:
-                    raise RuntimeError(f"{method}: {answer['error']}")
-                return answer["result"]
-
-    def receive(self):
-        """Waits for the next message and gives the tab that it is about what it says."""
-        while b"\0" not in self._buffer:
-            part = os.read(self._from_browser, 1 << 16)
-            if not part:
-                raise RuntimeError("the browser has ended")
-            self._buffer += part
-        message, _, self._buffer = self._buffer.partition(b"\0")
-        message = json.loads(message)
-        if "method" in message and message.get("sessionId") in self._tabs:
-            self._tabs[message["sessionId"]].note(message["method"], message["params"])
-        return message
+        """Returns a new tab when its page is loaded."""
+        self._driver.switch_to.window(self._blank)
+        self._driver.switch_to.new_window("tab")
+        return Tab(self._driver, url, width, height, dark)
 
 
 class Tab:
-    """One page. What it asks for and complains of is in `requests` and `complaints`."""
+    """One page. What it requests and complains of is in `requests` and `complaints`."""
 
-    def __init__(self, browser, target, session):
-        self.requests = []
-        self.complaints = []
-        self._browser = browser
-        self._target = target
-        self._session = session
-        self._loaded = False
-
-    def load(self, url, width, height, dark):
-        for domain in ("Page", "Runtime", "Log", "Network", "Performance"):
-            self.call(domain + ".enable")
-        self.call("Emulation.setFocusEmulationEnabled", enabled=True)
-        self.call("Emulation.setDeviceMetricsOverride", width=width, height=height, deviceScaleFactor=1, mobile=False)
-        self.call("Emulation.setEmulatedMedia",
-                  features=[{"name": "prefers-color-scheme", "value": "dark" if dark else "light"}])
-        self._loaded = False
-        self.call("Page.navigate", url=url)
-        while not self._loaded:
-            self._browser.receive()
+    def __init__(self, driver, url, width, height, dark):
+        self._driver = driver
+        self._window = driver.current_window_handle
+        self._requests = []
+        self._complaints = []
+        for kind in ("browser", "performance"):
+            driver.get_log(kind)  # of earlier tabs
+        driver.execute_cdp_cmd("Performance.enable", {})
+        driver.execute_cdp_cmd("Emulation.setFocusEmulationEnabled", {"enabled": True})
+        driver.execute_cdp_cmd("Emulation.setDeviceMetricsOverride",
+                               {"width": width, "height": height, "deviceScaleFactor": 1, "mobile": False})
+        driver.execute_cdp_cmd("Emulation.setEmulatedMedia", {
+            "features": [{"name": "prefers-color-scheme", "value": "dark" if dark else "light"}]})
+        driver.get(url)
 
     def close(self):
-        self._browser.call(None, "Target.closeTarget", targetId=self._target)
-
-    def call(self, method, **parameters):
-        return self._browser.call(self._session, method, **parameters)
+        self._driver.switch_to.window(self._window)
+        self._driver.close()
 
     def run(self, script):
-        """The value of a JavaScript expression, which may be a promise."""
-        answer = self.call("Runtime.evaluate", expression=script, awaitPromise=True, returnByValue=True)
-        if "exceptionDetails" in answer:
-            raise RuntimeError(answer["exceptionDetails"]["exception"].get("description", script))
-        return answer["result"].get("value")
+        """Returns the value of a JavaScript expression, which may be a promise."""
+        return self._driver.execute_script(f"return ({script})")
 
     def counters(self):
-        """The browser's own counts of what it has made and done for the page, by name."""
-        return {metric["name"]: metric["value"] for metric in self.call("Performance.getMetrics")["metrics"]}
+        """Returns the browser's own counts of what it has made and done for the page, by name."""
+        metrics = self._driver.execute_cdp_cmd("Performance.getMetrics", {})["metrics"]
+        return {metric["name"]: metric["value"] for metric in metrics}
 
     def screenshot(self):
-        """What is in sight, as the bytes of a PNG image."""
-        return base64.b64decode(self.call("Page.captureScreenshot", format="png")["data"])
+        """Returns what is in sight, as the bytes of a PNG image."""
+        return self._driver.get_screenshot_as_png()
 
     def press(self, *keys):
         """Presses and releases keys: characters, or names such as "Enter"."""
-        codes = {"Enter": 13, "Escape": 27, "Tab": 9, "ArrowLeft": 37, "ArrowUp": 38, "ArrowRight": 39,
-                 "ArrowDown": 40, "Home": 36, "End": 35, " ": 32}
+        actions = webdriver.ActionChains(self._driver, duration=0)
         for key in keys:
-            facts = {"key": key, "windowsVirtualKeyCode": codes.get(key, 0)}
-            text = {"Enter": "\r"}.get(key, key if len(key) == 1 else "")
-            self.call("Input.dispatchKeyEvent", type="keyDown", **facts, **({"text": text} if text else {}))
-            self.call("Input.dispatchKeyEvent", type="keyUp", **facts)
+            actions.send_keys(KEYS.get(key, key))
+        actions.perform()
 
     def type(self, text):
         self.press(*text)
 
-    def note(self, event, facts):
-        if event == "Page.loadEventFired":
-            self._loaded = True
-        elif event == "Network.requestWillBeSent":
-            self.requests.append(facts["request"]["url"])
-        elif event == "Network.loadingFailed":
-            self.complaints.append(facts["errorText"])
-        elif event == "Log.entryAdded" and facts["entry"]["level"] in ("warning", "error"):
-            self.complaints.append(facts["entry"]["text"])
-        elif event == "Runtime.exceptionThrown":
-            self.complaints.append(facts["exceptionDetails"].get("text", "exception"))
-        elif event == "Runtime.consoleAPICalled":
-            self.complaints.append(str(facts["args"]))
+    @property
+    def requests(self):
+        self._read_logs()
+        return self._requests
+
+    @property
+    def complaints(self):
+        self._read_logs()
+        return self._complaints
+
+    def _read_logs(self):
+        self._complaints += [entry["message"] for entry in self._driver.get_log("browser")]
+        for entry in self._driver.get_log("performance"):
+            event = json.loads(entry["message"])["message"]
+            if event["method"] == "Network.requestWillBeSent":
+                self._requests.append(event["params"]["request"]["url"])
+            elif event["method"] == "Network.loadingFailed":
+                self._complaints.append(event["params"]["errorText"])
