@@ -1,5 +1,5 @@
-// Runs a registry script (registry_script.h) in either direction, through a RegistryStore. Where the script
-// and its replacements come from is the caller's business (registration.h).
+// Runs a registry script (registry_script.h) in either direction, through a RegistryStore. The caller finds
+// the script and its replacements.
 //
 // Registering makes every key of the script, a key marked ForceRemove anew and empty, and sets what the
 // script says. It can be repeated, and completes what an earlier attempt left half done.

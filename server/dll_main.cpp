@@ -3,14 +3,21 @@
 
 #include "object_map.h"
 #include "qel_shell_ext_module.h"
+#include "registration.h"
 
 // Defined by the linker: its address is the module's instance handle.
 extern "C" IMAGE_DOS_HEADER __ImageBase;
 
+using Qel::Lumetra::ShellExt::ObjectMap;
+using Qel::Lumetra::ShellExt::ScriptDirection;
+using Qel::Lumetra::ShellExt::UpdateRegistration;
+
 namespace {
 
+const auto g_instance = reinterpret_cast<HINSTANCE>(&__ImageBase);
+
 // Made before DllMain runs, destroyed when the DLL is unloaded.
-CQelShellExtModule g_module(reinterpret_cast<HINSTANCE>(&__ImageBase), Qel::Lumetra::ShellExt::ObjectMap());
+CQelShellExtModule g_module(ObjectMap());
 
 }  // namespace
 
@@ -27,9 +34,9 @@ STDAPI DllCanUnloadNow() {
 }
 
 STDAPI DllRegisterServer() {
-  return g_module.RegisterServer();
+  return UpdateRegistration(ScriptDirection::kRegister, g_instance, g_module, ObjectMap());
 }
 
 STDAPI DllUnregisterServer() {
-  return g_module.UnregisterServer();
+  return UpdateRegistration(ScriptDirection::kUnregister, g_instance, g_module, ObjectMap());
 }

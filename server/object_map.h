@@ -14,7 +14,7 @@ namespace Qel::Lumetra::ShellExt {
 
 struct ObjectMapEntry {
   const CLSID* clsid = nullptr;  ///< null in an empty entry
-  UINT registryScript = 0;       ///< resource id of the script that registers the class
+  UINT registryScript = 0;       ///< resource id of the script that registers the class (script_ids.h)
   Com::ClassObjectMaker makeClassObject = nullptr;
   Com::InstanceMaker makeInstance = nullptr;
 

@@ -2,25 +2,19 @@
 
 #include <algorithm>
 #include <mutex>
-#include <new>
 
 using Qel::Com::ComPtr;
 using Qel::Lumetra::ShellExt::Replacement;
 
-CQelShellExtModule::CQelShellExtModule(HINSTANCE instance, std::span<ObjectMapEntry> objectMap) {
-  classes_.instance = instance;
-  classes_.objectMap = objectMap;
-  if (SUCCEEDED(classes_.section.Create())) {
-    classes_.size = sizeof classes_;
-  } else {
-    initFailed_ = true;
-  }
-  if (FAILED(section_.Create())) initFailed_ = true;
+CQelShellExtModule::CQelShellExtModule(std::span<ObjectMapEntry> objectMap)
+    : objectMap_(objectMap),
+      isReady_(SUCCEEDED(objectMapSection_.Create())),
+      initFailed_(FAILED(section_.Create()) || !isReady_) {
   MakeCurrent(this);
 }
 
 CQelShellExtModule::~CQelShellExtModule() {
-  for (ObjectMapEntry& entry : classes_.objectMap) {
+  for (ObjectMapEntry& entry : objectMap_) {
     if (void* const encoded = entry.classObject.exchange(nullptr); encoded != nullptr) {
       static_cast<IUnknown*>(DecodePointer(encoded))->Release();
     }
@@ -46,40 +40,19 @@ HRESULT CQelShellExtModule::AddCommonRGSReplacements(std::vector<Replacement>& r
   return S_OK;
 }
 
-HRESULT CQelShellExtModule::RegisterServer() const {
-  return UpdateRegistration(&Qel::Lumetra::ShellExt::RegisterServer);
-}
-
-HRESULT CQelShellExtModule::UnregisterServer() const {
-  return UpdateRegistration(&Qel::Lumetra::ShellExt::UnregisterServer);
-}
-
-HRESULT CQelShellExtModule::UpdateRegistration(RegistrationStep* step) const {
-  try {
-    std::vector<Replacement> replacements;
-    const HRESULT result = AddCommonRGSReplacements(replacements);
-    if (FAILED(result)) return result;
-    std::vector<UINT> scripts;
-    for (const ObjectMapEntry& entry : classes_.objectMap) scripts.push_back(entry.registryScript);
-    return step({classes_.instance, replacements, scripts});
-  } catch (const std::bad_alloc&) {
-    return E_OUTOFMEMORY;
-  }
-}
-
 HRESULT CQelShellExtModule::GetClassObject(REFCLSID clsid, REFIID iid, void** classObject) {
   if (classObject == nullptr) return E_POINTER;
   *classObject = nullptr;
-  if (classes_.size == 0) return E_UNEXPECTED;
+  if (!isReady_) return E_UNEXPECTED;
 
-  const auto entry = std::ranges::find_if(classes_.objectMap, [&clsid](const ObjectMapEntry& candidate) {
+  const auto entry = std::ranges::find_if(objectMap_, [&clsid](const ObjectMapEntry& candidate) {
     return candidate.clsid != nullptr && candidate.makeClassObject != nullptr && *candidate.clsid == clsid;
   });
-  if (entry == classes_.objectMap.end()) return CLASS_E_CLASSNOTAVAILABLE;
+  if (entry == objectMap_.end()) return CLASS_E_CLASSNOTAVAILABLE;
 
   HRESULT result = S_OK;
   if (entry->classObject == nullptr) {
-    const std::lock_guard guard(classes_.section);
+    const std::lock_guard guard(objectMapSection_);
     // Another thread may have made it meanwhile.
     if (entry->classObject == nullptr) result = MakeClassObject(*entry);
   }

@@ -12,7 +12,7 @@
 #include "critical_section.h"
 #include "module.h"
 #include "object_map.h"
-#include "registration.h"
+#include "registry_script.h"
 
 class CQelShellExtModule : public Qel::Com::Module {
  public:
@@ -23,7 +23,7 @@ class CQelShellExtModule : public Qel::Com::Module {
       0x0506151B, 0x7799, 0x43EC, {0xB1, 0x47, 0x65, 0x85, 0x6D, 0xF0, 0x03, 0x0A}};
 
   /// Makes this the current module. `objectMap` outlives it.
-  CQelShellExtModule(HINSTANCE instance, std::span<ObjectMapEntry> objectMap);
+  explicit CQelShellExtModule(std::span<ObjectMapEntry> objectMap);
 
   /// Releases the class objects.
   ~CQelShellExtModule() override;
@@ -44,26 +44,14 @@ class CQelShellExtModule : public Qel::Com::Module {
   /// ask at the same time.
   HRESULT GetClassObject(REFCLSID clsid, REFIID iid, void** classObject);
 
-  /// Register and unregister the module and the classes of the object map (registration.h).
-  HRESULT RegisterServer() const;
-  HRESULT UnregisterServer() const;
-
  private:
-  struct ClassRegistry {
-    UINT size = 0;  // of this structure, set when it is ready for use
-    HINSTANCE instance = nullptr;
-    std::span<ObjectMapEntry> objectMap;
-    Qel::Com::CriticalSection section;  // guards the creation of class objects
-  };
-
-  using RegistrationStep = HRESULT(const Qel::Lumetra::ShellExt::ServerRegistration&);
-
-  HRESULT UpdateRegistration(RegistrationStep* step) const;
   static HRESULT MakeClassObject(ObjectMapEntry& entry);
 
   std::atomic<LONG> lockCount_ = 0;
-  bool initFailed_ = false;
-  ClassRegistry classes_;
-  Qel::Com::CriticalSection section_;  // guards the members below
+  std::span<ObjectMapEntry> objectMap_;
+  Qel::Com::CriticalSection objectMapSection_;  // guards the creation of class objects
+  bool isReady_;                                // to make class objects
+  Qel::Com::CriticalSection section_;           // guards the interface table
+  bool initFailed_;
   Qel::Com::ComPtr<IGlobalInterfaceTable> interfaceTable_;
 };

@@ -14,17 +14,7 @@
 #include "com_ptr.h"
 #include "qel_shell_ext_module.h"
 
-namespace Qel::Lumetra::ShellExt {
-
-// There is no registry to register in, and nobody asks for it.
-HRESULT RegisterServer(const ServerRegistration&) {
-  return E_NOTIMPL;
-}
-HRESULT UnregisterServer(const ServerRegistration&) {
-  return E_NOTIMPL;
-}
-
-namespace Testing {
+namespace Qel::Lumetra::ShellExt::Testing {
 
 struct ICounter : IUnknown {
   /// Counts one further, under the object's own lock.
@@ -36,8 +26,7 @@ struct ICounter : IUnknown {
 
 constexpr IID kCounterId = {0x12345678, 0x1234, 0x1234, {1, 2, 3, 4, 5, 6, 7, 8}};
 
-}  // namespace Testing
-}  // namespace Qel::Lumetra::ShellExt
+}  // namespace Qel::Lumetra::ShellExt::Testing
 
 template <>
 inline constexpr IID Qel::Com::kInterfaceId<Qel::Lumetra::ShellExt::Testing::ICounter> =
@@ -130,7 +119,7 @@ class ModuleThreads : public testing::Test {
   static constexpr CLSID kClass = {0x12345678, 0x1234, 0x1234, {1, 2, 3, 4, 5, 6, 7, 9}};
 
   std::array<ObjectMapEntry, 1> map_{{{&kClass, 0, &MakeClassFactorySlowly, &Com::MakeInstance<Counter>}}};
-  SlowModule module_{nullptr, map_};
+  SlowModule module_{map_};
 };
 
 TEST_F(ModuleThreads, GetTheOneClassObject) {

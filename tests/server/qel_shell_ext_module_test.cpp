@@ -74,17 +74,18 @@ TEST_F(Module, ListsItsClassesInTheOrderOfTheirRegistration) {
 
 TEST_F(Module, SkipsEntriesThatAreEmptyOrMakeNoClassObject) {
   std::array<ObjectMapEntry, 3> map{{{}, {&kClass}, {&kClass, 0, &MakeFaultyFactory}}};
-  CQelShellExtModule module(nullptr, map);
+  CQelShellExtModule module(map);
   EXPECT_EQ(GetClassObject(module), S_OK);
 
-  CQelShellExtModule without(nullptr, std::span(map).first(2));
+  const std::span entries = map;
+  CQelShellExtModule without(entries.first(2));
   EXPECT_EQ(GetClassObject(without), CLASS_E_CLASSNOTAVAILABLE);
 }
 
 TEST_F(Module, KeepsTheClassObjectEncodedUntilItGoes) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
   {
-    CQelShellExtModule module(nullptr, map);
+    CQelShellExtModule module(map);
     EXPECT_EQ(map[0].classObject, nullptr);
     EXPECT_EQ(GetClassObject(module), S_OK);
     EXPECT_EQ(GetClassObject(module), S_OK);
@@ -98,7 +99,7 @@ TEST_F(Module, KeepsTheClassObjectEncodedUntilItGoes) {
 
 TEST_F(Module, ReturnsTheFailureOfTheMakerAndAsksItAgain) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
-  CQelShellExtModule module(nullptr, map);
+  CQelShellExtModule module(map);
   g_makerResult = E_OUTOFMEMORY;
   EXPECT_EQ(GetClassObject(module), E_OUTOFMEMORY);
   EXPECT_EQ(map[0].classObject, nullptr);
@@ -109,11 +110,11 @@ TEST_F(Module, ReturnsTheFailureOfTheMakerAndAsksItAgain) {
 
 TEST_F(Module, TakesSuccessWithoutAnObjectForAClassThatIsNotAvailable) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeNoFactory}}};
-  CQelShellExtModule module(nullptr, map);
+  CQelShellExtModule module(map);
   EXPECT_EQ(GetClassObject(module), CLASS_E_CLASSNOTAVAILABLE);
 
   std::array<ObjectMapEntry, 1> faultyMap{{{&kClass, 0, &MakeFaultyFactory}}};
-  CQelShellExtModule faulty(nullptr, faultyMap);
+  CQelShellExtModule faulty(faultyMap);
   EXPECT_EQ(GetClassObject(faulty, IID_IClassFactory), CLASS_E_CLASSNOTAVAILABLE);
 }
 
@@ -136,19 +137,19 @@ TEST_F(Module, IsNotToBeLoadedWithoutItsLocks) {
   g_sectionError = ERROR_NOT_ENOUGH_MEMORY;
   {
     g_failingSection = 0;
-    CQelShellExtModule module(nullptr, map);
+    CQelShellExtModule module(map);
     EXPECT_TRUE(module.initFailed());
     EXPECT_EQ(GetClassObject(module), E_UNEXPECTED);  // its classes have no lock
   }
   {
     g_failingSection = 1;
-    CQelShellExtModule module(nullptr, map);
+    CQelShellExtModule module(map);
     EXPECT_TRUE(module.initFailed());
     EXPECT_EQ(GetClassObject(module), S_OK);  // its classes have one
   }
   {
     g_failingSection = 2;
-    CQelShellExtModule module(nullptr, map);
+    CQelShellExtModule module(map);
     EXPECT_FALSE(module.initFailed());
   }
 }
@@ -158,13 +159,13 @@ TEST_F(Module, TakesAFailureWithoutAnErrorForALock) {
   g_sectionError = ERROR_SUCCESS;
   for (const int section : {0, 1}) {
     g_failingSection = section;
-    const CQelShellExtModule module(nullptr, {});
+    const CQelShellExtModule module({});
     EXPECT_FALSE(module.initFailed());
   }
 }
 
 TEST_F(Module, CountsItsLocks) {
-  CQelShellExtModule module(nullptr, {});
+  CQelShellExtModule module({});
   EXPECT_FALSE(module.initFailed());
   EXPECT_EQ(module.GetLockCount(), 0);
   EXPECT_EQ(module.Lock(), 1);
@@ -175,7 +176,7 @@ TEST_F(Module, CountsItsLocks) {
 }
 
 TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
-  CQelShellExtModule module(nullptr, {});
+  CQelShellExtModule module({});
   EXPECT_EQ(module.GetGITPtr(nullptr), E_POINTER);
 
   ComPtr<IGlobalInterfaceTable> table;
@@ -195,7 +196,7 @@ TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
 }
 
 TEST_F(Module, TellsTheRegistryScriptsItsAppId) {
-  const CQelShellExtModule module(nullptr, {});
+  const CQelShellExtModule module({});
   std::vector<Replacement> replacements;
   EXPECT_EQ(module.AddCommonRGSReplacements(replacements), S_OK);
   ASSERT_EQ(replacements.size(), 1u);
