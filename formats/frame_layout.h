@@ -1,4 +1,4 @@
-// Where the pixels of one frame lie in a file: all that a file kind has to say for a thumbnail.
+// Where the pixels of one frame are in a file: all that a thumbnail needs from a file kind.
 #pragma once
 
 #include <cstdint>
@@ -9,8 +9,8 @@
 namespace Qel::Lumetra::ShellExt {
 
 /// The pixel at column x of the picture's row y (row 0 is the top) begins at file offset
-/// blockPosition + firstPixel + x * pixelStride + y * rowStride. All bytes of the frame lie in the
-/// blockBytes bytes from blockPosition; a layout with a pixel outside of them cannot be read.
+/// blockPosition + firstPixel + x * pixelStride + y * rowStride. All bytes of the frame are in the
+/// blockBytes bytes from blockPosition; a layout with a pixel outside them cannot be read.
 struct FrameLayout {
   PixelType type;
   Size2 size;
@@ -22,10 +22,10 @@ struct FrameLayout {
   bool swapBytes = false;  // 16-bit pixels with the high byte first
 };
 
-/// Rows one after the other without padding, from the top, beginning at file offset `position`.
+/// Returns the layout of rows without padding, from the top, that begin at file offset `position`.
 FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t position);
 
-/// The same rows, the first of them at the bottom of the picture.
+/// Returns the layout of the same rows with the first one at the bottom of the picture.
 FrameLayout FlippedVertically(const FrameLayout& layout);
 
 }  // namespace Qel::Lumetra::ShellExt

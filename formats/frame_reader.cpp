@@ -18,25 +18,25 @@ constexpr std::int64_t kBandBytes = 256LL * 1024;
 // Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
 // picture is refused when it has more pixels than bytes and more than this, which bounds the memory that a
 // file of a few bytes can take to 512 KiB (a double for each pixel).
-constexpr std::int64_t kMostSharedPixels = 64LL * 1024;
+constexpr std::int64_t kMaxSharedPixels = 64LL * 1024;
 
-// Reading band by band is given up for reading column by column when it would read the block this often, and
-// that for reading the block as a whole.
-constexpr std::int64_t kMostPasses = 8;
+// Bands are given up for single columns if they would read the block more often than this, and single columns
+// for the whole block at once.
+constexpr std::int64_t kMaxPasses = 8;
 
-// A read takes as long as one of this many bytes, however few it brings.
-constexpr std::int64_t kLeastRead = 1024;
+// A shorter read takes as long as one of this many bytes.
+constexpr std::int64_t kMinReadBytes = 1024;
 
-// Strides can interleave rows and columns with each other, so that no part of the picture lies together in
-// the file. No program writes such a picture, but a few bytes suffice to claim one: a larger block than this
-// is refused, since it would be read pixel by pixel.
-constexpr std::int64_t kMostInterleavedBytes = 16LL * 1024 * 1024;
+// Strides can interleave rows and columns so that no part of the picture is contiguous in the file. No
+// program writes such a picture, but a few bytes of header can claim one. It is read as a whole, and refused
+// if its block is larger than this.
+constexpr std::int64_t kMaxInterleavedBytes = 16LL * 1024 * 1024;
 
-/// Whether the layout has pixels, all inside of its block, and not out of proportion to its bytes.
+/// Whether the layout has pixels, all inside its block, and not too many for its bytes.
 bool IsReadable(const FrameLayout& layout) {
   if (layout.size.width < 1 || layout.size.height < 1) return false;
   const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
-  if (pixels > std::max(layout.blockBytes, kMostSharedPixels)) return false;
+  if (pixels > std::max(layout.blockBytes, kMaxSharedPixels)) return false;
   const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
   const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
   const std::int64_t first =
@@ -46,8 +46,8 @@ bool IsReadable(const FrameLayout& layout) {
   return first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
 }
 
-/// Whether the stream holds the layout's block, so that a file cut short is refused before any work. The
-/// stream is left as a short read would leave it.
+/// Whether the stream holds the layout's whole block, so that a truncated file is refused before any work. If
+/// not, the stream is left as by a short read.
 bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
   if (layout.blockPosition < 0) {
     stream.setstate(std::ios_base::failbit);
@@ -61,7 +61,7 @@ bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
   return false;
 }
 
-/// Reads the pixels that a renderer wants, through one buffer, and hands them over in pieces.
+/// Reads the pixels that a renderer takes, through one buffer, and passes them on in pieces.
 class BandReader {
  public:
   BandReader(std::istream& stream, const FrameLayout& layout, FrameRenderer& renderer)
@@ -69,8 +69,8 @@ class BandReader {
         layout_(layout),
         renderer_(renderer),
         factor_(renderer.reduction().factor),
-        width_(renderer.reduction().size.width * factor_),
-        height_(renderer.reduction().size.height * factor_),
+        width_(renderer.reduction().Covered().width),
+        height_(renderer.reduction().Covered().height),
         pixelBytes_(layout.type.bytes()),
         pixelStep_(std::abs(layout.pixelStride)),
         rowStep_(std::abs(layout.rowStride)) {
@@ -84,15 +84,15 @@ class BandReader {
 
     const ColumnPieces pieces = SizeOfColumnPieces();
     const std::int64_t columns = width_ * Pieces(height_, pieces.rows);
-    if (IsEconomical(columns, std::max(Span(1, pieces.rows), kLeastRead))) return ReadBlockColumns(pieces);
+    if (IsEconomical(columns, std::max(Span(1, pieces.rows), kMinReadBytes))) return ReadBlockColumns(pieces);
 
-    if (layout_.blockBytes > kMostInterleavedBytes) return false;
+    if (layout_.blockBytes > kMaxInterleavedBytes) return false;
     Allocate(layout_.blockBytes);
     return ReadBands(height_);
   }
 
  private:
-  /// Parts of columns that are read one by one and handed over side by side.
+  /// Parts of columns that are read one by one and passed on side by side.
   struct ColumnPieces {
     std::int32_t columns;
     std::int32_t rows;
@@ -103,10 +103,10 @@ class BandReader {
     buffer_ = std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bytes));
   }
 
-  static std::int64_t Pieces(std::int64_t count, std::int64_t most) { return (count + most - 1) / most; }
+  static std::int64_t Pieces(std::int64_t count, std::int64_t max) { return (count + max - 1) / max; }
 
   bool IsEconomical(std::int64_t reads, std::int64_t bytesOfEach) const {
-    return reads * bytesOfEach / kMostPasses <= layout_.blockBytes;
+    return reads * bytesOfEach / kMaxPasses <= layout_.blockBytes;
   }
 
   /// Bytes from the first to the last byte of a rectangle of pixels.
@@ -114,18 +114,18 @@ class BandReader {
     return (columns - 1) * pixelStep_ + (rows - 1) * rowStep_ + pixelBytes_;
   }
 
-  /// How many steps fit into `bytes` bytes behind what is already there, at most `most`.
-  static std::int32_t StepsThatFit(std::int64_t bytes, std::int64_t step, std::int32_t most) {
+  /// How many rows or columns, `step` bytes apart, begin within `bytes` bytes; at most `max`.
+  static std::int32_t StepsThatFit(std::int64_t bytes, std::int64_t step, std::int32_t max) {
     if (bytes < 0) return 0;
-    return step == 0 ? most : static_cast<std::int32_t>(std::min<std::int64_t>(most, bytes / step + 1));
+    return step == 0 ? max : static_cast<std::int32_t>(std::min<std::int64_t>(max, bytes / step + 1));
   }
 
   std::int32_t RowsThatFit(std::int32_t columns) const {
     return StepsThatFit(bufferBytes_ - Span(columns, 1), rowStep_, height_);
   }
 
-  /// Bands of whole rows in the order of the file, from the bottom for a bottom-up frame. A row of blocks
-  /// that is larger than the buffer is read in parts from its top, because that is the order of its sums.
+  /// Reads bands of whole rows in the order of the file, from the bottom for a bottom-up frame. A row of
+  /// blocks larger than the buffer is read in parts from its top, because that is the order of its sums.
   bool ReadBands(std::int32_t rowsThatFit) {
     const std::int32_t bandRows = std::max(rowsThatFit / factor_, 1) * factor_;
     const std::int32_t bands = (height_ + bandRows - 1) / bandRows;
@@ -141,7 +141,7 @@ class BandReader {
     return true;
   }
 
-  /// A row that is larger than the buffer.
+  /// Reads a row that is larger than the buffer.
   bool ReadRowInParts(std::int32_t y) {
     const std::int32_t columns = StepsThatFit(bufferBytes_ - pixelBytes_, pixelStep_, width_);
     for (std::int32_t x = 0; x < width_; x += columns) {
@@ -150,8 +150,8 @@ class BandReader {
     return true;
   }
 
-  /// Frames whose columns lie one after the other in the file: a column of blocks after the other, each of
-  /// its columns read by itself.
+  /// Reads a frame whose columns are contiguous in the file: one column of blocks after the other, each pixel
+  /// column by itself.
   bool ReadBlockColumns(const ColumnPieces& pieces) {
     const auto [columns, rows] = pieces;
     for (std::int32_t left = 0; left < width_; left += factor_) {
@@ -167,14 +167,14 @@ class BandReader {
   }
 
   ColumnPieces SizeOfColumnPieces() const {
-    const auto mostColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
-    const std::int32_t columns = std::min(factor_, mostColumns);
-    const std::int32_t mostRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
+    const auto maxColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
+    const std::int32_t columns = std::min(factor_, maxColumns);
+    const std::int32_t maxRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
     // Blocks wider than the buffer are read a row at a time, to keep the order of their sums.
-    return {columns, columns < factor_ ? 1 : mostRows};
+    return {columns, columns < factor_ ? 1 : maxRows};
   }
 
-  /// Reads a rectangle of pixels with all bytes between its first and its last.
+  /// Reads a rectangle of pixels with all bytes between its first and its last pixel.
   bool ReadPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
     const std::int64_t right = (columns - std::int64_t{1}) * layout_.pixelStride;
     const std::int64_t down = (rows - std::int64_t{1}) * layout_.rowStride;
@@ -187,7 +187,7 @@ class BandReader {
     return true;
   }
 
-  /// Reads a rectangle of pixels column by column, leaving out what lies between the columns.
+  /// Reads a rectangle of pixels column by column, without the bytes between the columns.
   bool ReadColumnsPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
     const std::int64_t columnBytes = Span(1, rows);
     const std::int64_t before = layout_.rowStride < 0 ? columnBytes - pixelBytes_ : 0;
@@ -226,7 +226,7 @@ class BandReader {
   std::int64_t rowStep_;
   std::int64_t bufferBytes_ = 0;
   std::unique_ptr<std::byte[]> buffer_;
-  std::int64_t position_ = -1;  // of the stream, as far as it is known
+  std::int64_t position_ = -1;  // of the stream; -1 if unknown
 };
 
 }  // namespace
@@ -235,8 +235,7 @@ HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZ
   if (!IsReadable(layout) || !HoldsBlock(stream, layout)) return nullptr;
   const auto renderer = MakeFrameRenderer(layout.type.tag, layout.size, request);
   if (renderer == nullptr) return nullptr;
-  const Reduction& reduction = renderer->reduction();
-  const bool hasBlocks = reduction.factor > 0 && reduction.size.width > 0 && reduction.size.height > 0;
+  const bool hasBlocks = renderer->reduction().HasBlocks();
   if (hasBlocks && !BandReader(stream, layout, *renderer).ReadFrame()) return nullptr;
   return renderer->Finish();
 }

@@ -1,4 +1,4 @@
-// The way from a file to a thumbnail, the same for every file kind.
+// Turns a frame of a file into a thumbnail, for every file kind.
 #pragma once
 
 #include <windows.h>
@@ -9,8 +9,9 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Reads one frame and renders it (frame_renderer.h); the bitmap is the caller's. Memory does not depend on
-/// the size of the frame: it is read in bands, in the order of the file where the picture allows it.
+/// Reads one frame and renders it (frame_renderer.h). Returns the bitmap, owned by the caller. Memory does
+/// not depend on the size of the frame, which is read in bands, in the order of the file if the layout allows
+/// it.
 ///
 /// Returns null for a frame without pixels or of an unknown pixel type, for a layout that places a pixel
 /// outside of its block, and when the stream does not hold the whole block or fails; a short stream is left

@@ -1,4 +1,4 @@
-// The numbering of pixel types that .ser and .ebn files have in common.
+// The numbering of pixel types that .ser and .ebn files share.
 #pragma once
 
 #include <cstdint>
@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The type with the number `code`, from 1; none for a number that is not given to any.
+/// Returns the type with the number `code`, counted from 1; none for an unused number.
 std::optional<DataType> DataTypeOfCode(std::int32_t code);
 
 }  // namespace Qel::Lumetra::ShellExt

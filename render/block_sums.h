@@ -1,9 +1,9 @@
 // The sums of one row of blocks of factor by factor pixels, for the box average (box_reducer.h).
 //
-// Each sum is what adding the block's values as doubles gives, row by row from the block's top row and from
-// left to right within a row. Values of 8 and 16 bits are added as integers, which gives the same sum in any
-// order, so whole rows are added to column sums and these are folded into blocks. Wider values are added as
-// doubles in exactly that order, the blocks side by side because each is a chain of additions of its own.
+// A sum equals that of the block's values added as doubles, row by row from the top and left to right within
+// a row. Integers of 8 and 16 bits give the same sum in any order, so whole rows are added to column sums,
+// which are then folded into blocks. Wider values are added as doubles in exactly that order; the blocks are
+// independent, so several are added side by side.
 #pragma once
 
 #include <emmintrin.h>
@@ -23,15 +23,15 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// A pixel is one sample (grey) or several (colour channels), each averaged by itself. The reduced image
-/// holds the same pixels, but for colours, which go into a bitmap and take its byte order.
+/// The samples of a pixel, one (grey) or three (colour channels), each averaged by itself. The reduced image
+/// has the same type of pixel, except that colours take the byte order of a bitmap.
 template <class Pixel>
 struct SamplesOf {
   using Sample = Pixel;
   using Target = Pixel;
   static constexpr std::size_t kCount = 1;
 
-  /// The place in a target pixel of sample `i` of a pixel.
+  /// Returns the index in the target pixel of a pixel's sample `i`.
   static constexpr std::size_t TargetIndex(std::size_t i) { return i; }
 };
 template <ColourOrder kOrder>
@@ -44,15 +44,16 @@ struct SamplesOf<ColourPixel<kOrder>> {
   static constexpr std::size_t TargetIndex(std::size_t i) { return kSwaps ? 2 - i : i; }
 };
 
-/// For samples whose sums are exact whatever the order.
+/// For samples whose sums are exact in any order.
 template <class Pixel>
 class ExactBlockSums {
  public:
   ExactBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
 
-  /// Whether rows with this distance between pixels can be added. What lies between them is added as well, as
-  /// columns that are left out in the end; from some distance on it costs less to pick the pixels.
+  /// Whether rows with this distance between pixels can be added directly. The bytes between pixels are then
+  /// added too, as columns that are dropped afterwards; above a certain distance gathering the pixels is
+  /// cheaper.
   static bool Takes(std::int64_t pixelStride) {
     constexpr std::int64_t kSampleBytes = sizeof(Sample);
     constexpr std::int64_t kPixelBytes = kSampleBytes * kSamples;
@@ -62,15 +63,15 @@ class ExactBlockSums {
   /// Adds rows of one row of blocks, whose first pixel is at column `x` of the frame.
   void Add(const ImageView<const Pixel>& rows, std::int32_t x) {
     columns_ = static_cast<std::size_t>(rows.width);
-    for (std::int32_t y = 0; y < rows.height; y += kMostRows) {
-      const std::int32_t count = std::min(kMostRows, rows.height - y);
+    for (std::int32_t y = 0; y < rows.height; y += kMaxRows) {
+      const std::int32_t count = std::min(kMaxRows, rows.height - y);
       SumColumns(rows.Part(0, y, rows.width, count));
       FoldColumns(static_cast<std::size_t>(x), static_cast<std::size_t>(count) * factor_);
     }
   }
 
-  /// The sums of the samples of every block, in the order of the target's; the caller sets those it has used
-  /// back to 0.
+  /// The sums of every block's samples, in the order of the target's samples. The caller resets those that it
+  /// has used to 0.
   double* sums() { return sums_.data(); }
 
  private:
@@ -78,12 +79,12 @@ class ExactBlockSums {
   static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
   static_assert(sizeof(Sample) <= 2);
 
-  // Wide enough for the sum of kMostRows samples; narrow lanes make the pass over the rows a fast one.
+  // Wide enough for the sum of kMaxRows samples. Narrow lanes make the pass over the rows fast.
   using Lane = std::conditional_t<sizeof(Sample) == 1,
                                   std::conditional_t<std::is_signed_v<Sample>, std::int16_t, std::uint16_t>,
                                   std::int32_t>;
-  static constexpr std::int32_t kMostRows = sizeof(Sample) == 1 ? 255 : 32767;
-  // Three channels are folded with their neighbours in a vector, so that lanes behind the last are read.
+  static constexpr std::int32_t kMaxRows = sizeof(Sample) == 1 ? 255 : 32767;
+  // Three channels are loaded as a vector of eight lanes, which reads past the last channel.
   static constexpr std::size_t kFolded = kSamples == 3 ? 8 : kSamples;
 
   void SumColumns(const ImageView<const Pixel>& rows) {
@@ -95,10 +96,10 @@ class ExactBlockSums {
     for (; y + 4 <= rows.height; y += 4) AddRows<4>(rows, y, count);
     for (; y + 2 <= rows.height; y += 2) AddRows<2>(rows, y, count);
     if (y < rows.height) AddRows<1>(rows, y, count);
-    if (step != kSamples) LeaveOutColumnsBetween(step);
+    if (step != kSamples) DropColumnsBetween(step);
   }
 
-  void LeaveOutColumnsBetween(std::size_t step) {
+  void DropColumnsBetween(std::size_t step) {
     Lane* const sums = columnSums_.data();
     std::size_t column = 1;
     if constexpr (sizeof(Lane) == 4) {
@@ -112,7 +113,7 @@ class ExactBlockSums {
     for (; column < columns_; ++column) std::copy_n(sums + column * step, kSamples, sums + column * kSamples);
   }
 
-  /// Adds `count` samples of rows to the column sums, which begin with row 0.
+  /// Adds `count` samples of each row to the column sums, or sets these if the first row is row 0.
   template <std::size_t kRows>
   void AddRows(const ImageView<const Pixel>& rows, std::int32_t y, std::size_t count) {
     y == 0 ? AddRows<kRows, true>(rows, y, count) : AddRows<kRows, false>(rows, y, count);
@@ -138,8 +139,8 @@ class ExactBlockSums {
     }
   }
 
-  /// For signed 16-bit samples the processor widens and adds two rows at a time. Returns how many columns of
-  /// `count` are done.
+  /// Adds signed 16-bit samples, which the processor widens and adds two rows at a time. Returns how many of
+  /// the `count` columns are done.
   template <std::size_t kRows, bool kFirst>
   static std::size_t AddPairsOfRows(const std::array<const std::byte*, kRows>& row, std::size_t count,
                                     Lane* sums) {
@@ -161,10 +162,10 @@ class ExactBlockSums {
     return i;
   }
 
-  /// Folds with sums that have room for `samples` samples, and no more: the narrower, the faster.
+  /// Folds with the narrowest type that holds the sum of `samples` samples, which is the fastest.
   void FoldColumns(std::size_t x, std::size_t samples) {
     if constexpr (sizeof(Lane) < sizeof(std::int32_t)) {
-      if (samples <= kMostRows) return FoldColumns<Lane>(x);
+      if (samples <= kMaxRows) return FoldColumns<Lane>(x);
     }
     if (samples <= std::numeric_limits<std::int32_t>::max() / 65536) return FoldColumns<std::int32_t>(x);
     FoldColumns<std::int64_t>(x);
@@ -177,7 +178,7 @@ class ExactBlockSums {
     const std::size_t blocks = (columns_ - column) / factor_;
     const Lane* const lanes = &columnSums_[column * kSamples];
     double* const sums = &sums_[(x + column) / factor_ * kSamples];
-    // With the factor known to the compiler, small blocks are folded many at once.
+    // A factor that the compiler knows lets it fold many small blocks at once.
     switch (factor_) {
       case 2: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 2>()); break;
       case 3: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 3>()); break;
@@ -221,7 +222,7 @@ class ExactBlockSums {
     const auto widened = [](__m128i narrow) { return _mm_unpacklo_epi16(narrow, _mm_setzero_si128()); };
     __m128i sum = _mm_setzero_si128();
     if constexpr (sizeof(Sum) == 2) {
-      // Two columns at a time, the second in the lanes behind the first.
+      // Two columns at a time, the second in the lanes after the first.
       for (std::size_t i = 0; i + 2 <= factor; i += 2) sum = _mm_add_epi16(sum, load(i));
       sum = _mm_add_epi16(sum, _mm_srli_si128(sum, kSamples * sizeof(Lane)));
       if (factor % 2 != 0) sum = _mm_add_epi16(sum, load(factor - 1));
@@ -249,14 +250,14 @@ class ExactBlockSums {
   std::vector<Lane> columnSums_;
 };
 
-/// For samples that have to be added as doubles and in order.
+/// For samples that must be added as doubles, in order.
 template <class Sample>
 class OrderedBlockSums {
  public:
   OrderedBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(factor), sums_(static_cast<std::size_t>(blocks)) {}
 
-  /// Whether rows with this distance between pixels can be added.
+  /// Whether rows with this distance between pixels can be added directly.
   static bool Takes(std::int64_t pixelStride) {
     return pixelStride == static_cast<std::int64_t>(sizeof(Sample));
   }
@@ -267,7 +268,7 @@ class OrderedBlockSums {
     if (x % factor_ != 0) column = AddPart(rows, x, 0, std::min(rows.width, factor_ - x % factor_));
     const std::int32_t blocks = (rows.width - column) / factor_ / kSideBySide * kSideBySide;
     double* const sums = sums_.data() + (x + column) / factor_;
-    // With the factor known to the compiler, small blocks are added faster.
+    // A factor that the compiler knows makes small blocks faster.
     switch (factor_) {
       case 2: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 2>(), sums); break;
       case 3: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 3>(), sums); break;
@@ -278,14 +279,14 @@ class OrderedBlockSums {
     while (column < rows.width) column = AddPart(rows, x, column, std::min(rows.width - column, factor_));
   }
 
-  /// The sums of every block; the caller sets those it has used back to 0.
+  /// The sums of every block. The caller resets those that it has used to 0.
   double* sums() { return sums_.data(); }
 
  private:
   static constexpr std::int32_t kSideBySide = 8;
 
-  // Two blocks' sums are added to at once, two columns at a time: the columns of either block are loaded
-  // and widened together, then paired by column.
+  // Two blocks are summed in one vector, two columns at a time: a block's two columns are loaded and widened
+  // together, then paired with the other block's.
   static __m128d LoadTwo(const std::byte* bytes) {
     if constexpr (std::is_same_v<Sample, double>) {
       return _mm_loadu_pd(reinterpret_cast<const double*>(bytes));
@@ -293,7 +294,7 @@ class OrderedBlockSums {
       const __m128i samples = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(bytes));
       if constexpr (std::is_same_v<Sample, float>) return _mm_cvtps_pd(_mm_castsi128_ps(samples));
       if constexpr (std::is_same_v<Sample, std::int32_t>) return _mm_cvtepi32_pd(samples);
-      // There is no instruction for unsigned numbers: each becomes the low half of a double of 2^52 and more.
+      // No instruction converts unsigned numbers: each becomes the low half of a double of 2^52 and more.
       const __m128i raised = _mm_unpacklo_epi32(samples, _mm_set1_epi32(0x43300000));
       return _mm_sub_pd(_mm_castsi128_pd(raised), _mm_set1_pd(4503599627370496.0));
     }

@@ -14,17 +14,18 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Takes a frame in pieces and writes the average of every whole block into `target`.
+/// Takes a frame in pieces and writes the average of every whole block into `target`, which has no gaps
+/// between the pixels of a row.
 ///
-/// The pieces may be of any size and at any place, as long as the pixels of each block arrive in order (row
-/// by row, left to right) and a row of blocks is complete before the same columns of another begin.
-/// Pixels outside of the whole blocks must not be given. A factor below 1 has no blocks.
-///
-/// `TargetView` is an image view or something like it, of pixels of SamplesOf<Pixel>::Target.
-template <class Pixel, class TargetView = ImageView<typename SamplesOf<Pixel>::Target>>
+/// Pieces may have any size and position, as long as the pixels of each block arrive in order (row by row,
+/// left to right) and a row of blocks is complete before another begins in the same columns. Pieces must not
+/// contain pixels outside the whole blocks.
+template <class Pixel>
 class BoxReducer {
  public:
-  BoxReducer(std::int32_t factor, const TargetView& target)
+  using Target = typename SamplesOf<Pixel>::Target;
+
+  BoxReducer(std::int32_t factor, const ImageView<Target>& target)
       : factor_(factor),
         reciprocal_(1.0 / WrappingProduct(factor, factor)),
         target_(target),
@@ -32,7 +33,6 @@ class BoxReducer {
 
   /// Adds a piece whose first pixel is at column `x` of row `y` of the frame.
   void Add(const ImageView<const Pixel>& piece, std::int32_t x, std::int32_t y) {
-    if (factor_ < 1) return;
     if (factor_ == 1) return Copy(piece, x, y);
     for (std::int32_t row = 0; row < piece.height;) {
       const std::int32_t rows = std::min(piece.height - row, factor_ - (y + row) % factor_);
@@ -44,9 +44,8 @@ class BoxReducer {
 
  private:
   using Sample = typename SamplesOf<Pixel>::Sample;
-  using Target = typename SamplesOf<Pixel>::Target;
   static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
-  static constexpr std::int32_t kGathered = 16384;  // pixels
+  static constexpr std::int32_t kMaxGathered = 16384;  // pixels
 
   static bool IsDense(const ImageView<const Pixel>& view) {
     return view.pixelStride == static_cast<std::int64_t>(sizeof(Pixel));
@@ -72,20 +71,20 @@ class BoxReducer {
 
   void AddToBlockRow(const ImageView<const Pixel>& rows, std::int32_t x) {
     if (BlockSums::Takes(rows.pixelStride)) return sums_.Add(rows, x);
-    // Other pixels are gathered first, as many rows at a time as there is room for.
-    const std::int32_t columns = std::min(rows.width, kGathered);
-    const std::int32_t most = kGathered / columns;
-    for (std::int32_t y = 0; y < rows.height; y += most) {
+    // Other pixels are gathered first, as many rows at a time as fit.
+    const std::int32_t columns = std::min(rows.width, kMaxGathered);
+    const std::int32_t maxRows = kMaxGathered / columns;
+    for (std::int32_t y = 0; y < rows.height; y += maxRows) {
       for (std::int32_t column = 0; column < rows.width; column += columns) {
         sums_.Add(Gather(rows.Part(column, y, std::min(rows.width - column, columns),
-                                   std::min(rows.height - y, most))),
+                                   std::min(rows.height - y, maxRows))),
                   x + column);
       }
     }
   }
 
   ImageView<const Pixel> Gather(const ImageView<const Pixel>& rows) {
-    gathered_.resize(static_cast<std::size_t>(kGathered));
+    gathered_.resize(static_cast<std::size_t>(kMaxGathered));
     Pixel* next = gathered_.data();
     for (std::int32_t y = 0; y < rows.height; ++y) {
       for (std::int32_t x = 0; x < rows.width; ++x) *next++ = rows.Load(x, y);
@@ -93,7 +92,7 @@ class BoxReducer {
     return PackedView<const Pixel>(gathered_.data(), rows.width, rows.height);
   }
 
-  /// Stores the blocks that end within `columns` columns from column `x`, and starts their sums again.
+  /// Stores the blocks that end within `columns` columns from column `x`, and resets their sums.
   void StoreBlocks(std::int32_t x, std::int32_t columns, std::int32_t blockRow) {
     const std::int32_t first = x / factor_;
     const std::int32_t end = (x + columns) / factor_;
@@ -111,9 +110,9 @@ class BoxReducer {
     std::memcpy(target + SamplesOf<Pixel>::TargetIndex(i) * sizeof(Sample), &sample, sizeof sample);
   }
 
-  /// Integers are truncated toward zero, floats rounded to the nearest, doubles kept.
+  /// Truncates to an integer toward zero, rounds to the nearest float, or keeps a double.
   static Sample ToSample(double average) {
-    // The average of values that fit into 32 bits with a sign does so too, and is converted faster.
+    // The average of values that fit into signed 32 bits fits as well, and converts faster.
     using Whole = std::conditional_t<std::is_same_v<Sample, std::uint32_t>, std::int64_t, std::int32_t>;
     if constexpr (std::is_integral_v<Sample>) {
       return static_cast<Sample>(static_cast<Whole>(average));
@@ -126,7 +125,7 @@ class BoxReducer {
 
   std::int32_t factor_;
   double reciprocal_;
-  TargetView target_;
+  ImageView<Target> target_;
   BlockSums sums_;
   std::vector<Pixel> gathered_;
 };

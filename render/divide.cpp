@@ -5,8 +5,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Executes a division by zero. Written as an instruction, because in C++ the compiler may assume that it
-/// does not happen.
+/// Executes a division by zero, as an instruction because the compiler may assume that C++ code does not.
 [[noreturn]] void RaiseDivideFault() {
 #if !defined(__x86_64__)
 #error "The required divide fault is written for x86-64."

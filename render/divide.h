@@ -1,13 +1,13 @@
-// Integer division as the processor does it.
+// Integer division with the processor's fault.
 #pragma once
 
 #include <cstdint>
 
 namespace Qel::Lumetra::ShellExt {
 
-/// `dividend` / `divisor`, truncated toward zero. A divisor of 0 is a fault of the process (an integer
-/// division by zero), by construction and not by undefined behaviour: a request of 0 pixels, and a colour
-/// frame that is smaller than the request in both dimensions, are meant to end that way.
+/// Returns `dividend` / `divisor`, truncated toward zero. A divisor of 0 ends the process with an integer
+/// division fault, executed on purpose rather than left to undefined behaviour: this is the intended result
+/// of a request of 0 pixels and of a colour frame smaller than the request in both dimensions.
 std::int32_t DivideOrFault(std::int32_t dividend, std::int32_t divisor);
 
 }  // namespace Qel::Lumetra::ShellExt

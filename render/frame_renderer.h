@@ -1,8 +1,8 @@
-// From the pixels of a frame to a bitmap, a piece at a time.
+// Turns the pixels of a frame into a bitmap, a piece at a time.
 //
-// A FrameRenderer is made for one frame and one request, is given the frame's pixels in pieces and keeps
-// nothing of the frame but its reduced image. The frame reader (formats/frame_reader.h) uses it to stream
-// frames of any size; the Render... functions give it a frame that is in memory as a single piece.
+// A FrameRenderer is made for one frame and one request. It receives the frame's pixels in pieces and keeps
+// only the reduced image. The frame reader (formats/frame_reader.h) streams frames of any size through it;
+// whole_frame.h gives it a frame that is in memory as a whole.
 #pragma once
 
 #include <windows.h>
@@ -17,9 +17,9 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// A rectangle of a frame's pixels in memory, of the pixel type that its receiver was made for.
+/// A rectangle of a frame's pixels in memory, of the pixel type that the renderer was made for.
 struct FramePiece {
-  std::int32_t x = 0;  // place in the frame of the first pixel, in picture coordinates (row 0 is the top)
+  std::int32_t x = 0;  // position of the first pixel in the picture, whose row 0 is the top
   std::int32_t y = 0;
   ImageView<const std::byte> pixels;
 };
@@ -28,15 +28,14 @@ class FrameRenderer {
  public:
   virtual ~FrameRenderer() = default;
 
-  /// How the frame is reduced. Only the pixels of whole blocks are wanted: the first
-  /// size.width * factor columns of the first size.height * factor rows.
+  /// How the frame is reduced. The renderer takes only the pixels that this covers.
   virtual const Reduction& reduction() const = 0;
 
-  /// Takes a piece of the whole blocks. Pieces come in any order as long as the pixels of each block come
+  /// Adds a piece of the whole blocks. Pieces may come in any order as long as the pixels of each block come
   /// row by row and left to right, and a row of blocks is complete before another begins in its columns.
   virtual void Add(const FramePiece& piece) = 0;
 
-  /// The bitmap, owned by the caller; null when the system does not make one of this size.
+  /// Returns the bitmap, owned by the caller; null if the system cannot create one of this size.
   virtual HBITMAP Finish() = 0;
 };
 
@@ -44,18 +43,5 @@ class FrameRenderer {
 /// Faults for a request that cannot be divided by (reduction.h); throws std::bad_alloc when there is no
 /// memory for the reduced image.
 std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelTag pixel, Size2 frame, const SIZE& request);
-
-/// A grey bitmap of 8 bits a pixel of a frame of one of the eight scalar types: the box average, its own
-/// range of values stretched linearly to 0..255.
-template <class T>
-HBITMAP RenderGreyThumbnail(const ImageView<const T>& frame, const SIZE& request);
-
-/// The grey bitmap of ln(re² + im²) of every pixel, for complex pixels of int16, float or double parts.
-template <class T>
-HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<T>>& frame, const SIZE& request);
-
-/// A bitmap of 24 bits a pixel: the box average of each channel, values not stretched.
-template <ColourOrder kOrder>
-HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<kOrder>>& frame, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -14,9 +14,9 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The arithmetic in which two values of T are subtracted before the difference is widened to double.
-/// 8- and 16-bit values have room to spare in 32 bits. 32-bit signed differences wrap: an image that spans
-/// more than 2^31 - 1 maps wrongly, and stays that way.
+/// Subtracts two values of T before widening the difference to double. 8- and 16-bit differences are exact.
+/// 32-bit signed differences wrap, so an image that spans more than 2^31 - 1 maps wrongly; this is
+/// intentional.
 template <class T>
 double Difference(T a, T b) {
   if constexpr (std::is_floating_point_v<T>) {
@@ -28,18 +28,16 @@ double Difference(T a, T b) {
   }
 }
 
-/// The smallest and the largest value of an image. A NaN takes part only as the first value.
+/// The smallest and the largest value of an image. A NaN counts only as the first value.
 template <class T>
 struct ValueRange {
   T minimum;
   T maximum;
 
-  explicit ValueRange(T first) : minimum(first), maximum(first) {}
-
-  /// Takes `count` values in, which need not be aligned.
-  void Include(const std::byte* values, std::size_t count) {
-    // Each lane sees every kLanes-th value. The result does not depend on it: a NaN as the first value stays
-    // in every lane, any other is passed over by every lane.
+  /// Finds the range of `count` values, at least one.
+  ValueRange(const T* values, std::size_t count) : minimum(values[0]), maximum(values[0]) {
+    // Each lane sees every kLanes-th value. The result is the same: a NaN as the first value stays in every
+    // lane, and every lane ignores any other.
     constexpr std::size_t kLanes = 64 / sizeof(T);
     std::array<T, kLanes> low;
     std::array<T, kLanes> high;
@@ -48,17 +46,17 @@ struct ValueRange {
     std::size_t i = 0;
     for (; i + kLanes <= count; i += kLanes) {
       for (std::size_t lane = 0; lane < kLanes; ++lane) {
-        const T value = Load(values, i + lane);
+        const T value = values[i + lane];
         low[lane] = value < low[lane] ? value : low[lane];
         high[lane] = value > high[lane] ? value : high[lane];
       }
     }
-    for (; i < count; ++i) Include(Load(values, i), Load(values, i));
+    for (; i < count; ++i) Include(values[i], values[i]);
     for (std::size_t lane = 0; lane < kLanes; ++lane) Include(low[lane], high[lane]);
   }
 
-  /// Grey levels per unit. A flat image is given a range of one, formed in T itself: it wraps at the type's
-  /// maximum and vanishes beside large floats, which all comes out as black.
+  /// Returns the grey levels per unit. A flat image gets a range of one, formed in T itself: the sum wraps at
+  /// an integer's maximum and equals a large float, and either way every pixel is black.
   double Scale() const {
     T upper = maximum;
     if (!(minimum < maximum || minimum > maximum)) {
@@ -71,26 +69,20 @@ struct ValueRange {
     return 255.0 / Difference(upper, minimum);
   }
 
-  /// The grey levels of `count` values, before they are truncated.
-  void Stretch(const std::byte* values, std::size_t count, double scale, double* levels) const {
-    for (std::size_t i = 0; i < count; ++i) levels[i] = Difference(Load(values, i), minimum) * scale;
+  /// Writes the grey levels of `count` values, before they are truncated.
+  void Stretch(const T* values, std::size_t count, double scale, double* levels) const {
+    for (std::size_t i = 0; i < count; ++i) levels[i] = Difference(values[i], minimum) * scale;
   }
 
  private:
-  static T Load(const std::byte* values, std::size_t i) {
-    T value;
-    std::memcpy(&value, values + i * sizeof(T), sizeof(T));
-    return value;
-  }
-
   void Include(T low, T high) {
     if (low < minimum) minimum = low;
     if (high > maximum) maximum = high;
   }
 };
 
-/// Writes the low 8 bits of each of `count` levels truncated toward zero to 32 bits; 0 for what 32 bits
-/// cannot hold, NaN included, which is how the processor converts. `levels` has room for a multiple of 8.
+/// Truncates each of `count` levels toward zero to 32 bits and writes the low 8 bits; 0 for NaN and for what
+/// 32 bits cannot hold, which is how the processor converts. `levels` has room for a multiple of 8.
 inline void Truncate(const double* levels, std::size_t count, std::uint8_t* bytes) {
   const auto four = [levels](std::size_t i) {
     const __m128i two = _mm_cvttpd_epi32(_mm_loadu_pd(levels + i));
@@ -105,25 +97,21 @@ inline void Truncate(const double* levels, std::size_t count, std::uint8_t* byte
   }
 }
 
-/// Stretches an image's own range linearly to 0..255. `bits` has the size of `values`, rows of which may lie
-/// in the memory of the bits: no row of grey levels must reach into a row of values further down, nor begin
-/// behind its own.
-template <class T, class View>
-void MapToGreyLevels(const View& values, const ImageView<std::uint8_t>& bits) {
+/// Stretches an image's own range linearly to 0..255. `values` are those of the pixels of `bits`, row by row;
+/// there is at least one.
+template <class T>
+void MapToGreyLevels(const T* values, const ImageView<std::uint8_t>& bits) {
   constexpr std::int32_t kBatch = 256;
   const auto size = [](std::int32_t count) { return static_cast<std::size_t>(count); };
-  T first;
-  std::memcpy(&first, values.At(0, 0), sizeof first);
-  ValueRange<T> range(first);
-  for (std::int32_t y = 0; y < bits.height; ++y) range.Include(values.At(0, y), size(bits.width));
-
+  const ValueRange<T> range(values, size(bits.width) * size(bits.height));
   const double scale = range.Scale();
   std::array<double, kBatch> levels{};
   for (std::int32_t y = 0; y < bits.height; ++y) {
     for (std::int32_t x = 0; x < bits.width; x += kBatch) {
       const std::int32_t count = std::min(bits.width - x, kBatch);
-      range.Stretch(values.At(x, y), size(count), scale, levels.data());
+      range.Stretch(values, size(count), scale, levels.data());
       Truncate(levels.data(), size(count), reinterpret_cast<std::uint8_t*>(bits.At(x, y)));
+      values += count;
     }
   }
 }

@@ -1,5 +1,5 @@
-// A non-owning description of a rectangle of pixels in memory. Every loop over pixels addresses them this
-// way, so a packed buffer, a bottom-up one, an interleaved one and the bits of a bitmap are all alike.
+// A non-owning description of a rectangle of pixels in memory. Every loop over pixels goes through one, so
+// packed, bottom-up and interleaved buffers and the bits of a bitmap need no code of their own.
 #pragma once
 
 #include <cstddef>
@@ -45,6 +45,12 @@ struct ImageView {
 template <class T>
 ImageView<T> PackedView(T* data, std::int32_t width, std::int32_t height) {
   return {width, height, data, sizeof(T), std::int64_t{width} * std::int64_t{sizeof(T)}};
+}
+
+/// The same pixels, addressed as another type.
+template <class To, class From>
+ImageView<To> ViewAs(const ImageView<From>& view) {
+  return {view.width, view.height, reinterpret_cast<To*>(view.data), view.pixelStride, view.rowStride};
 }
 
 }  // namespace Qel::Lumetra::ShellExt

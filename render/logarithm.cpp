@@ -25,17 +25,17 @@ constexpr std::array<double, 6> kPolynomial = {0x1.fffffffffff12p+0, 0x1.5555555
                                                0x1.9999962c0828ep-2, 0x1.2494381e474b9p-2,
                                                0x1.c620ee95dc85cp-3, 0x1.9192e2aa6c40cp-3};
 
-// How far, relatively, the approximation and the library's logarithm may lie apart: four times the error of
-// the polynomial, beside which rounding is nothing. It leaves four values in a million to the library.
+// Relative bound on the difference between the approximation and the library's logarithm: four times the
+// error of the polynomial, against which rounding is negligible. It leaves four values in a million to the
+// library.
 constexpr double kMargin = 0x1p-43;
 
-/// Approximates a batch. Where the float nearest to the logarithm is in doubt, low and high differ: too near
-/// to the middle between two floats, or a value that has no mantissa of its own (0, subnormal, negative,
-/// infinite, not a number).
+/// Approximates a batch. `low` and `high` differ where the float nearest to the logarithm is in doubt: too
+/// close to the middle between two floats, or a value that is not a positive normal number.
 __attribute__((always_inline)) inline void Approximate(const double* values, std::size_t count, float* low,
                                                        float* high) {
-  // Adding 2^52 makes a small integer the mantissa of a double, which converts it without an instruction for
-  // it.
+  // Adding 2^52 makes a small integer the mantissa of a double, which converts it without a conversion
+  // instruction.
   constexpr std::uint64_t kIntegerBits = 0x4330000000000000;
   constexpr double kIntegerOffset = 4503599627370496.0 + 1023.0;
   for (std::size_t i = 0; i < count; ++i) {
@@ -79,7 +79,7 @@ void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* l
   Logarithms(values, count, logarithms);
 }
 
-// The same body for wider vectors; neither fuses a product and a sum, so both give the same bits.
+// The same body with wider vectors. Neither fuses a product and a sum, so both give the same bits.
 __attribute__((target("avx2"))) void LogarithmsToFloatAvx2(const double* values, std::size_t count,
                                                            float* logarithms) {
   Logarithms(values, count, logarithms);

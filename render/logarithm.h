@@ -1,15 +1,15 @@
-// The natural logarithm of many numbers, rounded to float, as complex frames need it.
+// Natural logarithms rounded to float, for complex frames.
 #pragma once
 
 #include <cstddef>
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Writes static_cast<float>(std::log(values[i])) for each of `count` values, bit for bit, several times
-/// faster. Uses the widest vectors that this processor has.
+/// Writes static_cast<float>(std::log(values[i])) for each of `count` values, with the same bits but several
+/// times faster. Uses AVX2 if this processor has it.
 void LogarithmsToFloat(const double* values, std::size_t count, float* logarithms);
 
-/// The two bodies behind it, which tests compare: for every x86-64 processor, and for those with AVX2.
+/// Its two bodies, which tests compare: for every x86-64 processor, and for those with AVX2.
 void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* logarithms);
 void LogarithmsToFloatAvx2(const double* values, std::size_t count, float* logarithms);
 

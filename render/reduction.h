@@ -1,4 +1,4 @@
-// By how much a frame is reduced: one integer factor for both dimensions, so that the aspect ratio stays.
+// How far a frame is reduced: by one integer factor in both dimensions, which keeps the aspect ratio.
 #pragma once
 
 #include <windows.h>
@@ -12,14 +12,22 @@ namespace Qel::Lumetra::ShellExt {
 struct Reduction {
   std::int32_t factor = 1;  // edge of the square block of pixels that becomes one
   Size2 size;               // of the reduced frame; what is left over at the right and the bottom is dropped
+
+  /// Whether the frame has a whole block. It has none if it is too narrow or too low for the factor, or if
+  /// the request or the frame's own size is negative.
+  bool HasBlocks() const { return factor > 0 && size.width > 0 && size.height > 0; }
+
+  /// The columns and rows of the frame that lie in whole blocks, counted from its left and its top. Only for
+  /// a frame that has blocks.
+  Size2 Covered() const { return {size.width * factor, size.height * factor}; }
 };
 
-/// For grey frames: never enlarges, the factor is at least 1. Because the factor is truncated, the result
-/// can be up to nearly twice the requested size. A request of 0 faults (divide.h).
+/// Returns the reduction of grey frames, which never enlarges: the factor is at least 1. Because the factor
+/// is truncated, the result can be nearly twice the requested size. A request of 0 faults (divide.h).
 Reduction GreyReduction(Size2 frame, const SIZE& request);
 
-/// For colour frames: as GreyReduction, but the factor is not raised to 1, so that a frame smaller than the
-/// request in both dimensions faults (divide.h). The difference between the two is intended.
+/// Returns the reduction of colour frames. Unlike GreyReduction it does not raise the factor to 1, so a frame
+/// smaller than the request in both dimensions faults (divide.h). The difference is intentional.
 Reduction ColourReduction(Size2 frame, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

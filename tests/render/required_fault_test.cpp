@@ -5,7 +5,7 @@
 #include <csignal>
 
 #include "divide.h"
-#include "frame_renderer.h"
+#include "whole_frame.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {

@@ -5,12 +5,13 @@
 #include <cmath>
 #include <cstring>
 #include <limits>
+#include <new>
 #include <vector>
 
 #include "bitmap_pixels.h"
-#include "frame_renderer.h"
 #include "naive_thumbnail.h"
 #include "random_values.h"
+#include "whole_frame.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
@@ -221,6 +222,14 @@ TEST(GreyThumbnail, NegativeRequestInOneDirectionIsIgnored) {
   EXPECT_EQ(Grey(frame, {-5, 10}), Testing::NaiveGreyThumbnail(frame, 10, 10));
 }
 
+TEST(GreyThumbnail, ReducedImageOfMorePixelsThan32BitsCountHasNoMemory) {
+  constexpr std::int32_t kEdge = 46341;  // the smallest whose square does not fit
+  const auto make = [] {
+    MakeFrameRenderer(std::type_identity<std::uint8_t>(), {kEdge, kEdge}, {kEdge, kEdge});
+  };
+  EXPECT_THROW(make(), std::bad_alloc);
+}
+
 TEST(GreyThumbnail, FirstValueNaNIsBlack) {
   constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
   const NaiveFrame<float> frame{4, 1, {kNaN, 1.0f, 2.0f, 3.0f}};
@@ -262,6 +271,19 @@ TEST(GreyThumbnail, IntegerAveragesTruncateTowardZero) {
   // -3 / 4 and 3 / 4 both become 0, -8 / 4 stays -2.
   const NaiveFrame<std::int8_t> frame{6, 2, {0, 0, 0, 0, -2, -2, 0, -3, 0, 3, -2, -2}};
   EXPECT_EQ(Grey(frame, {3, 1}).bytes, (std::vector<std::uint8_t>{255, 255, 0}));
+}
+
+TYPED_TEST(EveryScalar, DownsampleBoxWritesTheAverageOfEveryWholeBlock) {
+  using T = TypeParam;
+  Random random(9);
+  for (const int factor : {1, 2, 7, 60}) {
+    const auto frame = random.Frame<T>(61, 64, Values::kWholeRange);
+    const auto expected = Testing::NaiveReduce(frame, factor);
+    std::vector<T> averages(expected.values.size());
+    DownsampleBox(StorePacked(frame).view(), factor,
+                  PackedView(averages.data(), expected.width, expected.height));
+    EXPECT_EQ(std::memcmp(averages.data(), expected.values.data(), averages.size() * sizeof(T)), 0) << factor;
+  }
 }
 
 template <class T>
@@ -359,6 +381,27 @@ TEST(ColourThumbnail, IsBlueFirstAndNotStretched) {
   EXPECT_EQ(fromRed.bits, 24);
   EXPECT_TRUE(fromRed.colours.empty());
   EXPECT_EQ(TakeBitmap(RenderColourThumbnail<ColourOrder::kBlueFirst>(blue.view(), {1, 1})).bytes, expected);
+}
+
+TEST(ColourThumbnail, DownsampleBoxRgbSwapsOnlyRedFirstPixels) {
+  StoredFrame<RgbPixel> red(3, 2, 3, 9, 0);
+  StoredFrame<BgrPixel> blue(3, 2, 3, 9, 0);
+  for (int y = 0; y < 2; ++y) {
+    red.Set(0, y, {{10, 20, 30}});
+    red.Set(1, y, {{20, 40, 61}});
+    blue.Set(0, y, {{30, 20, 10}});
+    blue.Set(1, y, {{61, 40, 20}});
+  }
+  const std::vector<std::uint8_t> expected{45, 30, 15};
+  std::vector<std::uint8_t> bits(3);
+  const ImageView<std::uint8_t> target{1, 1, bits.data(), 3, 4};
+  DownsampleBoxRgb(red.view(), 2, target);
+  EXPECT_EQ(bits, expected);
+  bits.assign(3, 0);
+  DownsampleBoxRgb(blue.view(), 2, target);
+  EXPECT_EQ(bits, expected);
+  DownsampleBoxRgb(red.view(), 0, target);
+  EXPECT_EQ(bits, expected);
 }
 
 TEST(ColourThumbnail, AveragesTruncate) {
