@@ -4,6 +4,7 @@
 usage: qelshow_test.py EMULATOR QELSHOW SERVER FAULTY_SERVER [TEST_CLASS ...]
 """
 
+import contextlib
 import json
 import os
 import pathlib
@@ -14,6 +15,7 @@ import struct
 import subprocess
 import sys
 import tempfile
+import time
 import unittest
 
 EMULATOR, QELSHOW, SERVER, FAULTY_SERVER = sys.argv[1:5]
@@ -142,6 +144,16 @@ class CommandLine(Test):
                 self.assertEqual((result.returncode, result.stdout), (USAGE, ""))
                 self.assertOneSentence(result.stderr, *parts)
 
+    def test_sizes_go_up_to_4096(self):
+        result = run("info", self.write("a.mrc", mrc()), "--json", "--size", "4096")
+        file, = json.loads(result.stdout)["files"]
+        self.assertEqual((result.returncode, file["thumbnail"]["request"]), (DONE, 4096))
+
+    def test_a_single_hyphen_is_the_name_of_a_file(self):
+        result = run("info", "-")
+        self.assertEqual(result.returncode, FAILED)
+        self.assertOneSentence(result.stderr, "-: The file cannot be opened")
+
     def test_a_server_that_cannot_be_loaded_is_named(self):
         missing = self.folder / "no such.dll"
         other = self.write("text.dll", b"this is no DLL")
@@ -206,6 +218,7 @@ class ExitStatus(Test):
             ("short.mrc", mrc()[:1000], "1000 bytes"),
             ("empty.mrc", b"", "0 bytes"),
             ("cut.mrc", mrc(200, 100, 3)[:41000], "41024", "41000 bytes"),
+            ("even.mrc", mrc(200, 100, 4)[:61023], "61024", "61023 bytes"),
             ("far.mrc", mrc(50000, 50000, pixels=b""), "2 GiB"),
             ("magic.raw", b"QEL RawPicture" + bytes(60), "magic", "QEL RawImage"),
             ("type.raw", raw(1, 1, 3, 32, bytes(4)), "0x30020"),
@@ -328,6 +341,24 @@ class Faults(Test):
         self.assertIn('throws "bad EMI object index"', file["thumbnail"]["problem"])
 
 
+    def test_the_worker_process_ends_with_the_program(self):
+        program = self.write("a program of its own.exe", pathlib.Path(QELSHOW).read_bytes())
+        self.assertEqual(run("info", self.write("a.mrc", mrc()), program=program).returncode, DONE)
+        deadline = time.monotonic() + 60
+        while self.processes(program.name) and time.monotonic() < deadline:
+            time.sleep(0.1)
+        self.assertEqual(self.processes(program.name), [])
+
+    def processes(self, name):
+        """The command lines of running processes in which `name` occurs."""
+        found = []
+        for path in pathlib.Path("/proc").glob("[0-9]*/cmdline"):
+            with contextlib.suppress(OSError):
+                line = path.read_bytes()
+                found += [line] if name.encode() in line else []
+        return found
+
+
 class Json(Test):
     def test_is_valid_whatever_the_names_and_texts_are(self):
         name = "a & b's (ü é 樹 🔬) #100%.mrc"
@@ -335,6 +366,12 @@ class Json(Test):
         file, = self.info(self.write(name, mrc(label=label)))
         self.assertEqual((file["name"], file["verdict"]), (name, "good"))
         self.assertTrue(file["path"].endswith(name))
+
+    def test_keeps_control_characters_and_line_separators(self):
+        name = "a\u2028b\u2029c.mrc"
+        file, = self.info(self.write(name, mrc(label=b"a\x1fb")))
+        self.assertEqual(file["name"], name)
+        self.assertTrue(file["tip"]["text"].endswith("a\x1fb"))
 
     def test_says_of_an_unsupported_file_what_is_supported(self):
         file, = self.info(self.write("notes.txt", b"notes"))
@@ -344,6 +381,12 @@ class Json(Test):
     def test_has_the_file_s_size_and_kind(self):
         file, = self.info(self.write("UPPER.MRC", mrc()))
         self.assertEqual((file["bytes"], file["kind"]), (1024 + 12, "mrc"))
+
+    def test_has_the_size_of_a_file_beyond_4_GiB(self):
+        path = self.write("large.mrc", mrc())
+        os.truncate(path, (5 << 32) + 7)
+        file, = self.info(path)
+        self.assertEqual((file["bytes"], file["verdict"]), ((5 << 32) + 7, "good"))
 
 
 class Answers(Test):
@@ -401,6 +444,13 @@ class Answers(Test):
             self.assertEqual(file["propertyStore"]["items"], [])
             self.assertIn(f"no property store for .{file['kind']} files", file["propertyStore"]["problem"])
 
+    def test_have_columns_up_to_a_path_of_259_characters(self):
+        folder = str(self.folder) + "/" + "f" * 100
+        names = ["n" * (length - len("Z:" + folder + "/")) for length in (259, 260)]
+        longest, too_long = self.info(*(self.write(f"{folder}/{name[:-4]}.mrc", mrc()) for name in names))
+        self.assertEqual([len(file["columns"]["items"]) for file in (longest, too_long)], [6, 0])
+        self.assertIn("260 characters or more", too_long["columns"]["problem"])
+
     def test_of_a_damaged_file_say_why_they_are_missing(self):
         file, = self.info(self.write("a.mrc", mrc(mode=17)))
         self.assertIn("0x80004005", file["tip"]["problem"])
@@ -455,6 +505,14 @@ class Page(Test):
         self.assertEqual(result.returncode, DONE)
         self.assertEqual([(file["name"], file["verdict"]) for file in self.files_of(out / "index.html")],
                          [("b.mrc", "good"), ("gone.mrc", "failed"), ("a.txt", "unsupported")])
+
+    def test_has_the_files_of_each_folder_in_the_order_of_the_folders(self):
+        for name in ("1/b.mrc", "1/a.mrc", "2/d.mrc", "2/c.mrc"):
+            self.write(name, mrc())
+        out = self.folder / "page"
+        run("page", self.folder / "2", self.folder / "1", "--out", out)
+        self.assertEqual([file["name"] for file in self.files_of(out / "index.html")],
+                         ["c.mrc", "d.mrc", "a.mrc", "b.mrc"])
 
     def test_loads_nothing_from_a_network(self):
         out = self.folder / "page"
@@ -549,6 +607,7 @@ class Page(Test):
 class Doctor(Test):
     """Changes the registry of the Wine prefix, so that nothing else may use it at the same time."""
 
+    EXTENSION = "{79E696A1-2FA5-4B3E-9610-D5F760417E62}"
     EBN_STORE = "{E37DEDA9-F652-401B-B619-A1A88EADD003}"
     RAW_STORE = "{E217E970-5E2E-11E1-B86C-0800200C9A66}"
     MRC_STORE = "{ADF28042-3A9F-4409-9C62-444B018A7810}"
@@ -578,12 +637,14 @@ class Doctor(Test):
         cls.wine("regsvr32", "/s", *options, f"Z:{dll}")
 
     def set_registry(self, values):
-        """Sets values to texts: by their key, and behind an "@" their name. None deletes the key."""
+        """Sets values to texts and numbers: by their key, and after an "@" their name. None deletes the key."""
         lines = ["Windows Registry Editor Version 5.00"]
         for place, text in values.items():
             key, _, name = place.partition("@")
             if text is None:
                 lines += [f"[-{key}]"]
+            elif isinstance(text, int):
+                lines += [f"[{key}]", f'"{name}"=dword:{text:08x}']
             else:
                 name, text = (part.replace("\\", r"\\").replace('"', r'\"') for part in (name, text))
                 lines += [f"[{key}]", (f'"{name}"' if name else "@") + f'="{text}"']
@@ -675,6 +736,23 @@ class Doctor(Test):
         self.assertEqual(result.returncode, FAILED)
         self.assertIn("with the path of QelShellExt.dll", result.stdout)
 
+    def test_takes_the_installer_s_advice_only_for_what_the_installer_has_installed(self):
+        entry = "HKEY_LOCAL_MACHINE\\Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\{0FF1CE}"
+        self.addCleanup(self.set_registry, {entry: None})
+        self.set_registry({entry + "@DisplayName": "QelShellExt"})
+        self.assertProblem("run regsvr32")
+        self.set_registry({entry + "@WindowsInstaller": 0})
+        self.assertProblem("run regsvr32")
+        self.set_registry({entry + "@WindowsInstaller": 1})
+        self.assertProblem("run msiexec /i {0FF1CE} REINSTALL=ALL")
+
+    def test_tells_the_version_of_the_dll(self):
+        dll = bytearray(pathlib.Path(SERVER).read_bytes())
+        struct.pack_into("<4H", dll, dll.index(struct.pack("<I", 0xFEEF04BD)) + 8, 2, 1, 4, 3)
+        self.register(dll=self.write("QelShellExt.dll", dll))
+        _, document = self.doctor()
+        self.assertEqual({each["version"] for each in document["classes"]}, {"1.2.3"})
+
     def test_tells_that_the_dll_was_moved_away(self):
         dll = self.write("it's here, ä Ω/QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
         self.register(dll=dll)
@@ -749,6 +827,13 @@ class Doctor(Test):
         missing = [".raw property store", (".raw", "property store")] + [
             (kind, role) for kind in told for role in ("thumbnail", "info tip", "properties")]
         self.assertWorksBut(document, dict.fromkeys(missing, "not registered"))
+
+    def test_tells_that_the_dll_is_missing_also_where_a_kind_was_left_out(self):
+        self.register()
+        self.leave_out("ser")
+        self.set_dll(self.folder / "gone.dll", self.EXTENSION)
+        document = self.assertProblem("gone.dll", "is not found")
+        self.assertEqual(list(self.left_out(document)), [".ser"])
 
     def test_tells_of_a_file_whose_kind_was_left_out_that_windows_does_not_ask(self):
         self.register()
