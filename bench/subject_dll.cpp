@@ -11,6 +11,7 @@
 #include <map>
 
 #include "com_ptr.h"
+#include "property_table.h"
 #include "server_dll.h"
 #include "subject.h"
 
@@ -21,14 +22,6 @@ using Com::ComPtr;
 using Testing::kMrcHandlerClass;
 using Testing::kRawHandlerClass;
 using Testing::kShellExtClass;
-
-constexpr GUID kSummarySet = {0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0x00, 0x2B, 0x27, 0xB3, 0xD9}};
-constexpr GUID kImageSet = {0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
-
-/// What the extension publishes, as column, property and property key alike.
-constexpr PROPERTYKEY kProperties[] = {
-    {kImageSet, 3}, {kImageSet, 4}, {kImageSet, 7}, {kImageSet, 12}, {kImageSet, 13}, {kSummarySet, 6},
-};
 
 template <class Interface>
 ComPtr<Interface> Create(const CLSID& clsid, const IID& iid) {
@@ -58,10 +51,10 @@ bool ReadColumns(const std::wstring& path) {
   const auto provider = Create<IColumnProvider>(kShellExtClass, IID_IColumnProvider);
   SHCOLUMNDATA file{};
   path.copy(file.wszFile, std::size(file.wszFile) - 1);
-  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const SHCOLUMNID& column) {
+  return std::ranges::all_of(kProperties, [&](const Property& property) {
     VARIANT value;
     VariantInit(&value);
-    const HRESULT result = provider->GetItemData(&column, &file, &value);
+    const HRESULT result = provider->GetItemData(&property.key, &file, &value);
     VariantClear(&value);
     return result == S_OK;
   });
@@ -70,15 +63,15 @@ bool ReadColumns(const std::wstring& path) {
 /// All properties of both legacy property sets.
 bool ReadPropertySets(const std::wstring& path) {
   const auto sets = Load<IPropertySetStorage>(path, IID_IPropertySetStorage);
-  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const PROPERTYKEY& key) {
+  return std::ranges::all_of(kProperties, [&](const Property& property) {
     ComPtr<IPropertyStorage> storage;
-    if (sets->Open(key.fmtid, STGM_READ, storage.Put()) != S_OK) return false;
-    PROPSPEC property{};
-    property.ulKind = PRSPEC_PROPID;
-    property.propid = key.pid;
+    if (sets->Open(property.key.fmtid, STGM_READ, storage.Put()) != S_OK) return false;
+    PROPSPEC specifier{};
+    specifier.ulKind = PRSPEC_PROPID;
+    specifier.propid = property.key.pid;
     PROPVARIANT value;
     PropVariantInit(&value);
-    const HRESULT result = storage->ReadMultiple(1, &property, &value);
+    const HRESULT result = storage->ReadMultiple(1, &specifier, &value);
     PropVariantClear(&value);
     return result == S_OK;
   });
@@ -97,10 +90,10 @@ bool ReadPropertyStore(const std::wstring& path) {
   handler->Initialize(stream.Get(), STGM_READ);
   ComPtr<IPropertyStore> store;
   handler->QueryInterface(IID_IPropertyStore, reinterpret_cast<void**>(store.Put()));
-  return std::all_of(std::begin(kProperties), std::end(kProperties), [&](const PROPERTYKEY& key) {
+  return std::ranges::all_of(kProperties, [&](const Property& property) {
     PROPVARIANT value;
     PropVariantInit(&value);
-    const HRESULT result = store->GetValue(key, &value);
+    const HRESULT result = store->GetValue(property.key, &value);
     PropVariantClear(&value);
     return result == S_OK;
   });

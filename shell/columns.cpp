@@ -1,9 +1,6 @@
 #include "columns.h"
 
 #include <algorithm>
-#include <array>
-#include <cstdint>
-#include <cwchar>
 #include <fstream>
 #include <iterator>
 #include <memory>
@@ -11,62 +8,51 @@
 #include <string>
 
 #include "file_type_factory.h"
-#include "metadata.h"
 #include "path_stream.h"
-#include "string_ids.h"
+#include "property_table.h"
 #include "text.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// How a column presents itself. Numbers sort as texts and the declared types are not those of the values
-/// (metadata.cpp): that is how the shell knows these columns, and it is to stay.
-struct Column {
-  VARTYPE declaredType;
-  UINT width;  // in characters
-  DWORD state;
-  std::uint32_t title;
-};
-
-constexpr DWORD kText = SHCOLSTATE_TYPE_STR;
-constexpr DWORD kHiddenText = SHCOLSTATE_TYPE_STR | SHCOLSTATE_HIDDEN;
-constexpr DWORD kShownText = SHCOLSTATE_TYPE_STR | SHCOLSTATE_ONBYDEFAULT;
-
-/// In the order of kListedProperties.
-constexpr std::array<Column, kListedProperties.size()> kColumns{{
-    {VT_I4, 5, kHiddenText, IDS_WIDTH},
-    {VT_I4, 5, kHiddenText, IDS_HEIGHT},
-    {VT_UI4, 5, kText, IDS_BIT_DEPTH},
-    {VT_UI4, 5, kText, IDS_FRAME_COUNT},
-    {VT_LPWSTR, 20, kShownText, IDS_DIMENSIONS},
-    {VT_LPWSTR, 30, kShownText, IDS_COMMENTS},
-}};
+/// Returns the key of the property that a column shows. The resolutions, which no column declares, are
+/// answered with the size in pixels: clients that ask for them expect a number.
+PROPERTYKEY ShownKey(const SHCOLUMNID& column) {
+  constexpr PROPID kHorizontalResolutionId = 5;
+  constexpr PROPID kVerticalResolutionId = 6;
+  PROPERTYKEY key = column;
+  if (key.fmtid == kImageSummarySet && key.pid == kHorizontalResolutionId) key.pid = kWidthId;
+  if (key.fmtid == kImageSummarySet && key.pid == kVerticalResolutionId) key.pid = kHeightId;
+  return key;
+}
 
 std::wstring PathOf(const SHCOLUMNDATA& item) {
   return {std::begin(item.wszFile), std::find(std::begin(item.wszFile), std::end(item.wszFile), L'\0')};
 }
 
-std::optional<Metadatum> FindInFile(const std::wstring& path, const PROPERTYKEY& key) {
+/// Returns nothing for a property that no column has, and for a file that has no valid reader.
+std::optional<Metadatum> ReadFromFile(const std::wstring& path, const SHCOLUMNID& column) {
   std::ifstream stream;
   OpenPath(stream, path.c_str());
-  const std::unique_ptr<FileTypeInfo> file = CreateFileTypeInfo(stream, GetExtension(path));
-  if (file == nullptr || !file->IsValid()) return std::nullopt;
-  return FindMetadatum(View::kColumn, *file, key);
+  const std::unique_ptr<FileTypeInfo> reader = CreateFileTypeInfo(stream, GetExtension(path));
+  const Property* const property = FindProperty(ShownKey(column));
+  if (reader == nullptr || !reader->IsValid() || property == nullptr) return std::nullopt;
+  return property->value(*reader);
 }
 
 }  // namespace
 
 HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info) {
-  if (index >= kColumns.size()) return S_FALSE;
+  if (index >= kProperties.size()) return S_FALSE;
   if (info == nullptr) return E_POINTER;
-  const Column& column = kColumns[index];
-  const std::wstring title = LoadResourceString(column.title);
+  const Property& property = kProperties[index];
+  const std::wstring title = LoadResourceString(property.title);
   *info = {};
-  info->scid = kListedProperties[index];
-  info->vt = column.declaredType;
+  info->scid = property.key;
+  info->vt = property.declaredType;
   info->fmt = LVCFMT_LEFT;
-  info->cChars = column.width;
-  info->csFlags = column.state;
+  info->cChars = property.width;
+  info->csFlags = property.state;
   title.copy(info->wszTitle, std::size(info->wszTitle) - 1);
   return S_OK;
 }
@@ -74,11 +60,12 @@ HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info) {
 HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* value) {
   if (column.fmtid != kImageSummarySet && column.fmtid != kSummarySet) return S_FALSE;
   if (item == nullptr) return E_POINTER;
-  const std::optional<Metadatum> found = FindInFile(PathOf(*item), column);
+  const std::optional<Metadatum> found = ReadFromFile(PathOf(*item), column);
   if (!found) return S_FALSE;
   if (value == nullptr) return E_POINTER;
   if (const HRESULT result = VariantClear(value); FAILED(result)) return result;
-  return ToColumnValue(*found, *value);
+  // The number type that every automation client knows.
+  return ToAutomationValue(*found, VT_I4, *value);
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -8,7 +8,6 @@
 #include <cstring>
 
 #include "com_ptr.h"
-#include "metadata.h"
 #include "string_ids.h"
 #include "text.h"
 
@@ -56,20 +55,31 @@ std::wstring FileLines(const std::wstring& path) {
   return lines;
 }
 
-std::wstring TipText(const FileTypeInfo& file, const std::wstring& path) {
-  std::wstring text = Label(IDS_DIMENSIONS) + TipDimensions(file);
-  text += L"\r\n" + Label(IDS_TYPE) + file.GetTypeDescription();
+/// "61 images (4096 \u00D7 4096) 16 bit signed". People read it and no program, hence the multiplication sign
+/// and not the letter x of the properties.
+std::wstring Dimensions(const FileTypeInfo& reader) {
+  const std::int32_t frames = reader.GetFrameCount();
+  const Size2 size = reader.GetDimensions();
+  std::wstring text;
+  if (frames > 1) text = std::to_wstring(frames) + L" " + LoadResourceString(IDS_IMAGES) + L" ";
+  text += L"(" + std::to_wstring(size.width) + L" \u00D7 " + std::to_wstring(size.height) + L") ";
+  return text + reader.GetDataTypeName();
+}
+
+std::wstring TipText(const FileTypeInfo& reader, const std::wstring& path) {
+  std::wstring text = Label(IDS_DIMENSIONS) + Dimensions(reader);
+  text += L"\r\n" + Label(IDS_TYPE) + reader.GetTypeDescription();
   text += FileLines(path);
-  if (const std::wstring comment = file.GetComment(); !comment.empty()) text += L"\r\n" + comment;
+  if (const std::wstring comment = reader.GetComment(); !comment.empty()) text += L"\r\n" + comment;
   return text;
 }
 
 }  // namespace
 
-HRESULT MakeInfoTip(const FileTypeInfo& file, const std::wstring& path, wchar_t** tip) {
+HRESULT MakeInfoTip(const FileTypeInfo& reader, const std::wstring& path, wchar_t** tip) {
   Com::ComPtr<IMalloc> allocator;
   if (const HRESULT result = SHGetMalloc(allocator.Put()); FAILED(result)) return result;
-  const std::wstring text = TipText(file, path);
+  const std::wstring text = TipText(reader, path);
   const std::size_t bytes = (text.size() + 1) * sizeof(wchar_t);
   void* const copy = allocator->Alloc(bytes);
   if (copy == nullptr) return E_OUTOFMEMORY;

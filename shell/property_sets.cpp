@@ -2,25 +2,25 @@
 
 #include <algorithm>
 #include <iterator>
-#include <optional>
 #include <tuple>
 
 #include "com_object.h"
-#include "metadata.h"
 #include "property_storage.h"
+#include "property_table.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-HRESULT AddPropertySet(const FileTypeInfo& file, const FMTID& set, PropertySets& sets) {
+HRESULT AddPropertySet(const FileTypeInfo& reader, const FMTID& set, PropertySets& sets) {
   Com::ComPtr<Com::CComObject<CPropertyStorage>> storage;
   HRESULT result = Com::MakeObject(storage);
   if (FAILED(result)) return result;
-  for (const PROPERTYKEY& key : kListedProperties) {
-    if (key.fmtid != set) continue;
+  for (const Property& property : kProperties) {
+    if (property.key.fmtid != set) continue;
     PropertyValue value;
-    result = ToPropertySetValue(FindMetadatum(View::kPropertySet, file, key).value(), value.Put());
-    if (SUCCEEDED(result)) result = storage->Add(key.pid, value.Get());
+    // The machine integer is the type of number that these sets have always announced in their enumerators.
+    result = ToAutomationValue(property.value(reader), VT_INT, value.Put());
+    if (SUCCEEDED(result)) result = storage->Add(property.key.pid, value.Get());
     if (FAILED(result)) return result;
   }
   sets.emplace(set, storage.Get());
@@ -36,10 +36,10 @@ bool FormatIdLess::operator()(const FMTID& a, const FMTID& b) const {
                                       std::end(b.Data4));
 }
 
-HRESULT BuildPropertySets(const FileTypeInfo& file, std::shared_ptr<const PropertySets>& sets) {
+HRESULT BuildPropertySets(const FileTypeInfo& reader, std::shared_ptr<const PropertySets>& sets) {
   const auto built = std::make_shared<PropertySets>();
   for (const FMTID& set : {kSummarySet, kImageSummarySet}) {
-    if (const HRESULT result = AddPropertySet(file, set, *built); FAILED(result)) return result;
+    if (const HRESULT result = AddPropertySet(reader, set, *built); FAILED(result)) return result;
   }
   sets = built;
   return S_OK;

@@ -20,8 +20,9 @@ struct FormatIdLess {
 
 using PropertySets = std::map<FMTID, Com::ComPtr<IPropertyStorage>, FormatIdLess>;
 
-/// Makes the sets of a valid file: the summary, which holds the comment, and the image summary, which holds
-/// everything else. Fails with what a part of them fails with; `sets` is written on success only.
-HRESULT BuildPropertySets(const FileTypeInfo& file, std::shared_ptr<const PropertySets>& sets);
+/// Makes the sets of the valid file that `reader` reads: the summary, which holds the comment, and the image
+/// summary, which holds everything else. Fails with what a part of them fails with; `sets` is written on
+/// success only.
+HRESULT BuildPropertySets(const FileTypeInfo& reader, std::shared_ptr<const PropertySets>& sets);
 
 }  // namespace Qel::Lumetra::ShellExt

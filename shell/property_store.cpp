@@ -1,13 +1,14 @@
 #include "property_store.h"
 
+#include <shlwapi.h>
+
 #include <cstddef>
 #include <cstring>
 #include <mutex>
-#include <optional>
 
 #include "ebn_file_info.h"
-#include "metadata.h"
 #include "mrc_file_info.h"
+#include "property_table.h"
 #include "raw_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -18,6 +19,21 @@ namespace {
 constexpr std::size_t kBufferBytes = 4 + 1024;
 
 constexpr HRESULT kNoCount = 6;
+
+/// Makes a value of the types by which the property system declares the properties: unsigned numbers, and
+/// strings of the task allocator. `value` is written on success only.
+HRESULT ToStoreValue(const Metadatum& metadatum, PROPVARIANT& value) {
+  PROPVARIANT made{};
+  if (const auto* const text = std::get_if<std::wstring>(&metadatum)) {
+    made.vt = VT_LPWSTR;
+    if (const HRESULT result = SHStrDupW(text->c_str(), &made.pwszVal); FAILED(result)) return result;
+  } else {
+    made.vt = VT_UI4;
+    made.ulVal = static_cast<ULONG>(std::get<std::int32_t>(metadatum));
+  }
+  value = made;
+  return S_OK;
+}
 
 }  // namespace
 
@@ -38,8 +54,8 @@ HRESULT CShellExtVista::GetCount(DWORD* count) {
 
 HRESULT CShellExtVista::GetAt(DWORD index, PROPERTYKEY* key) {
   if (key == nullptr) return E_POINTER;
-  const bool isListed = index < kListedProperties.size();
-  *key = isListed ? kListedProperties[index] : PROPERTYKEY{};
+  const bool isListed = index < kProperties.size();
+  *key = isListed ? kProperties[index].key : PROPERTYKEY{};
   return isListed ? S_OK : E_UNEXPECTED;
 }
 
@@ -48,8 +64,8 @@ HRESULT CShellExtVista::GetValue(REFPROPERTYKEY key, PROPVARIANT* value) {
   if (reader_ == nullptr || !reader_->IsValid()) return E_FAIL;
   if (value == nullptr) return E_POINTER;
   std::memset(value, 0, sizeof *value);
-  const std::optional<Metadatum> found = FindMetadatum(View::kPropertyStore, *reader_, key);
-  return found ? ToPropertyStoreValue(*found, *value) : E_UNEXPECTED;
+  const Property* const property = FindProperty(key);
+  return property != nullptr ? ToStoreValue(property->storeValue(*reader_), *value) : E_UNEXPECTED;
 }
 
 HRESULT CShellExtVista::Commit() {

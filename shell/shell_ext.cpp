@@ -19,23 +19,23 @@ HRESULT CShellExt::GetLocation(LPWSTR, DWORD, DWORD*, const SIZE* size, DWORD, D
 
 HRESULT CShellExt::Extract(HBITMAP* thumbnail) {
   if (thumbnail == nullptr) return E_POINTER;
-  if (!HasValidFile()) return E_FAIL;
-  *thumbnail = info_->CreateThumbnail(thumbnailSize_);
+  if (!HasValidReader()) return E_FAIL;
+  *thumbnail = reader_->CreateThumbnail(thumbnailSize_);
   return *thumbnail != nullptr ? S_OK : E_FAIL;
 }
 
 HRESULT CShellExt::Load(LPCOLESTR path, DWORD) {
   OpenPath(stream_, path);
   std::wstring newPath = path != nullptr ? path : L"";
-  info_ = CreateFileTypeInfo(stream_, GetExtension(newPath));
+  reader_ = CreateFileTypeInfo(stream_, GetExtension(newPath));
   path_ = std::move(newPath);
   propertySets_.reset();
   return S_OK;
 }
 
 HRESULT CShellExt::GetInfoTip(DWORD, WCHAR** tip) {
-  if (!HasValidFile()) return E_FAIL;
-  return tip != nullptr ? MakeInfoTip(*info_, path_, tip) : E_POINTER;
+  if (!HasValidReader()) return E_FAIL;
+  return tip != nullptr ? MakeInfoTip(*reader_, path_, tip) : E_POINTER;
 }
 
 HRESULT CShellExt::GetInfoFlags(DWORD* flags) {
@@ -68,7 +68,7 @@ HRESULT CShellExt::Enum(IEnumSTATPROPSETSTG** enumerator) {
 
 HRESULT CShellExt::BuildPropertySetsOnce() {
   if (propertySets_ != nullptr) return S_OK;
-  return HasValidFile() ? BuildPropertySets(*info_, propertySets_) : E_FAIL;
+  return HasValidReader() ? BuildPropertySets(*reader_, propertySets_) : E_FAIL;
 }
 
 }  // namespace Qel::Lumetra::ShellExt

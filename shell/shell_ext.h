@@ -68,12 +68,12 @@ class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPers
   ~CShellExt() = default;
 
  private:
-  bool HasValidFile() const { return info_ && info_->IsValid(); }
+  bool HasValidReader() const { return reader_ && reader_->IsValid(); }
 
   HRESULT BuildPropertySetsOnce();
 
   std::ifstream stream_;
-  std::unique_ptr<FileTypeInfo> info_;  // reads from stream_, and goes before it
+  std::unique_ptr<FileTypeInfo> reader_;  // reads from stream_, and goes before it
   std::wstring path_;
   SIZE thumbnailSize_{128, 128};
   std::shared_ptr<const PropertySets> propertySets_;  // null until asked for; shared with the enumerators

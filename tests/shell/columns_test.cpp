@@ -129,6 +129,11 @@ TEST_F(Columns, OfRaw) {
   EXPECT_EQ(Read(file, kCommentsKey), Text(VT_BSTR, L""));
 }
 
+TEST_F(Columns, GiveANegativeNumberAsItIs) {
+  const auto file = folder_.Write(L"negative.raw", RawFile{.width = -2}.Bytes());
+  EXPECT_EQ(Read(file, kWidthKey), Number(VT_I4, -2));
+}
+
 TEST_F(Columns, OfEbn) {
   const EbnFile ebn{.typeCode = 8, .width = 3, .height = 2, .model = 1, .source = 1, .kilovolts = 200};
   const auto file = folder_.Write(L"image.ebn", ebn.Bytes());

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "mrc_file.h"
+#include "raw_file.h"
 #include "server_dll.h"
 #include "shell_values.h"
 #include "temp_folder.h"
@@ -100,6 +101,12 @@ TEST_F(PropertySet, OfImageSummaryHasFiveProperties) {
   EXPECT_EQ(Read(storage, 7), Number(VT_INT, 16));
   EXPECT_EQ(Read(storage, 12), Number(VT_INT, 61));
   EXPECT_EQ(Read(storage, 13), Text(VT_BSTR, L"512 x 256"));
+}
+
+TEST_F(PropertySet, GivesANegativeNumberAsItIs) {
+  const Sets sets = Make();
+  Load(sets, folder_.Write(L"negative.raw", RawFile{.width = -2}.Bytes()));
+  EXPECT_EQ(Read(Open(sets, kImageSummary), 3), Number(VT_INT, -2));
 }
 
 TEST_F(PropertySet, OfSummaryHasTheComment) {

@@ -142,6 +142,13 @@ TEST_F(PropertyStore, OfRawHasTheSixProperties) {
   EXPECT_EQ(Read(handler, kCommentsKey), Text(VT_LPWSTR, L""));
 }
 
+TEST_F(PropertyStore, GivesANegativeNumberAsAnUnsignedOne) {
+  ScriptedStream stream(RawFile{.width = -2}.Bytes());
+  const Handler handler = Open(stream, kRawHandlerClass);
+  EXPECT_EQ(Read(handler, kWidthKey), Number(VT_UI4, 0xFFFFFFFE));
+  EXPECT_EQ(Read(handler, kDimensionsKey), Text(VT_LPWSTR, L"(-2 x 1) 8 bit unsigned"));
+}
+
 TEST_F(PropertyStore, WritesSizesWithoutGrouping) {
   ScriptedStream stream(MrcBytes(2048, 1234567, 1, 2));
   EXPECT_EQ(Read(Open(stream), kDimensionsKey), Text(VT_LPWSTR, L"(2048 x 1234567) 32 bit float"));

@@ -14,16 +14,13 @@
 #include "file_type_factory.h"
 #include "handle_owner.h"
 #include "png.h"
+#include "property_table.h"
 #include "same_text.h"
 #include "text_tools.h"
 #include "value_text.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
-
-constexpr GUID kSummarySet = {0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0x00, 0x2B, 0x27, 0xB3, 0xD9}};
-constexpr GUID kImageSummarySet = {
-    0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
 
 /// The bound of a list that the extension ends itself.
 constexpr DWORD kMaxItems = 64;
@@ -73,30 +70,6 @@ HRESULT LoadFile(const ExtensionClient& client, const std::wstring& path, ComPtr
   return result;
 }
 
-struct KnownProperty {
-  const GUID& set;
-  DWORD id;
-  const wchar_t* canonicalName;
-  const wchar_t* plainName;
-};
-
-/// The properties that the extension publishes. The names are the platform's.
-constexpr KnownProperty kKnownProperties[] = {
-    {kImageSummarySet, 3, L"System.Image.HorizontalSize", L"Width"},
-    {kImageSummarySet, 4, L"System.Image.VerticalSize", L"Height"},
-    {kImageSummarySet, 7, L"System.Image.BitDepth", L"Bit depth"},
-    {kImageSummarySet, 12, L"System.Media.FrameCount", L"Frame count"},
-    {kImageSummarySet, 13, L"System.Image.Dimensions", L"Dimensions"},
-    {kSummarySet, 6, L"System.Comment", L"Comments"},
-};
-
-const KnownProperty* FindProperty(const GUID& set, DWORD id) {
-  for (const KnownProperty& known : kKnownProperties) {
-    if (known.id == id && known.set == set) return &known;
-  }
-  return nullptr;
-}
-
 /// The value of a column, or why there is none.
 void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDATA& file, Column& column) {
   ColumnValue value;
@@ -120,7 +93,7 @@ HRESULT ReadPropertySet(IPropertySetStorage& sets, const GUID& format, std::vect
   while (enumerator->Next(1, &entry, &fetched) == S_OK && fetched == 1) {
     CoTaskMemFree(entry.lpwstrName);
     Property property;
-    const KnownProperty* const known = FindProperty(format, entry.propid);
+    const ShellExt::Property* const known = FindProperty({format, entry.propid});
     property.name = known == nullptr ? L"" : known->plainName;
     property.set = GuidText(format);
     property.id = entry.propid;
@@ -254,7 +227,7 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
     PROPERTYKEY key{};
     for (DWORD index = 0; index < kMaxItems && store->GetAt(index, &key) == S_OK; ++index) {
       Property property;
-      const KnownProperty* const known = FindProperty(key.fmtid, key.pid);
+      const ShellExt::Property* const known = FindProperty(key);
       property.name = known == nullptr ? L"" : known->canonicalName;
       property.set = GuidText(key.fmtid);
       property.id = key.pid;
