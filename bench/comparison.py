@@ -37,7 +37,7 @@ def commands(frame, folder):
     return {
         "vips shrink, a command": ["vips", "shrink", "frame.v", "other.v", str(factor), str(factor)],
         "convert -scale, a command":
-            ["convert", "-size", f"{frame.width}x{frame.height}+{frame.block_position}", "-depth", depth,
+            ["/usr/bin/convert", "-size", f"{frame.width}x{frame.height}+{frame.block_position}", "-depth", depth,
              *floats, "-endian", "LSB", f"gray:{frame.file}", "-scale", small, "-auto-level", "other.png"],
     }
 

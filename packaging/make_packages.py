@@ -34,6 +34,10 @@ HERE = pathlib.Path(__file__).resolve().parent
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 TEXTS = ("README.txt", "NOTICES.txt")
 
+# What the programs are compiled with, and the libraries that NOTICES.txt names; gdtoa is in libmingwex.
+COMPILER = "x86_64-w64-mingw32-g++-posix"
+LIBRARIES = ("libgcc.a", "libstdc++.a", "libssp.a", "libmingw32.a", "libmingwex.a", "libwinpthread.a")
+
 # What makes a product of Windows Installer another version of this one. Never to be changed.
 UPGRADE_CODE = uuid.UUID("{D5320353-60A9-41CE-A794-4CBF1BCBA0D4}")
 
@@ -57,6 +61,7 @@ def run(*command, **options):
                             stderr=subprocess.STDOUT, text=True, **options)
     if result.returncode != 0:
         fail(f"{command[0]} failed: {result.stdout.strip()}")
+    return result.stdout
 
 
 class Project:
@@ -67,6 +72,17 @@ class Project:
         self.version, self.description = (
             re.search(rf"^CMAKE_PROJECT_{name}:STATIC=(.*)$", cache, re.MULTILINE)[1]
             for name in ("VERSION", "DESCRIPTION"))
+
+
+def library_packages():
+    """The Debian packages that contain the libraries, with their versions, one a line."""
+    lines = set()
+    for library in LIBRARIES:
+        path = os.path.realpath(run(COMPILER, f"-print-file-name={library}").strip())
+        package = run("dpkg-query", "--search", path).partition(":")[0]
+        version = run("dpkg-query", "--show", "--showformat=${Version}", package)
+        lines.add(f"  {package} {version}")
+    return "\n".join(sorted(lines))
 
 
 class Signing:
@@ -201,9 +217,11 @@ def make_packages(build, out, epoch):
         for program in PROGRAMS:
             shutil.copyfile(build / program, content / program)
             signing.sign(content / program)
+        packages_used = library_packages()
         for text in TEXTS:
+            contents = (HERE / text).read_text().replace("@PACKAGES@", packages_used)
             # For editors that know no other line ends.
-            (content / text).write_bytes((HERE / text).read_bytes().replace(b"\n", b"\r\n"))
+            (content / text).write_text(contents, newline="\r\n")
         make_msi(content, build / "registration" / "scripts", project, epoch, packages[0])
         signing.sign(packages[0])
         make_zip(packages[1], [content / name for name in (*PROGRAMS, *TEXTS)], epoch)

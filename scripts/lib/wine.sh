@@ -8,8 +8,8 @@ export WINEPREFIX=${QEL_WINEPREFIX-$root/build/wine}
 export WINEARCH=win64
 export LC_ALL=C.UTF-8 # in another character set Wine mangles the letters of paths
 export WINEDEBUG=-all
-# No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types.
-export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe="
+# No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types, no Wayland.
+export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe,winewayland.drv="
 
 # Pipes are closed, as Wine's services inherit them and would keep whoever reads them waiting.
 wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }

@@ -108,6 +108,18 @@ class Contents(Test):
             for program in PROGRAMS:
                 self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
 
+    def test_name_the_versions_of_the_libraries_in_the_programs(self):
+        archive = package(self.out, ".zip")
+        with zipfile.ZipFile(archive) as files:
+            notices = files.read(f"{archive.stem}/NOTICES.txt").decode()
+        compiler = re.search(r"^  g\+\+-mingw-w64-x86-64-posix (\d+)\.", notices, re.MULTILINE)[1]
+        for program in PROGRAMS:
+            self.assertIn(f"GCC: (GNU) {compiler}-posix".encode(), (BUILD / program).read_bytes())
+        runtime = re.search(r"^  mingw-w64-x86-64-dev (\d+)\.", notices, re.MULTILINE)[1]
+        headers = subprocess.run(["x86_64-w64-mingw32-g++-posix", "-E", "-P", "-x", "c++", "-"], check=True, text=True,
+                                 input="#include <_mingw_mac.h>\n__MINGW64_VERSION_MAJOR", capture_output=True).stdout
+        self.assertEqual(runtime, headers.split()[-1])
+
     def test_that_cannot_be_made_are_told_in_one_sentence(self):
         file = self.folder / "file"
         file.touch()

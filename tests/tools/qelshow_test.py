@@ -253,6 +253,7 @@ class ExitStatus(Test):
         self.assertFalse((self.folder / "out.png").exists())
 
     def test_what_cannot_be_printed_is_a_failure(self):
+        self.assertTrue(pathlib.Path("/dev/full").is_char_device(), "/dev/full is no device on this machine")
         path = self.write("a.mrc", mrc())
         for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-"),
                           ("page", path, "--out", self.folder / "page")):
