@@ -14,9 +14,9 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// What the C++ runtime asks for when it starts and ends: memory, and from the environment how much of it; its
-/// own locks, the classification of all characters, the streams of the console, a slot for exceptions, and a
-/// random number for the protection of the stack.
+/// What the C++ runtime asks for when it starts and ends: memory, and from the environment how much of it;
+/// its own locks, the classification of all characters, the streams of the console, a slot for exceptions,
+/// and a random number for the protection of the stack.
 const std::set<std::string> kRuntime = {
     "AcquireSRWLockExclusive",
     "FlsAlloc",
