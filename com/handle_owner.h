@@ -1,4 +1,4 @@
-// Owns a handle of the system, as ComPtr owns an interface: for programs and tests that use Windows directly.
+// Owns a handle of the system, as ComPtr owns an interface.
 #pragma once
 
 #include <windows.h>

@@ -18,7 +18,7 @@
 /// has been given a buffer, it is at its end and writes nothing. Nothing is thrown for failures of the COM
 /// stream: they end the input or fail the output.
 ///
-/// One array serves both directions. The get area lies behind a reserve of four characters, which keeps what
+/// One array serves both directions. The get area follows a reserve of four characters, which keeps what
 /// was read last across a refill; the put area begins at the first character and leaves the last one free
 /// for the character that overflow brings. Input and output are therefore not to be mixed.
 template <class Char, class Traits = std::char_traits<Char>, class Allocator = std::allocator<Char>>

@@ -9,7 +9,7 @@ void SkipBytes(std::istream& stream, std::uint32_t count) {
   std::array<char, 512> bytes;
   std::streamsize rest = count;
   if (count > bytes.size()) {
-    // A file can be positioned behind its end. Its last byte tells whether the part is there.
+    // A position after the end of a file is valid. Its last byte tells whether the part is there.
     stream.seekg(rest - 1, std::ios_base::cur);
     rest = 1;
   }

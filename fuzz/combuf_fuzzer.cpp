@@ -16,7 +16,7 @@ using Qel::Lumetra::ShellExt::Testing::ScriptedStream;
 using Traits = std::char_traits<char>;
 
 constexpr HRESULT kResults[] = {S_OK, S_FALSE, E_FAIL, STG_E_READFAULT, STG_E_ACCESSDENIED};
-constexpr std::size_t kMostBytes = 3000;
+constexpr std::size_t kMaxBytes = 3000;
 
 void Require(bool condition, const char* what) {
   if (condition) return;
@@ -63,9 +63,9 @@ class Reader {
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   FuzzedDataProvider input(data, size);
-  ScriptedStream stream(input.ConsumeRandomLengthString(kMostBytes));
-  stream.mostPerRead = input.ConsumeIntegralInRange<ULONG>(1, kMostBytes);
-  stream.mostPerWrite = input.ConsumeIntegralInRange<ULONG>(0, kMostBytes);
+  ScriptedStream stream(input.ConsumeRandomLengthString(kMaxBytes));
+  stream.maxPerRead = input.ConsumeIntegralInRange<ULONG>(1, kMaxBytes);
+  stream.maxPerWrite = input.ConsumeIntegralInRange<ULONG>(0, kMaxBytes);
   stream.failingRead = input.ConsumeIntegralInRange<int>(0, 20);
   stream.endResult = input.PickValueInArray(kResults);
   stream.writeResult = input.PickValueInArray(kResults);
@@ -74,7 +74,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (!honest) stream.overclaim = input.ConsumeIntegral<ULONG>();
   {
     basic_combuf<char> buffer;
-    buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes));
+    buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMaxBytes));
     buffer.Attach(&stream);
     Reader reader(buffer, stream);
     // Reading and writing share the buffer's memory and are not mixed by those who care for the bytes.
@@ -86,7 +86,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         case 1: compares ? reader.Peek() : void(buffer.sgetc()); break;
         case 2: compares ? reader.PutBack() : void(buffer.sungetc()); break;
         case 3: {
-          const auto count = input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes);
+          const auto count = input.ConsumeIntegralInRange<std::size_t>(0, kMaxBytes);
           std::string bytes(count, '\0');
           compares ? reader.Read(count) : void(buffer.sgetn(bytes.data(), std::streamsize(count)));
           break;
@@ -101,13 +101,13 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
           reader.Restart();
           break;
         case 6:
-          buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMostBytes));
+          buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMaxBytes));
           reader.Restart();
           break;
         case 7: buffer.sputbackc(input.ConsumeIntegral<char>()); break;
         case 8: buffer.sputc(input.ConsumeIntegral<char>()); break;
         case 9: {
-          const std::string bytes = input.ConsumeRandomLengthString(kMostBytes);
+          const std::string bytes = input.ConsumeRandomLengthString(kMaxBytes);
           buffer.sputn(bytes.data(), static_cast<std::streamsize>(bytes.size()));
           break;
         }

@@ -20,12 +20,12 @@ void Require(bool condition, const char* what) {
 }
 
 void CheckKeys(const RegistryScript& script) {
-  std::size_t mostDepth = 0;  // of the next key
+  std::size_t maxDepth = 0;  // of the next key
   for (const ScriptKey& key : script) {
-    Require(key.depth <= mostDepth, "a key stands in no other key");
+    Require(key.depth <= maxDepth, "a key stands in no other key");
     Require(key.depth < kMaxKeyNesting, "a key is nested too deeply");
     Require(!key.name.empty() && key.name.find(L'\\') == std::wstring::npos, "a key's name is no name");
-    mostDepth = key.depth + 1;
+    maxDepth = key.depth + 1;
   }
 }
 

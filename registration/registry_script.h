@@ -18,7 +18,7 @@
 // keyword that is meant as a name is quoted. Scripts are plain ASCII, only replacements bring in other
 // letters.
 //
-// What becomes of the keys when a script is registered or unregistered is registrar.h's business. Nothing
+// registrar.h says what registering and unregistering do to the keys. Nothing
 // here calls Windows, so the parser is tested and fuzzed natively as well.
 #pragma once
 

@@ -1,5 +1,7 @@
 #include "windows_registry.h"
 
+#include "handle_owner.h"
+
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
@@ -16,39 +18,22 @@ HRESULT FromRemoval(LSTATUS status) {
   return isGone ? S_OK : FromStatus(status);
 }
 
-/// An open key, closed at the end of its scope.
-class OpenKey {
- public:
-  OpenKey() = default;
-  OpenKey(const OpenKey&) = delete;
-  OpenKey& operator=(const OpenKey&) = delete;
-  ~OpenKey() {
-    if (key_) RegCloseKey(key_);
-  }
-
-  HKEY get() const { return key_; }
-  HKEY* out() { return &key_; }
-
- private:
-  HKEY key_ = nullptr;
-};
-
 }  // namespace
 
 HRESULT WindowsRegistry::CreateKey(RegistryRoot root, const std::wstring& path) {
-  OpenKey key;
+  Com::OwnedKey key;
   return FromStatus(RegCreateKeyExW(RootKey(root), path.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE,
-                                    KEY_SET_VALUE, nullptr, key.out(), nullptr));
+                                    KEY_SET_VALUE, nullptr, key.Put(), nullptr));
 }
 
 HRESULT WindowsRegistry::SetValue(RegistryRoot root, const std::wstring& path, const std::wstring& name,
                                   const RegistryData& data) {
-  OpenKey key;
-  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.out());
+  Com::OwnedKey key;
+  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.Put());
   if (opened != ERROR_SUCCESS) return FromStatus(opened);
 
   const auto set = [&](DWORD type, const void* bytes, std::size_t size) {
-    return FromStatus(RegSetValueExW(key.get(), name.c_str(), 0, type, static_cast<const BYTE*>(bytes),
+    return FromStatus(RegSetValueExW(key.Get(), name.c_str(), 0, type, static_cast<const BYTE*>(bytes),
                                      static_cast<DWORD>(size)));
   };
   if (const auto* number = std::get_if<std::uint32_t>(&data)) {
@@ -63,24 +48,24 @@ HRESULT WindowsRegistry::DeleteTree(RegistryRoot root, const std::wstring& path)
 }
 
 HRESULT WindowsRegistry::DeleteValue(RegistryRoot root, const std::wstring& path, const std::wstring& name) {
-  OpenKey key;
-  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.out());
+  Com::OwnedKey key;
+  const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_SET_VALUE, key.Put());
   if (opened != ERROR_SUCCESS) return FromRemoval(opened);
-  return FromRemoval(RegDeleteValueW(key.get(), name.c_str()));
+  return FromRemoval(RegDeleteValueW(key.Get(), name.c_str()));
 }
 
 HRESULT WindowsRegistry::DeleteEmptyKey(RegistryRoot root, const std::wstring& path, bool ignoreDefault) {
   DWORD subkeys = 0;
   DWORD values = 0;
   {
-    OpenKey key;
-    const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_QUERY_VALUE, key.out());
+    Com::OwnedKey key;
+    const LSTATUS opened = RegOpenKeyExW(RootKey(root), path.c_str(), 0, KEY_QUERY_VALUE, key.Put());
     if (opened != ERROR_SUCCESS) return FromRemoval(opened);
-    const LSTATUS counted = RegQueryInfoKeyW(key.get(), nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr,
+    const LSTATUS counted = RegQueryInfoKeyW(key.Get(), nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr,
                                              &values, nullptr, nullptr, nullptr, nullptr);
     if (counted != ERROR_SUCCESS) return FromStatus(counted);
     const bool hasDefault =
-        RegQueryValueExW(key.get(), nullptr, nullptr, nullptr, nullptr, nullptr) == ERROR_SUCCESS;
+        RegQueryValueExW(key.Get(), nullptr, nullptr, nullptr, nullptr, nullptr) == ERROR_SUCCESS;
     if (ignoreDefault && hasDefault) --values;
   }
   if (subkeys > 0 || values > 0) return S_OK;

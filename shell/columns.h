@@ -7,7 +7,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Describes the column `index`, counted from 0. S_FALSE, with nothing written, behind the last one.
+/// Describes the column `index`, counted from 0. S_FALSE, with nothing written, after the last one.
 HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info);
 
 /// The value of a column for one file, in the place of what `value` held. The file is opened for this call

@@ -47,7 +47,7 @@ std::wstring FileLines(const std::wstring& path) {
   if (const std::wstring time = LocalTime(attributes.ftLastWriteTime); !time.empty()) {
     lines += L"\r\n" + Label(IDS_DATE_MODIFIED) + time;
   }
-  // The size is shown modulo 4 GiB: its high half is left out, and that is meant to stay so.
+  // The size is shown modulo 4 GiB, intentionally: its high half is left out.
   std::array<wchar_t, kTextRoom> size{};
   if (StrFormatByteSizeW(std::int64_t{attributes.nFileSizeLow}, size.data(), kTextRoom) != nullptr) {
     lines += L"\r\n" + Label(IDS_SIZE) + size.data();

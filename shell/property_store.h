@@ -31,7 +31,7 @@ class CShellExtVista : public Com::CComRoot<Com::FreeThreaded, IInitializeWithSt
   /// find none, and a caller that asks by key gets values.
   HRESULT STDMETHODCALLTYPE GetCount(DWORD* count) override;
 
-  /// Answers the six keys all the same; E_UNEXPECTED and the null key behind them.
+  /// Answers the six keys all the same; E_UNEXPECTED and the null key after them.
   HRESULT STDMETHODCALLTYPE GetAt(DWORD index, PROPERTYKEY* key) override;
 
   /// `value` need not be initialised, and is empty after every failure but that of a file that is not valid

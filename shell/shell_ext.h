@@ -22,8 +22,8 @@ namespace Qel::Lumetra::ShellExt {
 class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPersistFile, IQueryInfo,
                                        IColumnProvider, IPropertySetStorage> {
  public:
-  // IExtractImage. Every extraction is synchronous: of what GetLocation is told only the size is kept, and
-  // of what it can answer only the wish to have the thumbnail cached is given.
+  // IExtractImage. Every extraction is synchronous: GetLocation keeps the size, requests a cached thumbnail
+  // and ignores everything else.
   HRESULT STDMETHODCALLTYPE GetLocation(LPWSTR pathBuffer, DWORD length, DWORD* priority, const SIZE* size,
                                         DWORD colourDepth, DWORD* flags) override;
 

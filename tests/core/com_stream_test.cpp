@@ -43,7 +43,7 @@ TEST(ComBufferReading, BringsTheBytesInOrderForEveryBufferAndPieceSize) {
   for (const std::size_t size : {5u, 6u, 8u, 9u, 64u, 303u, 304u, 305u, 5000u}) {
     for (const ULONG piece : {1u, 2u, 3u, 7u, 299u, 1000u}) {
       ScriptedStream source(bytes);
-      source.mostPerRead = piece;
+      source.maxPerRead = piece;
       OpenBuffer buffer(source, size);
       EXPECT_EQ(ReadAll(buffer), bytes) << size << " " << piece;
       EXPECT_EQ(source.otherCalls, 0);
@@ -114,7 +114,7 @@ TEST(ComBufferReading, FailsAtEveryCallWithTheBytesBeforeItIntact) {
   const std::string bytes = Bytes(40);
   for (int failing = 1; failing <= 11; ++failing) {
     ScriptedStream source(bytes);
-    source.mostPerRead = 4;
+    source.maxPerRead = 4;
     source.failingRead = failing;
     OpenBuffer buffer(source, 12);
     EXPECT_EQ(ReadAll(buffer), bytes.substr(0, static_cast<std::size_t>(failing - 1) * 4));
@@ -124,7 +124,7 @@ TEST(ComBufferReading, FailsAtEveryCallWithTheBytesBeforeItIntact) {
 
 TEST(ComBufferReading, GoesOnAfterAFailureThatPasses) {
   ScriptedStream source(Bytes(8));
-  source.mostPerRead = 4;
+  source.maxPerRead = 4;
   source.failingRead = 2;
   OpenBuffer buffer(source, 12);
   EXPECT_EQ(ReadAll(buffer), Bytes(4));
@@ -164,7 +164,7 @@ TEST(ComBufferPutBack, HasNothingBeforeTheFirstCharacter) {
 TEST(ComBufferPutBack, GathersTheReserveFromPiecesOfOneByte) {
   const std::string bytes = Bytes(9);
   ScriptedStream source(bytes);
-  source.mostPerRead = 1;
+  source.maxPerRead = 1;
   OpenBuffer buffer(source, 12);
   for (int i = 0; i < 6; ++i) buffer.sbumpc();
   for (int i = 5; i >= 2; --i) EXPECT_EQ(buffer.sungetc(), i);
@@ -319,7 +319,7 @@ TEST(ComBufferWriting, FailsWithoutABuffer) {
 
 TEST(ComBufferWriting, TakesATooShortWriteForAFailure) {
   ScriptedStream sink("");
-  sink.mostPerWrite = 2;
+  sink.maxPerWrite = 2;
   OpenBuffer buffer(sink, 8);
   buffer.sputn("abc", 3);
   EXPECT_EQ(buffer.pubsync(), -1);
@@ -429,7 +429,7 @@ TEST(ComStream, FailsToSeekAndReadsOnAfterwards) {
 
 TEST(ComStream, EndsShortWhereTheStreamFails) {
   ScriptedStream source(Bytes(100));
-  source.mostPerRead = 10;
+  source.maxPerRead = 10;
   source.failingRead = 3;
   Stream stream;
   stream.rdbuf()->Allocate(64);

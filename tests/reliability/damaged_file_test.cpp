@@ -25,10 +25,10 @@ using Testing::PutField;
 using Testing::SampleFile;
 
 /// A lie in a header may cost this much more than the true file takes.
-constexpr std::int64_t kMostBytesForALie = 16 << 20;
+constexpr std::int64_t kMaxBytesForALie = 16 << 20;
 
 /// And a file of 100 bytes takes no more than this, whatever it says.
-constexpr std::int64_t kMostBytesForAHundred = 1 << 20;
+constexpr std::int64_t kMaxBytesForAHundred = 1 << 20;
 
 /// Two are enough for hundreds of thousands of files: a reduced picture, and one of every pixel.
 constexpr SIZE kRequests[] = {{3, 2}, {Testing::kLargestRequest, Testing::kLargestRequest}};
@@ -77,7 +77,7 @@ TEST_P(DamagedFile, EveryByteOfEveryValue) {
   const std::int64_t whole = Ask(sample.bytes);
   for (std::size_t i = 0; i < sample.bytes.size(); ++i) {
     for (int value = 0; value < 256; ++value) {
-      AskDamaged(sample, whole, kMostBytesForALie,
+      AskDamaged(sample, whole, kMaxBytesForALie,
                  [&](std::string& bytes) { bytes[i] = static_cast<char>(value); });
     }
   }
@@ -90,7 +90,7 @@ TEST_P(DamagedFile, EveryFieldOfBoundaryValues) {
     const std::size_t end = &sample == &samples_.front() ? sample.bytes.size() : kHeaderBytes;
     for (std::size_t i = 0; i + 4 <= std::min(end, sample.bytes.size()); ++i) {
       for (const std::uint32_t value : kBoundaryValues) {
-        AskDamaged(sample, whole, kMostBytesForALie, [&](std::string& bytes) { PutField(bytes, i, value); });
+        AskDamaged(sample, whole, kMaxBytesForALie, [&](std::string& bytes) { PutField(bytes, i, value); });
       }
     }
   }
@@ -110,7 +110,7 @@ TEST_P(DamagedFile, HundredBytesTakeAtMostAMebibyte) {
       const auto field = static_cast<std::size_t>(random.Between(0, 96));
       PutField(bytes, field, random.OneIn(2) ? pick(kSizes) : pick(kBoundaryValues));
     }
-    EXPECT_LE(Ask(bytes), kMostBytesForAHundred);
+    EXPECT_LE(Ask(bytes), kMaxBytesForAHundred);
   }
 }
 
@@ -139,7 +139,7 @@ TEST(SharedPixels, HundredBytesTakeAtMostAMebibyte) {
         Testing::MemoryBuffer buffer(bytes);
         std::istream stream(&buffer);
         const auto answers = Testing::AskEverything(stream, L"raw");
-        EXPECT_LE(meter.Peak(), kMostBytesForAHundred) << width << " x " << height;
+        EXPECT_LE(meter.Peak(), kMaxBytesForAHundred) << width << " x " << height;
         most = std::max(most, meter.Peak());
         thumbnails += answers.bitmaps;
       }

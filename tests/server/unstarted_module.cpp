@@ -8,7 +8,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-constexpr std::size_t kMostStubs = 1024;
+constexpr std::size_t kMaxStubs = 1024;
 
 template <class T>
 T* At(HMODULE module, std::size_t offset) {
@@ -44,7 +44,7 @@ UnstartedModule::UnstartedModule(const std::filesystem::path& dll)
   if (module_ == nullptr) throw std::runtime_error(dll.string() + " cannot be mapped");
   static_assert(offsetof(Stub, calls) == 8 + 8 && offsetof(Stub, function) == 14 + 10);
   stubs_ = static_cast<Stub*>(
-      VirtualAlloc(nullptr, kMostStubs * sizeof(Stub), MEM_COMMIT | MEM_RESERVE, PAGE_EXECUTE_READWRITE));
+      VirtualAlloc(nullptr, kMaxStubs * sizeof(Stub), MEM_COMMIT | MEM_RESERVE, PAGE_EXECUTE_READWRITE));
   if (stubs_ == nullptr) throw std::runtime_error("there is no memory for code");
   BindImports();
 }
@@ -80,7 +80,7 @@ void UnstartedModule::BindImports() {
     for (auto* slot = At<void*>(module_, library->FirstThunk); *names != 0; ++names, ++slot) {
       const char* const name = At<IMAGE_IMPORT_BY_NAME>(module_, static_cast<std::size_t>(*names))->Name;
       const auto function = reinterpret_cast<void*>(GetProcAddress(libraries_.back(), name));
-      if (function == nullptr || count_ == kMostStubs) {
+      if (function == nullptr || count_ == kMaxStubs) {
         throw std::runtime_error(std::string("cannot bind ") + name + " of " + libraryName);
       }
       void* bound = function;

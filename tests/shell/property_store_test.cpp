@@ -353,15 +353,15 @@ TEST_F(PropertyStore, ReadsTheHeaderAndNothingElse) {
 
 TEST_F(PropertyStore, ReadsAStreamThatGivesOneByteAtATime) {
   ScriptedStream mrc(MrcBytes());
-  mrc.mostPerRead = 1;
+  mrc.maxPerRead = 1;
   EXPECT_EQ(Read(Open(mrc), kWidthKey), Number(VT_UI4, 512));
   EXPECT_EQ(mrc.reads, 1024);
   ScriptedStream ebn(EbnBytes());
-  ebn.mostPerRead = 1;
+  ebn.maxPerRead = 1;
   EXPECT_EQ(Read(Open(ebn, kEbnHandlerClass), kWidthKey), Number(VT_UI4, 300));
   EXPECT_EQ(ebn.reads, 54);
   ScriptedStream raw(RawBytes());
-  raw.mostPerRead = 1;
+  raw.maxPerRead = 1;
   EXPECT_EQ(Read(Open(raw, kRawHandlerClass), kWidthKey), Number(VT_UI4, 48));
   EXPECT_EQ(raw.reads, 49);
 }
@@ -377,7 +377,7 @@ TEST_F(PropertyStore, NeedsEveryReadOfTheHeader) {
   for (const auto& [clsid, bytes, reads] : kinds) {
     for (int failing = 1; failing <= reads + 1; ++failing) {
       ScriptedStream stream(bytes);
-      stream.mostPerRead = 1;
+      stream.maxPerRead = 1;
       stream.failingRead = failing;
       EXPECT_EQ(ReadWidth(Open(stream, clsid)), failing <= reads ? E_FAIL : S_OK) << failing;
       EXPECT_EQ(stream.references, 1u);
@@ -388,7 +388,7 @@ TEST_F(PropertyStore, NeedsEveryReadOfTheHeader) {
 TEST_F(PropertyStore, TakesBytesThatComeWithFalse) {
   ScriptedStream stream(MrcBytes());
   stream.readResult = S_FALSE;
-  stream.mostPerRead = 100;
+  stream.maxPerRead = 100;
   EXPECT_EQ(Read(Open(stream), kWidthKey), Number(VT_UI4, 512));
 }
 
@@ -416,7 +416,7 @@ TEST_F(PropertyStore, LetsOneCallerAtATimeUseItsStream) {
     const Handler handler = Make();
     const auto initializer = As<IInitializeWithStream>(handler, IID_IInitializeWithStream);
     const auto work = [&](ScriptedStream& stream) {
-      stream.mostPerRead = 64;
+      stream.maxPerRead = 64;
       for (int i = 0; i < 500; ++i) {
         stream.position = 0;
         initializer->Initialize(&stream, STGM_READ);

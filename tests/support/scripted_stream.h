@@ -18,8 +18,8 @@ class ScriptedStream final : public IStream {
  public:
   explicit ScriptedStream(std::string bytes) : content(std::move(bytes)) {}
 
-  ULONG mostPerRead = std::numeric_limits<ULONG>::max();
-  ULONG mostPerWrite = std::numeric_limits<ULONG>::max();
+  ULONG maxPerRead = std::numeric_limits<ULONG>::max();
+  ULONG maxPerWrite = std::numeric_limits<ULONG>::max();
   HRESULT readResult = S_OK;  // of a Read that brings bytes
   HRESULT endResult = S_OK;   // of a Read at the end
   int failingRead = 0;        // which Read fails, counted from 1; 0 for none
@@ -54,7 +54,7 @@ class ScriptedStream final : public IStream {
       return readFailure;
     }
     const std::size_t brought =
-        std::min({content.size() - position, std::size_t{count}, std::size_t{mostPerRead}});
+        std::min({content.size() - position, std::size_t{count}, std::size_t{maxPerRead}});
     std::memcpy(bytes, content.data() + position, brought);
     position += brought;
     *read = static_cast<ULONG>(brought) + (brought == 0 ? 0 : overclaim);
@@ -63,7 +63,7 @@ class ScriptedStream final : public IStream {
 
   HRESULT STDMETHODCALLTYPE Write(const void* bytes, ULONG count, ULONG* taken) override {
     ++writes;
-    *taken = writeResult < 0 ? 0 : std::min(count, mostPerWrite);
+    *taken = writeResult < 0 ? 0 : std::min(count, maxPerWrite);
     written.append(static_cast<const char*>(bytes), *taken);
     return writeResult;
   }
