@@ -1,5 +1,5 @@
 // The vocabulary of pixel types that the RAW, EBN, SER and EMI readers share. The MRC family numbers its
-// pixel types itself (mrc_file_info.h).
+// pixel types itself (mrc_parser.h).
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,5 @@
 // All that the layers know about a pixel type. The two vocabularies of types, DataType (data_type.h) and
-// MrcPixelType (mrc_file_info.h), map their values to it.
+// MrcPixelType (mrc_parser.h), map their values to it.
 #pragma once
 
 #include <cstdint>

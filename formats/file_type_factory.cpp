@@ -1,13 +1,23 @@
 #include "file_type_factory.h"
 
-#include "ebn_file_info.h"
-#include "emi_file_info.h"
-#include "mrc_file_info.h"
-#include "raw_file_info.h"
-#include "same_text.h"
-#include "ser_file_info.h"
+#include <type_traits>
+
+#include "file_kinds.h"
+#include "image_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
+namespace {
+
+template <Parser KindParser>
+bool IsExtensionOf(const std::wstring& extension) {
+  bool isIts = false;
+  WithKindOf(extension, [&]<class RowParser>(const FileKind<RowParser>&) {
+    isIts = std::is_same_v<RowParser, KindParser>;
+  });
+  return isIts;
+}
+
+}  // namespace
 
 std::wstring GetExtension(const std::wstring& path) {
   const std::size_t dot = path.rfind(L'.');
@@ -15,33 +25,31 @@ std::wstring GetExtension(const std::wstring& path) {
 }
 
 bool IsSerExtension(const std::wstring& extension) {
-  return SameIgnoringCase(extension, L"ser");
+  return IsExtensionOf<SerParser>(extension);
 }
 
 bool IsMrcExtension(const std::wstring& extension) {
-  return SameIgnoringCase(extension, L"ali") || SameIgnoringCase(extension, L"rec") ||
-         SameIgnoringCase(extension, L"mrc");
+  return IsExtensionOf<MrcParser>(extension);
 }
 
 bool IsEbnExtension(const std::wstring& extension) {
-  return SameIgnoringCase(extension, L"ebn");
+  return IsExtensionOf<EbnParser>(extension);
 }
 
 bool IsEmiExtension(const std::wstring& extension) {
-  return SameIgnoringCase(extension, L"emi");
+  return IsExtensionOf<EmiParser>(extension);
 }
 
 bool IsRawExtension(const std::wstring& extension) {
-  return SameIgnoringCase(extension, L"raw");
+  return IsExtensionOf<RawParser>(extension);
 }
 
 std::unique_ptr<FileTypeInfo> CreateFileTypeInfo(std::istream& stream, const std::wstring& extension) {
-  if (IsSerExtension(extension)) return std::make_unique<SerFileInfo>(stream);
-  if (IsMrcExtension(extension)) return std::make_unique<MrcFileInfo>(stream, extension);
-  if (IsEbnExtension(extension)) return std::make_unique<EbnFileInfo>(stream);
-  if (IsEmiExtension(extension)) return std::make_unique<EmiFileInfo>(stream);
-  if (IsRawExtension(extension)) return std::make_unique<RawFileInfo>(stream);
-  return nullptr;
+  std::unique_ptr<FileTypeInfo> reader;
+  WithKindOf(extension, [&]<class KindParser>(const FileKind<KindParser>&) {
+    reader = std::make_unique<ImageFileInfo<KindParser>>(stream, extension);
+  });
+  return reader;
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -6,10 +6,8 @@
 #include <cstring>
 #include <mutex>
 
-#include "ebn_file_info.h"
-#include "mrc_file_info.h"
+#include "image_file_info.h"
 #include "property_table.h"
-#include "raw_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {

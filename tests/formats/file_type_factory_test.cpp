@@ -7,15 +7,11 @@
 #include <stdexcept>
 
 #include "ebn_file.h"
-#include "ebn_file_info.h"
 #include "emi_file.h"
-#include "emi_file_info.h"
+#include "image_file_info.h"
 #include "mrc_file.h"
-#include "mrc_file_info.h"
 #include "raw_file.h"
-#include "raw_file_info.h"
 #include "ser_file.h"
-#include "ser_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {

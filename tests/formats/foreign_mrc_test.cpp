@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "bitmap_pixels.h"
-#include "mrc_file_info.h"
+#include "image_file_info.h"
 #include "path_stream.h"
 
 namespace Qel::Lumetra::ShellExt {

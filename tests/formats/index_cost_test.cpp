@@ -6,9 +6,8 @@
 #include <string>
 
 #include "emi_file.h"
-#include "emi_file_info.h"
+#include "image_file_info.h"
 #include "ser_file.h"
-#include "ser_file_info.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {

@@ -1,21 +1,18 @@
-#include "emi_file_info.h"
+#include "emi_parser.h"
 
 #include <optional>
 #include <stdexcept>
 
 #include "byte_order.h"
-#include "frame_reader.h"
+#include "data_type.h"
 #include "skip_bytes.h"
-#include "text.h"
 #include "wrap.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-constexpr std::uint32_t kDescriptionId = 101;
-
 constexpr std::uint16_t kMagic = 0x4B4A;
-constexpr std::int16_t kLastVersion = 0x0200;
+constexpr std::int16_t kMaxVersion = 0x0200;
 
 constexpr EmiItemId kImageObject = {0x49B0, 0x0610};
 constexpr std::uint16_t kDataTag = 0x0202;  // of the one array of an image that holds its pixels
@@ -71,22 +68,27 @@ std::optional<DataType> ElementType(std::uint16_t arrayType) {
 
 }  // namespace
 
-EmiParser::EmiParser(std::istream& stream) : stream_(&stream) {
+EmiParser::EmiParser(std::istream& stream) : FileParser(stream) {
+  // What the first image is until a pixel array of a known type is found in it.
+  frame_ = PackedLayout(PixelTypeOf(DataType::kUInt8), {}, 0);
   const auto magic = ReadLittleEndian<std::uint16_t>(stream);
   const auto version = ReadLittleEndian<std::int16_t>(stream);
   ReadLittleEndian<std::uint32_t>(stream);  // nothing that is known
-  check_.Require(magic == kMagic, "magic", magic, "0x4B4A")
-      .Require(version <= kLastVersion, "version", version, "0x0200 or below");
-  if (!stream.good() || fault()) return;
-  Walk();
-  // A walk may well end with the file; what it found is usable all the same.
-  stream.clear();
+  Require(magic == kMagic, "magic", magic, "0x4B4A");
+  Require(version <= kMaxVersion, "version", version, "0x0200 or below");
+  if (stream.good() && !fault()) {
+    Walk();
+    // A walk may well end with the file; what it found is usable all the same.
+    stream.clear();
+  }
+  frameCount_ = WrapToInt32(imageCount_);
+  Require(imageCount_ > 0, "The file holds no image object.");
 }
 
 void EmiParser::Walk() {
   while (true) {
     const EmiItemId id = ReadItemId();
-    if (!stream_->good()) return;
+    if (!stream().good()) return;
     if (id.type == 0) {  // the end of a list
       if (objectPath_.empty()) return;
       objectPath_.pop_back();
@@ -100,8 +102,8 @@ void EmiParser::Walk() {
 
 EmiItemId EmiParser::ReadItemId() {
   EmiItemId id;
-  id.type = ReadLittleEndian<std::uint16_t>(*stream_);
-  if (id.type != 0) id.tag = ReadLittleEndian<std::uint16_t>(*stream_);
+  id.type = ReadLittleEndian<std::uint16_t>(stream());
+  if (id.type != 0) id.tag = ReadLittleEndian<std::uint16_t>(stream());
   return id;
 }
 
@@ -109,12 +111,12 @@ bool EmiParser::ReadValue() {
   const std::uint16_t type = objectPath_.back().type;
   if (const auto bytes = BytesOfNumber(type)) {
     if (type == kDouble) PathEntry(-3);  // belongs to an object of an object
-    SkipBytes(*stream_, *bytes);
+    SkipBytes(stream(), *bytes);
     return true;
   }
   if (type == kText) {
     PathEntry(-2);  // belongs to an object
-    SkipBytes(*stream_, ReadLittleEndian<std::uint32_t>(*stream_));
+    SkipBytes(stream(), ReadLittleEndian<std::uint32_t>(stream()));
     return true;
   }
   if ((type & kArrayBit) != 0) {
@@ -125,73 +127,31 @@ bool EmiParser::ReadValue() {
 }
 
 void EmiParser::ReadArray() {
-  const auto byteCount = ReadLittleEndian<std::uint32_t>(*stream_);
+  const auto byteCount = ReadLittleEndian<std::uint32_t>(stream());
   const EmiItemId id = objectPath_.back();
   if (IsDataArray(id.type)) {
     const bool inImage = PathEntry(-2) == kImageObject;
     if (inImage && IsPixelArray(id)) ReadPixelArray();
   }
   // The byte count says where the next item is, whatever the array's width and height come to.
-  SkipBytes(*stream_, byteCount);
+  SkipBytes(stream(), byteCount);
 }
 
 void EmiParser::ReadPixelArray() {
-  const std::int64_t start = stream_->tellg();
-  const auto width = ReadLittleEndian<std::int32_t>(*stream_);
-  const auto height = ReadLittleEndian<std::int32_t>(*stream_);
+  const std::int64_t start = stream().tellg();
+  const auto width = ReadLittleEndian<std::int32_t>(stream());
+  const auto height = ReadLittleEndian<std::int32_t>(stream());
   // The array belongs to the image that was opened last.
   if (const auto type = ElementType(objectPath_.back().type); type && imageCount_ == 1) {
-    firstImage_ = {*type, {width, height}, stream_->tellg()};
+    frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, stream().tellg());
   }
-  stream_->seekg(start);
+  stream().seekg(start);
 }
 
 const EmiItemId& EmiParser::PathEntry(std::ptrdiff_t index) const {
   const auto depth = static_cast<std::ptrdiff_t>(objectPath_.size());
   if (-index > depth) throw std::invalid_argument("bad EMI object index");
   return objectPath_[static_cast<std::size_t>(depth + index)];
-}
-
-std::int32_t EmiParser::imageCount() const {
-  return WrapToInt32(imageCount_);
-}
-
-FrameLayout EmiParser::FirstFrame() const {
-  return PackedLayout(PixelTypeOf(firstImage_.dataType), firstImage_.size, firstImage_.dataPosition);
-}
-
-EmiFileInfo::EmiFileInfo(std::istream& stream) : parser_(stream) {}
-
-bool EmiFileInfo::IsValid() const {
-  return parser_.imageCount() > 0 && !parser_.stream().bad();
-}
-
-std::wstring EmiFileInfo::GetTypeDescription() const {
-  return LoadResourceString(kDescriptionId);
-}
-
-Size2 EmiFileInfo::GetDimensions() const {
-  return parser_.firstImage().size;
-}
-
-std::int32_t EmiFileInfo::GetFrameCount() const {
-  return parser_.imageCount();
-}
-
-std::int32_t EmiFileInfo::GetBitDepth() const {
-  return BitsPerPixel(parser_.firstImage().dataType);
-}
-
-std::wstring EmiFileInfo::GetDataTypeName() const {
-  return DataTypeName(parser_.firstImage().dataType);
-}
-
-std::wstring EmiFileInfo::GetComment() const {
-  return WidenComment("VRA EMI File");
-}
-
-HBITMAP EmiFileInfo::CreateThumbnail(const SIZE& size) const {
-  return ReadThumbnail(parser_.stream(), parser_.FirstFrame(), size);
 }
 
 }  // namespace Qel::Lumetra::ShellExt

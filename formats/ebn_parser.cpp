@@ -1,4 +1,4 @@
-#include "ebn_file_info.h"
+#include "ebn_parser.h"
 
 #include <array>
 #include <charconv>
@@ -6,16 +6,14 @@
 #include <string_view>
 
 #include "byte_order.h"
-#include "frame_reader.h"
-#include "text.h"
+#include "data_type.h"
 #include "type_code.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-constexpr std::uint32_t kDescriptionId = 214;
 constexpr std::int32_t kHeaderBytes = 54;
-constexpr std::int32_t kLastTypeCode = 8;  // the format has no complex types
+constexpr std::int32_t kMaxTypeCode = 8;  // the format has no complex types
 
 /// What the header says of the microscope, in the order of the file. All but the voltage are codes.
 struct Instrument {
@@ -85,7 +83,7 @@ std::string Describe(const Instrument& instrument) {
 
 }  // namespace
 
-EbnParser::EbnParser(std::istream& stream) : stream_(&stream) {
+EbnParser::EbnParser(std::istream& stream) : FileParser(stream) {
   const auto typeCode = ReadLittleEndian<std::uint16_t>(stream);
   const auto width = ReadLittleEndian<std::int32_t>(stream);
   const auto height = ReadLittleEndian<std::int32_t>(stream);
@@ -98,56 +96,16 @@ EbnParser::EbnParser(std::istream& stream) : stream_(&stream) {
       .kilovolts = ReadLittleEndian<double>(stream),
   };
   const auto type = DataTypeOfCode(typeCode);
-  check_.Require(type && typeCode <= kLastTypeCode, "data type code", typeCode, "from 1 to 8")
-      .Require(width >= 1, "width", width, "at least 1")
-      .Require(height >= 1, "height", height, "at least 1")
-      .Require(dataOffset >= kHeaderBytes, "data offset", dataOffset, "at least 54, behind the header");
+  Require(type && typeCode <= kMaxTypeCode, "data type code", typeCode, "from 1 to 8");
+  Require(width >= 1, "width", width, "at least 1");
+  Require(height >= 1, "height", height, "at least 1");
+  Require(dataOffset >= kHeaderBytes, "data offset", dataOffset, "at least 54, behind the header");
   if (fault()) {
     stream.setstate(std::ios_base::failbit);
     return;
   }
-  dataType_ = *type;
-  size_ = {width, height};
-  dataOffset_ = dataOffset;
+  frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, dataOffset);
   comment_ = Describe(instrument);
-}
-
-FrameLayout EbnParser::Frame() const {
-  return PackedLayout(PixelTypeOf(dataType_), size_, dataOffset_);
-}
-
-EbnFileInfo::EbnFileInfo(std::istream& stream) : parser_(stream) {}
-
-bool EbnFileInfo::IsValid() const {
-  return parser_.stream().good();
-}
-
-std::wstring EbnFileInfo::GetTypeDescription() const {
-  return LoadResourceString(kDescriptionId);
-}
-
-Size2 EbnFileInfo::GetDimensions() const {
-  return parser_.size();
-}
-
-std::int32_t EbnFileInfo::GetFrameCount() const {
-  return 1;
-}
-
-std::int32_t EbnFileInfo::GetBitDepth() const {
-  return BitsPerPixel(parser_.dataType());
-}
-
-std::wstring EbnFileInfo::GetDataTypeName() const {
-  return DataTypeName(parser_.dataType());
-}
-
-std::wstring EbnFileInfo::GetComment() const {
-  return WidenComment(parser_.comment());
-}
-
-HBITMAP EbnFileInfo::CreateThumbnail(const SIZE& size) const {
-  return ReadThumbnail(parser_.stream(), parser_.Frame(), size);
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -1,4 +1,4 @@
-#include "mrc_file_info.h"
+#include "mrc_parser.h"
 
 #include <algorithm>
 #include <iterator>
@@ -6,17 +6,14 @@
 
 #include "byte_order.h"
 #include "data_type.h"
-#include "frame_reader.h"
-#include "same_text.h"
-#include "text.h"
 #include "wrap.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-constexpr std::int32_t kMostLabels = 10;
+constexpr std::int32_t kMaxLabels = 10;
 constexpr std::size_t kLabelBytes = 80;
-constexpr std::uint32_t kLastMode = 16;
+constexpr std::uint32_t kMaxMode = 16;
 
 PixelType PixelTypeOf(MrcPixelType type) {
   switch (type) {
@@ -55,30 +52,30 @@ void SwapHeader(unsigned char* bytes) {
 
 }  // namespace
 
-MrcHeader::MrcHeader(std::istream& stream) : stream_(&stream) {
+MrcParser::MrcParser(std::istream& stream) : FileParser(stream) {
   stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
   // No frame is that large in both directions, so the bytes must be in the other order.
   constexpr std::uint32_t kTooLarge = 65536;
-  swapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
-             static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
-  if (swapped_) SwapHeader(bytes_.data());
-  check_ = Check();
-  if (fault()) stream.setstate(std::ios_base::badbit);
+  isSwapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
+               static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
+  if (isSwapped_) SwapHeader(bytes_.data());
+  Require(Word(kNx) >= 1, "nx", Word(kNx), "at least 1");
+  Require(Word(kNy) >= 1, "ny", Word(kNy), "at least 1");
+  Require(Word(kNz) >= 1, "nz", Word(kNz), "at least 1");
+  Require(static_cast<std::uint32_t>(Word(kMode)) <= kMaxMode, "mode", Word(kMode), "from 0 to 16");
+  if (fault()) {
+    stream.setstate(std::ios_base::badbit);
+    return;
+  }
+  frameCount_ = Word(kNz);
+  frame_ = Section(frameCount_ / 2);
 }
 
-std::int32_t MrcHeader::Word(std::size_t offset) const {
+std::int32_t MrcParser::Word(std::size_t offset) const {
   return LoadLittleEndian<std::int32_t>(&bytes_[offset]);
 }
 
-HeaderCheck MrcHeader::Check() const {
-  return HeaderCheck()
-      .Require(Word(kNx) >= 1, "nx", Word(kNx), "at least 1")
-      .Require(Word(kNy) >= 1, "ny", Word(kNy), "at least 1")
-      .Require(Word(kNz) >= 1, "nz", Word(kNz), "at least 1")
-      .Require(static_cast<std::uint32_t>(Word(kMode)) <= kLastMode, "mode", Word(kMode), "from 0 to 16");
-}
-
-MrcPixelType MrcHeader::pixelType() const {
+MrcPixelType MrcParser::PixelTypeOfMode() const {
   switch (Word(kMode)) {
     case 1: return MrcPixelType::kInt16;
     case 2: return MrcPixelType::kFloat32;
@@ -90,9 +87,9 @@ MrcPixelType MrcHeader::pixelType() const {
   }
 }
 
-std::string MrcHeader::Labels() const {
+std::string MrcParser::comment() const {
   std::string text;
-  const std::int32_t count = std::min(Word(kNlabl), kMostLabels);
+  const std::int32_t count = std::min(Word(kNlabl), kMaxLabels);
   for (std::int32_t i = 0; i < count; ++i) {
     const unsigned char* const first = &bytes_[kLabels + static_cast<std::size_t>(i) * kLabelBytes];
     std::string_view label(reinterpret_cast<const char*>(first), kLabelBytes);
@@ -105,56 +102,19 @@ std::string MrcHeader::Labels() const {
   return text;
 }
 
-FrameLayout MrcHeader::Section(std::int32_t section) const {
-  const PixelType type = PixelTypeOf(pixelType());
+FrameLayout MrcParser::Section(std::int32_t section) const {
+  const PixelType type = PixelTypeOf(PixelTypeOfMode());
+  const Size2 size = {Word(kNx), Word(kNy)};
   // Sizes and positions are 32-bit and wrap: a section beyond 2 GiB is not reached.
-  const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size().width, size().height), type.bytes());
+  const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size.width, size.height), type.bytes());
   const std::int32_t position =
       WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
-  FrameLayout layout = FlippedVertically(PackedLayout(type, size(), position));
+  FrameLayout layout = FlippedVertically(PackedLayout(type, size, position));
   layout.blockBytes = frameBytes;
   // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they
   // are.
-  layout.swapBytes = swapped_ && type.bits == 16;
+  layout.swapBytes = isSwapped_ && type.bits == 16;
   return layout;
-}
-
-MrcFileInfo::MrcFileInfo(std::istream& stream, const std::wstring& extension)
-    : header_(stream),
-      descriptionId_(SameIgnoringCase(extension, L"ali")   ? 210
-                     : SameIgnoringCase(extension, L"rec") ? 211
-                                                           : 212) {}
-
-bool MrcFileInfo::IsValid() const {
-  return header_.stream().good();
-}
-
-std::wstring MrcFileInfo::GetTypeDescription() const {
-  return LoadResourceString(descriptionId_);
-}
-
-Size2 MrcFileInfo::GetDimensions() const {
-  return header_.size();
-}
-
-std::int32_t MrcFileInfo::GetFrameCount() const {
-  return header_.sections();
-}
-
-std::int32_t MrcFileInfo::GetBitDepth() const {
-  return PixelTypeOf(header_.pixelType()).bits;
-}
-
-std::wstring MrcFileInfo::GetDataTypeName() const {
-  return PixelTypeOf(header_.pixelType()).name;
-}
-
-std::wstring MrcFileInfo::GetComment() const {
-  return WidenComment(header_.Labels());
-}
-
-HBITMAP MrcFileInfo::CreateThumbnail(const SIZE& size) const {
-  return ReadThumbnail(header_.stream(), header_.Section(header_.sections() / 2), size);
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -1,4 +1,4 @@
-#include "ser_file_info.h"
+#include "image_file_info.h"
 
 #include <gtest/gtest.h>
 

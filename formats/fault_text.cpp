@@ -1,0 +1,80 @@
+#include "fault_text.h"
+
+#include <cstdint>
+#include <exception>
+#include <iomanip>
+#include <sstream>
+#include <string_view>
+
+#include "file_kinds.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+/// Written as the rule writes numbers: a rule with hexadecimal numbers is about a code, not a quantity.
+std::string NumberText(std::int64_t value, std::string_view rule) {
+  if (rule.find("0x") == std::string_view::npos) return std::to_string(value);
+  std::ostringstream text;
+  text << "0x" << std::hex << std::uppercase << std::setfill('0') << std::setw(4) << value;
+  return text.str();
+}
+
+std::string Sentence(const Fault& fault, bool isSwapped) {
+  if (fault.field == nullptr) return fault.rule;
+  std::string text =
+      isSwapped ? "The header, read as big-endian, is not acceptable: " : "The header is not acceptable: ";
+  text += fault.field;
+  if (fault.value) text += " is " + NumberText(*fault.value, fault.rule) + " and";
+  return text + " must be " + fault.rule + ".";
+}
+
+std::string Bytes(std::int64_t count) {
+  return std::to_string(count) + (count == 1 ? " byte" : " bytes");
+}
+
+/// Whether the file, whose size is `end`, holds the frame.
+std::string FrameText(const FrameLayout& frame, std::int64_t end) {
+  if (frame.size.width < 1 || frame.size.height < 1) {
+    return "The picture has no pixels: it is " + std::to_string(frame.size.width) + " x " +
+           std::to_string(frame.size.height) + ".";
+  }
+  if (frame.blockPosition < 0 || frame.blockBytes < 0) {
+    return "The picture lies beyond the first 2 GiB of the file, where this format is not read.";
+  }
+  const std::int64_t frameEnd = frame.blockPosition + frame.blockBytes;
+  if (frameEnd > end) {
+    return "The file is cut short: the picture takes the bytes up to " + std::to_string(frameEnd) +
+           ", and the file has " + Bytes(end) + ".";
+  }
+  return {};
+}
+
+template <Parser KindParser>
+std::string TextOf(const KindParser& parser, std::int64_t end) {
+  if (parser.stream().eof()) {
+    return "The file ends before its header and index do: it has only " + Bytes(end) + ".";
+  }
+  if (parser.fault()) return Sentence(*parser.fault(), parser.isSwapped());
+  return FrameText(parser.frame(), end);
+}
+
+}  // namespace
+
+std::optional<std::string> FaultText(std::istream& stream, const std::wstring& extension) {
+  stream.seekg(0, std::ios_base::end);
+  const std::int64_t end = stream.tellg();
+  stream.seekg(0);
+  std::optional<std::string> text;
+  WithKindOf(extension, [&]<class KindParser>(const FileKind<KindParser>&) {
+    try {
+      text = TextOf(KindParser(stream), end);
+    } catch (const std::exception& e) {
+      stream.clear();
+      text = "The contents cannot be followed beyond byte " + std::to_string(stream.tellg()) + ": " +
+             e.what() + ".";
+    }
+  });
+  return text;
+}
+
+}  // namespace Qel::Lumetra::ShellExt

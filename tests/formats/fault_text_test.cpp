@@ -1,0 +1,101 @@
+#include "fault_text.h"
+
+#include <gtest/gtest.h>
+
+#include <limits>
+#include <sstream>
+
+#include "ebn_file.h"
+#include "emi_file.h"
+#include "mrc_file.h"
+#include "raw_file.h"
+#include "ser_file.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+using namespace Testing;
+
+/// "none" for an extension that has no parser.
+std::string TextOf(const std::string& bytes, const std::wstring& extension) {
+  std::istringstream stream(bytes);
+  return FaultText(stream, extension).value_or("none");
+}
+
+SerFile OneImageSeries() {
+  return SerFile{.elements = {SerElement{.pixels = "p"}}};
+}
+
+TEST(FaultText, IsEmptyForAFileThatIsWell) {
+  EXPECT_EQ(TextOf(MrcFile{.pixels = "p"}.Bytes(), L"mrc"), "");
+  EXPECT_EQ(TextOf(MrcFile{.pixels = "p"}.Bytes(), L"Ali"), "");
+  EXPECT_EQ(TextOf(OneImageSeries().Bytes(), L"ser"), "");
+  EXPECT_EQ(TextOf(EbnFile{.afterHeader = "p"}.Bytes(), L"ebn"), "");
+  EXPECT_EQ(TextOf(OneImageEmiFile(0x2202, 1, 1, "p").Bytes(), L"emi"), "");
+  EXPECT_EQ(TextOf(RawFile{.pixels = "p"}.Bytes(), L"raw"), "");
+}
+
+TEST(FaultText, IsNoneForAnUnknownExtension) {
+  EXPECT_EQ(TextOf(MrcFile{.pixels = "p"}.Bytes(), L"mrc2"), "none");
+  EXPECT_EQ(TextOf("", L""), "none");
+}
+
+TEST(FaultText, NamesTheFirstFieldThatIsNotAcceptable) {
+  EXPECT_EQ(TextOf(MrcFile{.nx = 0, .mode = 99}.Bytes(), L"mrc"),
+            "The header is not acceptable: nx is 0 and must be at least 1.");
+  EXPECT_EQ(TextOf(EbnFile{.dataOffset = 53}.Bytes(), L"ebn"),
+            "The header is not acceptable: data offset is 53 and must be at least 54, behind the header.");
+}
+
+TEST(FaultText, WritesACodeAsItsRuleDoes) {
+  EXPECT_EQ(TextOf(EmiFile{.magic = 0x4A}.Bytes(), L"emi"),
+            "The header is not acceptable: magic is 0x004A and must be 0x4B4A.");
+}
+
+TEST(FaultText, NamesAFieldThatIsNotANumber) {
+  EXPECT_EQ(TextOf(RawFile{.magic = "QEL RawImage!"}.Bytes(), L"raw"),
+            "The header is not acceptable: magic must be the text \"QEL RawImage\" and a zero byte.");
+}
+
+TEST(FaultText, SaysThatAHeaderIsReadAsBigEndian) {
+  constexpr std::int32_t kLarge = 0x7FFFFFFF;
+  EXPECT_EQ(TextOf(MrcFile{.nx = kLarge, .ny = kLarge}.Bytes(), L"mrc"),
+            "The header, read as big-endian, is not acceptable: nx is -129 and must be at least 1.");
+}
+
+TEST(FaultText, NamesAnElementOfAnUnknownType) {
+  SerFile file = OneImageSeries();
+  file.elements.front().typeCode = 11;
+  EXPECT_EQ(TextOf(file.Bytes(), L"ser"),
+            "The header is not acceptable: the data type code of an element is 11 and must be from 1 to 10.");
+}
+
+TEST(FaultText, TellsOfAFileThatEndsBeforeItsPicture) {
+  EXPECT_EQ(TextOf("", L"mrc"), "The file ends before its header and index do: it has only 0 bytes.");
+  EXPECT_EQ(TextOf("J", L"emi"), "The file ends before its header and index do: it has only 1 byte.");
+  EXPECT_EQ(TextOf(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"),
+            "The file is cut short: the picture takes the bytes up to 56, and the file has 55 bytes.");
+}
+
+TEST(FaultText, TellsOfAFileWithoutAPicture) {
+  EXPECT_EQ(TextOf(EmiFile{}.Bytes(), L"emi"), "The file holds no image object.");
+  EXPECT_EQ(TextOf(EmiFile{.items = EmiImageObject("")}.Bytes(), L"emi"),
+            "The picture has no pixels: it is 0 x 0.");
+  SerFile lines = OneImageSeries();
+  lines.dataTypeId = 0x4120;
+  EXPECT_EQ(TextOf(lines.Bytes(), L"ser"),
+            "This is a series of lines (data type id 0x4120), which have no picture.");
+}
+
+TEST(FaultText, TellsOfAPictureThatIsTooFarAway) {
+  EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"),
+            "The picture lies beyond the first 2 GiB of the file, where this format is not read.");
+}
+
+TEST(FaultText, TellsOfContentsThatCannotBeFollowed) {
+  EXPECT_EQ(TextOf(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),
+            "The contents cannot be followed beyond byte 12: bad EMI object index.");
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
