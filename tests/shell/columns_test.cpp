@@ -59,9 +59,6 @@ class Columns : public ServerTest {
   }
 };
 
-const PROPERTYKEY kAllKeys[] = {kWidthKey,      kHeightKey,     kBitDepthKey,
-                                kFrameCountKey, kDimensionsKey, kCommentsKey};
-
 TEST_F(Columns, AreSix) {
   const struct {
     PROPERTYKEY key;

@@ -340,10 +340,7 @@ TEST_F(PropertyStore, ReadsTheHeaderAndNothingElse) {
     ScriptedStream stream(bytes);
     {
       const Handler handler = Open(stream, clsid);
-      for (const PROPERTYKEY& key :
-           {kWidthKey, kHeightKey, kBitDepthKey, kFrameCountKey, kDimensionsKey, kCommentsKey}) {
-        Read(handler, key);
-      }
+      for (const PROPERTYKEY& key : kAllKeys) Read(handler, key);
     }
     EXPECT_EQ(stream.wanted, std::vector<ULONG>{1024});
     EXPECT_EQ(stream.writes, 0);

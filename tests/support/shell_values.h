@@ -29,6 +29,8 @@ inline constexpr PROPERTYKEY kBitDepthKey{kImageSummary, 7};
 inline constexpr PROPERTYKEY kFrameCountKey{kImageSummary, 12};
 inline constexpr PROPERTYKEY kDimensionsKey{kImageSummary, 13};
 inline constexpr PROPERTYKEY kCommentsKey{kSummary, 6};
+inline constexpr PROPERTYKEY kAllKeys[] = {kWidthKey,      kHeightKey,     kBitDepthKey,
+                                           kFrameCountKey, kDimensionsKey, kCommentsKey};
 
 /// The type of a value, and its number or text.
 struct Value {
