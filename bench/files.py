@@ -1,8 +1,4 @@
-"""The image files that are measured: what is in them, and how they are written.
-
-The writers stand here on their own, independent of the readers: that a thumbnail is right is found out by
-comparing it with the naive reference on the places that the writer names.
-"""
+"""The image files that are measured."""
 
 import contextlib
 import dataclasses
@@ -39,10 +35,6 @@ def random_rows(pixel_format, width, rows, generator):
     return numpy.clip(1000 + 100 * values, 0, 32767).astype(pixel_format)
 
 
-def file_name(name):
-    return name.replace(" ", "-").replace(",", "")
-
-
 class Written:
     """Something on disk that is written into a folder and gone afterwards."""
 
@@ -58,75 +50,51 @@ class Written:
 
 @dataclasses.dataclass
 class Frame(Written):
-    """One frame of a file. Offsets and strides are bytes; row 0 is the top of the picture."""
+    """A file of one frame. Sizes and positions are in bytes."""
 
     name: str
     pixel_format: str
     width: int
     height: int
     kind: str = "mrc"  # the extension
-    sections: int = 1  # of a stack, of which the middle one is filled and the others are holes
-    padding: int = 0  # bytes after each row of a .raw file
+    padding: int = 0  # after each row of a .raw file
     spread: int = 1  # pixels of the same size that are interleaved in a .raw file; the first is the frame's
     bottom_up: bool = False  # rows of a .raw file
 
     @property
     def file(self):
-        return f"{file_name(self.name)}.{self.kind}"
+        return f"{self.name.replace(' ', '-')}.{self.kind}"
 
     @property
-    def pixel_stride(self):
-        return pixel_bytes(self.pixel_format) * self.spread
+    def position(self):
+        return RAW_HEADER_BYTES if self.kind == "raw" else MRC_HEADER_BYTES
 
     @property
     def row_bytes(self):
-        return self.width * self.pixel_stride + self.padding
+        return self.width * pixel_bytes(self.pixel_format) * self.spread + self.padding
 
     @property
     def block_bytes(self):
         return self.height * self.row_bytes
 
-    @property
-    def block_position(self):
-        if self.kind == "raw":
-            return RAW_HEADER_BYTES
-        return MRC_HEADER_BYTES + self.sections // 2 * self.block_bytes
-
-    @property
-    def flipped(self):
-        return self.bottom_up or self.kind == "mrc"
-
-    @property
-    def row_stride(self):
-        return -self.row_bytes if self.flipped else self.row_bytes
-
-    @property
-    def first_pixel(self):
-        last_row = (self.height - 1) * self.row_bytes
-        return self.block_position + (last_row if self.flipped else 0)
-
     def factor(self, edge):
         return max(self.width // edge, self.height // edge, 1)
 
-    def output_bytes(self, edge):
-        factor = self.factor(edge)
-        channels = 3 if self.pixel_format in ("rgb", "bgr") else 1
-        return -(-(self.width // factor) * channels // 4) * 4 * (self.height // factor)
-
     def header(self):
         if self.kind == "mrc":
-            words = struct.pack("<4i", self.width, self.height, self.sections, MRC_MODES[self.pixel_format])
+            words = struct.pack("<4i", self.width, self.height, 1, MRC_MODES[self.pixel_format])
             return (words.ljust(208, b"\0") + b"MAP \x44\x44\0\0").ljust(MRC_HEADER_BYTES, b"\0")
-        return b"QEL RawImage\0" + struct.pack(
-            "<9i", 1, self.width, self.height, 1, 8 * pixel_bytes(self.pixel_format),
-            RAW_CLASSES[self.pixel_format], self.first_pixel - self.block_position, self.pixel_stride,
-            self.row_stride)
+        bytes_ = pixel_bytes(self.pixel_format)
+        first_pixel, row_stride = ((self.height - 1) * self.row_bytes, -self.row_bytes) if self.bottom_up else (
+            0, self.row_bytes)
+        return b"QEL RawImage\0" + struct.pack("<9i", 1, self.width, self.height, 1, 8 * bytes_,
+                                               RAW_CLASSES[self.pixel_format], first_pixel, bytes_ * self.spread,
+                                               row_stride)
 
     def write(self, folder):
         generator = numpy.random.default_rng(1)
         with open(folder / self.file, "wb") as file:
             file.write(self.header())
-            file.seek(self.block_position)
             rows_at_once = max(1, 2**22 // self.row_bytes)
             for row in range(0, self.height, rows_at_once):
                 rows = min(rows_at_once, self.height - row)
@@ -134,12 +102,11 @@ class Frame(Written):
                 bytes_ = numpy.zeros((rows, self.row_bytes), "uint8")
                 bytes_[:, : self.row_bytes - self.padding] = pixels.view("uint8")
                 file.write(bytes_)
-            file.truncate(self.block_position + self.block_bytes * (self.sections - self.sections // 2))
 
 
 @dataclasses.dataclass
 class Series(Written):
-    """A .ser file of many small images, their offsets after the last of them."""
+    """A .ser file of many small images, with their offsets at its end."""
 
     count: int
     edge: int = 32  # of an image of 16-bit pixels
@@ -179,28 +146,22 @@ class Series(Written):
 
 @dataclasses.dataclass
 class Folder(Written):
-    """A folder of small files of one kind."""
+    """A folder of small .mrc files. Their pixels are a hole in each file, as nobody reads them."""
 
-    kind: str
     count: int
 
     @property
     def file(self):
-        return f"{self.count}-{self.kind}-files"
+        return f"folder-of-{self.count}"
 
     @property
     def files(self):
-        return [f"{self.file}/{number}.{self.kind}" for number in range(self.count)]
-
-    @property
-    def header_bytes(self):
-        return {"mrc": MRC_HEADER_BYTES, "raw": RAW_HEADER_BYTES}[self.kind]
+        return [f"{self.file}/{number}.mrc" for number in range(self.count)]
 
     def write(self, folder):
-        """Pixels are a hole in each file: nobody is meant to read them."""
         (folder / self.file).mkdir(exist_ok=True)
-        frame = Frame("any", "uint8", 512, 512, self.kind)
+        frame = Frame("any", "uint8", 512, 512)
         for name in self.files:
             with open(folder / name, "wb") as file:
                 file.write(frame.header())
-                file.truncate(frame.block_position + frame.block_bytes)
+                file.truncate(frame.position + frame.block_bytes)

@@ -1,43 +1,57 @@
-"""What all measurements share: the systems that are measured, rounds that interleave, memory."""
+"""Processes that measure on command, rounds that take turns, and memory."""
 
-import dataclasses
 import pathlib
 import statistics
-
-from files import Frame
-from processes import Worker
+import subprocess
 
 
-@dataclasses.dataclass
-class System:
-    """One way in which the project is built and run, with a process of it that measures."""
+class Failure(Exception):
+    """A measurement that could not be made."""
 
-    name: str
-    command: list
-    metadata: dict  # what its workers can be asked of a file beside the picture: how often that opens the file
-    folder: pathlib.Path  # of the files
-    worker: Worker = None
+
+class Worker:
+    """A program that answers each line of its input, words separated by tabs, with one line of output."""
+
+    def __init__(self, command, folder):
+        self._process = subprocess.Popen(command, cwd=folder, text=True, stdin=subprocess.PIPE,
+                                         stdout=subprocess.PIPE)
 
     def __enter__(self):
-        self.worker = self.new_worker()
         return self
 
     def __exit__(self, *exception):
-        self.worker.__exit__(*exception)
+        self._process.stdin.close()
+        self._process.wait()
+        self._process.stdout.close()
 
-    def new_worker(self):
-        return Worker(self.command, self.folder)
+    def nanoseconds(self, *words):
+        print(*words, sep="\t", file=self._process.stdin, flush=True)
+        answer = self._process.stdout.readline().strip()
+        if not answer.isdecimal():
+            raise Failure(f"{' '.join(map(str, words))[:200]}: {answer or 'the worker ended'}")
+        return int(answer)
 
-    def asking(self, *words):
-        return lambda: self.worker.nanoseconds(*words)
+    def peak_memory(self, small, large):
+        """Bytes in use at the peak of the request `large`, above those in use after the request `small`, which
+        loads what is loaded only once. For a process that has done nothing else."""
+        self.nanoseconds(*small)
+        process = pathlib.Path("/proc") / str(self._process.pid)
+        (process / "clear_refs").write_text("5")  # starts the peak anew
+        before = _kibibytes(process, "VmRSS")
+        self.nanoseconds(*large)
+        return (_kibibytes(process, "VmHWM") - before) * 1024
 
-    def reading(self, frame):
-        """The bare read of the frame's bytes."""
-        return self.asking("read", frame.block_position, frame.block_bytes, frame.file)
+
+def _kibibytes(process, field):
+    for line in (process / "status").read_text().splitlines():
+        name, value = line.split(":", 1)
+        if name == field:
+            return int(value.split()[0])
+    raise Failure(f"there is no {field} in {process}/status")
 
 
 def interleaved(contenders, rounds):
-    """Runs every contender once a round, in an order that turns, after one round that does not count.
+    """Calls every contender once a round, in an order that rotates, after one round that does not count.
     Returns the times of each, by name."""
     times = {name: [] for name in contenders}
     names = list(contenders)
@@ -51,20 +65,5 @@ def interleaved(contenders, rounds):
 
 
 def ratio(times, bases):
-    """The median over the rounds, so that what slows a whole round down does not count."""
+    """The median of the ratios of each round, which a slow round does not change."""
     return statistics.median(time / base for time, base in zip(times, bases))
-
-
-def peak_memory(new_worker, small, large):
-    """Bytes that a new process needs at most for the question `large`, above what it has in use after the
-    question `small`, which loads what is loaded only once."""
-    with new_worker() as worker:
-        worker.ask(*small)
-        idle = worker.reset_peak_memory()
-        worker.ask(*large)
-        return worker.peak_memory() - idle
-
-
-def small_frame(frame):
-    """A frame of the same pixels that costs next to nothing."""
-    return Frame("small", frame.pixel_format, 64, 64, frame.kind)

@@ -1,39 +1,130 @@
-"""The main program of scripts/bench, which builds what is measured and hands its arguments on."""
+"""The main program of scripts/bench, which builds what is measured and passes its arguments on."""
 
 import argparse
 import contextlib
 import json
 import pathlib
+import statistics
 import sys
 
-from comparison import measure_others
-from files import Frame
-from headers import measure_folder, measure_series
-from measuring import System
-from processes import Failure
-from report import machine, print_machine, print_summary
-from thumbnails import measure_kernels, measure_stack, measure_thumbnails
+from files import MRC_HEADER_BYTES, SER_ELEMENT_HEADER_BYTES, Folder, Frame, Series
+from measuring import Failure, Worker, interleaved, ratio
+from peers import PEERS
+from report import Table, machine
 
 BUILD = pathlib.Path(__file__).resolve().parent.parent / "build"
 FOLDER = BUILD / "bench"
 
+EDGES = (96, 256, 1024)  # of the squares for which thumbnails are requested
+PEER_EDGE = 256
 FRAMES = [
+    Frame("uint8", "uint8", 8192, 8192),
     Frame("int16", "int16", 4096, 4096),
     Frame("uint16", "uint16", 4096, 4096),
-    Frame("uint16 5760x4092", "uint16", 5760, 4092),
-    Frame("uint8", "uint8", 8192, 8192),
-    Frame("rgb", "rgb", 4096, 4096),
     Frame("int32", "int32", 4096, 4096, "raw"),
     Frame("float32", "float32", 4096, 4096),
     Frame("float64", "float64", 4096, 4096, "raw"),
     Frame("complex64", "complex64", 4096, 4096),
     Frame("complex128", "complex128", 2048, 2048, "raw"),
-    Frame("raw padded", "uint16", 4096, 4096, "raw", padding=96),
-    Frame("raw interleaved", "uint16", 4096, 4096, "raw", spread=2),
-    Frame("raw bottom-up", "uint16", 4096, 4096, "raw", bottom_up=True),
+    Frame("rgb", "rgb", 4096, 4096),
+    Frame("uint16 5760x4092", "uint16", 5760, 4092),
+    Frame("uint16 padded", "uint16", 4096, 4096, "raw", padding=96),
+    Frame("uint16 interleaved", "uint16", 4096, 4096, "raw", spread=2),
+    Frame("uint16 bottom-up", "uint16", 4096, 4096, "raw", bottom_up=True),
 ]
-STACK = Frame("stack of 1000", "uint16", 1024, 1024, sections=1000)
-COMPARED = ("int16", "uint16", "float32")
+SERIES = [Series(10_000), Series(100_000)]
+FILES = Folder(1000)
+MEMORY_FRAME = Frame("memory", "float32", 4096, 4096)
+SMALL_FRAME = Frame("small", "float32", 64, 64)
+
+COMMANDS = {
+    "native": [BUILD / "linux/bench/bench_worker"],
+    "DLL": [BUILD.parent / "scripts/wine", BUILD / "windows/bench/bench_worker.exe"],
+    **{peer: [sys.executable, pathlib.Path(__file__).with_name("peers.py"), peer] for peer in PEERS},
+}
+SYSTEMS = ("native", "DLL")  # of which each has its own bare read; peers are compared with the native one
+
+
+def question(way, frame, edge):
+    """What a worker is asked for a thumbnail."""
+    if way in SYSTEMS:
+        return ("thumbnail", edge, frame.file)
+    return ("thumbnail", frame.factor(edge), frame.pixel_format, frame.width, frame.height, frame.position,
+            frame.file)
+
+
+def ways_to(frame, edge):
+    peers = [name for name, peer in PEERS.items() if edge == PEER_EDGE and peer.accepts(frame)]
+    return [*SYSTEMS, *peers]
+
+
+class Bench:
+    """Measures rows, prints them and collects them as data."""
+
+    def __init__(self, rounds):
+        self.rows = []
+        self._rounds = rounds
+        self._workers = {}
+        self._table = Table({"workload": 22, "asked": 5, "read ms": 8, "in Wine": 8, "native": 6, "DLL": 6,
+                             **{peer: len(peer) for peer in PEERS}})
+
+    @contextlib.contextmanager
+    def new_workers(self):
+        """Starts processes for the rows that follow. What was measured before has no effect on them."""
+        with contextlib.ExitStack() as stack:
+            self._workers = {way: stack.enter_context(Worker(command, FOLDER)) for way, command in COMMANDS.items()}
+            yield
+
+    def measure(self, workload, asked, read, questions):
+        """Compares each way's time for its question with that of the bare `read` on its system."""
+        bases = {way: "DLL" if way == "DLL" else "native" for way in questions}
+        systems = [system for system in SYSTEMS if system in bases.values()]
+        contenders = {("read", system): self._asking(system, read) for system in systems}
+        contenders.update({way: self._asking(way, words) for way, words in questions.items()})
+        times = interleaved(contenders, self._rounds)
+        read_ns = {system: statistics.median(times["read", system]) for system in systems}
+        ratios = {way: ratio(times[way], times["read", base]) for way, base in bases.items()}
+        self.rows.append({"workload": workload, "asked": asked, "read_ns": read_ns, "ratios": ratios})
+        self._table.row(workload, asked or "",
+                        *(f"{read_ns[system] / 1e6:.2f}" if system in read_ns else "" for system in SYSTEMS),
+                        *(f"{ratios[way]:.2f}" if way in ratios else "" for way in COMMANDS))
+
+    def _asking(self, way, words):
+        return lambda: self._workers[way].nanoseconds(*words)
+
+
+def measure_frame(bench, frame):
+    read = ("read", frame.position, frame.block_bytes, frame.file)
+    for edge in EDGES:
+        bench.measure(frame.name, edge, read, {way: question(way, frame, edge) for way in ways_to(frame, edge)})
+
+
+def measure_series(bench, series):
+    """Opening a series, which reads the header of each element, beside reading just these headers."""
+    read = ("blocks", series.first_element, series.element_bytes, series.count, SER_ELEMENT_HEADER_BYTES, series.file)
+    bench.measure(f"series of {series.count}", None, read,
+                  {"native": ("metadata", "reader", series.file), "DLL": ("metadata", "tip", series.file)})
+
+
+def measure_folder(bench, folder):
+    """What is shown of every file of a folder except the picture, beside reading just the headers."""
+    read = ("starts", MRC_HEADER_BYTES, *folder.files)
+    for way, view in (("native", "reader"), ("DLL", "tip"), ("DLL", "columns"), ("DLL", "sets"), ("DLL", "store")):
+        bench.measure(f"folder: {view}", None, read, {way: ("metadata", view, *folder.files)})
+
+
+def measure_memory():
+    """Returns by way the bytes that a thumbnail takes in a new process."""
+    print(f"\nPeak memory for a thumbnail of {MEMORY_FRAME.pixel_format}, {MEMORY_FRAME.width} x"
+          f" {MEMORY_FRAME.height}, at {PEER_EDGE}:")
+    peaks = {}
+    with MEMORY_FRAME.in_folder(FOLDER), SMALL_FRAME.in_folder(FOLDER):
+        for way in ways_to(MEMORY_FRAME, PEER_EDGE):
+            with Worker(COMMANDS[way], FOLDER) as worker:
+                peaks[way] = worker.peak_memory(question(way, SMALL_FRAME, 16),
+                                                question(way, MEMORY_FRAME, PEER_EDGE))
+            print(f"- {way}: {peaks[way] / 2**20:.1f} MiB", flush=True)
+    return peaks
 
 
 def main():
@@ -41,39 +132,30 @@ def main():
     parser.add_argument("--quick", action="store_true", help="few rounds, for a first look")
     parser.add_argument("workloads", nargs="*", metavar="WORKLOAD", help="a part of a name; all without one")
     options = parser.parse_args()
-    known = [*(frame.name for frame in FRAMES), STACK.name, "series", "folder", "others"]
+    tasks = [(measure_frame, frame.name, frame) for frame in FRAMES]
+    tasks += [(measure_series, "series", series) for series in SERIES]
+    tasks += [(measure_folder, "folder", FILES)]
+    known = [*dict.fromkeys(name for _, name, _ in tasks), "memory"]
     chosen = [name for name in known
               if not options.workloads or any(word in name for word in options.workloads)]
     if not chosen:
         parser.error(f"no workload is called that, only: {', '.join(known)}")
     rounds = 5 if options.quick else 15
-    frames = [frame for frame in FRAMES if frame.name in chosen]
 
     FOLDER.mkdir(parents=True, exist_ok=True)
     results = {"machine": machine(), "rounds": rounds}
-    print_machine(results["machine"])
-    with contextlib.ExitStack() as stack:
-        native = stack.enter_context(
-            System("native", [BUILD / "linux/bench/bench_worker"], {"reader": 1}, FOLDER))
-        dll = stack.enter_context(
-            System("DLL", [BUILD.parent / "scripts/wine", BUILD / "windows/bench/bench_worker.exe"],
-                   {"tip": 1, "columns": 6, "sets": 1, "store": 1}, FOLDER))
-        systems = [native, dll]
-        if frames:
-            results["thumbnails"] = measure_thumbnails(frames, systems, rounds)
-            results["kernels"] = measure_kernels(frames, BUILD / "linux/bench/bench_kernels", rounds)
-        if STACK.name in chosen:
-            results["stack"] = measure_stack(STACK, systems, rounds)
-        if "series" in chosen:
-            results["series"] = measure_series((10_000, 100_000), systems, rounds)
-        if "folder" in chosen:
-            results["folder"] = measure_folder("mrc", 1000, systems, rounds)
-        if "others" in chosen:
-            results["others"] = [result for frame in FRAMES if frame.name in COMPARED
-                                 for result in measure_others(frame, native, rounds)]
-    file = FOLDER / "results.json"
-    file.write_text(json.dumps(results, indent=1) + "\n")
-    print_summary(results)
+    for name, fact in results["machine"].items():
+        print(f"- {name}: {fact}")
+    print()
+    bench = Bench(rounds)
+    for measure, name, subject in tasks:
+        if name in chosen:
+            with subject.in_folder(FOLDER), bench.new_workers():
+                measure(bench, subject)
+    results["rows"] = bench.rows
+    if "memory" in chosen:
+        results["memory_bytes"] = measure_memory()
+    (FOLDER / "results.json").write_text(json.dumps(results, indent=1) + "\n")
 
 
 if __name__ == "__main__":
