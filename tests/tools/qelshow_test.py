@@ -11,12 +11,14 @@ import pathlib
 import pty
 import random
 import re
+import shutil
 import struct
 import subprocess
 import sys
 import tempfile
 import time
 import unittest
+import zlib
 
 EMULATOR, QELSHOW, SERVER, FAULTY_SERVER = sys.argv[1:5]
 
@@ -302,6 +304,109 @@ class Thumbnail(Test):
         self.assertOneSentence(result.stderr, "out.png", "cannot be written")
 
 
+class Output(Test):
+    """What is written, and what is never overwritten."""
+
+    NO_SERVER = "no such.dll"  # which nothing complains about before it is needed
+
+    def setUp(self):
+        super().setUp()
+        self.source = self.write("source.mrc", mrc(20, 10))
+
+    def contents(self, *folders):
+        """The bytes of all files in the test's folder, by path."""
+        return {path: path.read_bytes() for path in self.folder.rglob("*") if path.is_file()}
+
+    def assertRefused(self, *arguments, parts):
+        before = self.contents()
+        result = run(*arguments, server=self.NO_SERVER, folder=self.folder)
+        self.assertEqual((result.returncode, result.stdout), (USAGE, ""))
+        self.assertOneSentence(result.stderr, *parts)
+        self.assertEqual(self.contents(), before)
+
+    def test_is_never_the_input_however_it_is_spelled(self):
+        os.link(self.source, self.folder / "hard.png")
+        os.symlink(self.source, self.folder / "soft.png")
+        for out in ("source.mrc", "./SOURCE.MRC", self.source, "hard.png", "soft.png"):
+            with self.subTest(out=out):
+                self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "is the file to read"))
+
+    def test_is_never_called_as_an_image_file_is(self):
+        self.write("other.mrc", mrc())
+        for out in ("other.mrc", "new.Ebn", "deep.er/new.raw"):
+            with self.subTest(out=out):
+                self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "extension"))
+                self.assertRefused("page", "source.mrc", "--out", out, parts=(out, "extension"))
+
+    def test_does_not_replace_what_another_program_has_written(self):
+        header = struct.pack(">I4sIIBBBBB", 13, b"IHDR", 1, 1, 8, 0, 0, 0, 0)
+        self.write("photo.png", b"\x89PNG\r\n\x1a\n" + header + bytes(100))
+        self.write("empty.png", b"")
+        self.write("site/index.html", b"<!DOCTYPE html><title>Mine</title>")
+        self.write("album/pictures/1.png", b"mine")
+        for out in ("photo.png", "empty.png"):
+            self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "not written by qelshow"))
+        for folder, file in (("site", "index.html"), ("album", "1.png")):
+            self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by qelshow"))
+
+    def test_is_no_folder_where_a_file_is_wanted_and_no_file_where_a_folder_is(self):
+        (self.folder / "folder").mkdir()
+        self.write("file", b"mine")
+        self.assertRefused("thumbnail", "source.mrc", "-o", "folder", parts=("folder", "is a folder"))
+        self.assertRefused("page", "source.mrc", "--out", "file", parts=("file", "is a file"))
+
+    def test_replaces_a_png_of_its_own_in_one_step(self):
+        out = self.folder / "out.png"
+        self.assertEqual(run("thumbnail", self.source, "-o", out).returncode, DONE)
+        earlier = out.read_bytes()
+        os.link(out, self.folder / "earlier.png")  # would change if the file were written to
+        self.write("out.png.part", b"mine")
+        self.assertEqual(run("thumbnail", self.write("larger.mrc", mrc(60, 40)), "-o", out).returncode, DONE)
+        self.assertEqual(png_facts(out.read_bytes())[:2], (60, 40))
+        self.assertEqual((self.folder / "earlier.png").read_bytes(), earlier)
+        self.assertEqual(sorted(path.name for path in self.folder.iterdir()),
+                         ["earlier.png", "larger.mrc", "out.png", "out.png.part", "source.mrc"])
+        self.assertEqual((self.folder / "out.png.part").read_bytes(), b"mine")
+
+    def test_is_a_png_whose_parts_are_all_intact(self):
+        png = run_for_bytes("thumbnail", self.source, "-o", "-").stdout
+        place, kinds = 8, []
+        while place < len(png):
+            length, kind = struct.unpack_from(">I4s", png, place)
+            end = place + 8 + length
+            self.assertEqual(struct.unpack_from(">I", png, end)[0], zlib.crc32(png[place + 4:end]), kind)
+            kinds.append(kind)
+            place = end + 4
+        self.assertEqual((kinds[0], kinds[-1]), (b"IHDR", b"IEND"))
+
+    def make_page(self, *paths, **options):
+        return run("page", *paths, "--out", "page", folder=self.folder, **options)
+
+    def test_takes_the_place_of_an_earlier_page_with_its_pictures(self):
+        other = self.write("other.mrc", mrc(8, 6))
+        self.assertEqual(self.make_page(self.source, other, other).returncode, DONE)
+        self.write("page/pictures/mine.png", b"mine")
+        self.write("page/pictures/2.txt", b"mine")
+        self.write("page/notes.txt", b"mine")
+        self.assertEqual(self.make_page(other).returncode, DONE)
+        self.assertEqual(sorted(str(path.relative_to(self.folder)) for path in self.contents()),
+                         ["other.mrc", "page/index.html", "page/notes.txt", "page/pictures/1.png",
+                          "page/pictures/2.txt", "page/pictures/mine.png", "source.mrc"])
+        self.assertEqual(png_facts((self.folder / "page/pictures/1.png").read_bytes())[:2], (8, 6))
+
+    def test_that_is_not_finished_leaves_the_earlier_page_as_it_was(self):
+        self.make_page(self.source)
+        before = self.contents()
+        other = self.write("other.mrc", mrc(8, 6))
+        before[other] = other.read_bytes()
+        with open("/dev/full", "wb") as full:
+            process = start("page", other, other, "--out", "page", stdout=full, stderr=subprocess.DEVNULL,
+                            cwd=self.folder)
+            self.assertEqual(process.wait(), FAILED)
+        self.assertEqual(self.contents(), before)
+        self.assertEqual(sorted(path.name for path in (self.folder / "page").iterdir()), ["index.html", "pictures"])
+
+
 class Faults(Test):
     def test_of_the_extension_end_one_question_and_not_the_run(self):
         # Smaller than the request, a colour picture divides by zero.
@@ -554,13 +659,15 @@ class Page(Test):
         self.assertTrue(result.stdout.endswith(": 1 thumbnail of 1 file\n"), result.stdout)
 
     def test_that_cannot_be_written_leaves_an_earlier_one_as_it_is(self):
-        out = self.folder / "page"
-        self.write("page/index.html", b"earlier")
+        out, path = self.folder / "page", self.write("a.txt", b"")
+        run("page", path, self.write("b.mrc", mrc()), "--out", out)
+        earlier = (out / "index.html").read_bytes()
+        shutil.rmtree(out / "pictures")
         (out / "pictures").write_bytes(b"a file where the folder has to be")
-        result = run("page", self.write("a.mrc", mrc()), "--out", out)
+        result = run("page", self.folder / "b.mrc", "--out", out)
         self.assertEqual(result.returncode, FAILED)
         self.assertOneSentence(result.stderr, "pictures", "cannot be written: Not a directory.")
-        self.assertEqual((out / "index.html").read_bytes(), b"earlier")
+        self.assertEqual((out / "index.html").read_bytes(), earlier)
 
     def test_is_the_same_in_two_runs(self):
         path = self.write("a.mrc", mrc(300, 300))

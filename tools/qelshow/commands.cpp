@@ -10,6 +10,7 @@
 #include "file_inspection.h"
 #include "file_list.h"
 #include "json_records.h"
+#include "output.h"
 #include "page_writer.h"
 #include "reports.h"
 #include "text_tools.h"
@@ -61,14 +62,16 @@ int RunInfo(const CommandLine& line) {
 }
 
 int RunThumbnail(const CommandLine& line) {
-  Worker worker(line.server);
   const std::wstring& path = line.files.front();
+  const bool isToFile = line.out != L"-";
+  if (isToFile) CheckPictureOutput(line.out, path);
+  Worker worker(line.server);
   const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
   PrintProblem(facts);
   const auto& png = facts.png;
   if (png.empty()) return ExitStatus(facts.verdict);
-  if (line.out != L"-") {
-    WriteFileAt(line.out, png.data(), png.size());
+  if (isToFile) {
+    ReplaceFileAt(line.out, png);
   } else {
     PrintBytes(png.data(), png.size());
   }
@@ -77,6 +80,7 @@ int RunThumbnail(const CommandLine& line) {
 
 int RunPage(const CommandLine& line) {
   const std::vector<ListedFile> files = ListFiles(line.files);
+  CheckPageOutput(line.out, files.size());
   Worker worker(line.server);
   PageWriter page(line.out);
   constexpr std::size_t kMaxNameWidth = 40;

@@ -16,12 +16,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-bool IsSupported(const fs::path& path) {
-  const std::wstring extension = GetExtension(path.filename().wstring());
-  return IsMrcExtension(extension) || IsSerExtension(extension) || IsEmiExtension(extension) ||
-         IsEbnExtension(extension) || IsRawExtension(extension);
-}
-
 void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   const std::size_t first = files.size();
   std::error_code error;
@@ -31,7 +25,7 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   if (!error) entry = {folder, fs::directory_options::skip_permission_denied, error};
   for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {
     std::error_code ignored;
-    if (!IsSupported(entry->path()) || !entry->is_regular_file(ignored)) continue;
+    if (!IsSupported(entry->path().wstring()) || !entry->is_regular_file(ignored)) continue;
     files.push_back({entry->path().wstring(), entry->path().lexically_relative(folder).wstring()});
   }
   if (error) {
@@ -59,6 +53,12 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
 }
 
 }  // namespace
+
+bool IsSupported(const std::wstring& path) {
+  const std::wstring extension = GetExtension(fs::path(path).filename().wstring());
+  return IsMrcExtension(extension) || IsSerExtension(extension) || IsEmiExtension(extension) ||
+         IsEbnExtension(extension) || IsRawExtension(extension);
+}
 
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {
   std::vector<ListedFile> files;

@@ -11,6 +11,9 @@ struct ListedFile {
   std::wstring name;  // what the page calls it: relative to the folder that was named
 };
 
+/// Whether the extension shows files with this one's extension.
+bool IsSupported(const std::wstring& path);
+
 /// The files named, and of the folders named all files of the supported kinds, also in folders below them,
 /// ordered by name. A path that does not exist is kept as a file, so that it is reported. Throws Failure for
 /// a folder that cannot be listed, and if nothing is there that can be shown.

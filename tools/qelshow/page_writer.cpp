@@ -3,26 +3,20 @@
 #include <filesystem>
 
 #include "console.h"
-#include "failure.h"
 #include "json_records.h"
+#include "output.h"
 #include "page_resource.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-using Com::OwnedHandle;
+namespace fs = std::filesystem;
 
 /// Where the JSON document stands in the template.
 constexpr std::string_view kPlaceOfFiles = "@FILES@";
 
 constexpr const wchar_t* kPicturesFolder = L"pictures";
-
-/// `error` is a code of the system or of the standard library.
-template <class Error>
-[[noreturn]] void CannotWrite(const std::wstring& path, const Error& error) {
-  throw Failure(L"\"" + path + L"\" cannot be written: " + SystemErrorText(error) + L".");
-}
 
 /// JSON that can stand in a script element of the page: without '<', which would be able to end the element.
 std::string InScript(std::string json) {
@@ -37,32 +31,43 @@ std::string_view Template() {
   return {static_cast<const char*>(LockResource(handle)), SizeofResource(nullptr, resource)};
 }
 
-OwnedHandle CreateFileAt(const std::wstring& path) {
-  OwnedHandle file(CreateFileW(path.c_str(), GENERIC_WRITE, FILE_SHARE_READ, nullptr, CREATE_ALWAYS,
-                               FILE_ATTRIBUTE_NORMAL, nullptr));
-  if (!file) CannotWrite(path, GetLastError());
-  return file;
-}
-
 void MakeFolder(const std::wstring& path) {
   std::error_code error;
-  std::filesystem::create_directories(path, error);
+  fs::create_directories(path, error);
   if (error) CannotWrite(path, error);
+}
+
+std::wstring PictureName(std::size_t number) {
+  return std::to_wstring(number) + L".png";
+}
+
+/// A name in the folder that nothing has.
+std::wstring UnusedFolder(const std::wstring& folder) {
+  for (int i = 1;; ++i) {
+    std::wstring path = folder + L"\\unfinished-" + std::to_wstring(i);
+    if (GetFileAttributesW(path.c_str()) == INVALID_FILE_ATTRIBUTES) return path;
+  }
 }
 
 }  // namespace
 
-void WriteFileAt(const std::wstring& path, const void* bytes, std::size_t size) {
-  const OwnedHandle file = CreateFileAt(path);
-  if (!WriteBytes(file.Get(), bytes, size)) CannotWrite(path, GetLastError());
+bool IsMarkedPage(std::string_view beginning) {
+  return beginning.find("<meta name=\"generator\" content=\"qelshow\">") != std::string_view::npos;
+}
+
+std::wstring PagePath(const std::wstring& folder) {
+  return folder + L"\\index.html";
+}
+
+std::wstring PicturePath(const std::wstring& folder, std::size_t number) {
+  return folder + L"\\" + kPicturesFolder + L"\\" + PictureName(number);
 }
 
 PageWriter::PageWriter(const std::wstring& folder)
-    : folder_(std::filesystem::path(folder).make_preferred().wstring()),
-      path_(folder_ + L"\\index.html"),
-      unfinishedPath_(path_ + L".part") {
+    : folder_(fs::path(folder).make_preferred().wstring()), unfinished_(UnusedFolder(folder_)) {
   MakeFolder(folder_ + L"\\" + kPicturesFolder);
-  file_ = CreateFileAt(unfinishedPath_);
+  MakeFolder(unfinished_);
+  file_ = CreateNewFile(PagePath(unfinished_));
   const std::string_view page = Template();
   const std::size_t place = page.find(kPlaceOfFiles);
   templateEnd_ = page.substr(place + kPlaceOfFiles.size());
@@ -70,13 +75,20 @@ PageWriter::PageWriter(const std::wstring& folder)
   Write("{\"schema\":" + std::to_string(kJsonSchema) + ",\"files\":[");
 }
 
+PageWriter::~PageWriter() {
+  file_.Reset();
+  std::error_code ignored;
+  fs::remove_all(unfinished_, ignored);
+}
+
 void PageWriter::Add(const FileFacts& facts) {
   ++count_;
   Json record = facts;
   if (!facts.png.empty()) {
-    const std::wstring picture = std::wstring(kPicturesFolder) + L"/" + std::to_wstring(count_) + L".png";
-    WriteFileAt(folder_ + L"\\" + picture, facts.png.data(), facts.png.size());
-    record["thumbnail"]["picture"] = picture;
+    const std::wstring name = PictureName(count_);
+    WriteNewFile(unfinished_ + L"\\" + name, facts.png);
+    record["thumbnail"]["picture"] = std::wstring(kPicturesFolder) + L"/" + name;
+    pictures_.insert(name);
   }
   Write((count_ > 1 ? ",\n" : "\n") + InScript(record.dump()));
 }
@@ -85,13 +97,20 @@ void PageWriter::Finish() {
   Write("\n]}");
   Write(templateEnd_);
   file_.Reset();
-  if (!MoveFileExW(unfinishedPath_.c_str(), path_.c_str(), MOVEFILE_REPLACE_EXISTING)) {
-    CannotWrite(path_, GetLastError());
+  const std::wstring pictures = folder_ + L"\\" + kPicturesFolder + L"\\";
+  for (const std::wstring& name : pictures_) MoveInto(unfinished_ + L"\\" + name, pictures + name);
+  MoveInto(PagePath(unfinished_), PagePath(folder_));
+  // What the earlier page had more is left over.
+  std::error_code error;
+  for (const fs::directory_entry& entry : fs::directory_iterator(pictures, error)) {
+    const std::wstring path = entry.path().wstring();
+    if (!pictures_.contains(entry.path().filename().wstring()) && IsPictureOfPage(path))
+      DeleteFileW(path.c_str());
   }
 }
 
 void PageWriter::Write(std::string_view text) {
-  if (!WriteBytes(file_.Get(), text.data(), text.size())) CannotWrite(unfinishedPath_, GetLastError());
+  if (!WriteBytes(file_.Get(), text.data(), text.size())) CannotWrite(PagePath(unfinished_), GetLastError());
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

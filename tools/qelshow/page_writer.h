@@ -7,6 +7,8 @@
 
 #include <windows.h>
 
+#include <cstddef>
+#include <set>
 #include <string>
 #include <string_view>
 
@@ -16,31 +18,40 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
+/// The files of a page in this folder.
+std::wstring PagePath(const std::wstring& folder);
+std::wstring PicturePath(const std::wstring& folder, std::size_t number);
+
+/// Whether a file that begins with these bytes is a page of this program; kMarkedPageBytes are enough.
+bool IsMarkedPage(std::string_view beginning);
+inline constexpr std::size_t kMarkedPageBytes = 1024;
+
 class PageWriter {
  public:
   /// Makes the folder if it is missing. Throws Failure for whatever cannot be written, here and below.
   explicit PageWriter(const std::wstring& folder);
+  ~PageWriter();
+  PageWriter(const PageWriter&) = delete;
+  PageWriter& operator=(const PageWriter&) = delete;
 
   void Add(const FileFacts& facts);
 
-  /// Without this, no page appears in the folder, and one of an earlier run stays.
+  /// Puts the page with its pictures into the folder, in the place of an earlier one. Without this nothing in
+  /// the folder changes.
   void Finish();
 
   /// Where the page is, with all its folders.
-  std::wstring path() const { return AbsolutePath(path_); }
+  std::wstring path() const { return AbsolutePath(PagePath(folder_)); }
 
  private:
   void Write(std::string_view text);
 
   std::wstring folder_;
-  std::wstring path_;
-  std::wstring unfinishedPath_;
+  std::wstring unfinished_;  // a folder for the new page until it is complete
   Com::OwnedHandle file_;
   std::string_view templateEnd_;  // what follows the files
   std::size_t count_ = 0;
+  std::set<std::wstring> pictures_;  // file names
 };
-
-/// Writes a file in one go.
-void WriteFileAt(const std::wstring& path, const void* bytes, std::size_t size);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

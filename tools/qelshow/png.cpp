@@ -9,6 +9,15 @@ namespace {
 
 using Com::ComPtr;
 
+using namespace std::string_view_literals;
+
+constexpr std::string_view kSignature = "\x89PNG\r\n\x1A\n"sv;
+
+/// A text chunk with its length and check sum, and its place after the signature and the header's chunk.
+constexpr std::string_view kMark = "\0\0\0\x10tEXtSoftware\0qelshow\xE8\xA0\x60\x39"sv;
+constexpr std::size_t kMarkPosition = 33;
+static_assert(kMarkPosition + kMark.size() == kMarkedPngBytes);
+
 HRESULT WriteFrame(IWICBitmapFrameEncode& frame, const BITMAP& bitmap) {
   HRESULT result = frame.Initialize(nullptr);
   if (SUCCEEDED(result)) {
@@ -65,7 +74,14 @@ HRESULT EncodePng(HBITMAP bitmap, std::vector<std::uint8_t>& png) {
   ComPtr<IStream> stream;
   HRESULT result = CreateStreamOnHGlobal(nullptr, TRUE, stream.Put());
   if (SUCCEEDED(result)) result = WritePng(*stream.Get(), section.dsBm);
-  return SUCCEEDED(result) ? ReadAll(*stream.Get(), png) : result;
+  if (SUCCEEDED(result)) result = ReadAll(*stream.Get(), png);
+  if (SUCCEEDED(result)) png.insert(png.begin() + kMarkPosition, kMark.begin(), kMark.end());
+  return result;
+}
+
+bool IsMarkedPng(std::string_view beginning) {
+  return beginning.size() >= kMarkedPngBytes && beginning.starts_with(kSignature) &&
+         beginning.substr(kMarkPosition).starts_with(kMark);
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show
