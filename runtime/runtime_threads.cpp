@@ -1,6 +1,6 @@
 // What the C++ runtime in the DLL needs of POSIX threads, in place of mingw's library of that name.
 //
-// The DLL is a guest in its process: it must leave nothing behind when it is unloaded, and the process may
+// The DLL is a guest in its process: it must leave nothing there when it is unloaded, and the process may
 // load and unload it thousands of times. The library takes a thread-local slot, memory and event handles per
 // thread and an exception handler for the whole process, and gives back none but the last. The runtime uses
 // only these few of its functions, for initialisation on first use and short critical sections, and besides
@@ -10,12 +10,7 @@
 #include <pthread.h>
 #include <windows.h>
 
-#include <algorithm>
-#include <array>
 #include <atomic>
-#include <cstdlib>
-#include <exception>
-#include <new>
 
 // Frees the memory that libstdc++ sets aside for exceptions that are thrown when there is no memory. Not
 // declared in any of its headers.
@@ -28,6 +23,14 @@ struct abi::__cxa_eh_globals {
   void* caughtExceptions;
   unsigned int uncaughtExceptions;
 };
+
+// The module's thread-local memory: the system's loader makes a copy of it for every thread that there is or
+// comes to be, and frees them. The C runtime defines where it begins and under which number a thread finds
+// it.
+extern "C" {
+extern char _tls_start;
+extern ULONG _tls_index;
+}
 
 namespace {
 
@@ -70,57 +73,23 @@ class RuntimeLock {
 
 constinit RuntimeLock g_lock;
 
-/// What the runtime keeps of the exceptions of each thread that has thrown one. Throwing must not need
-/// memory, least of all to say that there is none, so that the first threads find room here. The runtime's
-/// own way ends the process then.
-class ThreadExceptions {
- public:
-  ThreadExceptions() : slot_(FlsAlloc(&GiveBack)) {}
+/// What the runtime keeps of the exceptions of each thread, in the thread-local memory. So a throw needs
+/// neither memory nor a slot, and reaches its caller also in a process that has none left; the runtime's own
+/// way ends the process then. The compiler's thread_local would be the library's again.
+[[gnu::section(".tls$")]] abi::__cxa_eh_globals g_exceptions{};
 
-  /// Gives back what every thread has, also those that live on.
-  ~ThreadExceptions() {
-    FlsFree(slot_);
-    __gnu_cxx::__freeres();
-  }
+abi::__cxa_eh_globals* ExceptionsOfThisThread() {
+  char* const* copies = nullptr;
+  asm("mov %%gs:0x58, %0" : "=r"(copies));  // ThreadLocalStoragePointer in the thread's block
+  const auto offset = reinterpret_cast<char*>(&g_exceptions) - &_tls_start;
+  return reinterpret_cast<abi::__cxa_eh_globals*>(copies[_tls_index] + offset);
+}
 
-  abi::__cxa_eh_globals* OfThisThread() const {
-    // A throw between a failed call and the question for its error must not change the answer.
-    const DWORD error = GetLastError();
-    void* state = FlsGetValue(slot_);
-    if (state == nullptr) {
-      state = Take();
-      if (state == nullptr || FlsSetValue(slot_, state) == FALSE) std::terminate();
-    }
-    SetLastError(error);
-    return static_cast<abi::__cxa_eh_globals*>(state);
-  }
-
- private:
-  struct Room {
-    abi::__cxa_eh_globals state;
-    std::atomic<bool> isTaken;
-  };
-
-  static void* Take() {
-    for (Room& room : g_rooms) {
-      if (!room.isTaken.exchange(true)) return new (&room.state) abi::__cxa_eh_globals{};
-    }
-    return std::calloc(1, sizeof(abi::__cxa_eh_globals));
-  }
-
-  static void WINAPI GiveBack(void* state) {
-    const auto room = std::ranges::find(g_rooms, state, [](Room& candidate) { return &candidate.state; });
-    if (room == g_rooms.end()) return std::free(state);
-    room->isTaken = false;
-  }
-
-  static constinit inline std::array<Room, 64> g_rooms{};
-
-  DWORD slot_;
+/// Made before every other static object and so destroyed after it.
+struct ExceptionMemory {
+  ~ExceptionMemory() { __gnu_cxx::__freeres(); }
 };
-
-// Made before every other static object and so destroyed after it.
-[[gnu::init_priority(101)]] ThreadExceptions g_exceptions;
+[[gnu::init_priority(101)]] ExceptionMemory g_exceptionMemory;
 
 // States of a pthread_once_t.
 constexpr pthread_once_t kNotRun = PTHREAD_ONCE_INIT;
@@ -183,11 +152,11 @@ int pthread_once(pthread_once_t* once, void (*run)()) {
 namespace __cxxabiv1 {
 
 __cxa_eh_globals* __cxa_get_globals() noexcept {
-  return g_exceptions.OfThisThread();
+  return ExceptionsOfThisThread();
 }
 
 __cxa_eh_globals* __cxa_get_globals_fast() noexcept {
-  return g_exceptions.OfThisThread();
+  return ExceptionsOfThisThread();
 }
 
 }  // namespace __cxxabiv1

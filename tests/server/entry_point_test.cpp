@@ -19,10 +19,6 @@ namespace {
 /// and a random number for the protection of the stack.
 const std::set<std::string> kRuntime = {
     "AcquireSRWLockExclusive",
-    "FlsAlloc",
-    "FlsFree",
-    "FlsGetValue",
-    "FlsSetValue",
     "GetCurrentProcessId",
     "GetCurrentThreadId",
     "GetLastError",

@@ -44,11 +44,11 @@ TEST(ReleaseDll, ImportsFromTheSystemsOwnModulesOnly) {
 }
 
 TEST(ReleaseDll, AsksForNothingThatOutlivesItInTheProcess) {
-  // Not a thread, not a handler of the process's faults, and not a thread-local slot that is not freed.
+  // Not a thread, not a handler of the process's faults, and not a thread-local or fiber-local slot.
   for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
     for (const char* const function :
          {"createthread", "_beginthreadex", "addvectoredexceptionhandler", "setunhandledexceptionfilter",
-          "tlsalloc", "setwindowshookexw", "createeventa", "createsemaphorea", "suspendthread"}) {
+          "tlsalloc", "flsalloc", "setwindowshookexw", "createeventa", "createsemaphorea", "suspendthread"}) {
       EXPECT_FALSE(functions.contains(function)) << name << " " << function;
     }
   }

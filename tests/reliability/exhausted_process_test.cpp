@@ -1,0 +1,94 @@
+// The release DLL in a process that has no thread-local and fiber-local slots left: the exceptions of readers
+// reach their caller all the same, in every thread.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <shlobj.h>
+
+#include <filesystem>
+#include <latch>
+#include <stdexcept>
+#include <thread>
+#include <vector>
+
+#include "emi_file.h"
+#include "server_dll.h"
+#include "temp_folder.h"
+
+namespace Qel::Lumetra::ShellExt::Testing {
+namespace {
+
+/// Takes every slot that is free in the process and gives them back at the end.
+template <auto allocate, auto free>
+class AllSlots {
+ public:
+  AllSlots() {
+    for (DWORD slot = allocate(); slot != TLS_OUT_OF_INDEXES; slot = allocate()) slots_.push_back(slot);
+  }
+  ~AllSlots() {
+    for (const DWORD slot : slots_) free(slot);
+  }
+  AllSlots(const AllSlots&) = delete;
+  AllSlots& operator=(const AllSlots&) = delete;
+
+ private:
+  std::vector<DWORD> slots_;
+};
+
+DWORD AllocateFiberSlot() {
+  return FlsAlloc(nullptr);
+}
+
+class ExhaustedProcess : public testing::Test {
+ protected:
+  ExhaustedProcess() {
+    // A text outside of any object, which its reader refuses with an exception.
+    EmiFile emi;
+    emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside of any image");
+    path_ = folder_.Write("throwing.emi", emi.Bytes());
+    // This program's own runtime has what it needs for exceptions from now on.
+    EXPECT_THROW(throw std::runtime_error("first"), std::runtime_error);
+  }
+
+  /// Loads the file in an object of its own, which throws what the reader throws.
+  void Load(const ServerDll& dll) const {
+    const auto file = dll.CreateInstance<IPersistFile>(kShellExtClass, IID_IPersistFile);
+    file->Load(path_.c_str(), STGM_READ);
+  }
+
+  TempFolder folder_;
+  std::filesystem::path path_;
+};
+
+TEST_F(ExhaustedProcess, GetsTheExceptionsOfReaders) {
+  // This program imports from the same modules of the system, so that only the DLL itself is loaded now.
+  const AllSlots<&TlsAlloc, &TlsFree> threadSlots;
+  const AllSlots<&AllocateFiberSlot, &FlsFree> fiberSlots;
+  const ServerDll dll;
+  EXPECT_THROW(Load(dll), std::invalid_argument);
+  EXPECT_THROW(Load(dll), std::invalid_argument);
+  std::thread([&] { EXPECT_THROW(Load(dll), std::invalid_argument); }).join();
+}
+
+TEST_F(ExhaustedProcess, GetsTheExceptionsOfManyThreadsAtOnce) {
+  constexpr int kThreads = 200;
+  const ServerDll dll;
+  std::latch everyThreadHasOne(kThreads);
+  std::vector<std::thread> threads;
+  for (int i = 0; i < kThreads; ++i) {
+    threads.emplace_back([&] {
+      try {
+        Load(dll);
+        ADD_FAILURE() << "nothing was thrown";
+        everyThreadHasOne.count_down();
+      } catch (const std::invalid_argument& e) {
+        everyThreadHasOne.arrive_and_wait();
+        EXPECT_STREQ(e.what(), "bad EMI object index");
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Testing
