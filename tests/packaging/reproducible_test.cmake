@@ -12,16 +12,13 @@ endforeach()
 
 set(ENV{SOURCE_DATE_EPOCH} 1700000000)
 set(ENV{CCACHE_DISABLE} 1)
-foreach(command
-    "${SOURCE}/packaging/make_packages.py;${BUILD};${WORK}/first"
-    "${copy}/scripts/package;--out;${WORK}/second")
-  execute_process(COMMAND ${command} COMMAND_ERROR_IS_FATAL ANY)
-endforeach()
+execute_process(COMMAND ${SOURCE}/scripts/package --out ${WORK}/first COMMAND_ERROR_IS_FATAL ANY)
+execute_process(COMMAND "${copy}/scripts/package" --out ${WORK}/second COMMAND_ERROR_IS_FATAL ANY)
 
 file(STRINGS ${WORK}/first/SHA256SUMS packages)
 list(TRANSFORM packages REPLACE "^[0-9a-f]+  " "")
 list(LENGTH packages count)
-if(NOT count EQUAL 3)
+if(NOT count EQUAL 4)
   message(FATAL_ERROR "There are ${count} packages: ${packages}.")
 endif()
 foreach(package ${packages})

@@ -5,9 +5,12 @@
 
 #include "samples.h"
 
-int wmain(int count, wchar_t** arguments) {
+namespace {
+
+/// Takes the characters in which the system has its paths.
+int Run(int count, const std::filesystem::path::value_type* const* arguments) {
   namespace fs = std::filesystem;
-  if (count != 2 || arguments[1][0] == L'-') {
+  if (count != 2 || arguments[1][0] == '-') {
     std::fputs("usage: qelsamples FOLDER\n\nWrites a sample of every supported file kind into FOLDER.\n",
                stderr);
     return 2;
@@ -24,4 +27,14 @@ int wmain(int count, wchar_t** arguments) {
     }
   }
   return 0;
+}
+
+}  // namespace
+
+#ifdef _WIN32
+int wmain(int count, wchar_t** arguments) {
+#else
+int main(int count, char** arguments) {
+#endif
+  return Run(count, arguments);
 }

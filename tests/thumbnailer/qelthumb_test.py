@@ -1,0 +1,246 @@
+#!/usr/bin/python3
+"""Runs qelthumb as file managers do.
+
+usage: qelthumb_test.py BUILD
+"""
+
+import contextlib
+import os
+import pathlib
+import resource
+import struct
+import subprocess
+import sys
+import tempfile
+import time
+import unittest
+
+from PIL import Image
+
+from stage import Stage
+
+BUILD = sys.argv.pop(1)
+DONE, FAILED, USAGE = range(3)
+
+
+def mrc(width, height, pixels, mode=0):
+    header = bytearray(1024)
+    struct.pack_into("<4i", header, 0, width, height, 1, mode)
+    return bytes(header) + pixels
+
+
+class Test(unittest.TestCase):
+    @classmethod
+    def setUpClass(cls):
+        cls.stage = Stage(BUILD)
+        cls.addClassCleanup(cls.stage.close)
+
+    def setUp(self):
+        folder = tempfile.TemporaryDirectory()
+        self.addCleanup(folder.cleanup)
+        self.folder = pathlib.Path(folder.name)
+        self.out = self.folder / "out" / "thumbnail.png"
+        self.out.parent.mkdir()
+
+    def write(self, name, contents):
+        path = self.folder / name
+        path.write_bytes(contents)
+        return path
+
+    def thumbnail(self, size, file):
+        """The picture that is made of a file."""
+        self.assertEqual(self.stage.thumbnail(size, file, self.out), (DONE, ""))
+        with Image.open(self.out) as picture:
+            picture.load()
+        return picture
+
+    def assertFails(self, status, *arguments, says):
+        """Nothing is left in the folder of the output but what was there before."""
+        before = self.outputs()
+        result = subprocess.run([self.stage.program, *map(str, arguments)], stdin=subprocess.DEVNULL,
+                                stdout=subprocess.PIPE, stderr=subprocess.PIPE)
+        errors = os.fsdecode(result.stderr)
+        self.assertEqual((result.returncode, result.stdout), (status, b""), errors)
+        self.assertIn(says, errors)
+        self.assertEqual(self.outputs(), before)
+        return errors
+
+    def outputs(self):
+        return {path: path.is_file() and path.read_bytes() for path in self.out.parent.iterdir()}
+
+
+class Usage(Test):
+    def test_what_cannot_be_understood_is_told_how_it_is_meant(self):
+        file = self.stage.samples / "atlas.mrc"
+        for arguments in ((), ("128",), ("128", file), ("128", file, self.out, "more"), ("0", file, self.out),
+                          ("-1", file, self.out), ("4097", file, self.out), ("12x", file, self.out),
+                          ("", file, self.out), (" 12", file, self.out), ("99999999999", file, self.out),
+                          ("--help",)):
+            with self.subTest(arguments=arguments):
+                self.assertFails(USAGE, *arguments, says="usage: qelthumb SIZE INPUT OUTPUT.png")
+
+    def test_the_file_itself_is_no_place_for_its_thumbnail(self):
+        contents = (self.stage.samples / "atlas.mrc").read_bytes()
+        file = self.write("out/a.mrc", contents)
+        symbolic, hard = self.out.parent / "symbolic.png", self.out.parent / "hard.png"
+        symbolic.symlink_to(file)
+        os.link(file, hard)
+        for output in (file, symbolic, hard, f"{self.out.parent}/../out/a.mrc"):
+            with self.subTest(output=output):
+                self.assertFails(USAGE, 128, file, output, says="a.mrc: The thumbnail cannot replace the file.\n")
+        self.assertEqual(file.read_bytes(), contents)
+
+
+class Thumbnail(Test):
+    def test_is_never_larger_than_the_request(self):
+        for file in self.stage.pictures():
+            for size in (7, 100, 128, 256, 512, 4096):
+                with self.subTest(file=file.name, size=size):
+                    picture = self.thumbnail(size, file)
+                    self.assertLessEqual(max(picture.size), size)
+
+    def test_is_as_large_as_a_whole_number_allows(self):
+        # 640 pixels become 128 by the factor 5, 213 by 3, 640 by 1; the same of 300 by 3, 2 and 1.
+        file = self.stage.samples / "micrograph.mrc"
+        for size, expected in ((127, 106), (128, 128), (256, 213), (639, 320), (640, 640), (1024, 640)):
+            with self.subTest(size=size):
+                self.assertEqual(self.thumbnail(size, file).size, (expected, expected))
+        file = self.write("wide.mrc", mrc(300, 100, bytes(30000)))
+        for size, expected in ((128, (100, 33)), (256, (150, 50)), (512, (300, 100))):
+            with self.subTest(size=size):
+                self.assertEqual(self.thumbnail(size, file).size, expected)
+
+    def test_of_a_small_coloured_picture_does_not_end_the_process(self):
+        file = self.write("small.mrc", mrc(3, 2, bytes(range(18)), mode=16))
+        picture = self.thumbnail(256, file)
+        self.assertEqual((picture.mode, picture.size), ("RGB", (3, 2)))
+        # The bottom row comes first in the file.
+        self.assertEqual(picture.getpixel((0, 0)), (9, 10, 11))
+        self.assertEqual(picture.getpixel((2, 1)), (6, 7, 8))
+
+    def test_shows_grey_values_from_black_to_white_from_the_top(self):
+        file = self.write("grey.mrc", mrc(2, 2, bytes((10, 20, 30, 61))))
+        picture = self.thumbnail(128, file)
+        self.assertEqual((picture.mode, list(picture.getdata())), ("L", [100, 255, 0, 50]))
+
+    def test_is_made_of_files_with_any_name(self):
+        contents = (self.stage.samples / "atlas.mrc").read_bytes()
+        for name in (b"\xff\xfe not UTF-8.mrc", "Größe 樹.MRC".encode(), b"-1.mrc", b"two\nlines.mrc", b"%s %i.mrc"):
+            with self.subTest(name=name):
+                file = os.path.join(os.fsencode(self.folder), name)
+                with open(file, "wb") as out:
+                    out.write(contents)
+                output = os.path.join(os.fsencode(self.out.parent), name + b".png")
+                self.assertEqual(self.stage.thumbnail(100, file, output), (DONE, ""))
+                with Image.open(output) as picture:
+                    self.assertEqual(picture.size, (89, 89))
+
+
+class Fault(Test):
+    def test_of_a_damaged_file_is_told_in_the_words_of_qelshow(self):
+        for name, sentence in (
+            ("damaged.mrc", "The header is not acceptable: mode is 99 and must be from 0 to 16."),
+            ("damaged.ser", "The header is not acceptable: series id is 0x0198 and must be 0x0197."),
+            ("damaged.emi", "The contents cannot be followed beyond byte 12: bad EMI object index."),
+            ("truncated.mrc", "The file is cut short: the picture takes the bytes up to 820224, and the file has "
+                              "102528 bytes."),
+        ):
+            with self.subTest(name=name):
+                file = self.stage.samples / name
+                self.assertEqual(self.assertFails(FAILED, 128, file, self.out, says=sentence), f"{file}: {sentence}\n")
+
+    def test_of_a_picture_that_is_too_narrow_is_told(self):
+        file = self.write("line.mrc", mrc(1000, 1, bytes(1000)))
+        self.assertFails(FAILED, 128, file, self.out, says="cannot be reduced to 125 pixels")
+
+    def test_of_what_is_no_picture_file_is_told(self):
+        pipe = self.folder / "pipe.mrc"
+        os.mkfifo(pipe)
+        for file, says in (
+            (self.write("empty.mrc", b""), "it has only 0 bytes"),
+            (self.write("picture.png", b"\x89PNG"), "Files with this extension have no thumbnail."),
+            (self.write("none", b""), "Files with this extension have no thumbnail."),
+            (self.folder / "missing.mrc", "The file cannot be opened: No such file or directory."),
+            (self.folder, "This is not a file."),
+            (pipe, "This is not a file."),
+        ):
+            with self.subTest(file=file):
+                self.assertFails(FAILED, 128, file, self.out, says=says)
+
+    def test_of_the_output_leaves_what_was_there(self):
+        file = self.stage.samples / "atlas.mrc"
+        self.out.write_bytes(b"the thumbnail of before")
+        (self.out.parent / "folder").mkdir()
+        self.assertFails(FAILED, 128, file, self.folder / "no folder" / "a.png",
+                         says="no folder/a.png cannot be written: No such file or directory.")
+        self.assertFails(FAILED, 128, file, self.out.parent / "folder", says="cannot be written: Is a directory.")
+        self.assertFails(FAILED, 128, self.stage.samples / "damaged.mrc", self.out, says="mode is 99")
+
+
+class Output(Test):
+    """What others have open, or see while it is written."""
+
+    def test_replaces_what_was_there_at_once(self):
+        self.out.write_bytes(b"the thumbnail of before")
+        with open(self.out, "rb") as before:
+            self.thumbnail(128, self.stage.samples / "atlas.mrc")
+            self.assertEqual(before.read(), b"the thumbnail of before")
+        self.assertEqual(list(self.out.parent.iterdir()), [self.out])
+
+    def test_is_the_file_that_the_caller_has_made_for_it(self):
+        with open(self.out, "x+b") as made:
+            self.thumbnail(128, self.stage.samples / "atlas.mrc")
+            self.assertEqual(made.read(), self.out.read_bytes())
+        self.assertEqual(list(self.out.parent.iterdir()), [self.out])
+
+
+class Limits(Test):
+    def test_are_those_of_memory_and_processor_time(self):
+        # While it cannot say what is wrong with the file, it can be looked at.
+        reader, writer = os.pipe()
+        self.addCleanup(os.close, reader)
+        os.set_blocking(writer, False)
+        with contextlib.suppress(BlockingIOError):
+            while True:
+                os.write(writer, bytes(4096))
+        os.set_blocking(writer, True)
+        process = subprocess.Popen([self.stage.program, "128", self.stage.samples / "damaged.mrc", self.out],
+                                   stdin=subprocess.DEVNULL, stderr=writer)
+        os.close(writer)
+        self.addCleanup(process.wait)
+        self.addCleanup(process.kill)
+        wanted = {"Max address space": str(512 << 20), "Max cpu time": "30"}
+        deadline = time.monotonic() + 60
+        limits = {}
+        while limits != wanted:
+            self.assertLess(time.monotonic(), deadline, limits)
+            self.assertIsNone(process.poll())
+            lines = pathlib.Path(f"/proc/{process.pid}/limits").read_text().splitlines()
+            limits = {name: line.removeprefix(name).split()[1] for name in wanted for line in lines
+                      if line.startswith(name)}
+            time.sleep(0.01)
+
+    def test_that_are_lower_already_stay(self):
+        file = self.write("large.mrc", mrc(4000, 4000, bytes(4 * 4000 * 4000), mode=2))
+        limit = 48 << 20
+        result = subprocess.run([self.stage.program, "4096", file, self.out], stdin=subprocess.DEVNULL,
+                                stderr=subprocess.PIPE, text=True,
+                                preexec_fn=lambda: resource.setrlimit(resource.RLIMIT_AS, (limit, limit)))
+        self.assertEqual((result.returncode, result.stderr), (FAILED, f"{file}: There is not enough memory.\n"))
+        self.assertEqual(list(self.out.parent.iterdir()), [])
+
+    def test_hold_for_a_file_that_claims_more_than_it_has(self):
+        # A file with a hole for nearly all of its 256 MB is no reason to take more memory.
+        file = self.folder / "huge.mrc"
+        with open(file, "wb") as out:
+            out.write(mrc(16000, 16000, b""))
+            out.truncate(1024 + 16000 * 16000)
+        process = subprocess.Popen([self.stage.program, "128", file, self.out], stdin=subprocess.DEVNULL)
+        _, status, usage = os.wait4(process.pid, 0)
+        process.returncode = os.waitstatus_to_exitcode(status)
+        self.assertEqual(process.returncode, DONE)
+        self.assertLess(usage.ru_maxrss, 32 * 1024)
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,89 @@
+"""qelthumb as its package installs it, but in a folder, with samples of every kind beside it."""
+
+import os
+import pathlib
+import re
+import subprocess
+import tempfile
+
+SYSTEM_TYPES = pathlib.Path("/usr/share/mime/packages/freedesktop.org.xml")
+
+# The list of kinds, which is one of the sources.
+KINDS = re.findall(r'FileKind<\w+>\{L"(\w+)"',
+                   (pathlib.Path(__file__).parents[2] / "formats" / "file_kinds.h").read_text())
+
+
+def run(*command, **options):
+    """Runs a program that has to succeed; returns what it prints."""
+    result = subprocess.run([*map(str, command)], stdin=subprocess.DEVNULL, stdout=subprocess.PIPE,
+                            stderr=subprocess.PIPE, text=True, **options)
+    if result.returncode != 0:
+        raise AssertionError(f"{command[0]} ends with {result.returncode}: {result.stdout}{result.stderr}")
+    return result.stdout
+
+
+def make_types(folder, *definitions):
+    """A database of the types that these files define, for XDG_DATA_DIRS."""
+    packages = folder / "mime" / "packages"
+    packages.mkdir(parents=True, exist_ok=True)
+    for definition in definitions:
+        (packages / definition.name).write_bytes(definition.read_bytes())
+    run("update-mime-database", folder / "mime", env=os.environ | {"PKGSYSTEM_ENABLE_FSYNC": "0"})
+    return folder
+
+
+def types_of(files, types):
+    """What GLib takes the files to be, with the database in a folder."""
+    environment = os.environ | {"XDG_DATA_DIRS": str(types), "XDG_DATA_HOME": "/nonexistent", "LC_ALL": "C.UTF-8"}
+    attribute = "standard::content-type"
+    lines = run("gio", "info", "--attributes", attribute, *files, env=environment).splitlines()
+    return [line.split()[-1] for line in lines if line.strip().startswith(attribute)]
+
+
+class Stage:
+    """Deleted with everything in it by close()."""
+
+    def __init__(self, build):
+        self.folder = tempfile.TemporaryDirectory()
+        root = pathlib.Path(self.folder.name)
+        run("cmake", "--install", build, "--prefix", root / "usr")
+        self.program = root / "usr" / "bin" / "qelthumb"
+        self.share = root / "usr" / "share"
+        make_types(self.share, self.share / "mime" / "packages" / "qelthumb.xml", SYSTEM_TYPES)
+        self.samples = root / "samples"
+        run(pathlib.Path(build) / "qelsamples", self.samples)
+
+        self.home = root / "home"
+        self.cache = self.home / ".cache"
+        self.runtime = root / "runtime"
+        self.runtime.mkdir(mode=0o700)
+        self.cache.mkdir(parents=True)
+
+    def close(self):
+        self.folder.cleanup()
+
+    def files(self):
+        return sorted(self.samples.iterdir())
+
+    def pictures(self):
+        """The samples that have a thumbnail."""
+        return [file for file in self.files() if not file.name.startswith(("damaged", "truncated"))]
+
+    def thumbnail(self, size, file, output):
+        """Runs qelthumb; returns its exit status and what it says."""
+        result = subprocess.run([self.program, str(size), file, output], stdin=subprocess.DEVNULL,
+                                capture_output=True, env=os.environ | {"LC_ALL": "C.UTF-8"})
+        return result.returncode, os.fsdecode(result.stderr)
+
+    def environment(self):
+        """That of a desktop session with nothing in it but what is staged and what the system has."""
+        return {
+            "PATH": f"{self.program.parent}:/usr/bin:/bin",
+            "HOME": str(self.home),
+            "XDG_CACHE_HOME": str(self.cache),
+            "XDG_CONFIG_HOME": str(self.home / ".config"),
+            "XDG_DATA_HOME": str(self.home / ".local" / "share"),
+            "XDG_DATA_DIRS": f"{self.share}:/usr/share",
+            "XDG_RUNTIME_DIR": str(self.runtime),
+            "LC_ALL": "C.UTF-8",
+        }

@@ -1,0 +1,150 @@
+// qelthumb, the front end for the file managers of Linux: they run it as qelthumb.thumbnailer says, once for
+// each picture, and read the PNG file that it writes.
+#include <png.h>
+#include <sys/resource.h>
+#include <unistd.h>
+#include <windows.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <charconv>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <new>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <system_error>
+
+#include "fault_text.h"
+#include "file_type_factory.h"
+
+namespace Qel::Lumetra::ShellExt {
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr int kWrongUsage = 2;
+
+constexpr std::int32_t kMaxSize = 4096;
+constexpr rlim_t kMaxMemory = rlim_t{512} << 20;  // four times what a picture of that size takes
+constexpr rlim_t kMaxSeconds = 30;
+
+/// With a sentence for the user.
+using Failure = std::runtime_error;
+
+using Bitmap = std::unique_ptr<HBITMAP__, decltype([](HBITMAP bitmap) { DeleteObject(bitmap); })>;
+
+/// Why the last call of the system failed, as the end of a sentence.
+std::string Reason() {
+  return ": " + std::generic_category().message(errno) + ".";
+}
+
+/// Lowers a limit of this process, which may have a lower one already.
+void Limit(int resource, rlim_t value) {
+  rlimit limit{};
+  getrlimit(resource, &limit);
+  limit.rlim_cur = limit.rlim_max = std::min(limit.rlim_cur, value);
+  setrlimit(resource, &limit);
+}
+
+/// Returns 0 for what is no size.
+std::int32_t ParseSize(std::string_view text) {
+  std::int32_t size = 0;
+  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), size);
+  return error == std::errc() && end == text.data() + text.size() && size <= kMaxSize ? std::max(size, 0) : 0;
+}
+
+/// Returns the edge to request for a thumbnail that is not larger than `size`. It is never larger than the
+/// frame, for which a colour frame would end the process.
+std::int32_t EdgeFor(Size2 frame, std::int32_t size) {
+  const std::int64_t longest = std::max({frame.width, frame.height, 1});
+  return static_cast<std::int32_t>(longest / ((longest + size - 1) / size));
+}
+
+Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
+  std::error_code error;
+  // To open a pipe would be to wait for its writer.
+  if (!fs::is_regular_file(path, error) && !error) throw Failure("This is not a file.");
+  std::ifstream stream(path, std::ios_base::binary);
+  if (!stream) throw Failure("The file cannot be opened" + Reason());
+  // The letters of a known extension are the same in every character set.
+  const std::wstring extension = GetExtension({path.native().begin(), path.native().end()});
+  const auto fault = FaultText(stream, extension);
+  if (!fault) throw Failure("Files with this extension have no thumbnail.");
+  if (!fault->empty()) throw Failure(*fault);
+
+  stream.clear();
+  stream.seekg(0);
+  const auto reader = CreateFileTypeInfo(stream, extension);
+  const std::int32_t edge = EdgeFor(reader->GetDimensions(), size);
+  Bitmap bitmap(reader->CreateThumbnail({edge, edge}));
+  if (!bitmap) throw Failure("The picture cannot be reduced to " + std::to_string(edge) + " pixels.");
+  return bitmap;
+}
+
+/// Writes beside `path` and renames, so that nobody sees half a picture. An empty file is written to in its
+/// place: whoever made it may have it open, as tumblerd has, and would go on to read the old one.
+void WritePng(const Bitmap& bitmap, const std::string& path) {
+  BITMAP pixels{};
+  GetObjectW(bitmap.get(), sizeof pixels, &pixels);
+  png_image image{};
+  image.version = PNG_IMAGE_VERSION;
+  image.width = static_cast<png_uint_32>(pixels.bmWidth);
+  image.height = static_cast<png_uint_32>(pixels.bmHeight);
+  image.format = pixels.bmBitsPixel == 8 ? PNG_FORMAT_GRAY : PNG_FORMAT_BGR;
+
+  std::error_code error;
+  const bool isEmpty = fs::is_regular_file(path, error) && fs::file_size(path, error) == 0;
+  std::string written = isEmpty ? path : path + ".XXXXXX";
+  if (!isEmpty) {
+    const int descriptor = mkstemp(written.data());
+    if (descriptor == -1) throw Failure(path + " cannot be written" + Reason());
+    close(descriptor);
+  }
+  if (png_image_write_to_file(&image, written.c_str(), 0, pixels.bmBits, pixels.bmWidthBytes, nullptr) == 0) {
+    throw Failure(path + " cannot be written: " + image.message + ".");
+  }
+  if (std::rename(written.c_str(), path.c_str()) != 0) {
+    const std::string reason = Reason();
+    unlink(written.c_str());
+    throw Failure(path + " cannot be written" + reason);
+  }
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt
+
+int main(int count, char** arguments) {
+  using namespace Qel::Lumetra::ShellExt;
+  const std::int32_t size = count == 4 ? ParseSize(arguments[1]) : 0;
+  if (size == 0) {
+    std::fputs(
+        "usage: qelthumb SIZE INPUT OUTPUT.png\n\n"
+        "Writes a thumbnail of INPUT with at most SIZE pixels in each direction, from 1 to 4096.\n",
+        stderr);
+    return kWrongUsage;
+  }
+  const char* const input = arguments[2];
+  const char* const output = arguments[3];
+  if (std::error_code error; fs::equivalent(input, output, error)) {
+    std::fprintf(stderr, "%s: The thumbnail cannot replace the file.\n", input);
+    return kWrongUsage;
+  }
+  // Some file managers set no limits themselves.
+  Limit(RLIMIT_AS, kMaxMemory);
+  Limit(RLIMIT_CPU, kMaxSeconds);
+  try {
+    WritePng(MakeThumbnail(input, size), output);
+    return EXIT_SUCCESS;
+  } catch (const std::bad_alloc&) {
+    std::fprintf(stderr, "%s: There is not enough memory.\n", input);
+  } catch (const std::exception& e) {
+    std::fprintf(stderr, "%s: %s\n", input, e.what());
+  }
+  return EXIT_FAILURE;
+}
