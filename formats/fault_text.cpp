@@ -51,6 +51,7 @@ std::string FrameText(const FrameLayout& frame, std::int64_t end) {
 
 template <Parser KindParser>
 std::string TextOf(const KindParser& parser, std::int64_t end) {
+  if (end == 0) return "The file is empty.";
   if (parser.stream().eof()) {
     return "The file ends before its header and index do: it has only " + Bytes(end) + ".";
   }

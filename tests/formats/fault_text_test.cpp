@@ -71,7 +71,7 @@ TEST(FaultText, NamesAnElementOfAnUnknownType) {
 }
 
 TEST(FaultText, TellsOfAFileThatEndsBeforeItsPicture) {
-  EXPECT_EQ(TextOf("", L"mrc"), "The file ends before its header and index do: it has only 0 bytes.");
+  EXPECT_EQ(TextOf("", L"mrc"), "The file is empty.");
   EXPECT_EQ(TextOf("J", L"emi"), "The file ends before its header and index do: it has only 1 byte.");
   EXPECT_EQ(TextOf(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"),
             "The file is cut short: the picture takes the bytes up to 56, and the file has 55 bytes.");

@@ -157,7 +157,7 @@ class Fault(Test):
         pipe = self.folder / "pipe.mrc"
         os.mkfifo(pipe)
         for file, says in (
-            (self.write("empty.mrc", b""), "it has only 0 bytes"),
+            (self.write("empty.mrc", b""), "The file is empty."),
             (self.write("picture.png", b"\x89PNG"), "Files with this extension have no thumbnail."),
             (self.write("none", b""), "Files with this extension have no thumbnail."),
             (self.folder / "missing.mrc", "The file cannot be opened: No such file or directory."),

@@ -74,7 +74,7 @@ class PageTest(unittest.TestCase):
             picture = own["thumbnail"]["picture"]
             thumbnail = own["thumbnail"] | {"picture": picture and f"{picture}?{i}"}
             files.append(own | {"name": f"{i:05} {own['name']}", "thumbnail": thumbnail})
-        data = json.dumps({"schema": 1, "files": files}).replace("<", "\\u003c")
+        data = json.dumps({"schema": 2, "files": files}).replace("<", "\\u003c")
         page = self.page.with_name("many.html")
         page.write_text(DATA.sub(lambda _: data, text, count=1), "utf-8")
         return page

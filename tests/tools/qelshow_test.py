@@ -106,7 +106,7 @@ class Test(unittest.TestCase):
         """The files of the JSON that info prints."""
         result = run("info", *paths, "--json", server=server)
         document = json.loads(result.stdout)
-        self.assertEqual(document["schema"], 1)
+        self.assertEqual(document["schema"], 2)
         return document["files"]
 
 
@@ -121,12 +121,47 @@ class CommandLine(Test):
             self.assertIn(f"  {command} ", texts[0].stdout)
         self.assertEqual(len({result.stdout for result in texts}), 5)
 
+    def test_help_is_found_by_its_other_names(self):
+        whole, info = run("--help", server=None).stdout, run("info", "--help", server=None).stdout
+        for arguments, text in ((("/?",), whole), (("-h",), whole), (("help",), whole), (("info", "/?"), info),
+                                (("info", "-h"), info), (("help", "info"), info)):
+            with self.subTest(arguments=arguments):
+                result = run(*arguments, server=None)
+                self.assertEqual((result.returncode, result.stdout, result.stderr), (DONE, text, ""))
+
+    def test_tells_its_version(self):
+        result = run("--version", server=None)
+        self.assertEqual((result.returncode, result.stderr), (DONE, ""))
+        self.assertRegex(result.stdout, r"\Aqelshow \d+\.\d+\.\d+\n\Z")
+
+    def test_two_hyphens_end_the_options(self):
+        self.write("--json", mrc())
+        self.write("-a.mrc", mrc())
+        result = run("info", "--server", SERVER, "--json", "--", "-a.mrc", "--json", server=None, folder=self.folder)
+        files = json.loads(result.stdout)["files"]
+        self.assertEqual([(file["name"], file["verdict"]) for file in files],
+                         [("-a.mrc", "good"), ("--json", "unsupported")])
+        self.assertEqual(run("info", "--", server=None).returncode, USAGE)
+
+    def test_a_pattern_without_a_match_says_so(self):
+        result = run("info", "*.mrc", folder=self.folder)
+        self.assertEqual((result.returncode, result.stdout, result.stderr),
+                         (FAILED, "", "*.mrc: No file matches.\n"))
+        result = run("page", "*.mrc", folder=self.folder)
+        self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
+        self.assertOneSentence(result.stderr, 'No file matches "*.mrc".')
+
     def test_what_cannot_be_understood_is_a_usage_error_of_one_sentence(self):
         for arguments, *parts in (
             ((), "No command"),
             (("show",), '"show"', "qelshow --help"),
             (("info",), "No file", "qelshow info --help"),
             (("info", "a.mrc", "--pretty"), '"--pretty"'),
+            (("info", "a.mrc", "--json=1"), '"--json=1"', "no value"),
+            (("info", "a.mrc", "--json="), '"--json="', "no value"),
+            (("help", "show"), '"show"', "qelshow --help"),
+            (("help", "info", "page"), '"page"'),
+            (("--version", "info"), '"info"'),
             (("info", "a.mrc", "--out", "x"), '"--out"'),
             (("info", "a.mrc", "--server"), '"--server"', "value"),
             (("info", "a.mrc", "--size", "0"), '"0"', "1 to 4096"),
@@ -218,7 +253,7 @@ class ExitStatus(Test):
             ("mode.mrc", mrc(mode=17), "mode is 17", "0 to 16"),
             ("swapped.mrc", mrc(0x7FFFFFFF, 0x7FFFFFFF, 0x7FFFFFFF, pixels=b""), "nx is -129", "read as big-endian"),
             ("short.mrc", mrc()[:1000], "1000 bytes"),
-            ("empty.mrc", b"", "0 bytes"),
+            ("empty.mrc", b"", "The file is empty."),
             ("cut.mrc", mrc(200, 100, 3)[:41000], "41024", "41000 bytes"),
             ("even.mrc", mrc(200, 100, 4)[:61023], "61024", "61023 bytes"),
             ("far.mrc", mrc(50000, 50000, pixels=b""), "2 GiB"),
@@ -275,6 +310,16 @@ class ExitStatus(Test):
                 self.assertEqual(process.wait(), DONE)
                 errors.seek(0)
                 self.assertEqual(errors.read(), b"")
+
+    def test_each_problem_is_printed_once(self):
+        paths = (self.write("mode.mrc", mrc(mode=17)), self.write("notes.txt", b""), self.folder / "gone.mrc")
+        result = run("info", *paths)
+        printed = result.stdout + result.stderr
+        for path, part in zip(paths, ("mode is 17", "files only", "cannot be opened")):
+            self.assertEqual(printed.count(part), 1, part)
+            self.assertIn(str(path), result.stderr)
+        self.assertEqual(result.stdout.count("\n\n"), 0)
+        self.assertNotIn("notes.txt", result.stdout)
 
     def test_a_folder_is_no_file(self):
         result = run("info", self.folder)
@@ -426,8 +471,8 @@ class Faults(Test):
         self.assertIn("0xC0000005 (access violation)", load["thumbnail"]["problem"])
         self.assertEqual(load["problem"], load["thumbnail"]["problem"])
         self.assertIn("0xC00000FD (stack overflow)", tip["tip"]["problem"])
-        self.assertIn("0x80004005", tip["thumbnail"]["problem"])
-        self.assertIn("0x80004001, not implemented", quiet["tip"]["problem"])
+        self.assertIn(": failed.", tip["thumbnail"]["problem"])
+        self.assertIn(": not implemented.", quiet["tip"]["problem"])
         self.assertIn("no such interface", quiet["columns"]["problem"])
         self.assertIn("no such class", quiet["propertyStore"]["problem"])
         self.assertEqual([file["verdict"] for file in (load, tip, quiet)], ["damaged"] * 3)
@@ -471,7 +516,7 @@ class Json(Test):
         label = b"</script><script>alert(1)</script> \" \\ \x01 \xe9"
         file, = self.info(self.write(name, mrc(label=label)))
         self.assertEqual((file["name"], file["verdict"]), (name, "good"))
-        self.assertTrue(file["path"].endswith(name))
+        self.assertEqual(file["path"], f"Z:{self.folder / name}".replace("/", "\\"))
 
     def test_keeps_control_characters_and_line_separators(self):
         name = "a\u2028b\u2029c.mrc"
@@ -513,28 +558,28 @@ class Answers(Test):
         self.assertRegex(file["tip"]["text"], r"\ADimensions: 7 images \(40 × 30\) 16 bit signed\r\nType: \r\n"
                                               r"Date Modified: .+\r\nSize: 17.4 KB\r\nLine one\Z")
         self.assertEqual(self.rows(file["columns"], "title", "set", "id", "declared", "delivered", "value"), [
-            ("Width", self.IMAGE_SUMMARY, 3, "VT_I4", "VT_I4", "40"),
-            ("Height", self.IMAGE_SUMMARY, 4, "VT_I4", "VT_I4", "30"),
-            ("Bit Depth", self.IMAGE_SUMMARY, 7, "VT_UI4", "VT_I4", "16"),
-            ("Frame Count", self.IMAGE_SUMMARY, 12, "VT_UI4", "VT_I4", "7"),
+            ("Width", self.IMAGE_SUMMARY, 3, "VT_I4", "VT_I4", 40),
+            ("Height", self.IMAGE_SUMMARY, 4, "VT_I4", "VT_I4", 30),
+            ("Bit Depth", self.IMAGE_SUMMARY, 7, "VT_UI4", "VT_I4", 16),
+            ("Frame Count", self.IMAGE_SUMMARY, 12, "VT_UI4", "VT_I4", 7),
             ("Dimensions", self.IMAGE_SUMMARY, 13, "VT_LPWSTR", "VT_BSTR", "40 x 30"),
             ("Comments", self.SUMMARY, 6, "VT_LPWSTR", "VT_BSTR", "Line one"),
         ])
         self.assertEqual(self.rows(file["columns"], "index", "characters", "state"),
                          [(0, 5, 0x101), (1, 5, 0x101), (2, 5, 1), (3, 5, 1), (4, 20, 0x11), (5, 30, 0x11)])
         self.assertEqual(self.rows(file["propertySets"], "set", "id", "type", "value"), [
-            (self.IMAGE_SUMMARY, 3, "VT_INT", "40"),
-            (self.IMAGE_SUMMARY, 4, "VT_INT", "30"),
-            (self.IMAGE_SUMMARY, 7, "VT_INT", "16"),
-            (self.IMAGE_SUMMARY, 12, "VT_INT", "7"),
+            (self.IMAGE_SUMMARY, 3, "VT_INT", 40),
+            (self.IMAGE_SUMMARY, 4, "VT_INT", 30),
+            (self.IMAGE_SUMMARY, 7, "VT_INT", 16),
+            (self.IMAGE_SUMMARY, 12, "VT_INT", 7),
             (self.IMAGE_SUMMARY, 13, "VT_BSTR", "40 x 30"),
             (self.SUMMARY, 6, "VT_BSTR", "Line one"),
         ])
         self.assertEqual(self.rows(file["propertyStore"], "name", "set", "id", "type", "value"), [
-            ("System.Image.HorizontalSize", self.IMAGE_SUMMARY, 3, "VT_UI4", "40"),
-            ("System.Image.VerticalSize", self.IMAGE_SUMMARY, 4, "VT_UI4", "30"),
-            ("System.Image.BitDepth", self.IMAGE_SUMMARY, 7, "VT_UI4", "16"),
-            ("System.Media.FrameCount", self.IMAGE_SUMMARY, 12, "VT_UI4", "7"),
+            ("System.Image.HorizontalSize", self.IMAGE_SUMMARY, 3, "VT_UI4", 40),
+            ("System.Image.VerticalSize", self.IMAGE_SUMMARY, 4, "VT_UI4", 30),
+            ("System.Image.BitDepth", self.IMAGE_SUMMARY, 7, "VT_UI4", 16),
+            ("System.Media.FrameCount", self.IMAGE_SUMMARY, 12, "VT_UI4", 7),
             ("System.Image.Dimensions", self.IMAGE_SUMMARY, 13, "VT_LPWSTR", "(40 x 30) 16 bit signed"),
             ("System.Comment", self.SUMMARY, 6, "VT_LPWSTR", ""),
         ])
@@ -559,10 +604,11 @@ class Answers(Test):
 
     def test_of_a_damaged_file_say_why_they_are_missing(self):
         file, = self.info(self.write("a.mrc", mrc(mode=17)))
-        self.assertIn("0x80004005", file["tip"]["problem"])
-        self.assertIn("0x80004005", file["propertySets"]["problem"])
-        self.assertEqual({column["problem"] for column in file["columns"]["items"]}, {"0x00000001, no value"})
-        self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"0x80004005, failed"})
+        self.assertEqual(file["tip"]["problem"], "The extension gives no tip: failed.")
+        self.assertEqual(file["propertySets"]["problem"], "The extension gives no property sets: failed.")
+        self.assertEqual({column["problem"] for column in file["columns"]["items"]}, {"no value"})
+        self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"failed"})
+        self.assertEqual({item["value"] for name in ("columns", "propertyStore") for item in file[name]["items"]}, {None})
 
 
 class Page(Test):
@@ -571,7 +617,7 @@ class Page(Test):
         text = page.read_text("utf-8")
         data = re.search(r'<script id="files" type="application/json">(.*?)</script>', text, re.DOTALL)
         document = json.loads(data[1])
-        self.assertEqual(document["schema"], 1)
+        self.assertEqual(document["schema"], 2)
         return document["files"]
 
     def test_has_every_file_of_a_folder_with_its_picture(self):
@@ -591,7 +637,7 @@ class Page(Test):
             picture = file["thumbnail"]["picture"]
             if file["name"] == "broken.ser":
                 self.assertIsNone(picture)
-                self.assertIn("0 bytes", file["problem"])
+                self.assertEqual(file["problem"], "The file is empty.")
             else:
                 width, height, _, _ = png_facts((out / picture).read_bytes())
                 self.assertEqual((width, height), (file["thumbnail"]["width"], file["thumbnail"]["height"]))
@@ -602,7 +648,7 @@ class Page(Test):
         self.assertEqual(len(lines), 1 + len(names) + 2)
         self.assertIn("4 thumbnails of 5 files", lines[-1])
         self.assertRegex(result.stdout, r"(?m)^big.MRC .* 4 x 3$")
-        self.assertRegex(result.stdout, r"(?m)^broken.ser .* none: .*0 bytes")
+        self.assertRegex(result.stdout, r"(?m)^broken.ser .* none: The file is empty\.$")
 
     def test_shows_files_that_are_named_even_if_they_cannot_be_shown(self):
         out = self.folder / "page"
@@ -613,12 +659,22 @@ class Page(Test):
                          [("b.mrc", "good"), ("gone.mrc", "failed"), ("a.txt", "unsupported")])
 
     def test_has_the_files_of_each_folder_in_the_order_of_the_folders(self):
-        for name in ("1/b.mrc", "1/a.mrc", "2/d.mrc", "2/c.mrc"):
+        for name in ("1/b.mrc", "1/a.mrc", "2/d 10.mrc", "2/d 9.mrc"):
             self.write(name, mrc())
         out = self.folder / "page"
         run("page", self.folder / "2", self.folder / "1", "--out", out)
         self.assertEqual([file["name"] for file in self.files_of(out / "index.html")],
-                         ["c.mrc", "d.mrc", "a.mrc", "b.mrc"])
+                         ["d 9.mrc", "d 10.mrc", "a.mrc", "b.mrc"])
+
+    def test_has_the_files_whose_names_windows_cannot_represent(self):
+        for name in ("in/a.mrc", "in/b?.mrc"):
+            self.write(name, mrc())
+        result = run("page", self.folder / "in", "--out", self.folder / "page")
+        self.assertEqual(result.returncode, DONE)
+        named, other = self.files_of(self.folder / "page" / "index.html")
+        self.assertEqual((named["verdict"], other["name"], other["verdict"]), ("good", "b?.mrc", "failed"))
+        self.assertOneSentence(other["problem"], "Windows cannot represent its name")
+        self.assertIn("1 thumbnail of 2 files", result.stdout)
 
     def test_loads_nothing_from_a_network(self):
         out = self.folder / "page"
@@ -767,7 +823,7 @@ class Doctor(Test):
         result = run("doctor", *files, "--json", server=None)
         self.assertEqual(result.stderr, "")
         document = json.loads(result.stdout)
-        self.assertEqual(document["schema"], 1)
+        self.assertEqual(document["schema"], 2)
         return result, document
 
     def conditions(self, document):
@@ -987,6 +1043,18 @@ class Doctor(Test):
         self.assertWorksBut(document, dict.fromkeys(
             (".raw property store", (".raw", "property store"), ".mrc property store", (".mrc", "property store")),
             "disabled"))
+
+    def test_spells_classes_and_paths_in_one_way(self):
+        dll = self.write("QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
+        self.register(dll=dll)
+        self.set_registry({self.CLASSES + ".mrc\\" + self.THUMBNAIL: self.EXTENSION.lower()})
+        self.set_dll(self.folder / "below" / ".." / "QelShellExt.dll", self.EBN_STORE)
+        (self.folder / "below").mkdir()
+        result, document = self.doctor()
+        self.assertEqual(result.returncode, DONE)
+        self.assertEqual({each["dll"] for each in document["classes"]}, {f"Z:{dll}".replace("/", "\\")})
+        self.assertEqual({handler["class"] for kind in document["kinds"] for handler in kind["handlers"]},
+                         {self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE})
 
     def test_names_the_program_that_has_taken_a_handler(self):
         foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"

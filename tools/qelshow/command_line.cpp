@@ -22,9 +22,10 @@ commands:
   thumbnail FILE -o PNG  the thumbnail of one file
   page FOLDER|FILE...    a page of all thumbnails and everything else
   doctor [FILE...]       whether the extension works, and if not, why
-  COMMAND --help         more about a command
+  help COMMAND           more about a command
+  --version              the version of this program
 
-FILE can be a pattern, such as *.mrc.
+FILE can be a pattern, such as *.mrc. After "--" every word is a FILE.
 
 options of info, thumbnail and page:
   --server PATH  ask this QelShellExt.DLL instead of the registered one
@@ -45,7 +46,7 @@ Prints everything that the shell learns about each file: the size of its
 thumbnail or why there is none, the tip, the columns of the Details view with
 the declared and the delivered types, the property sets, the property store.
 
-  --json         print one JSON document: {"schema": 1, "files": [...]}
+  --json         print one JSON document: {"schema": 2, "files": [...]}
   --server PATH  ask this QelShellExt.DLL instead of the registered one
   --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
 
@@ -92,7 +93,7 @@ whether objects of its classes can be made; and whether the registered extension
 reads each file. What is wrong is told with its reason and what to do about it.
 A kind of file that was left to other programs is no fault.
 
-  --json  print one JSON document: {"schema": 1, "classes": [...],
+  --json  print one JSON document: {"schema": 2, "classes": [...],
           "kinds": [...], "problems": [...], "files": [...]}
 
 exit status: 0 everything works, 1 something does not, or a file is of a kind
@@ -115,6 +116,8 @@ constexpr CommandFacts kCommands[] = {
     {L"page", kPageHelp, Command::kPage, false, true, true},
     {L"doctor", kDoctorHelp, Command::kDoctor, true, false, false},
 };
+
+constexpr const wchar_t* kVersion = L"qelshow " QEL_VERSION "\n";
 
 [[noreturn]] void WrongUsage(const std::wstring& sentence, std::wstring_view command = {}) {
   const std::wstring help =
@@ -144,7 +147,11 @@ const CommandFacts& FindCommand(const std::wstring& name) {
   WrongUsage(L"There is no command \"" + name + L"\".");
 }
 
-/// The arguments behind the command.
+bool IsHelp(const std::wstring& argument) {
+  return argument == L"--help" || argument == L"-h" || argument == L"/?";
+}
+
+/// The arguments after the command.
 class OptionReader {
  public:
   OptionReader(const CommandFacts& facts, const std::vector<std::wstring>& arguments)
@@ -155,10 +162,14 @@ class OptionReader {
     line.command = facts_.command;
     while (next_ < arguments_.size()) {
       const std::wstring& argument = arguments_[next_++];
+      if (argument == L"--") {
+        line.files.insert(line.files.end(), arguments_.begin() + static_cast<std::ptrdiff_t>(next_),
+                          arguments_.end());
+        break;
+      }
+      if (IsHelp(argument)) return HelpLine(facts_.help);
       if (argument.size() < 2 || argument.front() != L'-') {
         line.files.push_back(argument);
-      } else if (argument == L"--help" || argument == L"-h") {
-        return HelpLine(facts_.help);
       } else if (!ReadOption(argument, line)) {
         WrongUsage(L"\"" + argument + L"\" is no option of \"" + facts_.name + L"\".", facts_.name);
       }
@@ -172,6 +183,8 @@ class OptionReader {
     const std::size_t equals = argument.find(L'=');
     const std::wstring name = argument.substr(0, equals);
     if (name == L"--json" && facts_.takesJson) {
+      if (equals != std::wstring::npos)
+        WrongUsage(L"\"" + argument + L"\": --json takes no value.", facts_.name);
       line.json = true;
     } else if (name == L"--server" && facts_.takesServer) {
       line.server = Value(argument, equals);
@@ -185,7 +198,7 @@ class OptionReader {
     return true;
   }
 
-  /// The value of an option: behind the equals sign, or the next argument.
+  /// The value of an option: after the equals sign, or the next argument.
   std::wstring Value(const std::wstring& argument, std::size_t equals) {
     std::wstring value;
     if (equals != std::wstring::npos) {
@@ -222,8 +235,13 @@ class OptionReader {
 
 CommandLine ParseCommandLine(const std::vector<std::wstring>& arguments) {
   if (arguments.empty()) WrongUsage(L"No command is given.");
-  if (arguments.front() == L"--help" || arguments.front() == L"-h" || arguments.front() == L"help") {
-    return HelpLine(kHelp);
+  const std::wstring& first = arguments.front();
+  const bool isVersion = first == L"--version";
+  if (isVersion || first == L"help" || IsHelp(first)) {
+    const std::size_t count = first == L"help" ? 2 : 1;
+    if (arguments.size() > count) WrongUsage(L"\"" + arguments[count] + L"\" is one argument too many.");
+    if (isVersion) return HelpLine(kVersion);
+    return HelpLine(arguments.size() == 2 ? FindCommand(arguments[1]).help : kHelp);
   }
   return OptionReader(FindCommand(arguments.front()), arguments).Read();
 }

@@ -11,7 +11,7 @@ enum class Command { kHelp, kInfo, kThumbnail, kPage, kDoctor };
 
 struct CommandLine {
   Command command = Command::kHelp;
-  std::wstring helpText;  // for kHelp
+  std::wstring helpText;  // or the version, for kHelp
   std::vector<std::wstring> files;
   std::wstring server;  // empty: the registered one
   std::wstring out;     // a file or a folder

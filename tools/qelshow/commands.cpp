@@ -32,8 +32,8 @@ std::wstring Counted(std::size_t count, const wchar_t* what) {
 
 /// Names a file with what is wrong with it.
 void PrintProblem(const FileFacts& facts) {
-  if (!facts.problem.empty()) PrintError(facts.path + L": " + facts.problem);
-  if (!facts.remark.empty()) PrintError(facts.path + L": " + facts.remark);
+  if (!facts.problem.empty()) PrintError(facts.named + L": " + facts.problem);
+  if (!facts.remark.empty()) PrintError(facts.named + L": " + facts.remark);
 }
 
 }  // namespace
@@ -43,6 +43,7 @@ int RunInfo(const CommandLine& line) {
   ProgressBar progress(line.files.size());
   int status = kExitDone;
   std::size_t count = 0;
+  std::size_t printed = 0;
   if (line.json) PrintUtf8("{\"schema\":" + std::to_string(kJsonSchema) + ",\"files\":[");
   for (const std::wstring& path : line.files) {
     progress.Show(count, FileName(path));
@@ -50,8 +51,8 @@ int RunInfo(const CommandLine& line) {
     progress.Hide();
     if (line.json) {
       PrintUtf8((count > 0 ? ",\n" : "\n") + Json(facts).dump());
-    } else {
-      Print((count > 0 ? L"\n" : L"") + TextReport(facts));
+    } else if (facts.verdict == Verdict::kGood || facts.verdict == Verdict::kDamaged) {
+      Print((printed++ > 0 ? L"\n" : L"") + TextReport(facts));
     }
     if (facts.verdict != Verdict::kGood) PrintProblem(facts);
     status = std::max(status, ExitStatus(facts.verdict));

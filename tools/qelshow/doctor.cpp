@@ -54,7 +54,8 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
       files.push_back(InspectFile(*worker, path, name, line.size));
     } else {
       FileFacts facts;
-      facts.path = path;
+      facts.path = AbsolutePath(path);
+      facts.named = path;
       facts.name = name;
       facts.verdict = Verdict::kFailed;
       facts.problem = obstacle;
@@ -113,7 +114,7 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
 }
 
 std::wstring FileText(const FileFacts& facts) {
-  std::wstring text = L"    " + facts.path + L": ";
+  std::wstring text = L"    " + facts.named + L": ";
   if (facts.verdict != Verdict::kGood) return text + L"is not read. " + facts.problem + L"\n";
   text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
           L" pixels, frames: " + std::to_wstring(facts.frames) + L", " + facts.type + L"\n";

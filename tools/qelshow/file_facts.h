@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <string>
 #include <utility>
+#include <variant>
 #include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -45,6 +46,9 @@ struct TipAnswer {
   OptionalText problem;
 };
 
+/// A number, a text, or nothing.
+using Value = std::variant<std::monostate, std::int64_t, std::wstring>;
+
 /// A column of the Details view. Types are names such as "VT_I4".
 struct Column {
   std::uint32_t index = 0;
@@ -55,7 +59,7 @@ struct Column {
   std::uint32_t state = 0;       // SHCOLSTATE flags
   std::wstring declared;
   OptionalText delivered;
-  std::wstring value;
+  Value value;
   OptionalText problem;
 };
 
@@ -64,7 +68,7 @@ struct Property {
   std::wstring set;   // format id
   std::uint32_t id = 0;
   OptionalText type;
-  std::wstring value;
+  Value value;
   OptionalText problem;
 };
 
@@ -83,7 +87,8 @@ struct ThumbnailAnswer {
 };
 
 struct FileFacts {
-  std::wstring path;  // as it was named on the command line
+  std::wstring path;   // absolute
+  std::wstring named;  // as on the command line; not in the document
   std::wstring name;
   std::wstring kind;  // the extension in small letters
   std::uint64_t bytes = 0;

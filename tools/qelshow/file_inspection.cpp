@@ -3,7 +3,6 @@
 #include <windows.h>
 
 #include <algorithm>
-#include <cwchar>
 
 #include "file_type_factory.h"
 #include "text_tools.h"
@@ -32,12 +31,10 @@ void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar
 
 /// The number that a column delivered; 0 without one.
 std::int32_t Number(const ListAnswer<Column>& columns, std::uint32_t id) {
-  for (const Column& column : columns.items) {
-    if (column.id == id && column.delivered == L"VT_I4") {
-      return static_cast<std::int32_t>(std::wcstol(column.value.c_str(), nullptr, 10));
-    }
-  }
-  return 0;
+  const auto column = std::ranges::find(columns.items, id, &Column::id);
+  const auto* const number =
+      column == columns.items.end() ? nullptr : std::get_if<std::int64_t>(&column->value);
+  return number == nullptr ? 0 : static_cast<std::int32_t>(*number);
 }
 
 /// The pixel type is told in the tip only, at the end of its first line: "Dimensions: (640 × 480) 8 bit
@@ -73,12 +70,13 @@ void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, 
 
 FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size) {
   FileFacts facts;
-  facts.path = path;
+  // The shell names files by their full path.
+  const std::wstring absolute = AbsolutePath(path);
+  facts.path = absolute;
+  facts.named = path;
   facts.name = name;
   facts.kind = Lowered(GetExtension(path));
   facts.thumbnail.request = size;
-  // The shell names files by their full path.
-  const std::wstring absolute = AbsolutePath(path);
   facts.bytes = FileBytes(absolute);
 
   Diagnosis diagnosis;

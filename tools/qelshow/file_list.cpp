@@ -2,6 +2,8 @@
 
 #include <windows.h>
 
+#include <shlwapi.h>
+
 #include <algorithm>
 #include <filesystem>
 #include <system_error>
@@ -24,8 +26,10 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   fs::recursive_directory_iterator entry;
   if (!error) entry = {folder, fs::directory_options::skip_permission_denied, error};
   for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {
-    std::error_code ignored;
-    if (!IsSupported(entry->path().wstring()) || !entry->is_regular_file(ignored)) continue;
+    if (!IsSupported(entry->path().wstring())) continue;
+    // What cannot be looked at, as its name cannot be represented, is reported.
+    std::error_code unknown;
+    if (!entry->is_regular_file(unknown) && !unknown) continue;
     files.push_back({entry->path().wstring(), entry->path().lexically_relative(folder).wstring()});
   }
   if (error) {
@@ -33,7 +37,10 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
                   L".");
   }
   std::sort(files.begin() + static_cast<std::ptrdiff_t>(first), files.end(),
-            [](const ListedFile& a, const ListedFile& b) { return a.name < b.name; });
+            [](const ListedFile& a, const ListedFile& b) {
+              const int order = StrCmpLogicalW(a.name.c_str(), b.name.c_str());
+              return order != 0 ? order < 0 : a.name < b.name;
+            });
 }
 
 /// Of these paths none is, or holds, a file that can be shown.
@@ -43,6 +50,7 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   };
   if (const auto missing = std::ranges::find_if(paths, isMissing); missing != paths.end()) {
     const std::wstring reason = SystemErrorText(GetLastError());
+    if (IsUnmatchedPattern(*missing)) throw Failure(L"No file matches \"" + *missing + L"\".");
     throw Failure(L"\"" + *missing + L"\" cannot be opened: " + reason + L".");
   }
   const std::wstring& first = paths.front();
@@ -58,6 +66,15 @@ bool IsSupported(const std::wstring& path) {
   const std::wstring extension = GetExtension(fs::path(path).filename().wstring());
   return IsMrcExtension(extension) || IsSerExtension(extension) || IsEmiExtension(extension) ||
          IsEbnExtension(extension) || IsRawExtension(extension);
+}
+
+bool IsUnmatchedPattern(const std::wstring& path) {
+  if (path.find_first_of(L"*?") == std::wstring::npos) return false;
+  WIN32_FIND_DATAW found{};
+  const HANDLE search = FindFirstFileW(path.c_str(), &found);
+  if (search == INVALID_HANDLE_VALUE) return true;
+  FindClose(search);
+  return false;
 }
 
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {

@@ -14,9 +14,12 @@ struct ListedFile {
 /// Whether the extension shows files with this one's extension.
 bool IsSupported(const std::wstring& path);
 
+/// Whether the path has wildcards and no file matches them.
+bool IsUnmatchedPattern(const std::wstring& path);
+
 /// The files named, and of the folders named all files of the supported kinds, also in folders below them,
-/// ordered by name. A path that does not exist is kept as a file, so that it is reported. Throws Failure for
-/// a folder that cannot be listed, and if nothing is there that can be shown.
+/// in natural order of their names (9 before 10). A path that does not exist is kept as a file, so that it is
+/// reported. Throws Failure for a folder that cannot be listed, and if nothing is there that can be shown.
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -22,13 +22,25 @@ struct nlohmann::adl_serializer<std::wstring> {
   }
 };
 
+template <>
+struct nlohmann::adl_serializer<Qel::Lumetra::ShellExt::Show::Value> {
+  static void to_json(nlohmann::json& json, const Qel::Lumetra::ShellExt::Show::Value& value) {
+    if (const auto* const number = std::get_if<std::int64_t>(&value)) json = *number;
+    if (const auto* const text = std::get_if<std::wstring>(&value)) json = *text;
+  }
+  static void from_json(const nlohmann::json& json, Qel::Lumetra::ShellExt::Show::Value& value) {
+    if (json.is_number()) value = json.get<std::int64_t>();
+    if (json.is_string()) value = json.get<std::wstring>();
+  }
+};
+
 namespace Qel::Lumetra::ShellExt::Show {
 
 using Json = nlohmann::json;
 
 /// The version of the documents. It changes when a member is renamed, removed or given another meaning; a new
 /// member does not change it.
-inline constexpr int kJsonSchema = 1;
+inline constexpr int kJsonSchema = 2;
 
 inline void to_json(Json& json, const OptionalText& text) {
   if (!text.empty()) json = Utf8(text);

@@ -44,6 +44,11 @@ std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name =
   return text;
 }
 
+/// A path without detours; a bare file name, which the system looks for in its folders, and no text stay.
+std::wstring FullPath(const std::wstring& path) {
+  return path.find(L'\\') == std::wstring::npos ? path : AbsolutePath(path);
+}
+
 /// The key by which an administrator, the user or a tool of theirs has disabled the class; empty without one.
 std::wstring BlockingKey(const std::wstring& clsid) {
   constexpr const wchar_t* kBlocked =
@@ -75,7 +80,7 @@ Handler ReadShellHandler(const std::wstring& extension, const ShellHandler& fact
     if (name == nullptr) continue;
     for (const std::wstring& place : PlacesOfHandlers(extension)) {
       const std::wstring key = place + L"\\ShellEx\\" + name;
-      handler.registered = TextValue(HKEY_CLASSES_ROOT, key);
+      handler.registered = SpelledGuid(TextValue(HKEY_CLASSES_ROOT, key));
       handler.key = L"HKEY_CLASSES_ROOT\\" + key;
       handler.isOwnKey = key == ownKey;
       if (!handler.registered.empty()) return handler;
@@ -95,8 +100,8 @@ std::vector<KindOfFile> ReadHandlers() {
     }
     if (const CLSID* const store = StoreClassOf(extension)) {
       const std::wstring key = kPropertyHandlers + extension;
-      kind.handlers.push_back(
-          {L"property store", *store, TextValue(HKEY_LOCAL_MACHINE, key), L"HKEY_LOCAL_MACHINE\\" + key});
+      kind.handlers.push_back({L"property store", *store, SpelledGuid(TextValue(HKEY_LOCAL_MACHINE, key)),
+                               L"HKEY_LOCAL_MACHINE\\" + key});
     }
     kinds.push_back(std::move(kind));
   }
@@ -107,8 +112,8 @@ RegisteredClass ReadClass(const std::wstring& clsid) {
   const std::wstring path = L"CLSID\\" + clsid;
   Com::OwnedKey key;
   if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, key.Put()) != ERROR_SUCCESS) return {};
-  return {true, TextValue(HKEY_CLASSES_ROOT, path), TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32"),
-          BlockingKey(clsid)};
+  return {true, TextValue(HKEY_CLASSES_ROOT, path),
+          FullPath(TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32")), BlockingKey(clsid)};
 }
 
 std::wstring InstalledProduct() {

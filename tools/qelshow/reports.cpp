@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "text_tools.h"
+#include "value_text.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
@@ -36,8 +37,8 @@ std::wstring OneLine(std::wstring_view text) {
   return line;
 }
 
-std::wstring ValueOrProblem(const std::wstring& value, const std::wstring& problem) {
-  return problem.empty() ? OneLine(value) : L"(" + problem + L")";
+std::wstring ValueOrProblem(const Value& value, const std::wstring& problem) {
+  return problem.empty() ? OneLine(ValueText(value)) : L"(" + problem + L")";
 }
 
 std::wstring ColumnsText(const ListAnswer<Column>& columns) {
@@ -74,10 +75,8 @@ std::wstring ThumbnailText(const Thumbnail& thumbnail) {
 }  // namespace
 
 std::wstring TextReport(const FileFacts& facts) {
-  std::wstring text = facts.path + L"\n";
-  if (!facts.problem.empty()) text += L"  Problem     " + facts.problem + L"\n";
+  std::wstring text = facts.named + L"\n";
   if (!facts.remark.empty()) text += L"  Remark      " + facts.remark + L"\n";
-  if (facts.verdict == Verdict::kFailed || facts.verdict == Verdict::kUnsupported) return text;
   if (facts.width > 0) {
     text += L"  Dimensions  " + Dimensions(facts.width, facts.height) + L"\n";
     text += L"  Frames      " + std::to_wstring(facts.frames) + L"\n";

@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Everything about the file, as lines.
+/// Everything about a file that was read, as lines, but for its problem.
 std::wstring TextReport(const FileFacts& facts);
 
 /// Rows of a table of which every file is one; `nameWidth` is the number of characters of the first column.

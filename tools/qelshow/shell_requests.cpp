@@ -76,7 +76,7 @@ void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDA
   const HRESULT result = provider.GetItemData(&id, &file, &value);
   if (result == S_OK) {
     column.delivered = TypeName(value.vt);
-    column.value = ValueText(value);
+    column.value = ValueOf(value);
   } else {
     column.problem = ResultText(result);
   }
@@ -104,7 +104,7 @@ HRESULT ReadPropertySet(IPropertySetStorage& sets, const GUID& format, std::vect
     const HRESULT read = storage->ReadMultiple(1, &specifier, &value);
     if (read == S_OK) {
       property.type = TypeName(value.vt);
-      property.value = ValueText(value);
+      property.value = ValueOf(value);
     } else {
       property.problem = ResultText(read);
     }
@@ -235,7 +235,7 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
       result = store->GetValue(key, &value);
       if (SUCCEEDED(result)) {
         property.type = TypeName(value.vt);
-        property.value = ValueText(value);
+        property.value = ValueOf(value);
       } else {
         property.problem = ResultText(result);
       }

@@ -40,14 +40,23 @@ std::wstring HexCode(std::uint32_t code) {
   return text.data();
 }
 
-std::wstring SystemErrorText(DWORD error) {
+namespace {
+
+/// What the system says about a code, without a full stop; empty if it knows nothing.
+std::wstring SystemMessage(DWORD code) {
   std::array<wchar_t, 512> text{};
   const DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
-                                      error, 0, text.data(), static_cast<DWORD>(text.size()), nullptr);
-  std::wstring_view message(text.data(), length);
-  const std::size_t last = message.find_last_not_of(L" .\r\n");
-  if (last == std::wstring_view::npos) return L"error " + std::to_wstring(error);
-  return std::wstring(message.substr(0, last + 1)) + L" (error " + std::to_wstring(error) + L")";
+                                      code, 0, text.data(), static_cast<DWORD>(text.size()), nullptr);
+  const std::wstring_view message(text.data(), length);
+  return std::wstring(message.substr(0, message.find_last_not_of(L" .\r\n") + 1));
+}
+
+}  // namespace
+
+std::wstring SystemErrorText(DWORD error) {
+  const std::wstring message = SystemMessage(error);
+  const std::wstring code = L"error " + std::to_wstring(error);
+  return message.empty() ? code : message + L" (" + code + L")";
 }
 
 std::wstring SystemErrorText(const std::error_code& error) {
@@ -71,11 +80,11 @@ std::wstring ResultText(HRESULT result) {
       {REGDB_E_CLASSNOTREG, L"class not registered"},
   };
   for (const Known& known : kKnown) {
-    if (known.result == result) {
-      return HexCode(static_cast<std::uint32_t>(result)) + L", " + known.meaning;
-    }
+    if (known.result == result) return known.meaning;
   }
-  return HexCode(static_cast<std::uint32_t>(result));
+  const auto code = static_cast<std::uint32_t>(result);
+  const std::wstring message = SystemMessage(code);
+  return message.empty() ? HexCode(code) : message + L" (" + HexCode(code) + L")";
 }
 
 std::wstring ProcessEndText(DWORD exitCode) {
@@ -101,6 +110,11 @@ std::wstring GuidText(const GUID& guid) {
   std::array<wchar_t, 40> text{};
   StringFromGUID2(guid, text.data(), static_cast<int>(text.size()));
   return text.data();
+}
+
+std::wstring SpelledGuid(const std::wstring& text) {
+  GUID guid{};
+  return SUCCEEDED(CLSIDFromString(text.c_str(), &guid)) ? GuidText(guid) : text;
 }
 
 std::wstring AbsolutePath(const std::wstring& path) {

@@ -21,7 +21,7 @@ std::wstring Lowered(std::wstring_view text);
 /// For instance 0x80004005.
 std::wstring HexCode(std::uint32_t code);
 
-/// The code of an HRESULT with what the system or this program knows to say about it.
+/// What this program or the system says about an HRESULT, without a full stop.
 std::wstring ResultText(HRESULT result);
 
 /// What the system says about an error code of GetLastError, without a full stop.
@@ -35,6 +35,9 @@ std::wstring ProcessEndText(DWORD exitCode);
 
 /// For instance {6444048F-4C8B-11D1-8B70-080036B11A03}.
 std::wstring GuidText(const GUID& guid);
+
+/// A class identifier in the spelling of GuidText; the text itself if it is none.
+std::wstring SpelledGuid(const std::wstring& text);
 
 /// The full path of what `path` names.
 std::wstring AbsolutePath(const std::wstring& path);

@@ -21,25 +21,31 @@ std::wstring TypeName(VARTYPE type) {
   }
 }
 
-std::wstring ValueText(const PROPVARIANT& value) {
+Value ValueOf(const PROPVARIANT& value) {
   switch (value.vt) {
-    case VT_I4: return std::to_wstring(value.lVal);
-    case VT_INT: return std::to_wstring(value.intVal);
-    case VT_UI4: return std::to_wstring(value.ulVal);
+    case VT_I4: return value.lVal;
+    case VT_INT: return value.intVal;
+    case VT_UI4: return value.ulVal;
     case VT_BSTR: return TextOrEmpty(value.bstrVal);
     case VT_LPWSTR: return TextOrEmpty(value.pwszVal);
     default: return {};
   }
 }
 
-std::wstring ValueText(const VARIANT& value) {
+Value ValueOf(const VARIANT& value) {
   switch (value.vt) {
-    case VT_I4: return std::to_wstring(value.lVal);
-    case VT_INT: return std::to_wstring(value.intVal);
-    case VT_UI4: return std::to_wstring(value.ulVal);
+    case VT_I4: return value.lVal;
+    case VT_INT: return value.intVal;
+    case VT_UI4: return value.ulVal;
     case VT_BSTR: return TextOrEmpty(value.bstrVal);
     default: return {};
   }
+}
+
+std::wstring ValueText(const Value& value) {
+  if (const auto* const number = std::get_if<std::int64_t>(&value)) return std::to_wstring(*number);
+  if (const auto* const text = std::get_if<std::wstring>(&value)) return *text;
+  return {};
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

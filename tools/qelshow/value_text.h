@@ -1,4 +1,4 @@
-// Values as the extension delivers them, put into words.
+// Values as the extension delivers them.
 #pragma once
 
 #include <windows.h>
@@ -9,13 +9,18 @@
 
 #include <string>
 
+#include "file_facts.h"
+
 namespace Qel::Lumetra::ShellExt::Show {
 
 /// For instance "VT_UI4"; the number of a type that this program does not know.
 std::wstring TypeName(VARTYPE type);
 
-/// The value in plain decimal or as its text; empty for VT_EMPTY and for a type without a text.
-std::wstring ValueText(const PROPVARIANT& value);
-std::wstring ValueText(const VARIANT& value);
+/// Returns nothing for VT_EMPTY and for a type that this program does not know.
+Value ValueOf(const PROPVARIANT& value);
+Value ValueOf(const VARIANT& value);
+
+/// The number in plain decimal, the text, or an empty text.
+std::wstring ValueText(const Value& value);
 
 }  // namespace Qel::Lumetra::ShellExt::Show
