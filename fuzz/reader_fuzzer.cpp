@@ -1,4 +1,5 @@
-// The fuzzer of a file kind, built once for each: the input is the file.
+// The fuzzer of a file kind, built once for each: the input is the file. Its last bytes also choose the
+// request, so that each input costs one thumbnail and repeats what it found.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -10,37 +11,38 @@
 
 namespace {
 
-using Qel::Lumetra::ShellExt::Testing::AskEverything;
-using Qel::Lumetra::ShellExt::Testing::MemoryBuffer;
+using namespace Qel::Lumetra::ShellExt::Testing;
 
-void Ask(MemoryBuffer& buffer) {
-  std::istream stream(&buffer);
-  const auto answers = AskEverything(stream, QEL_FILE_KIND);
-  if (answers.wrong.empty()) return;
-  std::fprintf(stderr, "%s\n", answers.wrong.c_str());
-  std::abort();
-}
+/// What an input chooses.
+struct Choice {
+  SIZE request{1, 1};
+  std::int64_t failingRead = -1;  // of the file, counted from 0; -1 for none
+  MemoryBuffer::Failure failure = MemoryBuffer::Failure::kBringsNothing;
+  bool seekable = true;
+};
 
-/// A number that any change of the input changes: which read fails, and how, is the input's own choice, so
-/// that an input alone repeats what it found.
-std::uint64_t Choice(std::string_view bytes) {
-  std::uint64_t hash = 0xCBF29CE484222325;
-  for (const char byte : bytes) hash = (hash ^ static_cast<unsigned char>(byte)) * 0x100000001B3;
-  return hash >> 16;
+Choice ChoiceOf(std::string_view bytes) {
+  if (bytes.size() < 4) return {};
+  const auto byte = [end = bytes.rbegin()](int i) { return static_cast<unsigned char>(end[i]); };
+  // From -16, which is no size, to more than the edge of most frames. A read fails for half of the inputs.
+  return {{byte(0) - 16, byte(1) - 16},
+          byte(2) % 2 == 1 ? byte(2) / 2 : -1,
+          static_cast<MemoryBuffer::Failure>(byte(3) % 3),
+          byte(3) < 0x80};
 }
 
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   const std::string_view bytes(reinterpret_cast<const char*>(data), size);
-  MemoryBuffer whole(bytes);
-  Ask(whole);
-
-  const std::uint64_t choice = Choice(bytes);
-  MemoryBuffer failing(bytes);
-  failing.failingRead = static_cast<std::int64_t>(choice / 6) % whole.reads;
-  failing.failure = static_cast<MemoryBuffer::Failure>(choice % 3);
-  failing.seekable = choice % 2 == 0;
-  Ask(failing);
-  return 0;
+  const Choice choice = ChoiceOf(bytes);
+  MemoryBuffer buffer(bytes);
+  buffer.failingRead = choice.failingRead;
+  buffer.failure = choice.failure;
+  buffer.seekable = choice.seekable;
+  std::istream stream(&buffer);
+  const Answers answers = AskEverything(stream, QEL_FILE_KIND, {&choice.request, 1});
+  if (answers.wrong.empty()) return 0;
+  std::fprintf(stderr, "%s\n", answers.wrong.c_str());
+  std::abort();
 }
