@@ -57,11 +57,12 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
 
  protected:
   int_type overflow(int_type c = Traits::eof()) override {
-    if (Traits::eq_int_type(c, Traits::eof())) return Flush() ? Traits::not_eof(c) : Traits::eof();
-    // The last character is free, unless an earlier overflow stored its character and could not write.
-    if (!HasRoom() && !(Flush() && HasRoom())) return Traits::eof();
-    *this->pptr() = Traits::to_char_type(c);
-    MovePutPosition(this->pptr() + 1);
+    if (!Traits::eq_int_type(c, Traits::eof())) {
+      // The last character is free, unless an earlier overflow stored its character and could not write.
+      if (!HasRoom() && !(Flush() && HasRoom())) return Traits::eof();
+      *this->pptr() = Traits::to_char_type(c);
+      MovePutPosition(this->pptr() + 1);
+    }
     return Flush() ? c : Traits::eof();
   }
 

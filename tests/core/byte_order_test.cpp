@@ -2,9 +2,12 @@
 
 #include <gtest/gtest.h>
 
+#include <istream>
 #include <limits>
 #include <sstream>
+#include <string>
 
+#include "memory_buffer.h"
 #include "skip_bytes.h"
 #include "wrap.h"
 
@@ -68,6 +71,18 @@ TEST(SkipBytes, FailsTheStreamAtItsEnd) {
       SkipBytes(stream, count);
       EXPECT_EQ(stream.good(), count == length) << count << " of " << length;
     }
+  }
+}
+
+TEST(SkipBytes, NoticesThatTheLastByteIsMissing) {
+  // A file, unlike a stream of a string, can be positioned behind its end.
+  const std::string bytes(1000, 'x');
+  for (const std::uint32_t count : {512u, 513u, 999u, 1000u, 1001u, 1002u, 5000u}) {
+    Testing::MemoryBuffer buffer(bytes);
+    std::istream stream(&buffer);
+    SkipBytes(stream, count);
+    EXPECT_EQ(stream.good(), count <= 1000) << count;
+    EXPECT_LE(buffer.bytesRead, 512);
   }
 }
 

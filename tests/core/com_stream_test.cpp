@@ -153,6 +153,16 @@ TEST(ComBufferPutBack, KeepsNoMoreThanTheReserve) {
   EXPECT_EQ(buffer.sungetc(), kEnd);
 }
 
+TEST(ComBufferPutBack, KeepsNoMoreThanTheReserveAtTheEnd) {
+  ScriptedStream source(Bytes(8));
+  OpenBuffer buffer(source, 12);
+  EXPECT_EQ(ReadAll(buffer), Bytes(8));
+  EXPECT_EQ(buffer.result(), S_OK);
+  for (int i = 7; i >= 4; --i) EXPECT_EQ(buffer.sungetc(), i);
+  EXPECT_EQ(buffer.sungetc(), kEnd);
+  EXPECT_EQ(ReadAll(buffer), Bytes(8).substr(4));
+}
+
 TEST(ComBufferPutBack, HasNothingBeforeTheFirstCharacter) {
   ScriptedStream source(Bytes(4));
   OpenBuffer buffer(source, 12);
@@ -294,6 +304,27 @@ TEST(ComBufferWriting, NeverAsksAStreamThatIsOnlyReadToWrite) {
     EXPECT_EQ(buffer.pubsync(), 0);
   }
   EXPECT_EQ(source.writes, 0);
+}
+
+TEST(ComBufferWriting, OverflowWithoutACharacterOnlyWritesWhatIsPending) {
+  struct ExposedBuffer : OpenBuffer {
+    using OpenBuffer::OpenBuffer;
+    using OpenBuffer::overflow;
+  };
+  ScriptedStream sink("");
+  ExposedBuffer buffer(sink, 8);
+  EXPECT_EQ(buffer.overflow(), kEnd);
+  EXPECT_EQ(sink.writes, 0);
+  buffer.sputn("ab", 2);
+  sink.writeResult = kAccessDenied;
+  EXPECT_EQ(buffer.overflow(kEnd), kEnd);
+  EXPECT_EQ(buffer.result(), kAccessDenied);
+  sink.writeResult = S_OK;
+  EXPECT_EQ(buffer.overflow(kEnd), kEnd);
+  EXPECT_EQ(sink.written, "ab");
+  EXPECT_EQ(buffer.pubsync(), 0);
+  EXPECT_EQ(sink.written, "ab");
+  EXPECT_EQ(sink.writes, 2);
 }
 
 TEST(ComBufferWriting, FailsWithoutAStream) {

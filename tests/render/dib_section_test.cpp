@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
+
 #include "bitmap_pixels.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -18,6 +20,23 @@ TEST(DibSection, GreyBitsHaveOneByteAPixel) {
   section.Bits().Store(4, 2, 99);
   const auto pixels = Testing::TakeBitmap(section.Release());
   EXPECT_EQ(pixels.bytes.back(), 99);
+}
+
+TEST(DibSection, HoldsTheHandleAndThenTheViewOfItsBits) {
+  DibSection section;
+  section.CreateColour(5, 3);
+  struct {
+    HBITMAP bitmap;
+    ImageView<std::uint8_t> bits;
+  } fields;
+  static_assert(sizeof fields == sizeof(DibSection));
+  std::memcpy(static_cast<void*>(&fields), &section, sizeof fields);
+  EXPECT_EQ(fields.bits.width, 5);
+  EXPECT_EQ(fields.bits.height, 3);
+  EXPECT_EQ(fields.bits.data, section.Bits().data);
+  const HBITMAP bitmap = section.Release();
+  EXPECT_EQ(fields.bitmap, bitmap);
+  DeleteObject(bitmap);
 }
 
 TEST(DibSection, HeaderIsTopDown) {

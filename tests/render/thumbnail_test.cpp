@@ -222,6 +222,14 @@ TEST(GreyThumbnail, NegativeRequestInOneDirectionIsIgnored) {
   EXPECT_EQ(Grey(frame, {-5, 10}), Testing::NaiveGreyThumbnail(frame, 10, 10));
 }
 
+TEST(GreyThumbnail, NegativeRequestInBothDirectionsKeepsTheSize) {
+  Random random(8);
+  const auto frame = random.Frame<std::uint8_t>(40, 30, Values::kWholeRange);
+  for (const SIZE& request : {SIZE{-5, -5}, SIZE{-1, -1}, SIZE{-100, -2}}) {
+    EXPECT_EQ(Grey(frame, request), Testing::NaiveGreyThumbnail(frame, 40, 30));
+  }
+}
+
 TEST(GreyThumbnail, ReducedImageOfMorePixelsThan32BitsCountHasNoMemory) {
   constexpr std::int32_t kEdge = 46341;  // the smallest whose square does not fit
   const auto make = [] {
@@ -333,6 +341,26 @@ TEST(ComplexThumbnail, ShowsTheLogarithm) {
   stored.Set(2, 0, {-100, 0});
   EXPECT_EQ(TakeBitmap(RenderComplexThumbnail<float>(stored.view(), {10, 10})).bytes,
             (std::vector<std::uint8_t>{0, 127, 255}));
+}
+
+template <class T>
+class EveryFloatComplex : public testing::Test {};
+using FloatComplexParts = testing::Types<float, double>;
+TYPED_TEST_SUITE(EveryFloatComplex, FloatComplexParts);
+
+TYPED_TEST(EveryFloatComplex, NaNInEitherHalfIsNaN) {
+  using T = TypeParam;
+  constexpr T kNaN = std::numeric_limits<T>::quiet_NaN();
+  const NaiveFrame<ComplexPixel<T>> frame{5, 1, {{1, 0}, {kNaN, 50}, {0, 10}, {50, kNaN}, {100, 0}}};
+  const auto picture = [](const NaiveFrame<ComplexPixel<T>>& pixels) {
+    return TakeBitmap(RenderComplexThumbnail<T>(StorePacked(pixels).view(), {10, 10})).bytes;
+  };
+  EXPECT_EQ(picture(frame), (std::vector<std::uint8_t>{0, 0, 127, 0, 255}));
+  for (const ComplexPixel<T>& first : {ComplexPixel<T>{kNaN, 1}, ComplexPixel<T>{1, kNaN}}) {
+    auto black = frame;
+    black.values[0] = first;
+    EXPECT_EQ(picture(black), std::vector<std::uint8_t>(5, 0));
+  }
 }
 
 template <ColourOrder kOrder>
