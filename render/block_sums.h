@@ -200,14 +200,14 @@ class ExactBlockSums {
       if constexpr (kSamples == 3 && sizeof(Sum) <= 4) {
         FoldColours<Sum>(lanes + block * factor * kSamples, sums + block * kSamples, factor);
       } else {
-        std::array<Sum, kSamples> sum{};
-        for (std::size_t i = 0; i < factor; ++i) {
-          for (std::size_t sample = 0; sample < kSamples; ++sample) {
-            sum[sample] = static_cast<Sum>(sum[sample] + lanes[(block * factor + i) * kSamples + sample]);
-          }
-        }
+        // No array of sums: indexing one, even with a constant, can keep GCC from folding blocks side by
+        // side.
         for (std::size_t sample = 0; sample < kSamples; ++sample) {
-          sums[block * kSamples + SamplesOf<Pixel>::TargetIndex(sample)] += static_cast<double>(sum[sample]);
+          Sum sum = 0;
+          for (std::size_t i = 0; i < factor; ++i) {
+            sum = static_cast<Sum>(sum + lanes[(block * factor + i) * kSamples + sample]);
+          }
+          sums[block * kSamples + SamplesOf<Pixel>::TargetIndex(sample)] += static_cast<double>(sum);
         }
       }
     }
