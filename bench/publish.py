@@ -43,7 +43,7 @@ def table(rows):
     lines = ["| workload | read ms | " + " | ".join(COMMANDS) + " |", "|---|" + "--:|" * (len(COMMANDS) + 1)]
     for row in rows:
         read = row["read_ns"].get("native") or row["read_ns"]["DLL"]
-        size = f" at {row['asked']}" if row["asked"] not in (None, PEER_EDGE) else ""
+        size = f" at {row['request']}" if row["request"] not in (None, PEER_EDGE) else ""
         ratios = (f"{row['ratios'][way]:.2f}" if way in row["ratios"] else "" for way in COMMANDS)
         lines.append(f"| {row['workload']}{size} | {read / 1e6:.2f} | " + " | ".join(ratios) + " |")
     return "\n".join(lines)
@@ -51,9 +51,9 @@ def table(rows):
 
 def main():
     results = json.loads((FOLDER / "results.json").read_text())
-    rows = [row for row in results["rows"] if row["asked"] in (None, PEER_EDGE) or row["workload"] in ALL_EDGES]
+    rows = [row for row in results["rows"] if row["request"] in (None, PEER_EDGE) or row["workload"] in ALL_EDGES]
     # A pixel type's own row is named after it alone.
-    chart([row for row in rows if row["asked"] == PEER_EDGE and " " not in row["workload"]], DOCS / "performance.svg")
+    chart([row for row in rows if row["request"] == PEER_EDGE and " " not in row["workload"]], DOCS / "performance.svg")
     page = DOCS / "performance.md"
     parts = re.split("(<!-- (?:table|end of table) -->\n)", page.read_text())
     parts[2] = f"\n{table(rows)}\n\n"

@@ -45,8 +45,8 @@ COMMANDS = {
 SYSTEMS = ("native", "DLL")  # of which each has its own bare read; peers are compared with the native one
 
 
-def question(way, frame, edge):
-    """What a worker is asked for a thumbnail."""
+def request_for(way, frame, edge):
+    """What is sent to a worker for a thumbnail."""
     if way in SYSTEMS:
         return ("thumbnail", edge, frame.file)
     return ("thumbnail", frame.factor(edge), frame.pixel_format, frame.width, frame.height, frame.position,
@@ -65,7 +65,7 @@ class Bench:
         self.rows = []
         self._rounds = rounds
         self._workers = {}
-        self._table = Table({"workload": 22, "asked": 5, "read ms": 8, "in Wine": 8, "native": 6, "DLL": 6,
+        self._table = Table({"workload": 22, "request": 7, "read ms": 8, "in Wine": 8, "native": 6, "DLL": 6,
                              **{peer: len(peer) for peer in PEERS}})
 
     @contextlib.contextmanager
@@ -75,28 +75,28 @@ class Bench:
             self._workers = {way: stack.enter_context(Worker(command, FOLDER)) for way, command in COMMANDS.items()}
             yield
 
-    def measure(self, workload, asked, read, questions):
-        """Compares each way's time for its question with that of the bare `read` on its system."""
-        bases = {way: "DLL" if way == "DLL" else "native" for way in questions}
+    def measure(self, workload, edge, read, requests):
+        """Compares each way's time for its request with that of the bare `read` on its system."""
+        bases = {way: "DLL" if way == "DLL" else "native" for way in requests}
         systems = [system for system in SYSTEMS if system in bases.values()]
-        contenders = {("read", system): self._asking(system, read) for system in systems}
-        contenders.update({way: self._asking(way, words) for way, words in questions.items()})
+        contenders = {("read", system): self._requesting(system, read) for system in systems}
+        contenders.update({way: self._requesting(way, words) for way, words in requests.items()})
         times = interleaved(contenders, self._rounds)
         read_ns = {system: statistics.median(times["read", system]) for system in systems}
         ratios = {way: ratio(times[way], times["read", base]) for way, base in bases.items()}
-        self.rows.append({"workload": workload, "asked": asked, "read_ns": read_ns, "ratios": ratios})
-        self._table.row(workload, asked or "",
+        self.rows.append({"workload": workload, "request": edge, "read_ns": read_ns, "ratios": ratios})
+        self._table.row(workload, edge or "",
                         *(f"{read_ns[system] / 1e6:.2f}" if system in read_ns else "" for system in SYSTEMS),
                         *(f"{ratios[way]:.2f}" if way in ratios else "" for way in COMMANDS))
 
-    def _asking(self, way, words):
+    def _requesting(self, way, words):
         return lambda: self._workers[way].nanoseconds(*words)
 
 
 def measure_frame(bench, frame):
     read = ("read", frame.position, frame.block_bytes, frame.file)
     for edge in EDGES:
-        bench.measure(frame.name, edge, read, {way: question(way, frame, edge) for way in ways_to(frame, edge)})
+        bench.measure(frame.name, edge, read, {way: request_for(way, frame, edge) for way in ways_to(frame, edge)})
 
 
 def measure_series(bench, series):
@@ -121,8 +121,8 @@ def measure_memory():
     with MEMORY_FRAME.in_folder(FOLDER), SMALL_FRAME.in_folder(FOLDER):
         for way in ways_to(MEMORY_FRAME, PEER_EDGE):
             with Worker(COMMANDS[way], FOLDER) as worker:
-                peaks[way] = worker.peak_memory(question(way, SMALL_FRAME, 16),
-                                                question(way, MEMORY_FRAME, PEER_EDGE))
+                peaks[way] = worker.peak_memory(request_for(way, SMALL_FRAME, 16),
+                                                request_for(way, MEMORY_FRAME, PEER_EDGE))
             print(f"- {way}: {peaks[way] / 2**20:.1f} MiB", flush=True)
     return peaks
 
