@@ -24,26 +24,33 @@ struct FileKind {
   std::uint32_t descriptionId;  // of a text that the string table does not have
 };
 
-/// One row for each extension, in the order of registration. The first row of a parser has its own
-/// description, the others those of its other extensions. CMake and Python scripts read the rows as well
-/// (kinds.cmake, kinds.py).
+/// One row for each extension, in the order of registration. The first extension of a parser names its kind,
+/// and its description is that of a file without a row of its own. CMake and Python read the rows as well
+/// (cmake/file_kinds.cmake, file_kinds.py).
 inline constexpr std::tuple kFileKinds = {
-    FileKind<MrcParser>{L"mrc", 212}, FileKind<MrcParser>{L"ali", 210}, FileKind<MrcParser>{L"rec", 211},
-    FileKind<SerParser>{L"ser", 213}, FileKind<EbnParser>{L"ebn", 214}, FileKind<EmiParser>{L"emi", 101},
-    FileKind<RawParser>{L"raw", 215},
+    FileKind<MrcParser>{L"mrc", 212},  // images and volumes
+    FileKind<MrcParser>{L"ali", 210},  // aligned tilt series
+    FileKind<MrcParser>{L"rec", 211},  // reconstructions
+    FileKind<SerParser>{L"ser", 213},  // series of images
+    FileKind<EbnParser>{L"ebn", 214},  // single images
+    FileKind<EmiParser>{L"emi", 101},  // trees of objects
+    FileKind<RawParser>{L"raw", 215},  // pixels in any order
 };
 
 /// Their extensions.
 inline constexpr auto kExtensions =
     std::apply([](const auto&... kinds) { return std::array{kinds.extension...}; }, kFileKinds);
 
-/// Calls `action` with the FileKind of an extension, compared without regard to case; not for an unknown one.
+/// Calls `action` with the FileKind of an extension, compared without regard to case. Returns whether there
+/// is one.
 template <class Action>
-void WithKindOf(std::wstring_view extension, Action action) {
-  const auto actIfSame = [&](const auto& kind) {
-    if (SameIgnoringCase(extension, kind.extension)) action(kind);
+bool WithKindOf(std::wstring_view extension, Action action) {
+  const auto isKind = [&](const auto& kind) {
+    const bool isIt = SameIgnoringCase(extension, kind.extension);
+    if (isIt) action(kind);
+    return isIt;
   };
-  std::apply([&](const auto&... kinds) { (actIfSame(kinds), ...); }, kFileKinds);
+  return std::apply([&](const auto&... kinds) { return (isKind(kinds) || ...); }, kFileKinds);
 }
 
 /// The id of the description of a kind's file: that of the row with its extension, or else of the kind's

@@ -40,7 +40,7 @@ void Write(const std::filesystem::path& folder, const std::string& name, const s
 int main(int argc, char** argv) try {
   if (argc != 2) throw std::invalid_argument("name the folder to write to");
   const std::filesystem::path seeds = argv[1];
-  for (const char* kind : kFileKinds) {
+  for (const char* kind : kSampleKinds) {
     for (const SampleFile& sample : SampleFiles(kind)) Write(seeds / kind, sample.name, sample.bytes);
   }
   int number = 0;

@@ -31,6 +31,9 @@ from registry_entries import registered_entries  # noqa: E402
 
 HERE = pathlib.Path(__file__).resolve().parent
 
+sys.path.append(str(HERE.parent / "formats"))
+from file_kinds import EXTENSIONS  # noqa: E402
+
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 TEXTS = ("README.txt", "NOTICES.txt")
 
@@ -40,6 +43,17 @@ LIBRARIES = ("libgcc.a", "libstdc++.a", "libssp.a", "libmingw32.a", "libmingwex.
 
 # What makes a product of Windows Installer another version of this one. Never to be changed.
 UPGRADE_CODE = uuid.UUID("{D5320353-60A9-41CE-A794-4CBF1BCBA0D4}")
+
+# The codes of the components that were made before codes were derived from extensions. Never to be changed.
+COMPONENT_CODES = {
+    "mrc": "{391B1E31-23C5-483B-BA33-E4239E5B6DF0}",
+    "ali": "{9BADCDF1-0601-41C7-987D-74C1A271EB24}",
+    "rec": "{3AA43BE5-06C6-4158-BAD1-828B5EC88B4E}",
+    "ser": "{740C5EF6-9115-48B3-B949-B76EC1CEB2BC}",
+    "emi": "{0A445D8E-A1B9-4180-9268-7463A27B6D76}",
+    "ebn": "{56C4E05E-F9D1-4270-AE88-330510AB3CD4}",
+    "raw": "{6B2969AC-EE3C-4CC3-AF34-B35B3AD9DDCB}",
+}
 
 APP_ID = "{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}"
 
@@ -164,6 +178,19 @@ def add_registry(database, scripts):
                          FEATURE_NOT_ADVERTISED, extension)
 
 
+def component_code(extension):
+    return COMPONENT_CODES.get(extension) or braced(uuid.uuid5(UPGRADE_CODE, f"component {extension}"))
+
+
+def write_wxs(template, path):
+    """Writes what is to be installed, with every line of an extension once for each."""
+    lines = []
+    for line in template.read_text("utf-8").splitlines(keepends=True):
+        lines += [line.replace("@EXTENSION@", extension).replace("@CODE@", component_code(extension))
+                  for extension in EXTENSIONS] if "@EXTENSION@" in line else [line]
+    path.write_text("".join(lines), "utf-8")
+
+
 def make_msi(content, scripts, project, epoch, msi):
     """wixl does the most, and what it cannot do follows."""
     for name in (*PROGRAMS, *TEXTS):
@@ -171,9 +198,11 @@ def make_msi(content, scripts, project, epoch, msi):
     product_code = uuid.uuid5(UPGRADE_CODE, f"product {project.version}")
     variables = {"Version": project.version, "Description": project.description, "ProductCode": braced(product_code),
                  "UpgradeCode": braced(UPGRADE_CODE)}
+    wxs = content / "QelShellExt.wxs"
+    write_wxs(HERE / wxs.name, wxs)
     # The cabinet inside has local times.
     run("wixl", "--arch", "x64", "--output", msi, *(f"--define={name}={value}" for name, value in variables.items()),
-        HERE / "QelShellExt.wxs", cwd=content, env=os.environ | {"TZ": "UTC"})
+        wxs, cwd=content, env=os.environ | {"TZ": "UTC"})
 
     database = Database(msi)
     add_registry(database, scripts)

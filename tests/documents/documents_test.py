@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Checks that the documents lead to places that exist and name the version that is built.
+"""Checks that the documents lead to places that exist, and name the version that is built and all file kinds.
 
 usage: documents_test.py PROJECT_FOLDER VERSION
 """
@@ -10,6 +10,9 @@ import sys
 import unittest
 
 PROJECT, VERSION = pathlib.Path(sys.argv[1]), sys.argv[2]
+
+sys.path.append(str(PROJECT / "formats"))
+from file_kinds import EXTENSIONS, KINDS  # noqa: E402
 
 
 def anchors(text):
@@ -50,6 +53,42 @@ class Documents(unittest.TestCase):
         self.assertEqual(versions[0], VERSION)
         packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / "README.md").read_text("utf-8"))
         self.assertEqual(set(packages), {VERSION})
+
+
+class FileKinds(unittest.TestCase):
+    """What cannot be derived from the list of file kinds (formats/file_kinds.h)."""
+
+    def assertSame(self, found, expected):
+        self.assertEqual(sorted(found), sorted(expected))
+
+    def test_are_read_as_they_are_written(self):
+        rows = (PROJECT / "formats" / "file_kinds.h").read_text("utf-8").count("    FileKind<")
+        self.assertGreater(rows, 0)
+        self.assertEqual(len(EXTENSIONS), rows)
+
+    def test_are_all_named_where_the_program_is_introduced(self):
+        for name in ("README.md", "packaging/README.txt"):
+            first_sentences = " ".join((PROJECT / name).read_text("utf-8")[:800].split())
+            with self.subTest(document=name):
+                self.assertSame(re.findall(r"\.([a-z]+)`?(?:, | and | files)", first_sentences), EXTENSIONS)
+
+    def test_have_a_row_in_every_table_of_kinds(self):
+        tables = [(name, table) for name in ("README.md", "docs/user-guide.md")
+                  for table in re.findall(r"(?m)(?:^\|.*\n)+", (PROJECT / name).read_text("utf-8"))]
+        columns = [(name, re.findall(r"`\.([a-z]+)`", "".join(re.findall(r"(?m)^\|[^|]*", table)))) for name, table in tables]
+        columns = [(name, extensions) for name, extensions in columns if "mrc" in extensions]
+        self.assertEqual({name for name, _ in columns}, {"README.md", "docs/user-guide.md"})
+        for name, extensions in columns:
+            with self.subTest(document=name):
+                self.assertSame(extensions, EXTENSIONS)
+
+    def test_have_a_section_that_tells_their_format(self):
+        text = (PROJECT / "docs" / "formats.md").read_text("utf-8")
+        self.assertSame(re.findall(r"(?m)^## (\w+)$", text), [kind.upper() for kind in KINDS])
+
+    def test_have_a_dictionary_for_the_fuzzer(self):
+        dictionaries = {path.stem for path in (PROJECT / "fuzz" / "dictionaries").glob("*.dict")}
+        self.assertSame(dictionaries - {"combuf", "registrar"}, KINDS)
 
 
 if __name__ == "__main__":

@@ -2,12 +2,15 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <array>
 #include <functional>
 #include <sstream>
 #include <stdexcept>
 
 #include "ebn_file.h"
 #include "emi_file.h"
+#include "file_kinds.h"
 #include "image_file_info.h"
 #include "mrc_file.h"
 #include "raw_file.h"
@@ -75,6 +78,21 @@ TEST(Extensions, AreComparedWholeAndWithoutCase) {
                         (IsMrcExtension(row.extension) && IsMrcExtension(other.extension));
       EXPECT_EQ(row.test(other.extension), same);
     }
+  }
+}
+
+// New kinds are registered after these.
+TEST(FileKinds, AreInTheOrderInWhichTheyHaveAlwaysBeenRegistered) {
+  const std::array<std::wstring_view, 7> first = {L"mrc", L"ali", L"rec", L"ser", L"ebn", L"emi", L"raw"};
+  ASSERT_GE(kExtensions.size(), first.size());
+  EXPECT_TRUE(std::equal(first.begin(), first.end(), kExtensions.begin()));
+}
+
+TEST(FileKinds, HaveExtensionsThatDifferAndAReaderEach) {
+  for (const std::wstring_view extension : kExtensions) {
+    EXPECT_EQ(std::ranges::count(kExtensions, extension), 1) << std::wstring(extension);
+    std::istringstream stream;
+    EXPECT_NE(CreateFileTypeInfo(stream, std::wstring(extension)), nullptr) << std::wstring(extension);
   }
 }
 

@@ -1,5 +1,7 @@
 #include "expected_registration.h"
 
+#include "file_kinds.h"
+
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
@@ -14,8 +16,6 @@ const std::wstring kShellExt = L"{79E696A1-2FA5-4b3e-9610-D5F760417E62}";
 const std::wstring kPropertyList =
     L"prop:System.Image.HorizontalSize;System.Image.VerticalSize;System.Image.BitDepth;"
     L"System.Media.FrameCount;System.Image.Dimensions;System.Comment";
-
-const wchar_t* const kExtensions[] = {L".mrc", L".ali", L".rec", L".ser", L".ebn", L".emi", L".raw"};
 
 struct PropertyHandler {
   std::wstring extension;
@@ -58,8 +58,8 @@ RegistryContents ExpectedAfterRegistering(const std::wstring& path) {
   AddKey(all, shellExt + L"\\InprocServer32", {{L"", path}, {L"ThreadingModel", L"Apartment"}});
   AddKey(all, kWindows + L"\\Shell Extensions\\Approved", {{kShellExt, L"QelShellExt"}});
 
-  for (const std::wstring extension : kExtensions) {
-    const std::wstring handlers = kClasses + L"\\" + extension + L"\\ShellEx\\";
+  for (const std::wstring_view extension : kExtensions) {
+    const std::wstring handlers = kClasses + L"\\." + std::wstring(extension) + L"\\ShellEx\\";
     AddKey(all, handlers + L"{BB2E617C-0920-11d1-9A0B-00C04FC2D6C1}", {{L"", kShellExt}});
     AddKey(all, handlers + L"{00021500-0000-0000-C000-000000000046}", {{L"", kShellExt}});
     AddKey(all, handlers + L"PropertyHandler", {{L"", kShellExt}});
@@ -98,7 +98,9 @@ RegistryContents ExpectedAfterUnregistering() {
   AddKey(all, kClasses + L"\\QEL.ShellExt", {{L"", L"QelShellExt Class"}});
   AddKey(all, kClasses + L"\\QEL.ShellExt\\CLSID", {{L"", kShellExt}});
 
-  for (const std::wstring extension : kExtensions) AddKey(all, kClasses + L"\\" + extension + L"\\ShellEx");
+  for (const std::wstring_view extension : kExtensions) {
+    AddKey(all, kClasses + L"\\." + std::wstring(extension) + L"\\ShellEx");
+  }
 
   for (const std::wstring& windows : {kWindows, kWowWindows}) {
     AddKey(all, windows + L"\\PropertySystem\\PropertyHandlers");

@@ -195,7 +195,7 @@ TEST_F(DllOutOfMemory, WhileAnObjectIsMade) {
 }
 
 TEST_F(DllOutOfMemory, WhileAFileIsLoaded) {
-  for (const char* const kind : kFileKinds) {
+  for (const char* const kind : kSampleKinds) {
     WriteSample(kind, SampleFiles(kind).front());
     Try({[&] {
            Forget();
@@ -237,7 +237,7 @@ TEST_P(DllOutOfMemoryOfKind, WhileAThumbnailIsMade) {
   ExpectNothingLeft(request);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, DllOutOfMemoryOfKind, testing::ValuesIn(kFileKinds),
+INSTANTIATE_TEST_SUITE_P(All, DllOutOfMemoryOfKind, testing::ValuesIn(kSampleKinds),
                          [](const auto& kind) { return kind.param; });
 
 TEST_F(DllOutOfMemory, WhileATipIsMade) {

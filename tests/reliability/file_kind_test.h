@@ -12,7 +12,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Its parameter is one of kFileKinds.
+/// Its parameter is one of kSampleKinds.
 class FileKindTest : public testing::TestWithParam<const char*> {
  protected:
   std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream) const {
@@ -24,7 +24,7 @@ class FileKindTest : public testing::TestWithParam<const char*> {
   const std::vector<SampleFile> samples_ = SampleFiles(kind_);
 };
 
-inline const auto kEachFileKind = testing::ValuesIn(kFileKinds);
+inline const auto kEachFileKind = testing::ValuesIn(kSampleKinds);
 
 /// The name of a test's instance for a kind.
 inline std::string KindName(const testing::TestParamInfo<const char*>& kind) {

@@ -24,7 +24,7 @@ struct Question {
 
 std::vector<Question> EveryQuestion() {
   std::vector<Question> questions;
-  for (const std::string kind : kFileKinds) {
+  for (const std::string kind : kSampleKinds) {
     for (const SampleFile& sample : SampleFiles(kind)) {
       questions.push_back({{kind.begin(), kind.end()}, sample.bytes});
     }

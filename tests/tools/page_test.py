@@ -16,6 +16,9 @@ import unittest
 
 from browser import Browser
 
+sys.path.append(str(pathlib.Path(__file__).resolve().parents[2] / "formats"))
+from file_kinds import EXTENSIONS  # noqa: E402
+
 EMULATOR, QELSHOW, SAMPLES, SERVER = sys.argv[1:5]
 
 NAMES = "[...document.querySelectorAll('.cards .name')].map(name => name.textContent)"
@@ -122,7 +125,7 @@ class Page(PageTest):
         tab = self.open()
         labels = tab.run("[...document.querySelectorAll('.kinds button')].map(button => button.textContent)")
         self.assertEqual([re.sub(r"\d+$", "", label) for label in labels],
-                         ["all", ".mrc", ".ali", ".rec", ".ser", ".emi", ".ebn", ".raw", "no thumbnail"])
+                         ["all", *(f".{extension}" for extension in EXTENSIONS), "no thumbnail"])
         tab.press("Tab", "Tab", "Tab", "Tab", "Tab", "Enter")  # the fifth button
         self.assertBecomes(tab, PRESSED, labels[4])
         self.assertEqual(sorted(tab.run(NAMES)), [name for name in self.names if name.endswith(".ser")])

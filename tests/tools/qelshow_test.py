@@ -20,6 +20,9 @@ import time
 import unittest
 import zlib
 
+sys.path.append(str(pathlib.Path(__file__).resolve().parents[2] / "formats"))
+from file_kinds import EXTENSIONS  # noqa: E402
+
 EMULATOR, QELSHOW, SERVER, FAULTY_SERVER = sys.argv[1:5]
 
 COMMANDS = ("info", "thumbnail", "page", "doctor")
@@ -858,8 +861,7 @@ class Doctor(Test):
         for each in document["classes"]:
             self.assertEqual((each["dll"].replace("\\", "/"), each["problem"]), (f"Z:{SERVER}", None))
             self.assertRegex(each["version"], r"^\d+\.\d+\.\d+$")
-        self.assertEqual([kind["extension"] for kind in document["kinds"]],
-                         [".mrc", ".ali", ".rec", ".ser", ".emi", ".ebn", ".raw"])
+        self.assertEqual([kind["extension"] for kind in document["kinds"]], [f".{extension}" for extension in EXTENSIONS])
         result = run("doctor", server=None)
         self.assertEqual((result.returncode, result.stderr), (DONE, ""))
         self.assertRegex(result.stdout, r"(?m)^ +\.mrc( +works){4}$")

@@ -10,6 +10,7 @@
 #include <string>
 
 #include "bitmap_pixels.h"
+#include "file_kinds.h"
 #include "file_type_factory.h"
 
 namespace Qel::Lumetra::ShellExt::Samples {
@@ -64,7 +65,7 @@ TEST(Samples, CoverEveryKindAndEveryPixelType) {
     kinds.insert(ExtensionOf(sample));
     types.insert(reader->GetDataTypeName());
   }
-  EXPECT_EQ(kinds, (std::set<std::wstring>{L"mrc", L"ali", L"rec", L"ser", L"emi", L"ebn", L"raw"}));
+  EXPECT_EQ(kinds, std::set<std::wstring>(kExtensions.begin(), kExtensions.end()));
   EXPECT_EQ(types,
             (std::set<std::wstring>{L"8 bit unsigned", L"16 bit unsigned", L"32 bit unsigned",
                                     L"8 bit signed", L"16 bit signed", L"32 bit signed", L"32 bit float",

@@ -6,6 +6,8 @@
 #include <string_view>
 #include <vector>
 
+#include "sample_kinds.h"
+
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct SampleFile {
@@ -13,10 +15,7 @@ struct SampleFile {
   std::string bytes;
 };
 
-/// The extensions of the file kinds; .ali and .rec are .mrc files.
-inline constexpr const char* kFileKinds[] = {"mrc", "raw", "ebn", "emi", "ser"};
-
-/// At least 20 files of `kind`, one of kFileKinds. Every one of them has a thumbnail; the first is the
+/// At least 20 files of `kind`, one of kSampleKinds. Every one of them has a thumbnail; the first is the
 /// smallest that has all parts of its kind.
 std::vector<SampleFile> SampleFiles(std::string_view kind);
 

@@ -32,8 +32,7 @@ Diagnosis Diagnose(const std::wstring& path) {
   }
   const auto fault = FaultText(stream, GetExtension(path));
   if (!fault) {
-    return {Verdict::kUnsupported,
-            L"The extension shows .mrc, .ali, .rec, .ser, .emi, .ebn and .raw files only."};
+    return {Verdict::kUnsupported, L"The extension shows " + SupportedExtensions(L"and") + L" files only."};
   }
   if (!fault->empty()) return {Verdict::kDamaged, Wide(*fault)};
   return {};

@@ -10,6 +10,7 @@
 
 #include "failure.h"
 #include "file_facts.h"
+#include "file_kinds.h"
 #include "file_type_factory.h"
 #include "text_tools.h"
 
@@ -55,17 +56,24 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   }
   const std::wstring& first = paths.front();
   std::error_code ignored;
-  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" holds no" : L"\" is no") +
-                    L" .mrc, .ali, .rec, .ser, .emi, .ebn or .raw file.",
+  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" holds no" : L"\" is no") + L" " +
+                    SupportedExtensions(L"or") + L" file.",
                 static_cast<int>(Verdict::kUnsupported));
 }
 
 }  // namespace
 
 bool IsSupported(const std::wstring& path) {
-  const std::wstring extension = GetExtension(fs::path(path).filename().wstring());
-  return IsMrcExtension(extension) || IsSerExtension(extension) || IsEmiExtension(extension) ||
-         IsEbnExtension(extension) || IsRawExtension(extension);
+  return WithKindOf(GetExtension(fs::path(path).filename().wstring()), [](const auto&) {});
+}
+
+std::wstring SupportedExtensions(std::wstring_view conjunction) {
+  std::wstring text;
+  for (std::size_t i = 0; i < kExtensions.size(); ++i) {
+    if (i > 0) text += i + 1 < kExtensions.size() ? L", " : L" " + std::wstring(conjunction) + L" ";
+    text += L"." + std::wstring(kExtensions[i]);
+  }
+  return text;
 }
 
 bool IsUnmatchedPattern(const std::wstring& path) {

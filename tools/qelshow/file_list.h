@@ -2,6 +2,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -21,5 +22,8 @@ bool IsUnmatchedPattern(const std::wstring& path);
 /// in natural order of their names (9 before 10). A path that does not exist is kept as a file, so that it is
 /// reported. Throws Failure for a folder that cannot be listed, and if nothing is there that can be shown.
 std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths);
+
+/// The extensions of the supported kinds in a sentence, for instance ".mrc, .ser and .raw".
+std::wstring SupportedExtensions(std::wstring_view conjunction);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

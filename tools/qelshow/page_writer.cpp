@@ -3,6 +3,7 @@
 #include <filesystem>
 
 #include "console.h"
+#include "file_kinds.h"
 #include "json_records.h"
 #include "output.h"
 #include "page_resource.h"
@@ -72,7 +73,8 @@ PageWriter::PageWriter(const std::wstring& folder)
   const std::size_t place = page.find(kPlaceOfFiles);
   templateEnd_ = page.substr(place + kPlaceOfFiles.size());
   Write(page.substr(0, place));
-  Write("{\"schema\":" + std::to_string(kJsonSchema) + ",\"files\":[");
+  const std::vector<std::wstring> kinds(kExtensions.begin(), kExtensions.end());
+  Write("{\"schema\":" + std::to_string(kJsonSchema) + ",\"kinds\":" + Json(kinds).dump() + ",\"files\":[");
 }
 
 PageWriter::~PageWriter() {

@@ -5,14 +5,13 @@
 #include <iterator>
 
 #include "class_ids.h"
+#include "file_kinds.h"
 #include "handle_owner.h"
 #include "shell_requests.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
-
-constexpr const wchar_t* kExtensions[] = {L".mrc", L".ali", L".rec", L".ser", L".emi", L".ebn", L".raw"};
 
 struct ShellHandler {
   const wchar_t* role;
@@ -93,7 +92,8 @@ Handler ReadShellHandler(const std::wstring& extension, const ShellHandler& fact
 
 std::vector<KindOfFile> ReadHandlers() {
   std::vector<KindOfFile> kinds;
-  for (const std::wstring extension : kExtensions) {
+  for (const std::wstring_view name : kExtensions) {
+    const std::wstring extension = L"." + std::wstring(name);
     KindOfFile kind{extension, {}};
     for (const ShellHandler& facts : kShellHandlers) {
       kind.handlers.push_back(ReadShellHandler(extension, facts));
