@@ -22,7 +22,7 @@ std::wstring LoadResourceString(std::uint32_t id) {
 std::wstring WidenComment(std::string_view bytes) {
   std::wstring wide;
   wide.reserve(bytes.size());
-  std::transform(bytes.begin(), bytes.end(), std::back_inserter(wide), [](char byte) {
+  std::ranges::transform(bytes, std::back_inserter(wide), [](char byte) {
     return static_cast<wchar_t>(static_cast<std::uint16_t>(static_cast<signed char>(byte)));
   });
   return wide;

@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdint>
 #include <limits>
+#include <numbers>
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
@@ -17,7 +18,6 @@ constexpr std::uint64_t kMantissaBits = 52;
 constexpr std::uint64_t kMantissaMask = (std::uint64_t{1} << kMantissaBits) - 1;
 constexpr std::uint64_t kOne = 0x3FF0000000000000;
 constexpr std::uint64_t kRootOfHalf = 0x3FE6A09E667F3BCD;
-constexpr double kLn2 = 0.6931471805599453;
 
 // P(z) = 2 atanh(sqrt z) / sqrt z, interpolated at the Chebyshev nodes of the range of s^2; its relative
 // error is below 3e-14.
@@ -46,7 +46,7 @@ __attribute__((always_inline)) inline void Approximate(const double* values, std
     const double z = s * s;
     double p = kPolynomial.back();
     for (std::size_t j = kPolynomial.size() - 1; j-- > 0;) p = p * z + kPolynomial[j];
-    const double logarithm = k * kLn2 + s * p;
+    const double logarithm = k * std::numbers::ln2 + s * p;
     const double margin = std::abs(logarithm) * kMargin;
     const bool normal =
         values[i] >= std::numeric_limits<double>::min() && values[i] <= std::numeric_limits<double>::max();
