@@ -94,11 +94,11 @@ TEST(Ebn, PixelsBeginAtTheirOffset) {
 }
 
 TEST(Ebn, HugePicturesHaveNoThumbnail) {
-  constexpr std::int32_t kMost = std::numeric_limits<std::int32_t>::max();
+  constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
   EbnFile file;
   file.typeCode = 8;
   file.afterHeader = std::string(64, '\0');
-  for (const Size2 size : {Size2{kMost, kMost}, Size2{0x10000, 0x10000}, Size2{0x8000, 0x10001}}) {
+  for (const Size2 size : {Size2{kMax, kMax}, Size2{0x10000, 0x10000}, Size2{0x8000, 0x10001}}) {
     file.width = size.width;
     file.height = size.height;
     EXPECT_TRUE(OpenEbn(file)->IsValid());

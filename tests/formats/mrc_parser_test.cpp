@@ -19,8 +19,8 @@ using Testing::MrcFile;
 using Bytes = std::vector<std::uint8_t>;
 
 constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
-constexpr std::int32_t kLeast = std::numeric_limits<std::int32_t>::min();
-constexpr std::int32_t kMost = std::numeric_limits<std::int32_t>::max();
+constexpr std::int32_t kMin = std::numeric_limits<std::int32_t>::min();
+constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
 
 class OpenMrc : public Testing::OpenFile<MrcFileInfo> {
  public:
@@ -75,7 +75,7 @@ TEST(Mrc, HasTheTypeOfItsMode) {
 }
 
 TEST(Mrc, RejectsModesOutsideOf0To16) {
-  for (const std::int32_t mode : {17, 101, kMost, -1, kLeast}) {
+  for (const std::int32_t mode : {17, 101, kMax, -1, kMin}) {
     MrcFile file;
     file.mode = mode;
     EXPECT_FALSE(IsValid(file)) << mode;
@@ -84,7 +84,7 @@ TEST(Mrc, RejectsModesOutsideOf0To16) {
 
 TEST(Mrc, RejectsEmptyStacks) {
   for (const auto field : {&MrcFile::nx, &MrcFile::ny, &MrcFile::nz}) {
-    for (const std::int32_t number : {0, -1, kLeast}) {
+    for (const std::int32_t number : {0, -1, kMin}) {
       MrcFile file;
       file.*field = number;
       EXPECT_FALSE(IsValid(file)) << number;
@@ -130,7 +130,7 @@ TEST(Mrc, BothEdgesMustBeTooLargeForTheOtherByteOrder) {
   EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x100, 0x100}));
   file.nz = 0x01000000;
   EXPECT_EQ(OpenMrc(file)->GetFrameCount(), 1);
-  file.nx = kLeast;  // as an unsigned number
+  file.nx = kMin;  // as an unsigned number
   EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x80, 0x100}));
 }
 
@@ -166,13 +166,13 @@ TEST(MrcComment, HasAtMostTenLabels) {
     all += (all.empty() ? L"" : L"\r\n") + std::wstring(1, static_cast<wchar_t>(c));
   }
   EXPECT_EQ(OpenMrc(file)->GetComment(), all);
-  for (const std::int32_t count : {25, kMost}) {
+  for (const std::int32_t count : {25, kMax}) {
     file.nlabl = count;
     EXPECT_EQ(OpenMrc(file)->GetComment(), all);
   }
   file.nlabl = 2;
   EXPECT_EQ(OpenMrc(file)->GetComment(), L"a\r\nb");
-  for (const std::int32_t count : {0, -1, kLeast}) {
+  for (const std::int32_t count : {0, -1, kMin}) {
     file.nlabl = count;
     EXPECT_EQ(OpenMrc(file)->GetComment(), L"");
   }
@@ -227,7 +227,7 @@ TEST(MrcThumbnail, PixelsFollowTheExtendedHeader) {
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 1);
   file.next = -1025;
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
-  file.next = kMost;  // wraps to a negative position
+  file.next = kMax;  // wraps to a negative position
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
 }
 
@@ -321,10 +321,10 @@ TEST(MrcThumbnail, HugeSectionsHaveNone) {
   for (const std::int32_t mode : {0, 1, 2, 3, 4, 6, 16}) {
     file.mode = mode;
     for (const Size2 size :
-         {Size2{65536, 65535}, Size2{kMost, 65535}, Size2{kMost, 1}, Size2{1, kMost}, Size2{65535, 65535}}) {
+         {Size2{65536, 65535}, Size2{kMax, 65535}, Size2{kMax, 1}, Size2{1, kMax}, Size2{65535, 65535}}) {
       file.nx = size.width;
       file.ny = size.height;
-      file.nz = kMost;
+      file.nz = kMax;
       EXPECT_TRUE(IsValid(file));
       EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);
     }

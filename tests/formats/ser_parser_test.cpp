@@ -254,12 +254,12 @@ TEST(Ser, NegativeTextLengthIsALengthError) {
 }
 
 TEST(Ser, TextsAndDimensionsThatAreNotThereFailTheFile) {
-  constexpr std::int32_t kMost = std::numeric_limits<std::int32_t>::max();
+  constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
   SerFile file = OneImage();
-  file.dimensions[0].descriptionLength = kMost;
+  file.dimensions[0].descriptionLength = kMax;
   EXPECT_FALSE(IsValid(file));
   file = OneImage();
-  file.dimensions[0].unitsLength = kMost;
+  file.dimensions[0].unitsLength = kMax;
   EXPECT_FALSE(IsValid(file));
 
   // The last text ends with the file, or a byte behind it.

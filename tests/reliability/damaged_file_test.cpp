@@ -31,7 +31,7 @@ constexpr std::int64_t kMaxBytesForALie = 16 << 20;
 constexpr std::int64_t kMaxBytesForAHundred = 1 << 20;
 
 /// Two are enough for hundreds of thousands of files: a reduced picture, and one of every pixel.
-constexpr SIZE kRequests[] = {{3, 2}, {Testing::kLargestRequest, Testing::kLargestRequest}};
+constexpr SIZE kRequests[] = {{3, 2}, {Testing::kMaxRequest, Testing::kMaxRequest}};
 
 class DamagedFile : public Testing::FileKindTest {
  protected:

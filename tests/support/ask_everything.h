@@ -23,9 +23,9 @@ struct Answers {
 };
 
 /// Requests of every kind: smaller and larger than a frame, of one pixel, out of proportion and negative.
-inline constexpr LONG kLargestRequest = std::numeric_limits<LONG>::max();
+inline constexpr LONG kMaxRequest = std::numeric_limits<LONG>::max();
 inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
-                                        {1, 256}, {-5, 40}, {-3, -2}, {kLargestRequest, kLargestRequest}};
+                                        {1, 256}, {-5, 40}, {-3, -2}, {kMaxRequest, kMaxRequest}};
 
 /// Makes the reader of `extension` on `stream` and asks a valid one for its metadata, for thumbnails of
 /// the sizes `requests` and for its metadata again.
