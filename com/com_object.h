@@ -98,12 +98,17 @@ class CComAggObject final : public IUnknown {
 };
 
 /// Makes an `Object` (one of the templates above or CComObjectCached) with the constructor's `arguments`
-/// and one reference, held by `made`. Without memory E_OUTOFMEMORY; when the object's lock or its final
-/// construction fails, that failure, and the object is destroyed.
+/// and one reference, held by `made`. Without memory for the object or for what its constructor needs
+/// E_OUTOFMEMORY; when the object's lock or its final construction fails, that failure, and the object is
+/// destroyed.
 template <class Object, class... Arguments>
 HRESULT MakeObject(ComPtr<Object>& made, Arguments&&... arguments) {
-  std::unique_ptr<Object> unreferenced(new (std::nothrow) Object(std::forward<Arguments>(arguments)...));
-  if (!unreferenced) return E_OUTOFMEMORY;
+  std::unique_ptr<Object> unreferenced;
+  try {
+    unreferenced = std::make_unique<Object>(std::forward<Arguments>(arguments)...);
+  } catch (const std::bad_alloc&) {
+    return E_OUTOFMEMORY;
+  }
   HRESULT result = unreferenced->CreateSection();
   if (FAILED(result)) return result;
   ComPtr<Object> object(unreferenced.release());

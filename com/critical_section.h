@@ -14,11 +14,15 @@ class CriticalSection {
   CriticalSection& operator=(const CriticalSection&) = delete;
 
   /// To be called once, before the first lock. A failure is the system's error as an HRESULT; one without
-  /// an error code counts as success.
+  /// an error code counts as success, and then there is nothing to lock.
   HRESULT Create();
 
-  void lock() { EnterCriticalSection(&section_); }
-  void unlock() { LeaveCriticalSection(&section_); }
+  void lock() {
+    if (created_) EnterCriticalSection(&section_);
+  }
+  void unlock() {
+    if (created_) LeaveCriticalSection(&section_);
+  }
 
  private:
   CRITICAL_SECTION section_{};

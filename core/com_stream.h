@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <iostream>
 #include <memory>
+#include <new>
 #include <streambuf>
 #include <vector>
 
@@ -34,9 +35,13 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
   ~basic_combuf() override { Flush(); }
 
   /// Makes the buffer `size` characters large; it takes more than the put-back reserve to read anything.
-  /// What was read ahead or is pending is dropped.
+  /// What was read ahead or is pending is dropped. Without memory there is no buffer.
   void Allocate(std::size_t size) {
-    buffer_.assign(size, Char());
+    try {
+      buffer_.assign(size, Char());
+    } catch (const std::bad_alloc&) {
+      buffer_ = {};
+    }
     ResetAreas();
   }
 

@@ -63,9 +63,16 @@ HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* 
   const std::optional<Metadatum> found = ReadFromFile(PathOf(*item), column);
   if (!found) return S_FALSE;
   if (value == nullptr) return E_POINTER;
-  if (const HRESULT result = VariantClear(value); FAILED(result)) return result;
+  VARIANT made{};
   // The number type that every automation client knows.
-  return ToAutomationValue(*found, VT_I4, *value);
+  HRESULT result = ToAutomationValue(*found, VT_I4, made);
+  if (SUCCEEDED(result)) result = VariantClear(value);
+  if (SUCCEEDED(result)) {
+    *value = made;
+  } else {
+    VariantClear(&made);
+  }
+  return result;
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -16,7 +16,7 @@ HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info);
 /// S_FALSE, with nothing written, for a property that no column has, a file that cannot be opened or is not
 /// valid, and one whose extension names no kind of image. E_POINTER for a null `item` where the file has to
 /// be looked at, and for a null `value` where there is an answer; the failure of VariantClear for a `value`
-/// that cannot be cleared; E_OUTOFMEMORY.
+/// that cannot be cleared; E_OUTOFMEMORY. After a failure `value` holds what it held.
 HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* value);
 
 }  // namespace Qel::Lumetra::ShellExt

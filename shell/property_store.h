@@ -21,7 +21,8 @@ class CShellExtVista : public Com::CComRoot<Com::FreeThreaded, IInitializeWithSt
                                             IPropertyStoreCapabilities> {
  public:
   /// Builds the reader on `stream`, which may be null, from where it stands. Always S_OK: a file that is not
-  /// acceptable shows in GetValue. Nothing resets a stream object that an earlier file has left failed.
+  /// acceptable, or one for which there is no buffer, shows in GetValue. Nothing resets a stream object that
+  /// an earlier file has left failed.
   HRESULT STDMETHODCALLTYPE Initialize(IStream* stream, DWORD mode) override;
 
   /// The reader of the class's file kind, which parses the header from `stream`; none is allowed.

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <type_traits>
 #include <vector>
 
@@ -36,7 +37,7 @@ std::vector<LONG> g_locksInDestructor;
 template <class Threading>
 class Probe : public CComRoot<Threading, IPersistFile, IOleWindow> {
  public:
-  Probe() { ++g_alive; }
+  Probe() : memory_(1) { ++g_alive; }
 
   HRESULT FinalConstruct() {
     // A reference that comes and goes must not end the object before it is handed out.
@@ -59,6 +60,9 @@ class Probe : public CComRoot<Threading, IPersistFile, IOleWindow> {
     --g_alive;
     g_locksInDestructor.push_back(Module::Current().GetLockCount());
   }
+
+ private:
+  std::vector<char> memory_;  // a second allocation
 };
 
 /// The outer half of an aggregate.
@@ -170,17 +174,47 @@ TYPED_TEST(ComObject, TakesAFailureWithoutAnErrorForALock) {
   EXPECT_EQ(MakeObject(object), S_OK);
 }
 
+std::vector<void*> g_entered;
+
+void WINAPI EnterSection(CRITICAL_SECTION* section) {
+  g_entered.push_back(section);
+}
+void WINAPI LeaveSection(CRITICAL_SECTION*) {}
+
+TEST(CriticalSection, IsNotEnteredWhenItsCreationFailedWithoutAnError) {
+  const HMODULE program = GetModuleHandleW(nullptr);
+  CriticalSection section;
+  {
+    const ImportPatch none(program, "InitializeCriticalSectionAndSpinCount", &NoSectionAndNoReason);
+    EXPECT_EQ(section.Create(), S_OK);
+  }
+  const auto entered = [&section, program] {
+    g_entered.clear();
+    g_entered.reserve(16);
+    const ImportPatch enter(program, "EnterCriticalSection", &EnterSection);
+    const ImportPatch leave(program, "LeaveCriticalSection", &LeaveSection);
+    section.lock();
+    section.unlock();
+    return std::ranges::count(g_entered, static_cast<void*>(&section));
+  };
+  EXPECT_EQ(entered(), 0);
+  EXPECT_EQ(section.Create(), S_OK);
+  EXPECT_EQ(entered(), 1);
+}
+
 TYPED_TEST(ComObject, IsNotMadeWithoutMemory) {
   Outer outer;
   for (IUnknown* const aggregating : {static_cast<IUnknown*>(nullptr), static_cast<IUnknown*>(&outer)}) {
-    void* answer = &answer;
-    HRESULT result = S_OK;
-    {
-      const FailingHeap heap(0, FailingHeap::Then::kRecovers);
-      result = MakeInstance<Probe<TypeParam>>(aggregating, IID_IUnknown, &answer);
+    for (const int allocation : {0, 1}) {  // of the object, and in its constructor
+      void* answer = &answer;
+      HRESULT result = S_OK;
+      {
+        const FailingHeap heap(allocation, FailingHeap::Then::kStaysFull);
+        result = MakeInstance<Probe<TypeParam>>(aggregating, IID_IUnknown, &answer);
+      }
+      EXPECT_EQ(result, E_OUTOFMEMORY);
+      EXPECT_EQ(answer, nullptr);
     }
-    EXPECT_EQ(result, E_OUTOFMEMORY);
-    EXPECT_EQ(answer, nullptr);
   }
   EXPECT_TRUE(g_locksInDestructor.empty());
   EXPECT_EQ(this->module_.GetLockCount(), 0);
@@ -238,6 +272,21 @@ TYPED_TEST(ComObject, IsMadeByTheFactoryOfItsClass) {
   EXPECT_EQ(answer, nullptr);
   EXPECT_EQ(factory->CreateInstance(&outer, IID_IOleWindow, nullptr), E_POINTER);
   EXPECT_EQ(g_alive, 1);
+}
+
+TEST(ComPtr, ReleasesWhatItHeldBeforeItTakesAnother) {
+  Outer first;
+  Outer second;
+  ComPtr<IUnknown> pointer(&first);
+  EXPECT_EQ(first.references, 2u);
+  IUnknown** const place = pointer.Put();
+  EXPECT_EQ(first.references, 1u);
+  EXPECT_EQ(*place, nullptr);
+  second.AddRef();
+  *place = &second;
+  EXPECT_EQ(pointer.Get(), &second);
+  pointer = {};
+  EXPECT_EQ(second.references, 1u);
 }
 
 TEST(CachedFactory, KeepsTheModuleLoadedFromItsSecondReferenceOn) {

@@ -4,6 +4,8 @@
 
 #include <type_traits>
 
+#include "virtual_slot.h"
+
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
@@ -12,6 +14,47 @@ TEST(FileTypeInfo, IsAPureInterface) {
   EXPECT_TRUE(std::has_virtual_destructor_v<FileTypeInfo>);
   EXPECT_EQ(sizeof(FileTypeInfo), sizeof(void*));  // nothing but its virtual functions
   EXPECT_FALSE(std::is_copy_constructible_v<FileTypeInfo>);
+}
+
+TEST(FileTypeInfo, HasItsOperationsInOrder) {
+  using Testing::VirtualSlot;
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::IsValid), 0u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetTypeDescription), 1u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetDimensions), 2u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetFrameCount), 3u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetBitDepth), 4u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetDataTypeName), 5u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::GetComment), 6u);
+  EXPECT_EQ(VirtualSlot(&FileTypeInfo::CreateThumbnail), 7u);
+}
+
+/// Counts how many of it are destroyed.
+class Destroyed final : public FileTypeInfo {
+ public:
+  explicit Destroyed(int& count) : count_(count) {}
+  ~Destroyed() override { ++count_; }
+
+  bool IsValid() const override { return false; }
+  std::wstring GetTypeDescription() const override { return {}; }
+  Size2 GetDimensions() const override { return {}; }
+  std::int32_t GetFrameCount() const override { return 0; }
+  std::int32_t GetBitDepth() const override { return 0; }
+  std::wstring GetDataTypeName() const override { return {}; }
+  std::wstring GetComment() const override { return {}; }
+  HBITMAP CreateThumbnail(const SIZE&) const override { return nullptr; }
+
+ private:
+  int& count_;
+};
+
+TEST(FileTypeInfo, HasItsDestructorLast) {
+  int count = 0;
+  FileTypeInfo* const info = new Destroyed(count);
+  // Of the two forms of a destructor in the table the second one deletes the object too.
+  using Delete = void(FileTypeInfo*);
+  void* const* const table = *reinterpret_cast<void***>(info);
+  reinterpret_cast<Delete*>(table[9])(info);
+  EXPECT_EQ(count, 1);
 }
 
 }  // namespace

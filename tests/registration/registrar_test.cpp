@@ -228,8 +228,8 @@ struct PropertyHandler {
   std::wstring wowApprovedName = approvedName;
 };
 
-TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
-  const std::vector<PropertyHandler> handlers = {
+const std::vector<PropertyHandler>& PropertyHandlers() {
+  static const std::vector<PropertyHandler> handlers = {
       {.script = "ali",
        .extension = L".ali",
        .clsid = L"{F9ADF69F-20BB-45A6-ABE6-D833AD51D6AE}",
@@ -268,11 +268,15 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
        .title = L"QEL .SER Image Property Handler",
        .approvedName = L"QelShellExtVistaSer"},
   };
+  return handlers;
+}
+
+TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
   const std::wstring properties =
       L"prop:System.Image.HorizontalSize;System.Image.VerticalSize;System.Image.BitDepth;"
       L"System.Media.FrameCount;System.Image.Dimensions;System.Comment";
 
-  for (const PropertyHandler& handler : handlers) {
+  for (const PropertyHandler& handler : PropertyHandlers()) {
     MemoryRegistry registry;
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
 
@@ -297,6 +301,38 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
       AddKey(expected, windows + L"\\Shell Extensions\\Approved",
              {{handler.clsid, isWow ? handler.wowApprovedName : handler.approvedName}});
     }
+    EXPECT_TRUE(Testing::Same(registry.Contents(), expected)) << handler.script;
+  }
+}
+
+TEST_F(CarriedScripts, EveryPropertyHandlerScriptTakesAwayWhatIsItsOwnAndNothingElse) {
+  for (const PropertyHandler& handler : PropertyHandlers()) {
+    MemoryRegistry registry;
+    ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
+    RegistryContents expected;
+    for (const std::wstring path : {L"", L"Wow6432Node\\"}) {
+      ASSERT_EQ(registry.CreateKey(kClassesRoot, path + L"CLSID\\" + handler.clsid + L"\\Stale"), S_OK);
+      ASSERT_EQ(registry.CreateKey(kLocalMachine,
+                                   L"SOFTWARE\\Classes\\" + path + L"CLSID\\" + handler.clsid + L"\\Stale"),
+                S_OK);
+      AddKey(expected, L"HKCR\\" + path + L"CLSID", {});
+      AddKey(expected, L"HKLM\\SOFTWARE\\Classes\\" + path + L"CLSID", {});
+      const std::wstring windows = L"HKLM\\SOFTWARE\\" + path + L"Microsoft\\Windows\\CurrentVersion";
+      AddKey(expected, windows + L"\\PropertySystem\\PropertyHandlers", {});
+      AddKey(expected, windows + L"\\Shell Extensions\\Approved", {});
+    }
+    AddKey(expected, L"HKCR\\" + handler.extension, {});
+    ASSERT_EQ(Run({handler.script}, ScriptDirection::kUnregister, registry), S_OK);
+    EXPECT_TRUE(Testing::Same(registry.Contents(), expected)) << handler.script;
+
+    // The key of the extension's handler stays when another program has a value in it.
+    ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
+    const std::wstring key =
+        L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\" +
+        handler.extension;
+    ASSERT_EQ(registry.SetValue(kLocalMachine, key, L"Foreign", std::wstring(L"foreign")), S_OK);
+    ASSERT_EQ(Run({handler.script}, ScriptDirection::kUnregister, registry), S_OK);
+    AddKey(expected, L"HKLM\\" + key, {{L"", handler.clsid}, {L"Foreign", L"foreign"}});
     EXPECT_TRUE(Testing::Same(registry.Contents(), expected)) << handler.script;
   }
 }

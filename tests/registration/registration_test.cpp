@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <functional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "child_process.h"
@@ -232,7 +233,7 @@ TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIs
   const auto getsPast = [&](int place, ScarceSystem::Then then) {
     ScarceSystem::FailAt(place, then);
     const HRESULT result = server_.Register();
-    const bool failed = ScarceSystem::Recover();
+    const bool failed = ScarceSystem::Recover() != ScarceSystem::Lack::kNothing;
     EXPECT_EQ(result, failed ? E_OUTOFMEMORY : S_OK) << "place " << place;
     return !failed;
   };
@@ -406,6 +407,74 @@ TEST_F(Registration, RefusesAScriptThatCannotBeParsed) {
     EXPECT_EQ(writes_, 0u);
   }
   EXPECT_TRUE(g_notifications.empty());
+}
+
+/// The script that every run finds instead of the one that it looks for.
+std::string g_script;
+
+void* WINAPI ThatScript(HGLOBAL) {
+  return g_script.data();
+}
+DWORD WINAPI SizeOfThatScript(HMODULE, HRSRC) {
+  return static_cast<DWORD>(g_script.size());
+}
+DWORD WINAPI QuotedModulePath(HMODULE, wchar_t* buffer, DWORD) {
+  return static_cast<DWORD>(std::wstring(L"C:\\it''s.dll").copy(buffer, 12));
+}
+
+TEST_F(Registration, ReplacesModuleByThePathWithEveryQuoteDoubledAndModuleRawByThePathAsItIs) {
+  g_script = "HKCR { A { val Module = s '%Module%' val Raw = s '%MODULE_RAW%' val AppId = s '%appid%' } }";
+  const ImportPatch script(server_.module(), "LockResource", &ThatScript);
+  const ImportPatch size(server_.module(), "SizeofResource", &SizeOfThatScript);
+  const ImportPatch path(server_.module(), "GetModuleFileNameW", &QuotedModulePath);
+  ASSERT_EQ(server_.Register(), S_OK);
+  const RegistryContents contents = registry_.Contents();
+  const std::wstring key = L"HKLM\\Software\\Classes\\A : ";
+  EXPECT_TRUE(contents.contains(key + L"Module = s 'C:\\it''s.dll'"));
+  EXPECT_TRUE(contents.contains(key + L"Raw = s 'C:\\it's.dll'"));
+  EXPECT_TRUE(contents.contains(key + L"AppId = s '{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}'"));
+}
+
+/// What the DLL asks of the registry functions, or a failure of theirs.
+bool g_createdVolatile = false;
+bool g_textWithoutNull = false;
+
+LSTATUS WINAPI CheckOptions(HKEY key, LPCWSTR name, DWORD reserved, LPWSTR type, DWORD options, REGSAM access,
+                            SECURITY_ATTRIBUTES* security, PHKEY opened, LPDWORD disposition) {
+  if (options != REG_OPTION_NON_VOLATILE) g_createdVolatile = true;
+  return RegCreateKeyExW(key, name, reserved, type, options, access, security, opened, disposition);
+}
+LSTATUS WINAPI CheckData(HKEY key, LPCWSTR name, DWORD reserved, DWORD type, const BYTE* data, DWORD size) {
+  if (type == REG_SZ) {
+    const std::wstring_view text(reinterpret_cast<const wchar_t*>(data), size / sizeof(wchar_t));
+    if (text.find(L'\0') != text.size() - 1) g_textWithoutNull = true;
+  }
+  return RegSetValueExW(key, name, reserved, type, data, size);
+}
+
+TEST_F(Registration, CreatesKeysThatStayAndTextsThatEndInANull) {
+  g_createdVolatile = g_textWithoutNull = false;
+  const ImportPatch keys(server_.module(), "RegCreateKeyExW", &CheckOptions);
+  const ImportPatch values(server_.module(), "RegSetValueExW", &CheckData);
+  ASSERT_EQ(server_.Register(), S_OK);
+  EXPECT_FALSE(g_createdVolatile);
+  EXPECT_FALSE(g_textWithoutNull);
+}
+
+TEST_F(Registration, ReturnsTheFailureToLookIntoAKey) {
+  ASSERT_EQ(server_.Register(), S_OK);
+  const ImportPatch query(
+      server_.module(), "RegQueryInfoKeyW",
+      +[](HKEY, LPWSTR, LPDWORD, LPDWORD, LPDWORD, LPDWORD, LPDWORD, LPDWORD, LPDWORD, LPDWORD, LPDWORD,
+          PFILETIME) -> LSTATUS WINAPI { return ERROR_ACCESS_DENIED; });
+  EXPECT_EQ(server_.Unregister(), E_ACCESSDENIED);
+}
+
+TEST_F(Registration, TakesAPathThatIsNotFoundForAKeyThatIsGone) {
+  const ImportPatch tree(
+      server_.module(), "RegDeleteTreeW",
+      +[](HKEY, LPCWSTR) -> LSTATUS WINAPI { return ERROR_PATH_NOT_FOUND; });
+  EXPECT_EQ(server_.Unregister(), S_OK);
 }
 
 TEST_F(Registration, CarriesNineScriptsInEnglish) {

@@ -163,6 +163,13 @@ TEST_F(ModuleThreads, LockAndUnlockTheServer) {
   });
 }
 
+TEST_F(ModuleThreads, AskForTheInterfaceTable) {
+  RunInThreads([&](std::size_t) {
+    IGlobalInterfaceTable* table = nullptr;
+    EXPECT_EQ(module_.GetGITPtr(&table), REGDB_E_CLASSNOTREG);  // there are no registered classes here
+  });
+}
+
 TEST_F(ModuleThreads, ShareAnObjectWhichTheLastOfThemDeletes) {
   for (int round = 0; round < kRounds; ++round) {
     std::array<ComPtr<ICounter>, kThreads> references;

@@ -5,7 +5,9 @@
 #include <array>
 
 #include "import_patch.h"
+#include "property_store.h"
 #include "server_dll.h"
+#include "virtual_slot.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -70,6 +72,20 @@ TEST_F(Module, ListsItsClassesInTheOrderOfTheirRegistration) {
     EXPECT_EQ(*map[i].clsid, rows[i].clsid);
     EXPECT_EQ(map[i].registryScript, rows[i].script);
   }
+}
+
+TEST_F(Module, HasItsVirtualFunctionsInOrder) {
+  // The destructor takes two.
+  EXPECT_EQ(VirtualSlot(&CQelShellExtModule::Lock), 2u);
+  EXPECT_EQ(VirtualSlot(&CQelShellExtModule::Unlock), 3u);
+  EXPECT_EQ(VirtualSlot(&CQelShellExtModule::GetLockCount), 4u);
+  EXPECT_EQ(VirtualSlot(&CQelShellExtModule::GetGITPtr), 5u);
+  EXPECT_EQ(VirtualSlot(&CQelShellExtModule::AddCommonRGSReplacements), 6u);
+}
+
+TEST_F(Module, MakesPropertyStoresThatBuildTheirReaderByTheFunctionAfterInitialize) {
+  EXPECT_EQ(VirtualSlot(&CShellExtVista::Initialize), 3u);
+  EXPECT_EQ(VirtualSlot(&CShellExtVista::CreateFileInfo), 4u);
 }
 
 TEST_F(Module, SkipsEntriesThatAreEmptyOrMakeNoClassObject) {
@@ -193,6 +209,42 @@ TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
   }
   table = {};
   CoUninitialize();
+}
+
+/// An interface table that counts the references on it.
+class FakeTable final : public IUnknown {
+ public:
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void**) override { return E_NOINTERFACE; }
+  ULONG STDMETHODCALLTYPE AddRef() override { return ++references; }
+  ULONG STDMETHODCALLTYPE Release() override { return --references; }
+
+  ULONG references = 0;
+};
+
+FakeTable g_table;
+
+HRESULT WINAPI MakeFakeTable(REFCLSID clsid, IUnknown* outer, DWORD context, REFIID iid, void** table) {
+  EXPECT_EQ(clsid, CLSID_StdGlobalInterfaceTable);
+  EXPECT_EQ(outer, nullptr);
+  EXPECT_EQ(context, DWORD{CLSCTX_INPROC_SERVER});
+  EXPECT_EQ(iid, IID_IGlobalInterfaceTable);
+  g_table.AddRef();
+  *table = &g_table;
+  return S_OK;
+}
+
+TEST_F(Module, AddsAReferenceToTheInterfaceTableForEveryCaller) {
+  {
+    CQelShellExtModule module({});
+    const ImportPatch patch(GetModuleHandleW(nullptr), "CoCreateInstance", &MakeFakeTable);
+    for (const ULONG callers : {1u, 2u}) {
+      IGlobalInterfaceTable* table = nullptr;
+      EXPECT_EQ(module.GetGITPtr(&table), S_OK);
+      EXPECT_EQ(static_cast<void*>(table), &g_table);
+      EXPECT_EQ(g_table.references, 1 + callers);  // the module has one
+    }
+  }
+  EXPECT_EQ(g_table.references, 2u);
 }
 
 TEST_F(Module, TellsTheRegistryScriptsItsAppId) {

@@ -5,7 +5,6 @@
 #include <shlobj.h>
 
 #include <cstring>
-#include <cwchar>
 #include <filesystem>
 #include <stdexcept>
 #include <string>
@@ -264,6 +263,7 @@ TEST_F(Columns, SurviveNullArguments) {
   SHCOLUMNDATA item{};
   VARIANT value{};
   EXPECT_EQ(provider_->GetColumnInfo(0, nullptr), E_POINTER);
+  EXPECT_EQ(provider_->GetColumnInfo(6, nullptr), S_FALSE);
   EXPECT_EQ(provider_->GetItemData(nullptr, &item, &value), E_POINTER);
   EXPECT_EQ(provider_->GetItemData(&kWidthKey, nullptr, &value), E_POINTER);
   // For the properties of another set there is no need to look at a file.
@@ -271,11 +271,24 @@ TEST_F(Columns, SurviveNullArguments) {
   EXPECT_EQ(provider_->GetItemData(&other, nullptr, nullptr), S_FALSE);
 }
 
-TEST_F(Columns, ReadAPathThatFillsItsRoom) {
+TEST_F(Columns, ReadAPathThatFillsItsRoomWithoutATerminator) {
   SHCOLUMNDATA item;
-  std::wmemset(item.wszFile, L'x', std::size(item.wszFile));
+  std::memset(&item, 0x5A, sizeof item);  // whatever comes after the path, too
+  std::wstring path = L"\\\\?\\" + folder_.path().wstring() + L"\\";
+  path.append(std::size(item.wszFile) - path.size() - 4, L'x').append(L".mrc");
+  ASSERT_EQ(path.copy(item.wszFile, std::wstring::npos), std::size(item.wszFile));
+  const std::string bytes = MrcFile{.nx = 5}.Bytes();
+  {
+    const HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_NEW, 0, nullptr);
+    ASSERT_NE(file, INVALID_HANDLE_VALUE);
+    DWORD written = 0;
+    EXPECT_TRUE(WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr));
+    CloseHandle(file);
+  }
   VARIANT value{};
-  EXPECT_EQ(provider_->GetItemData(&kWidthKey, &item, &value), S_FALSE);
+  EXPECT_EQ(provider_->GetItemData(&kWidthKey, &item, &value), S_OK);
+  EXPECT_EQ(TakeValue(value), Number(VT_I4, 5));
+  DeleteFileW(path.c_str());
 }
 
 TEST_F(Columns, LetAReadersExceptionsPassAndLeaveTheFileClosed) {

@@ -402,6 +402,14 @@ TEST_F(PropertySet, NextGivesAsManyAsThereAre) {
   EXPECT_EQ(list->Next(0, elements, &fetched), S_OK);
 }
 
+TEST_F(PropertySet, NextNeedsNoPlaceAtTheEnd) {
+  const Properties list = ListProperties(Open(MakeLoaded(), kSummary));
+  ULONG fetched = 7;
+  EXPECT_EQ(list->Skip(1), S_FALSE);
+  EXPECT_EQ(list->Next(1, nullptr, &fetched), S_FALSE);
+  EXPECT_EQ(fetched, 0u);
+}
+
 TEST_F(PropertySet, SkipGoesToTheEnd) {
   const Properties list = ListProperties(Open(MakeLoaded(), kImageSummary));
   EXPECT_EQ(list->Skip(0), S_OK);

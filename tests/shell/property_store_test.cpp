@@ -242,6 +242,7 @@ TEST_F(PropertyStore, RefusesEveryValueOfAFileThatIsNotAcceptable) {
   ScriptedStream shortHeader(MrcBytes().substr(0, 1023));
   EXPECT_EQ(Refusal(Open(shortHeader), kWidthKey), E_FAIL);
   ScriptedStream empty("");
+  EXPECT_EQ(Open(empty)->GetValue(kWidthKey, nullptr), E_FAIL);
   for (const CLSID& clsid : {kMrcHandlerClass, kEbnHandlerClass, kRawHandlerClass}) {
     EXPECT_EQ(Refusal(Open(empty, clsid), kWidthKey), E_FAIL);
   }

@@ -9,10 +9,12 @@
 #include <cwchar>
 #include <stdexcept>
 #include <string>
+#include <utility>
 
 #include "bitmap_pixels.h"
 #include "emi_file.h"
 #include "mrc_file.h"
+#include "process_census.h"
 #include "ser_file.h"
 #include "server_dll.h"
 #include "temp_folder.h"
@@ -271,6 +273,19 @@ TEST_F(ShellExtObject, ASecondLoadFindsAFailedStream) {
   HBITMAP bitmap = kUntouched;
   EXPECT_EQ(object.image->Extract(&bitmap), E_FAIL);
   EXPECT_EQ(bitmap, kUntouched);
+}
+
+TEST_F(ShellExtObject, ASecondLoadDestroysTheFirstReader) {
+  const auto path = folder_.Write("grid.mrc", OneSectionMrc(3, 2));
+  const ShellExt object(dll_);
+  const auto heapUseAfter = [&](int loads) {
+    for (int i = 0; i < loads; ++i) EXPECT_EQ(object.Load(path), S_OK);
+    const ProcessCensus census = ProcessCensus::Take();
+    return std::pair(census.heapBlocks, census.heapBytes);
+  };
+  heapUseAfter(2);  // what the system keeps, it takes now
+  const auto before = heapUseAfter(1);
+  EXPECT_EQ(heapUseAfter(200), before);
 }
 
 TEST_F(ShellExtObject, OpensAFileAfterOneThatIsMissing) {

@@ -136,6 +136,21 @@ TEST_F(SystemAnswers, TextsThatAreMissingAreEmpty) {
   EXPECT_STREQ(info.wszTitle, L"");
 }
 
+/// Fills the buffer.
+int WINAPI LongTexts(HINSTANCE, UINT, LPWSTR buffer, int room) {
+  std::wmemset(buffer, L'x', static_cast<std::size_t>(room) - 1);
+  buffer[room - 1] = L'\0';
+  return room - 1;
+}
+
+TEST_F(SystemAnswers, TitleOfAColumnIsCutAt80CharactersWithItsTerminator) {
+  const auto table = Answer("LoadStringW", &LongTexts);
+  SHCOLUMNINFO info;
+  std::memset(&info, 0x5A, sizeof info);
+  EXPECT_EQ(As<IColumnProvider>(LoadImage(), IID_IColumnProvider)->GetColumnInfo(0, &info), S_OK);
+  EXPECT_EQ(std::wstring(info.wszTitle), std::wstring(79, L'x'));
+}
+
 // The lines of a tip that come from the system.
 
 constexpr wchar_t kFirstLines[] = L"Dimensions: (1 \u00D7 1) 8 bit unsigned\r\nType: ";
@@ -325,8 +340,10 @@ TEST_F(SystemAnswers, ColumnsNeedMemoryForTheirTexts) {
   const auto text = Answer("SysAllocString", &NoText);
   for (const PROPERTYKEY& key : {kDimensionsKey, kCommentsKey}) {
     VARIANT value{};
+    value.vt = VT_I4;
+    value.lVal = 7;
     EXPECT_EQ(columns->GetItemData(&key, &item, &value), E_OUTOFMEMORY);
-    EXPECT_EQ(TakeValue(value), Value());
+    EXPECT_EQ(TakeValue(value), Number(VT_I4, 7));  // as it was
   }
 }
 
@@ -365,6 +382,42 @@ TEST_F(SystemAnswers, ReadingAPropertyReturnsTheFailureOfItsCopy) {
   const auto copy =
       Answer("PropVariantCopy", +[](PROPVARIANT*, const PROPVARIANT*) -> HRESULT WINAPI { return kFailure; });
   EXPECT_EQ(storage->ReadMultiple(2, specifiers, values), kFailure);
+}
+
+int g_copies = 0;
+
+HRESULT WINAPI FailFirstCopy(PROPVARIANT* to, const PROPVARIANT* from) {
+  return ++g_copies == 1 ? kFailure : PropVariantCopy(to, from);
+}
+
+TEST_F(SystemAnswers, ReadingPropertiesStopsAtTheFirstCopyThatFails) {
+  const auto sets = As<IPropertySetStorage>(LoadImage(), IID_IPropertySetStorage);
+  ComPtr<IPropertyStorage> storage;
+  ASSERT_EQ(sets->Open(kImageSummary, STGM_READ, storage.Put()), S_OK);
+  PROPSPEC specifiers[2] = {};
+  for (PROPSPEC& specifier : specifiers) {
+    specifier.ulKind = PRSPEC_PROPID;
+    specifier.propid = 3;
+  }
+  PROPVARIANT values[2] = {};
+  const auto copy = Answer("PropVariantCopy", &FailFirstCopy);
+  EXPECT_EQ(storage->ReadMultiple(2, specifiers, values), kFailure);
+  EXPECT_EQ(g_copies, 1);
+  EXPECT_EQ(TakeValue(values[1]), Value());
+}
+
+TEST_F(SystemAnswers, EnumeratorThatCannotBeMadeIsNull) {
+  const auto sets = As<IPropertySetStorage>(LoadImage(), IID_IPropertySetStorage);
+  ComPtr<IPropertyStorage> storage;
+  ASSERT_EQ(sets->Open(kImageSummary, STGM_READ, storage.Put()), S_OK);
+  const auto memory = Answer("malloc", +[](std::size_t) -> void* { return nullptr; });
+  int place = 0;
+  auto* properties = reinterpret_cast<IEnumSTATPROPSTG*>(&place);
+  EXPECT_EQ(storage->Enum(&properties), E_OUTOFMEMORY);
+  EXPECT_EQ(properties, nullptr);
+  auto* list = reinterpret_cast<IEnumSTATPROPSETSTG*>(&place);
+  EXPECT_EQ(sets->Enum(&list), E_OUTOFMEMORY);
+  EXPECT_EQ(list, nullptr);
 }
 
 TEST_F(SystemAnswers, PropertyStoreIsEmptyHandedWithoutMemoryForAText) {

@@ -7,6 +7,7 @@
 #include <shlwapi.h>
 
 #include <cstdlib>
+#include <utility>
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -14,24 +15,25 @@ namespace {
 constexpr std::int64_t kNever = -1;
 std::int64_t g_untilFailure = kNever;
 bool g_staysEmpty = false;
-bool g_failed = false;
+ScarceSystem::Lack g_failed = ScarceSystem::Lack::kNothing;
 
-bool IsToFail() {
-  if (g_failed && g_staysEmpty) return true;
+bool IsToFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
+  if (g_failed != ScarceSystem::Lack::kNothing && g_staysEmpty) return true;
   if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
-  g_failed = true;
+  g_failed = lack;
   return true;
 }
 
 /// Calls the function itself, or answers `kFailure` without it.
-template <auto kFunction, auto kFailure, class Result, class... Arguments>
+template <auto kFunction, auto kFailure, ScarceSystem::Lack kLack, class Result, class... Arguments>
 Result Scarce(Arguments... arguments) {
-  return IsToFail() ? static_cast<Result>(kFailure) : kFunction(arguments...);
+  return IsToFail(kLack) ? static_cast<Result>(kFailure) : kFunction(arguments...);
 }
 
-template <auto kFunction, auto kFailure, class Result, class... Arguments>
+template <auto kFunction, auto kFailure, ScarceSystem::Lack kLack = ScarceSystem::Lack::kOther, class Result,
+          class... Arguments>
 ImportPatch Patch(HMODULE module, const char* name, Result (*)(Arguments...)) {
-  return {module, name, &Scarce<kFunction, kFailure, Result, Arguments...>};
+  return {module, name, &Scarce<kFunction, kFailure, kLack, Result, Arguments...>};
 }
 
 /// The task allocator, which may have no more.
@@ -72,9 +74,9 @@ HBITMAP WINAPI MakeScarceBitmap(HDC dc, const BITMAPINFO* info, UINT usage, void
 }  // namespace
 
 ScarceSystem::ScarceSystem(HMODULE module)
-    : patches_{Patch<&std::malloc, nullptr>(module, "malloc", &std::malloc),
-               Patch<&std::calloc, nullptr>(module, "calloc", &std::calloc),
-               Patch<&std::realloc, nullptr>(module, "realloc", &std::realloc),
+    : patches_{Patch<&std::malloc, nullptr, Lack::kMemory>(module, "malloc", &std::malloc),
+               Patch<&std::calloc, nullptr, Lack::kMemory>(module, "calloc", &std::calloc),
+               Patch<&std::realloc, nullptr, Lack::kMemory>(module, "realloc", &std::realloc),
                Patch<&SysAllocString, nullptr>(module, "SysAllocString", &SysAllocString),
                Patch<&SHStrDupW, E_OUTOFMEMORY>(module, "SHStrDupW", &SHStrDupW),
                Patch<&PropVariantCopy, E_OUTOFMEMORY>(module, "PropVariantCopy", &PropVariantCopy),
@@ -89,14 +91,12 @@ ScarceSystem::~ScarceSystem() {
 void ScarceSystem::FailAt(std::int64_t request, Then then) {
   g_untilFailure = request;
   g_staysEmpty = then == Then::kStaysEmpty;
-  g_failed = false;
+  g_failed = Lack::kNothing;
 }
 
-bool ScarceSystem::Recover() {
-  const bool failed = g_failed;
+ScarceSystem::Lack ScarceSystem::Recover() {
   g_untilFailure = kNever;
-  g_failed = false;
-  return failed;
+  return std::exchange(g_failed, Lack::kNothing);
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

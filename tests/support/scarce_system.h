@@ -17,6 +17,9 @@ class ScarceSystem {
  public:
   enum class Then { kRecovers, kStaysEmpty };
 
+  /// What the system lacks.
+  enum class Lack { kNothing, kMemory, kOther };
+
   /// Nothing fails yet.
   explicit ScarceSystem(HMODULE module);
   ~ScarceSystem();
@@ -26,8 +29,8 @@ class ScarceSystem {
   /// Lets fail what the module asks for, counted from 0 from now on, and if so chosen all after it.
   static void FailAt(std::int64_t request, Then then);
 
-  /// Lets nothing fail. Returns whether anything has.
-  static bool Recover();
+  /// Lets nothing fail. Returns what has failed first: the C runtime's memory or anything else.
+  static Lack Recover();
 
  private:
   std::array<ImportPatch, 9> patches_;
