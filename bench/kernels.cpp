@@ -33,10 +33,10 @@ void Fill(std::vector<std::byte>& band) {
 void FillBand(DataType type, std::vector<std::byte>& band) {
   switch (type) {
     case DataType::kFloat32:
-    case DataType::kComplexFloat32: return Fill<float>(band);
+    case DataType::kComplexFloat32: Fill<float>(band); break;
     case DataType::kFloat64:
-    case DataType::kComplexFloat64: return Fill<double>(band);
-    default: return Fill<std::uint8_t>(band);  // every pattern of bytes is as good as any other for integers
+    case DataType::kComplexFloat64: Fill<double>(band); break;
+    default: Fill<std::uint8_t>(band);  // every pattern of bytes is as good as any other for integers
   }
 }
 

@@ -123,9 +123,9 @@ void Serve() {
   for (std::string line; std::getline(std::cin, line);) {
     if (!line.empty() && line.back() == '\r') line.pop_back();
     try {
-      std::cout << Answer(line) << std::endl;
+      std::cout << Answer(line) << '\n' << std::flush;
     } catch (const std::exception& error) {
-      std::cout << "error\t" << error.what() << std::endl;
+      std::cout << "error\t" << error.what() << '\n' << std::flush;
     }
   }
 }
