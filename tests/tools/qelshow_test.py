@@ -771,6 +771,10 @@ class Page(Test):
         return usage.ru_maxrss << 10
 
 
+# What the doctor says under Wine, whose shell shows no thumbnails and properties to programs.
+UNANSWERED = "The shell of this system does not tell what it shows."
+
+
 class Doctor(Test):
     """Changes the registry of the Wine prefix, so that nothing else may use it at the same time."""
 
@@ -879,7 +883,8 @@ class Doctor(Test):
             with self.subTest(files=files):
                 result = run("doctor", *files, server=None)
                 self.assertEqual((result.returncode, result.stderr), (status, ""))
-                self.assertIn(f"{good}: is read, 300 x 200 pixels, frames: 2, 8 bit", result.stdout)
+                self.assertRegex(result.stdout, rf"{re.escape(str(good))}: is read, 300 x 200 pixels, frames: 2, 8 bit.*\n"
+                                                rf" +{re.escape(UNANSWERED)}\n")
                 for path, part in bad.items():
                     lines = [line for line in result.stdout.splitlines() if str(path) in line]
                     self.assertEqual(len(lines), int(path in files))
@@ -887,7 +892,8 @@ class Doctor(Test):
                         self.assertOneSentence(line, path, "is not read", part)
         result, document = self.doctor(good)
         self.assertEqual(result.returncode, DONE)
-        self.assertEqual([(each["verdict"], each["frames"]) for each in document["files"]], [("good", 2)])
+        self.assertEqual([(each["verdict"], each["frames"], each["shell"]) for each in document["files"]],
+                         [("good", 2, UNANSWERED)])
 
     def test_tells_that_nothing_is_registered(self):
         document = self.assertProblem("not registered on this computer", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\"),

@@ -11,6 +11,7 @@
 #include "file_inspection.h"
 #include "installation.h"
 #include "json_records.h"
+#include "shell_view.h"
 #include "text_tools.h"
 #include "worker.h"
 
@@ -81,6 +82,27 @@ bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& f
   return found;
 }
 
+/// Asks the shell about the files that the extension reads and that nothing is remarked on. Answers whether
+/// all that it says is in order.
+bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
+  bool isInOrder = true;
+  std::optional<Worker> worker;
+  for (FileFacts& facts : files) {
+    if (facts.verdict != Verdict::kGood || !facts.remark.empty()) continue;
+    if (!worker) worker.emplace(std::wstring());
+    const std::wstring path = AbsolutePath(facts.path);
+    ShellView view;
+    if (const auto end = worker->Ask({Subject::kShellView, path, size}, view)) {
+      facts.shell = L"Asked what it shows, the shell ends its process with " + ProcessEndText(*end) + L".";
+      isInOrder = false;
+    } else {
+      facts.shell = ShellSentence(view, path);
+      isInOrder = isInOrder && IsInOrder(view);
+    }
+  }
+  return isInOrder;
+}
+
 Json Document(const Installation& installation, const std::vector<FileFacts>& files) {
   return {{"schema", kJsonSchema},
           {"classes", installation.classes},
@@ -118,7 +140,10 @@ std::wstring FileText(const FileFacts& facts) {
   if (facts.verdict != Verdict::kGood) return text + L"is not read. " + facts.problem + L"\n";
   text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
           L" pixels, frames: " + std::to_wstring(facts.frames) + L", " + facts.type + L"\n";
-  return facts.remark.empty() ? text : text + L"      " + facts.remark + L"\n";
+  for (const auto& sentence : {facts.remark, facts.shell}) {
+    if (!sentence.empty()) text += L"      " + sentence + L"\n";
+  }
+  return text;
 }
 
 std::wstring Text(const Installation& installation, const std::vector<FileFacts>& files) {
@@ -143,12 +168,13 @@ int RunDoctor(const CommandLine& line) {
   const Installation installation = ExamineInstallation();
   std::vector<FileFacts> files = ExamineFiles(line);
   const bool isAnyLeftOut = RemarkOnLeftOut(installation, files);
+  const bool isShown = AskShell(files, line.size);
   if (line.json) {
     PrintUtf8(Document(installation, files).dump() + "\n");
   } else {
     Print(Text(installation, files));
   }
-  int status = installation.problems.empty() && !isAnyLeftOut ? kExitDone : kExitFailed;
+  int status = installation.problems.empty() && !isAnyLeftOut && isShown ? kExitDone : kExitFailed;
   for (const FileFacts& facts : files) status = std::max(status, static_cast<int>(facts.verdict));
   return status;
 }

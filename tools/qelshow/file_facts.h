@@ -95,6 +95,7 @@ struct FileFacts {
   Verdict verdict = Verdict::kGood;
   OptionalText problem;  // one sentence for everything but a good file
   OptionalText remark;   // one sentence worth knowing about a file, good or not
+  OptionalText shell;    // one sentence on what Windows itself shows, where that was asked
 
   // What the columns and the tip say; 0 or empty when they say nothing.
   std::int32_t width = 0;

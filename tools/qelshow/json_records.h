@@ -72,7 +72,7 @@ NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, st
                                    value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Property, name, set, id, type, value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, picture, problem)
-NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, verdict, problem, remark, width,
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, verdict, problem, remark, shell, width,
                                    height, frames, bitDepth, type, thumbnail, tip, columns, propertySets,
                                    propertyStore)
 

@@ -6,7 +6,8 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// To load the DLL, about a file, and whether objects of a registered class can be created.
+/// To load the DLL, about a file, what the shell shows of it, and whether objects of a registered class can
+/// be created.
 enum class Subject : std::int32_t {
   kLoading,
   kDiagnosis,
@@ -15,6 +16,7 @@ enum class Subject : std::int32_t {
   kPropertySets,
   kPropertyStore,
   kThumbnail,
+  kShellView,
   kCreation
 };
 

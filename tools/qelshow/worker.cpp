@@ -11,6 +11,7 @@
 #include "extension_client.h"
 #include "failure.h"
 #include "shell_requests.h"
+#include "shell_view.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -55,6 +56,7 @@ Json AnswerTo(const Question& question, ExtensionClient& client) {
     case Subject::kPropertySets: return RequestPropertySets(client, question.path);
     case Subject::kPropertyStore: return RequestPropertyStore(client, question.path);
     case Subject::kThumbnail: return RequestThumbnail(client, question.path, question.size);
+    case Subject::kShellView: return RequestShellView(client, question.path, question.size);
     case Subject::kCreation: return RequestObject(question.path);
   }
   return {};
