@@ -27,7 +27,8 @@ import gi
 gi.require_version("Libmsi", "1.0")
 from gi.repository import Libmsi  # noqa: E402
 
-from registry_entries import registered_entries  # noqa: E402
+from registry_entries import Entry, registered_entries  # noqa: E402
+from test_kit import test_kit_files, with_windows_line_ends  # noqa: E402
 
 HERE = pathlib.Path(__file__).resolve().parent
 
@@ -56,6 +57,11 @@ COMPONENT_CODES = {
 }
 
 APP_ID = "{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}"
+
+# Has Windows run the thumbnail handler in the process that asks, where it need not be initialised with a stream. Only
+# the feature of this name, which is off by default, writes it; DllRegisterServer does not.
+IN_PROCESS = ("inprocess", Entry(r"SOFTWARE\Classes\CLSID\{79E696A1-2FA5-4b3e-9610-D5F760417E62}",
+                                 "DisableProcessIsolation", 1))
 
 # Windows Installer's numbers, from its tables Component, Feature and Registry.
 COMPONENT_64_BIT, COMPONENT_KEY_PATH_IS_REGISTRY = 256, 4
@@ -157,25 +163,27 @@ def braced(code):
 
 
 def add_registry(database, scripts):
-    """What DllRegisterServer writes, each entry in the component of its extension or in that of the DLL."""
+    """What DllRegisterServer writes, each entry in the component of its extension or in that of the DLL, and the entry
+    of the feature inprocess in its own.
+    """
     replacements = {"MODULE": "[InstallFolder]QelShellExt.dll", "APPID": APP_ID}
     key_paths = {}
-    for number, (extension, entry) in enumerate(registered_entries(scripts, replacements)):
-        row, component = f"registry{number}", extension or "Server"
+    for number, (feature, entry) in enumerate([*registered_entries(scripts, replacements), IN_PROCESS]):
+        row, component = f"registry{number}", feature or "Server"
         # An asterisk makes the key, and removes it with everything in it.
         name, data = ("*", None) if entry.owned else (entry.name or None, entry.data)
         data = f"#{data}" if isinstance(data, int) else data
         database.execute("INSERT INTO `Registry` (`Registry`, `Root`, `Key`, `Name`, `Value`, `Component_`) "
                          "VALUES (?, ?, ?, ?, ?, ?)", row, ROOT_LOCAL_MACHINE, entry.key, name, data, component)
-        if not entry.owned and extension:
-            key_paths.setdefault(extension, row)
+        if not entry.owned and feature:
+            key_paths.setdefault(feature, row)
     for action, sequence in (("RemoveRegistryValues", 2600), ("WriteRegistryValues", 5000)):
         database.execute("INSERT INTO `InstallExecuteSequence` (`Action`, `Sequence`) VALUES (?, ?)", action, sequence)
-    for extension, row in key_paths.items():
+    for feature, row in key_paths.items():
         database.execute("UPDATE `Component` SET `KeyPath` = ?, `Attributes` = ? WHERE `Component` = ?",
-                         row, COMPONENT_64_BIT | COMPONENT_KEY_PATH_IS_REGISTRY, extension)
+                         row, COMPONENT_64_BIT | COMPONENT_KEY_PATH_IS_REGISTRY, feature)
         database.execute("UPDATE `Feature` SET `Attributes` = ? WHERE `Feature` = ?",
-                         FEATURE_NOT_ADVERTISED, extension)
+                         FEATURE_NOT_ADVERTISED, feature)
 
 
 def component_code(extension):
@@ -225,13 +233,13 @@ def make_msi(content, scripts, project, epoch, msi):
 
 
 def make_zip(path, files, epoch):
-    """The files in a folder that has the name of the archive."""
+    """The files, bytes by path, in a folder that has the name of the archive."""
     date = time.gmtime(epoch)[:6]
     with zipfile.ZipFile(path, "w", zipfile.ZIP_DEFLATED) as archive:
-        for file in sorted(files, key=lambda file: file.name):
-            entry = zipfile.ZipInfo(f"{path.stem}/{file.name}", date)
+        for name, content in sorted(files.items()):
+            entry = zipfile.ZipInfo(f"{path.stem}/{name}", date)
             entry.external_attr = 0o100644 << 16
-            archive.writestr(entry, file.read_bytes(), zipfile.ZIP_DEFLATED, 9)
+            archive.writestr(entry, content, zipfile.ZIP_DEFLATED, 9)
 
 
 def make_packages(build, out, epoch):
@@ -240,7 +248,8 @@ def make_packages(build, out, epoch):
     out.mkdir(parents=True, exist_ok=True)
     out = out.resolve()  # wixl runs in another folder
     name = f"QelShellExt-{project.version}-x64"
-    packages = [out / f"{name}.msi", out / f"{name}.zip", out / f"{name}-symbols.zip"]
+    packages = [out / f"{name}{ending}" for ending in (".msi", ".zip", "-symbols.zip", "-tests.zip")]
+    registry_scripts = build / "registration" / "scripts"
     with tempfile.TemporaryDirectory() as folder:
         content = pathlib.Path(folder)
         for program in PROGRAMS:
@@ -249,12 +258,16 @@ def make_packages(build, out, epoch):
         packages_used = library_packages()
         for text in TEXTS:
             contents = (HERE / text).read_text().replace("@PACKAGES@", packages_used)
-            # For editors that know no other line ends.
-            (content / text).write_text(contents, newline="\r\n")
-        make_msi(content, build / "registration" / "scripts", project, epoch, packages[0])
+            (content / text).write_bytes(with_windows_line_ends(contents))
+        make_msi(content, registry_scripts, project, epoch, packages[0])
         signing.sign(packages[0])
-        make_zip(packages[1], [content / name for name in (*PROGRAMS, *TEXTS)], epoch)
-        make_zip(packages[2], [build / f"{program}.debug" for program in PROGRAMS], epoch)
+        released = {name: (content / name).read_bytes() for name in (*PROGRAMS, *TEXTS)}
+        symbols = {f"{program}.debug": (build / f"{program}.debug").read_bytes() for program in PROGRAMS}
+        tests = test_kit_files(build, registry_scripts)
+        # The tests test the released programs, signed if they are.
+        tests |= {name: content for name, content in released.items() if name != "README.txt"}
+        for path, files in zip(packages[1:], (released, symbols, tests)):
+            make_zip(path, files, epoch)
     sums = [f"{hashlib.sha256(package.read_bytes()).hexdigest()}  {package.name}\n" for package in packages]
     (out / "SHA256SUMS").write_text("".join(sums))
     for path in (*packages, out / "SHA256SUMS"):

@@ -115,7 +115,7 @@ TEST(PathStream, ReadsBehind4GiB) {
   constexpr std::int64_t kPosition = (std::int64_t{5} << 30) + 1;
   const TempFolder folder;
   const auto path = folder.Write("file", "");
-  std::filesystem::resize_file(path, kPosition);  // takes no space on the disk
+  Testing::Lengthen(path, kPosition);
   Append(path, "behind");
   std::ifstream stream;
   OpenPath(stream, path.wstring().c_str());

@@ -98,6 +98,7 @@ def main(folder):
                     else:
                         mrc.set_data(data)
                         mrc.set_image_stack() if kind == "stack" else mrc.set_volume()
+                    mrc.header.label[0] = "Created by mrcfile.py"  # without the time, so that runs agree
                     mrc.add_label(f"  {kind} of {code}")
                     if kind in ("stack", "volumes"):
                         mrc.set_extended_header(numpy.arange(777, dtype="u1"))

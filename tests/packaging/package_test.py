@@ -40,14 +40,17 @@ def make_packages(out, build=BUILD, epoch=EPOCH, **options):
 
 def package(out, ending=".msi"):
     """The one package in a folder."""
-    [path] = (path for path in out.glob("*" + ending) if ending != ".zip" or "symbols" not in path.name)
+    [path] = out.glob("*-x64" + ending)
     return path
 
 
 def copy_build(folder):
     """What packages are made of, and no more."""
     folder.mkdir()
-    for name in ("CMakeCache.txt", *PROGRAMS, *(f"{program}.debug" for program in PROGRAMS)):
+    tests = pathlib.Path("tests", "kit_programs.txt")
+    for name in ("CMakeCache.txt", *PROGRAMS, *(f"{program}.debug" for program in PROGRAMS), tests,
+                 *(BUILD / tests).read_text().split()):
+        (folder / name).parent.mkdir(parents=True, exist_ok=True)
         shutil.copyfile(BUILD / name, folder / name)
     shutil.copytree(BUILD / "registration" / "scripts", folder / "registration" / "scripts",
                     ignore=lambda _, names: [name for name in names if not name.endswith(".rgs")])
@@ -101,12 +104,22 @@ class Contents(Test):
     def test_hold_what_was_built_and_its_sums(self):
         sums = dict(reversed(line.split()) for line in (self.out / "SHA256SUMS").read_text().splitlines())
         self.assertEqual(sums, {path.name: digest(path) for path in self.out.iterdir() if path.name != "SHA256SUMS"})
-        self.assertEqual(len(sums), 3)
+        self.assertEqual(len(sums), 4)
         archive = package(self.out, ".zip")
         with zipfile.ZipFile(archive) as files:
             self.assertEqual(files.namelist(), [f"{archive.stem}/{name}" for name in FILES])
             for program in PROGRAMS:
                 self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
+
+    def test_hold_tests_of_the_same_programs_that_know_no_folder_of_this_machine(self):
+        archive = package(self.out, "-tests.zip")
+        with zipfile.ZipFile(archive) as files:
+            self.assertGreater(len(files.namelist()), 60)
+            for program in PROGRAMS:
+                self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
+            for name in files.namelist():
+                with self.subTest(name=name):
+                    self.assertNotIn(bytes(SOURCES), files.read(name))
 
     def test_name_the_versions_of_the_libraries_in_the_programs(self):
         archive = package(self.out, ".zip")
@@ -374,7 +387,7 @@ class Installation(Test):
         return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
 
     def test_an_extension_can_be_left_to_others(self):
-        self.install(self.msi, "ADDLOCAL=ALL", "REMOVE=raw")
+        self.install(self.msi, "ADDLOCAL=QelShellExt,mrc,ali,rec,ser,emi,ebn")
         fewer = self.ours()
         self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())
         # What the doctor says puts right what is missing and no more, and adds what was left out.
@@ -395,6 +408,20 @@ class Installation(Test):
             self.assertRegex(line, r"\\\.raw|\{E217E970-5E2E-11E1-B86C-0800200C9A66\}")
         self.install(self.msi, "REMOVE=raw")
         self.assertEqual(self.ours() ^ fewer, set())
+        self.remove(self.msi)
+        self.assertRemoved()
+
+    def test_thumbnails_leave_the_isolated_process_only_where_that_is_asked_for(self):
+        value = (r"\Classes\CLSID\{79E696A1-2FA5-4b3e-9610-D5F760417E62} : "
+                 '"DisableProcessIsolation"=dword:00000001')
+        self.install(self.msi)
+        default = self.ours()
+        self.install(self.msi, "ADDLOCAL=inprocess")
+        self.assertEqual(self.ours() ^ default, {value})
+        self.assertWorks()
+        self.install(self.msi, "REMOVE=inprocess")
+        self.assertEqual(self.ours() ^ default, set())
+        self.install(self.msi, "ADDLOCAL=inprocess")
         self.remove(self.msi)
         self.assertRemoved()
 

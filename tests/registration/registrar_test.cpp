@@ -169,7 +169,7 @@ class CarriedScripts : public ::testing::Test {
     static std::map<std::string, std::string> scripts;
     std::string& script = scripts[name];
     if (!script.empty()) return script;
-    std::ifstream file(std::string(QEL_REGISTRY_SCRIPTS) + "/" + name + ".rgs", std::ios::binary);
+    std::ifstream file(name + ".rgs", std::ios::binary);
     EXPECT_TRUE(file) << name;
     return script.assign(std::istreambuf_iterator<char>(file), {});
   }

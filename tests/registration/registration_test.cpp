@@ -222,10 +222,15 @@ TEST_F(Registration, LeavesNothingInTheProcess) {
     }
     return ProcessCensus::Take();
   };
-  const ProcessCensus before = takeAfter(2);
-  const ProcessCensus after = takeAfter(3);
-  EXPECT_LE(after.handles, before.handles);
-  EXPECT_LE(after.heapBlocks, before.heapBlocks);
+  // The system keeps something now and then, a leak leaves something in each of these rounds.
+  bool isConstant = false;
+  ProcessCensus before = takeAfter(2);
+  for (int i = 0; i < 5 && !isConstant; ++i) {
+    const ProcessCensus after = takeAfter(3);
+    isConstant = after.handles <= before.handles && after.heapBlocks <= before.heapBlocks;
+    before = after;
+  }
+  EXPECT_TRUE(isConstant);
 }
 
 TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIsSome) {

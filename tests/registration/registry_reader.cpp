@@ -75,12 +75,18 @@ RegistryContents ReadRegistry(HKEY key, const std::wstring& name) {
     const std::wstring path = std::move(pending.back());
     pending.pop_back();
     HKEY opened = nullptr;
-    Check(RegOpenKeyExW(key, path.c_str(), REG_OPTION_OPEN_LINK, KEY_READ, &opened), "RegOpenKeyExW");
+    const std::wstring full = path.empty() ? name : name + L'\\' + path;
+    const LSTATUS status = RegOpenKeyExW(key, path.c_str(), REG_OPTION_OPEN_LINK, KEY_READ, &opened);
+    if (status == ERROR_ACCESS_DENIED ||
+        status == ERROR_FILE_NOT_FOUND) {  // the system's own, or gone meanwhile
+      contents.insert(full);
+      continue;
+    }
+    Check(status, "RegOpenKeyExW");
     if (IsLink(opened)) {
       RegCloseKey(opened);
       continue;
     }
-    const std::wstring full = path.empty() ? name : name + L'\\' + path;
     contents.insert(full);
     ReadValues(opened, full, contents);
     for (const std::wstring& subkey : Subkeys(opened)) {

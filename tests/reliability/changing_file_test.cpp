@@ -19,6 +19,7 @@
 #include "server_dll.h"
 #include "shell_values.h"
 #include "temp_folder.h"
+#include "unused_file.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -109,17 +110,10 @@ class ChangingFile : public ServerTest {
       Write(whole_);
       check(Ask(number, interrupt, readFails));
       Write(whole_);
-      EXPECT_TRUE(IsUnused());
+      EXPECT_TRUE(IsUnused(path_));
       EXPECT_EQ(dll_.LockCount(), 0);
     }
     EXPECT_EQ(Ask().picture, picture_);
-  }
-
-  bool IsUnused() const {
-    const HANDLE file = CreateFileW(path_.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
-    if (file == INVALID_HANDLE_VALUE) return false;
-    CloseHandle(file);
-    return true;
   }
 
   static void ExpectAThumbnailOrNone(const Answers& answers) {

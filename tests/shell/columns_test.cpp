@@ -17,17 +17,10 @@
 #include "server_dll.h"
 #include "shell_values.h"
 #include "temp_folder.h"
+#include "unused_file.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
-
-/// Whether nobody has the file open.
-bool IsUnused(const std::filesystem::path& file) {
-  const HANDLE handle = CreateFileW(file.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
-  if (handle == INVALID_HANDLE_VALUE) return false;
-  CloseHandle(handle);
-  return true;
-}
 
 class Columns : public ServerTest {
  protected:

@@ -173,7 +173,7 @@ TEST_F(InfoTip, ShowsTheSizeModulo4GiB) {
   const auto file = folder_.Write(L"large.mrc", MrcFile{}.Bytes());
   for (const std::uintmax_t size : {(std::uintmax_t{1} << 32) + 1024, (std::uintmax_t{5} << 32) + 7777,
                                     (std::uintmax_t{1} << 32) - 1024}) {
-    std::filesystem::resize_file(file, size);
+    Lengthen(file, size);
     const std::wstring tip = TipOf(Load(file));
     const std::wstring line = L"\r\nSize: " + SizeText(static_cast<LONGLONG>(size & 0xFFFFFFFF));
     ASSERT_GE(tip.size(), line.size());

@@ -73,7 +73,7 @@ TEST(PropertyTable, NamesThePropertiesAsTheRegisteredListDoes) {
     const std::wstring name = property.canonicalName;
     list.append(name.begin(), name.end());
   }
-  std::ifstream script(std::string(QEL_REGISTRY_SCRIPTS) + "/mrc.rgs", std::ios::binary);
+  std::ifstream script("mrc.rgs", std::ios::binary);
   const std::string text{std::istreambuf_iterator(script), {}};
   for (const char* view : {"FullDetails", "InfoTip", "PreviewDetails", "PreviewTitle"}) {
     EXPECT_NE(text.find(std::string("val '") + view + "' = s '" + list + "'"), std::string::npos) << view;

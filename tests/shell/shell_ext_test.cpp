@@ -18,6 +18,7 @@
 #include "ser_file.h"
 #include "server_dll.h"
 #include "temp_folder.h"
+#include "unused_file.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -312,7 +313,7 @@ TEST_F(ShellExtObject, KeepsTheFileOpenAndSharedUntilItGoes) {
     EXPECT_TRUE(open(GENERIC_READ | GENERIC_WRITE | DELETE, kShareAll));
     EXPECT_FALSE(open(GENERIC_READ, 0));
   }
-  EXPECT_TRUE(open(GENERIC_READ, 0));
+  EXPECT_TRUE(IsUnused(path));
 }
 
 TEST_F(ShellExtObject, HasNothingElseOfIPersistFile) {

@@ -48,8 +48,8 @@ std::size_t CountSlots(Allocate allocate, Free free) {
 }
 static_assert(TLS_OUT_OF_INDEXES == FLS_OUT_OF_INDEXES);  // NOLINT(misc-redundant-expression): it is not
 
-// The GDI handles of all processes as the process block refers to them: GetGuiResources answers 0 under some
-// versions of Wine.
+// The GDI handles as the process block refers to them, under Wine those of this process: GetGuiResources
+// answers 0 under some versions of it.
 struct GdiHandleEntry {
   void* object;
   WORD owner;  // process id; 0 for the system, or where that is not kept
@@ -61,11 +61,15 @@ struct GdiHandleEntry {
 static_assert(sizeof(GdiHandleEntry) == 24);
 
 std::size_t CountGdiObjects() {
+  const HMODULE system = GetModuleHandleW(L"ntdll.dll");
+  if (GetProcAddress(system, "wine_get_version") == nullptr) {
+    return GetGuiResources(GetCurrentProcess(), GR_GDIOBJECTS);
+  }
   constexpr std::size_t kHandleTable = 0xF8;  // offset in the process block
   constexpr std::size_t kEntries = 0x4000;    // as many as the smallest table of any system has
   using GetProcessBlock = const std::byte*();
-  const auto getProcessBlock = reinterpret_cast<GetProcessBlock*>(
-      reinterpret_cast<void*>(GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "RtlGetCurrentPeb")));
+  const auto getProcessBlock =
+      reinterpret_cast<GetProcessBlock*>(reinterpret_cast<void*>(GetProcAddress(system, "RtlGetCurrentPeb")));
   const auto* const entries =
       *reinterpret_cast<const GdiHandleEntry* const*>(getProcessBlock() + kHandleTable);
   std::size_t count = 0;

@@ -6,6 +6,12 @@
 #include <string>
 #include <system_error>
 
+#ifdef _WIN32
+#include <windows.h>
+
+#include <winioctl.h>
+#endif
+
 namespace Qel::Lumetra::ShellExt::Testing {
 
 TempFolder::TempFolder() {
@@ -28,6 +34,18 @@ std::filesystem::path TempFolder::Write(const std::filesystem::path& name, std::
   file.close();
   if (!file) throw std::runtime_error("cannot write " + path.string());
   return path;
+}
+
+void Lengthen(const std::filesystem::path& file, std::uintmax_t size) {
+#ifdef _WIN32
+  // Else Windows writes the zeros.
+  const HANDLE handle = CreateFileW(file.c_str(), GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, nullptr,
+                                    OPEN_EXISTING, 0, nullptr);
+  DWORD returned = 0;
+  DeviceIoControl(handle, FSCTL_SET_SPARSE, nullptr, 0, nullptr, 0, &returned, nullptr);
+  CloseHandle(handle);
+#endif
+  std::filesystem::resize_file(file, size);
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

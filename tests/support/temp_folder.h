@@ -1,6 +1,7 @@
 // A folder of a test's own for the files that it writes.
 #pragma once
 
+#include <cstdint>
 #include <filesystem>
 #include <string_view>
 
@@ -22,5 +23,8 @@ class TempFolder {
  private:
   std::filesystem::path path_;
 };
+
+/// Makes a file larger. What is new holds zeros and takes no space on the disk.
+void Lengthen(const std::filesystem::path& file, std::uintmax_t size);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,0 +1,102 @@
+// What the shell of this computer shows of the sample files when the extension is registered, compared with
+// what the extension answers directly. The extension is registered as long as a test runs.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "dll_registration.h"
+#include "file_inspection.h"
+#include "machine_registration.h"
+#include "samples.h"
+#include "shell_view.h"
+#include "temp_folder.h"
+#include "text_tools.h"
+#include "worker.h"
+
+namespace Qel::Lumetra::ShellExt::Show {
+namespace {
+
+constexpr std::int32_t kRequest = 256;
+
+/// The registered DLL; what it replaced is put back in the end.
+class RegisteredDll {
+ public:
+  RegisteredDll() { EXPECT_EQ(dll_.Register(), S_OK); }
+  ~RegisteredDll() { EXPECT_EQ(dll_.Unregister(), S_OK); }
+  RegisteredDll(const RegisteredDll&) = delete;
+  RegisteredDll& operator=(const RegisteredDll&) = delete;
+
+ private:
+  Testing::OthersRegistrations others_;
+  Testing::DllRegistration dll_;
+};
+
+struct SampleView {
+  std::wstring path;
+  ShellView view;
+};
+
+class WindowsShell : public testing::Test {
+ protected:
+  void SetUp() override {
+    if (const std::string reason = Testing::WhyNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
+  }
+
+  /// What the shell shows of every sample, but for those of which no thumbnail can be asked: they end the
+  /// process.
+  std::vector<SampleView> AskForSamples() {
+    const RegisteredDll registered;
+    Worker worker{std::wstring()};
+    std::vector<SampleView> views;
+    for (const Samples::Sample& sample : Samples::AllSamples()) {
+      const std::wstring path = folder_.Write(sample.name, sample.make()).wstring();
+      const FileFacts facts = InspectFile(worker, path, path, kRequest);
+      if (!facts.remark.empty()) continue;
+      SampleView asked{path, {}};
+      const auto end = worker.Ask({Subject::kShellView, path, kRequest}, asked.view);
+      EXPECT_FALSE(end) << sample.name << ": the process of the shell ends with "
+                        << Utf8(ProcessEndText(*end));
+      views.push_back(std::move(asked));
+    }
+    EXPECT_GT(views.size(), 20u);
+    return views;
+  }
+
+  /// Compares one kind of answer for every sample.
+  void Compare(ShellAnswer ShellView::* answer) {
+    bool isAnswered = false;
+    for (const SampleView& asked : AskForSamples()) {
+      const Agreement agreement = (asked.view.*answer).agreement;
+      if (agreement != Agreement::kUnanswered) isAnswered = true;
+      EXPECT_TRUE(agreement != Agreement::kDiffers && agreement != Agreement::kNothing)
+          << Utf8(asked.path) << ": " << Utf8(ShellSentence(asked.view, asked.path));
+    }
+    if (!isAnswered && !HasFailure()) GTEST_SKIP() << "The shell of this system does not tell what it shows.";
+  }
+
+  const Testing::TempFolder folder_;
+};
+
+TEST_F(WindowsShell, ShowsTheThumbnailsOfTheExtension) {
+  Compare(&ShellView::thumbnail);
+}
+
+TEST_F(WindowsShell, ShowsThePropertiesOfTheExtension) {
+  Compare(&ShellView::properties);
+}
+
+}  // namespace
+}  // namespace Qel::Lumetra::ShellExt::Show
+
+/// The program is its own worker process.
+int main(int count, char** arguments) {
+  if (count == 2 && std::strcmp(arguments[1], "--worker") == 0)
+    return Qel::Lumetra::ShellExt::Show::RunWorker();
+  testing::InitGoogleTest(&count, arguments);
+  return RUN_ALL_TESTS();
+}
