@@ -18,7 +18,7 @@ execute_process(COMMAND "${copy}/scripts/package" --out ${WORK}/second COMMAND_E
 file(STRINGS ${WORK}/first/SHA256SUMS packages)
 list(TRANSFORM packages REPLACE "^[0-9a-f]+  " "")
 list(LENGTH packages count)
-if(NOT count EQUAL 4)
+if(NOT count EQUAL 5)
   message(FATAL_ERROR "There are ${count} packages: ${packages}.")
 endif()
 foreach(package ${packages})
