@@ -33,7 +33,7 @@ TEST(JsonRecords, WritesHalfOfASurrogatePairAsTheReplacementCharacter) {
 TEST(JsonRecords, WriteAnEmptyTextAsNullWhereItMayBeMissing) {
   Property property;
   EXPECT_TRUE(Json(property).at("problem").is_null());
-  EXPECT_EQ(Json(property).at("value"), "");
+  EXPECT_EQ(Json(property).at("set"), "");
   property.problem = L"none";
   EXPECT_EQ(Json(property).at("problem"), "none");
   EXPECT_EQ(Json(property).get<Property>().problem, L"none");
