@@ -40,7 +40,7 @@ class Documents(unittest.TestCase):
 
     def test_name_scripts_that_are_there(self):
         for document in self.documents:
-            for script in re.findall(r"(?<![\w/])scripts/([a-z]+)", document.read_text("utf-8")):
+            for script in re.findall(r"(?<![\w/])scripts/([a-z-]+)", document.read_text("utf-8")):
                 with self.subTest(document=document.name, script=script):
                     self.assertTrue((PROJECT / "scripts" / script).exists())
 
