@@ -163,6 +163,14 @@ TEST(ComBufferPutBack, KeepsNoMoreThanTheReserveAtTheEnd) {
   EXPECT_EQ(ReadAll(buffer), Bytes(8).substr(4));
 }
 
+TEST(ComBufferPutBack, KeepsNoMoreThanWasConsumedAtTheEnd) {
+  ScriptedStream source(Bytes(2));
+  OpenBuffer buffer(source, 12);
+  EXPECT_EQ(ReadAll(buffer), Bytes(2));
+  for (int i = 1; i >= 0; --i) EXPECT_EQ(buffer.sungetc(), i);
+  EXPECT_EQ(buffer.sungetc(), kEnd);
+}
+
 TEST(ComBufferPutBack, HasNothingBeforeTheFirstCharacter) {
   ScriptedStream source(Bytes(4));
   OpenBuffer buffer(source, 12);

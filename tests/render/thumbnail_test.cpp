@@ -281,6 +281,15 @@ TEST(GreyThumbnail, IntegerAveragesTruncateTowardZero) {
   EXPECT_EQ(Grey(frame, {3, 1}).bytes, (std::vector<std::uint8_t>{255, 255, 0}));
 }
 
+TYPED_TEST(EveryScalar, DownsampleBoxOfAFrameNarrowerThanABlockDoesNothing) {
+  using T = TypeParam;
+  constexpr auto kStep = static_cast<std::int64_t>(sizeof(T));
+  StoredFrame<T> mirrored(5, 20, -kStep, 5 * kStep, 0);
+  T untouched{7};
+  DownsampleBox(mirrored.view(), 7, ImageView<T>{0, 2, &untouched, kStep, 0});
+  EXPECT_EQ(untouched, T{7});
+}
+
 TYPED_TEST(EveryScalar, DownsampleBoxWritesTheAverageOfEveryWholeBlock) {
   using T = TypeParam;
   Random random(9);
