@@ -6,8 +6,6 @@
 // independent, so several are added side by side.
 #pragma once
 
-#include <emmintrin.h>
-
 #include <algorithm>
 #include <array>
 #include <cstddef>
@@ -18,6 +16,7 @@
 #include <utility>
 #include <vector>
 
+#include "block_kernels.h"
 #include "image_view.h"
 #include "pixel.h"
 
@@ -104,11 +103,7 @@ class ExactBlockSums {
     std::size_t column = 1;
     if constexpr (sizeof(Lane) == 4) {
       // Two interleaved images are the common case.
-      for (column = 0; step == 2 && column + 4 < columns_; column += 4) {
-        const __m128 a = _mm_loadu_ps(reinterpret_cast<const float*>(sums + 2 * column));
-        const __m128 b = _mm_loadu_ps(reinterpret_cast<const float*>(sums + 2 * column + 4));
-        _mm_storeu_ps(reinterpret_cast<float*>(sums + column), _mm_shuffle_ps(a, b, _MM_SHUFFLE(2, 0, 2, 0)));
-      }
+      if (step == 2) column = DropOddColumns(sums, columns_);
     }
     for (; column < columns_; ++column) std::copy_n(sums + column * step, kSamples, sums + column * kSamples);
   }
@@ -137,29 +132,6 @@ class ExactBlockSums {
       }
       sums[i] = sum;
     }
-  }
-
-  /// Adds signed 16-bit samples, which the processor widens and adds two rows at a time. Returns how many of
-  /// the `count` columns are done.
-  template <std::size_t kRows, bool kFirst>
-  static std::size_t AddPairsOfRows(const std::array<const std::byte*, kRows>& row, std::size_t count,
-                                    Lane* sums) {
-    const __m128i ones = _mm_set1_epi16(1);
-    const auto load = [](const void* bytes) { return _mm_loadu_si128(static_cast<const __m128i*>(bytes)); };
-    std::size_t i = 0;
-    for (; i + 8 <= count; i += 8) {
-      __m128i low = kFirst ? _mm_setzero_si128() : load(sums + i);
-      __m128i high = kFirst ? _mm_setzero_si128() : load(sums + i + 4);
-      for (std::size_t r = 0; r < kRows; r += 2) {
-        const __m128i a = load(row[r] + i * sizeof(Sample));
-        const __m128i b = load(row[r + 1] + i * sizeof(Sample));
-        low = _mm_add_epi32(low, _mm_madd_epi16(_mm_unpacklo_epi16(a, b), ones));
-        high = _mm_add_epi32(high, _mm_madd_epi16(_mm_unpackhi_epi16(a, b), ones));
-      }
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(sums + i), low);
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(sums + i + 4), high);
-    }
-    return i;
   }
 
   /// Folds with the narrowest type that holds the sum of `samples` samples, which is the fastest.
@@ -198,7 +170,8 @@ class ExactBlockSums {
                          Factor factor) {
     for (std::size_t block = 0; block < blocks; ++block) {
       if constexpr (kSamples == 3 && sizeof(Sum) <= 4) {
-        FoldColours<Sum>(lanes + block * factor * kSamples, sums + block * kSamples, factor);
+        FoldColours<Sum, SamplesOf<Pixel>::kSwaps>(lanes + block * factor * kSamples, sums + block * kSamples,
+                                                   factor);
       } else {
         // No array of sums: indexing one, even with a constant, can keep GCC from folding blocks side by
         // side.
@@ -211,30 +184,6 @@ class ExactBlockSums {
         }
       }
     }
-  }
-
-  /// Folds one block of colours, its channels side by side.
-  template <class Sum, class Factor>
-  static void FoldColours(const Lane* lanes, double* sums, Factor factor) {
-    const auto load = [lanes](std::size_t i) {
-      return _mm_loadu_si128(reinterpret_cast<const __m128i*>(lanes + i * kSamples));
-    };
-    const auto widened = [](__m128i narrow) { return _mm_unpacklo_epi16(narrow, _mm_setzero_si128()); };
-    __m128i sum = _mm_setzero_si128();
-    if constexpr (sizeof(Sum) == 2) {
-      // Two columns at a time, the second in the lanes after the first.
-      for (std::size_t i = 0; i + 2 <= factor; i += 2) sum = _mm_add_epi16(sum, load(i));
-      sum = _mm_add_epi16(sum, _mm_srli_si128(sum, kSamples * sizeof(Lane)));
-      if (factor % 2 != 0) sum = _mm_add_epi16(sum, load(factor - 1));
-      sum = widened(sum);
-    } else {
-      for (std::size_t i = 0; i < factor; ++i) sum = _mm_add_epi32(sum, widened(load(i)));
-    }
-    constexpr bool kSwaps = SamplesOf<Pixel>::kSwaps;
-    const __m128i two = kSwaps ? _mm_shuffle_epi32(sum, _MM_SHUFFLE(3, 3, 1, 2)) : sum;
-    const __m128i third = kSwaps ? sum : _mm_unpackhi_epi64(sum, sum);
-    _mm_storeu_pd(sums, _mm_add_pd(_mm_loadu_pd(sums), _mm_cvtepi32_pd(two)));
-    sums[2] += _mm_cvtsd_f64(_mm_cvtepi32_pd(third));
   }
 
   /// Folds some columns of one block; returns the column after them.
@@ -266,7 +215,7 @@ class OrderedBlockSums {
   void Add(const ImageView<const Sample>& rows, std::int32_t x) {
     std::int32_t column = 0;
     if (x % factor_ != 0) column = AddPart(rows, x, 0, std::min(rows.width, factor_ - x % factor_));
-    const std::int32_t blocks = (rows.width - column) / factor_ / kSideBySide * kSideBySide;
+    const std::int32_t blocks = (rows.width - column) / factor_ / kBlocksSideBySide * kBlocksSideBySide;
     double* const sums = sums_.data() + (x + column) / factor_;
     // A factor that the compiler knows makes small blocks faster.
     switch (factor_) {
@@ -283,64 +232,13 @@ class OrderedBlockSums {
   double* sums() { return sums_.data(); }
 
  private:
-  static constexpr std::int32_t kSideBySide = 8;
-
-  // Two blocks are summed in one vector, two columns at a time: a block's two columns are loaded and widened
-  // together, then paired with the other block's.
-  static __m128d LoadTwo(const std::byte* bytes) {
-    if constexpr (std::is_same_v<Sample, double>) {
-      return _mm_loadu_pd(reinterpret_cast<const double*>(bytes));
-    } else {
-      const __m128i samples = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(bytes));
-      if constexpr (std::is_same_v<Sample, float>) return _mm_cvtps_pd(_mm_castsi128_ps(samples));
-      if constexpr (std::is_same_v<Sample, std::int32_t>) return _mm_cvtepi32_pd(samples);
-      // No instruction converts unsigned numbers: each becomes the low half of a double of 2^52 and more.
-      const __m128i raised = _mm_unpacklo_epi32(samples, _mm_set1_epi32(0x43300000));
-      return _mm_sub_pd(_mm_castsi128_pd(raised), _mm_set1_pd(4503599627370496.0));
-    }
-  }
-
-  static double LoadOne(const std::byte* bytes) {
-    Sample sample;
-    std::memcpy(&sample, bytes, sizeof sample);
-    return static_cast<double>(sample);
-  }
-
-  /// Adds all columns of neighbouring blocks from a column on, kSideBySide at a time.
+  /// Adds all columns of neighbouring blocks from a column on, kBlocksSideBySide at a time.
   template <class Factor>
   static void AddBlocks(const ImageView<const Sample>& rows, std::int32_t column, std::int32_t blocks,
                         Factor factor, double* sums) {
-    for (std::int32_t block = 0; block < blocks; block += kSideBySide, sums += kSideBySide) {
-      AddSideBySide(rows, column + block * factor, factor, sums);
+    for (std::int32_t block = 0; block < blocks; block += kBlocksSideBySide, sums += kBlocksSideBySide) {
+      AddSideBySide<Sample>(rows, column + block * factor, factor, sums);
     }
-  }
-
-  template <class Factor>
-  static void AddSideBySide(const ImageView<const Sample>& rows, std::int32_t column, Factor factor,
-                            double* sums) {
-    constexpr std::size_t kPairs = kSideBySide / 2;
-    __m128d chain[kPairs];
-    for (std::size_t pair = 0; pair < kPairs; ++pair) chain[pair] = _mm_loadu_pd(sums + 2 * pair);
-    const std::size_t blockBytes = static_cast<std::size_t>(factor) * sizeof(Sample);
-    for (std::int32_t y = 0; y < rows.height; ++y) {
-      const std::byte* bytes = rows.At(column, y);
-      std::int32_t i = 0;
-      for (; i + 2 <= factor; i += 2, bytes += 2 * sizeof(Sample)) {
-        for (std::size_t pair = 0; pair < kPairs; ++pair) {
-          const __m128d left = LoadTwo(bytes + 2 * pair * blockBytes);
-          const __m128d right = LoadTwo(bytes + (2 * pair + 1) * blockBytes);
-          chain[pair] = _mm_add_pd(chain[pair], _mm_unpacklo_pd(left, right));
-          chain[pair] = _mm_add_pd(chain[pair], _mm_unpackhi_pd(left, right));
-        }
-      }
-      if (i < factor) {
-        for (std::size_t pair = 0; pair < kPairs; ++pair) {
-          chain[pair] = _mm_add_pd(chain[pair], _mm_set_pd(LoadOne(bytes + (2 * pair + 1) * blockBytes),
-                                                           LoadOne(bytes + 2 * pair * blockBytes)));
-        }
-      }
-    }
-    for (std::size_t pair = 0; pair < kPairs; ++pair) _mm_storeu_pd(sums + 2 * pair, chain[pair]);
   }
 
   /// Adds some columns of one block; returns the column after them.
@@ -348,7 +246,7 @@ class OrderedBlockSums {
                        std::int32_t columns) {
     double& sum = sums_[static_cast<std::size_t>((x + column) / factor_)];
     for (std::int32_t y = 0; y < rows.height; ++y) {
-      for (std::int32_t i = 0; i < columns; ++i) sum += LoadOne(rows.At(column + i, y));
+      for (std::int32_t i = 0; i < columns; ++i) sum += LoadAsDouble<Sample>(rows.At(column + i, y));
     }
     return column + columns;
   }

@@ -1,16 +1,19 @@
 #include "divide.h"
 
+#include <csignal>
 #include <limits>
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Executes a division by zero, as an instruction because the compiler may assume that C++ code does not.
+/// Ends the process as a division by zero does, by an instruction where the processor has one that faults:
+/// the compiler may assume that C++ code does not divide by zero.
 [[noreturn]] void RaiseDivideFault() {
-#if !defined(__x86_64__)
-#error "The required divide fault is written for x86-64."
-#endif
+#ifdef __x86_64__
   asm volatile("xorl %%ecx, %%ecx\n\tmovl $1, %%eax\n\tcltd\n\tidivl %%ecx" : : : "eax", "ecx", "edx", "cc");
+#else
+  std::raise(SIGFPE);
+#endif
   __builtin_trap();
 }
 

@@ -1,7 +1,9 @@
 // From a reduced image of scalar values to grey levels.
 #pragma once
 
+#ifdef __SSE2__
 #include <emmintrin.h>
+#endif
 
 #include <algorithm>
 #include <array>
@@ -86,8 +88,9 @@ struct ValueRange {
 };
 
 /// Truncates each of `count` levels toward zero to 32 bits and writes the low 8 bits; 0 for NaN and for what
-/// 32 bits cannot hold, which is how the processor converts. `levels` has room for a multiple of 8.
+/// 32 bits cannot hold, which is how an x86 processor converts. `levels` has room for a multiple of 8.
 inline void Truncate(const double* levels, std::size_t count, std::uint8_t* bytes) {
+#ifdef __SSE2__
   const auto four = [levels](std::size_t i) {
     const __m128i two = _mm_cvttpd_epi32(_mm_loadu_pd(levels + i));
     const __m128i others = _mm_cvttpd_epi32(_mm_loadu_pd(levels + i + 2));
@@ -99,6 +102,12 @@ inline void Truncate(const double* levels, std::size_t count, std::uint8_t* byte
     _mm_storel_epi64(reinterpret_cast<__m128i*>(eight), _mm_packus_epi16(words, words));
     std::memcpy(bytes + i, eight, std::min<std::size_t>(count - i, 8));
   }
+#else
+  for (std::size_t i = 0; i < count; ++i) {
+    const bool fits = levels[i] > -2147483649.0 && levels[i] < 2147483648.0;
+    bytes[i] = static_cast<std::uint8_t>(fits ? static_cast<std::int32_t>(levels[i]) : 0);
+  }
+#endif
 }
 
 /// Stretches an image's own range linearly to 0..255. `values` are those of the pixels of `bits`, row by row;

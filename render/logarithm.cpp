@@ -79,6 +79,8 @@ void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* l
   Logarithms(values, count, logarithms);
 }
 
+#ifdef __x86_64__
+
 // The same body with wider vectors. Neither fuses a product and a sum, so both give the same bits.
 __attribute__((target("avx2"))) void LogarithmsToFloatAvx2(const double* values, std::size_t count,
                                                            float* logarithms) {
@@ -88,6 +90,18 @@ __attribute__((target("avx2"))) void LogarithmsToFloatAvx2(const double* values,
 bool HasAvx2() {
   return __builtin_cpu_supports("avx2") != 0;
 }
+
+#else
+
+void LogarithmsToFloatAvx2(const double* values, std::size_t count, float* logarithms) {
+  LogarithmsToFloatBaseline(values, count, logarithms);
+}
+
+bool HasAvx2() {
+  return false;
+}
+
+#endif
 
 void LogarithmsToFloat(const double* values, std::size_t count, float* logarithms) {
   static const auto best = HasAvx2() ? LogarithmsToFloatAvx2 : LogarithmsToFloatBaseline;

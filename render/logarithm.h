@@ -9,7 +9,7 @@ namespace Qel::Lumetra::ShellExt {
 /// times faster. Uses AVX2 if this processor has it.
 void LogarithmsToFloat(const double* values, std::size_t count, float* logarithms);
 
-/// Its two bodies, which tests compare: for every x86-64 processor, and for those with AVX2.
+/// Its two bodies, which tests compare: for every processor, and for those with AVX2.
 void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* logarithms);
 void LogarithmsToFloatAvx2(const double* values, std::size_t count, float* logarithms);
 
