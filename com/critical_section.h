@@ -3,6 +3,8 @@
 
 #include <windows.h>
 
+#include <synchapi.h>
+
 namespace Qel::Com {
 
 /// Meets the standard library's BasicLockable: std::lock_guard holds it.

@@ -1,5 +1,9 @@
 #include "qel_shell_ext_module.h"
 
+#include <windows.h>
+
+#include <utilapiset.h>
+
 #include <algorithm>
 #include <mutex>
 

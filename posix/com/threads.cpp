@@ -1,5 +1,6 @@
 // Critical sections, and pointers that are stored in another form than they are used in.
-#include <windows.h>
+#include <synchapi.h>
+#include <utilapiset.h>
 
 #include <cstdint>
 #include <mutex>

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <limits>
 #include <memory>
 #include <new>
 #include <vector>
@@ -27,7 +28,8 @@ BOOL DeleteDC(HDC dc) {
   return 1;
 }
 
-// Without memory for it there is no bitmap, and no exception.
+// Without memory for it, or for more bytes than the header's 32 bits can count, there is no bitmap, and no
+// exception.
 HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE, DWORD) try {
   if (bits != nullptr) *bits = nullptr;
   const BITMAPINFOHEADER& header = info->bmiHeader;
@@ -36,6 +38,7 @@ HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE,
   auto bitmap = std::make_unique<HBITMAP__>();
   const std::int64_t rows = std::abs(std::int64_t{header.biHeight});
   const std::int64_t rowBytes = (std::int64_t{header.biWidth} * header.biBitCount + 31) / 32 * 4;
+  if (rowBytes > std::numeric_limits<DWORD>::max() / rows) return nullptr;
   bitmap->bits = std::make_unique<BYTE[]>(static_cast<std::size_t>(rows * rowBytes));
   bitmap->section.dsBm = {0,
                           header.biWidth,
@@ -60,6 +63,7 @@ BOOL DeleteObject(HGDIOBJ object) {
 }
 
 int GetObjectW(HANDLE object, int size, void* data) {
+  if (object == nullptr || size < 0) return 0;
   const auto bytes = std::min(static_cast<std::size_t>(size), sizeof(DIBSECTION));
   std::memcpy(data, &static_cast<HBITMAP__*>(object)->section, bytes);
   return static_cast<int>(bytes);

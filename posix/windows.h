@@ -1,6 +1,6 @@
-// Stand-in for the platform's header where layers are built natively: only what these layers and their tests
-// use, with the platform's own names, layouts and results. Bitmaps are blocks of
-// memory, handles of files are file descriptors.
+// Stand-in for the header of Windows where there is none: what core, render and formats use of it, with the
+// names, layouts and results that it has there. Bitmaps are blocks of memory, handles of files are file
+// descriptors.
 #pragma once
 
 #include <cstdint>
@@ -67,24 +67,6 @@ constexpr DWORD FILE_ATTRIBUTE_NORMAL = 0x80;
 HANDLE CreateFileW(const wchar_t* path, DWORD access, DWORD share, void* security, DWORD creation,
                    DWORD attributes, HANDLE pattern);
 BOOL CloseHandle(HANDLE file);
-
-constexpr DWORD ERROR_NOT_ENOUGH_MEMORY = 8;
-
-struct CRITICAL_SECTION {
-  void* mutex;
-};
-
-/// Fails only without memory.
-BOOL InitializeCriticalSectionAndSpinCount(CRITICAL_SECTION* section, DWORD spinCount);
-void EnterCriticalSection(CRITICAL_SECTION* section);
-void LeaveCriticalSection(CRITICAL_SECTION* section);
-void DeleteCriticalSection(CRITICAL_SECTION* section);
-
-/// That of a critical section that could not be made, as nothing else is asked for its error.
-DWORD GetLastError();
-
-void* EncodePointer(void* pointer);
-void* DecodePointer(void* pointer);
 
 // gdi32
 struct RGBQUAD {
