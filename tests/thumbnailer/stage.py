@@ -2,15 +2,10 @@
 
 import os
 import pathlib
-import re
 import subprocess
 import tempfile
 
 SYSTEM_TYPES = pathlib.Path("/usr/share/mime/packages/freedesktop.org.xml")
-
-# The list of kinds, which is one of the sources.
-KINDS = re.findall(r'FileKind<\w+>\{L"(\w+)"',
-                   (pathlib.Path(__file__).parents[2] / "formats" / "file_kinds.h").read_text())
 
 
 def run(*command, **options):
