@@ -33,7 +33,7 @@ from test_kit import test_kit_files, with_windows_line_ends  # noqa: E402
 HERE = pathlib.Path(__file__).resolve().parent
 
 sys.path.append(str(HERE.parent / "formats"))
-from file_kinds import EXTENSIONS  # noqa: E402
+from file_kinds import EXTENSIONS, EXTENSIONS_IN_WORDS  # noqa: E402
 
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 TEXTS = ("README.txt", "NOTICES.txt")
@@ -258,6 +258,7 @@ def make_packages(build, out, epoch):
         packages_used = library_packages()
         for text in TEXTS:
             contents = (HERE / text).read_text().replace("@PACKAGES@", packages_used)
+            contents = contents.replace("@EXTENSIONS@", EXTENSIONS_IN_WORDS)
             (content / text).write_bytes(with_windows_line_ends(contents))
         make_msi(content, registry_scripts, project, epoch, packages[0])
         signing.sign(packages[0])
