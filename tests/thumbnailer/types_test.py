@@ -75,7 +75,7 @@ FOREIGN = {
     "font.ttf": FONT, "font.otf": b"OTTO" + bytes(500), "font.woff": b"wOFF" + bytes(500), "font.rec": FONT,
     "archive.zip": zipped(("a.txt", TEXT)), "archive.tar": tarred(), "archive.gz": gzip.compress(TEXT, mtime=0),
     "archive.rec": zipped(("a.txt", TEXT)), "archive.ali": gzip.compress(TEXT, mtime=0), "archive.ser": tarred(),
-    "text.ali": TEXT, "text.rec": TEXT, "text.ser": TEXT, "text.raw": TEXT, "text.txt": TEXT,
+    "text.ali": TEXT, "text.rec": TEXT, "text.ser": TEXT, "second part.rec": b"II. The second part\n" + TEXT, "text.raw": TEXT, "text.txt": TEXT,
     "photograph.raw": TIFF, "picture.raw": JPEG, "noise.raw": zlib.compress(TEXT), "zeros.raw": bytes(2000),
     "photograph.tif": TIFF, "picture.jpg": JPEG, "picture.png": PNG, "frame.fits": FITS,
     "private.asc": PRIVATE_KEY, "public.asc": PUBLIC_KEY, "private.pem": PEM_KEY, "key.rec": PUBLIC_KEY,
