@@ -42,7 +42,8 @@ class PageTest(unittest.TestCase):
                            env=environment)
         cls.page = cls.folder / "page" / "index.html"
         cls.names = sorted(path.name for path in (cls.folder / "samples").iterdir())
-        cls.files = {file["name"]: file for file in json.loads(DATA.search(cls.page.read_text("utf-8"))[0])["files"]}
+        cls.document = json.loads(DATA.search(cls.page.read_text("utf-8"))[0])
+        cls.files = {file["name"]: file for file in cls.document["files"]}
 
         cls.browser = Browser()
         cls.addClassCleanup(cls.browser.close)
@@ -77,7 +78,7 @@ class PageTest(unittest.TestCase):
             picture = own["thumbnail"]["picture"]
             thumbnail = own["thumbnail"] | {"picture": picture and f"{picture}?{i}"}
             files.append(own | {"name": f"{i:05} {own['name']}", "thumbnail": thumbnail})
-        data = json.dumps({"schema": 2, "files": files}).replace("<", "\\u003c")
+        data = json.dumps(self.document | {"files": files}).replace("<", "\\u003c")
         page = self.page.with_name("many.html")
         page.write_text(DATA.sub(lambda _: data, text, count=1), "utf-8")
         return page
