@@ -11,8 +11,7 @@ inline bool SameIgnoringCase(std::wstring_view a, std::wstring_view b) {
   const auto lower = [](wchar_t c) {
     return c >= L'A' && c <= L'Z' ? static_cast<wchar_t>(c - L'A' + L'a') : c;
   };
-  return std::equal(a.begin(), a.end(), b.begin(), b.end(),
-                    [lower](wchar_t x, wchar_t y) { return lower(x) == lower(y); });
+  return std::ranges::equal(a, b, {}, lower, lower);
 }
 
 }  // namespace Qel::Lumetra::ShellExt
