@@ -38,9 +38,10 @@ from file_kinds import EXTENSIONS, EXTENSIONS_IN_WORDS  # noqa: E402
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 TEXTS = ("README.txt", "NOTICES.txt")
 
-# What the programs are compiled with, and the libraries that NOTICES.txt names; gdtoa is in libmingwex.
+# The compiler of the programs, and a file of each library that NOTICES.txt names; gdtoa is in libmingwex.
 COMPILER = "x86_64-w64-mingw32-g++-posix"
-LIBRARIES = ("libgcc.a", "libstdc++.a", "libssp.a", "libmingw32.a", "libmingwex.a", "libwinpthread.a")
+LIBRARIES = ("libgcc.a", "libstdc++.a", "libssp.a", "libmingw32.a", "libmingwex.a", "libwinpthread.a",
+             "/usr/include/nlohmann/json.hpp")
 
 # What makes a product of Windows Installer another version of this one. Never to be changed.
 UPGRADE_CODE = uuid.UUID("{D5320353-60A9-41CE-A794-4CBF1BCBA0D4}")
