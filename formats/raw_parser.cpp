@@ -59,7 +59,7 @@ RawParser::RawParser(std::istream& stream) : FileParser(stream) {
     stream.setstate(std::ios_base::badbit);
     return;
   }
-  // The bytes from the end of the header to the end of the pixel furthest behind it. The sums are 32-bit and
+  // The bytes from the end of the header to the end of the furthest pixel after it. The sums are 32-bit and
   // wrap, which leaves pixels outside of the block: such an image cannot be read.
   const std::int64_t right = WrappingProduct(WrapToInt32(width - std::int64_t{1}), pixelStride);
   const std::int64_t down = WrappingProduct(WrapToInt32(height - std::int64_t{1}), rowStride);

@@ -1,7 +1,7 @@
 """What DllRegisterServer writes, read from the same scripts (registration/scripts), for the installer package.
 
-The language of the scripts is told in registration/registry_script.h. The scripts are the project's own and have passed its
-tests, so a text that is none is not explained here, it only fails.
+registration/registry_script.h describes the language of the scripts. Only the project's own scripts are read, and tests
+parse them, so invalid text is not explained here: it only fails.
 """
 
 import re

@@ -75,7 +75,7 @@ TEST(SkipBytes, FailsTheStreamAtItsEnd) {
 }
 
 TEST(SkipBytes, NoticesThatTheLastByteIsMissing) {
-  // A file, unlike a stream of a string, can be positioned behind its end.
+  // A file, unlike a stream of a string, can be positioned after its end.
   const std::string bytes(1000, 'x');
   for (const std::uint32_t count : {512u, 513u, 999u, 1000u, 1001u, 1002u, 5000u}) {
     Testing::MemoryBuffer buffer(bytes);

@@ -120,7 +120,7 @@ TEST_P(TruncatedFile, InMemoryIsAcceptedAsFarAsItGoes) {
   }
 }
 
-// A file can be positioned behind its end, a stream of bytes in memory cannot.
+// A file can be positioned after its end, a stream of bytes in memory cannot.
 TEST_P(TruncatedFile, OnDiskIsAcceptedAsFarAsItGoes) {
   const TempFolder folder;
   const std::filesystem::path path = folder.Write("file", GetParam().bytes);

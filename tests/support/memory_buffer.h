@@ -9,7 +9,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Every read is one read of the file: nothing is buffered. It can be positioned behind its end, as a file.
+/// Every read is one read of the file: nothing is buffered. It can be positioned after its end, as a file.
 class MemoryBuffer : public std::streambuf {
  public:
   /// What the failing read does. Reads after it work again.
