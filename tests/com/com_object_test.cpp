@@ -40,7 +40,7 @@ class Probe : public CComRoot<Threading, IPersistFile, IOleWindow> {
   Probe() : memory_(1) { ++g_alive; }
 
   HRESULT FinalConstruct() {
-    // A reference that comes and goes must not end the object before it is handed out.
+    // Taking and releasing a reference here must not destroy the object.
     this->AddRef();
     this->Release();
     return g_finalResult;
@@ -62,10 +62,10 @@ class Probe : public CComRoot<Threading, IPersistFile, IOleWindow> {
   }
 
  private:
-  std::vector<char> memory_;  // a second allocation
+  std::vector<char> memory_;  // makes the constructor allocate
 };
 
-/// The outer half of an aggregate.
+/// The outer object of an aggregate.
 class Outer final : public IUnknown {
  public:
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override {
@@ -96,7 +96,7 @@ class ComObject : public testing::Test {
 using ThreadingModels = testing::Types<SingleThreaded, FreeThreaded>;
 TYPED_TEST_SUITE(ComObject, ThreadingModels);
 
-TYPED_TEST(ComObject, TheListOfInterfacesIsTheMap) {
+TYPED_TEST(ComObject, ListsItsInterfacesInItsBases) {
   ComPtr<CComObject<Probe<TypeParam>>> object;
   ASSERT_EQ(MakeObject(object), S_OK);
 
@@ -153,7 +153,7 @@ BOOL WINAPI NoSectionAndNoReason(CRITICAL_SECTION*, DWORD) {
 }
 
 TYPED_TEST(ComObject, IsDestroyedWhenItsLockCannotBeMade) {
-  // Without threads there is no lock that could fail.
+  // An object for one thread has no lock whose creation could fail.
   const bool locks = std::is_same_v<TypeParam, FreeThreaded>;
   const ImportPatch none(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &NoSection);
   Outer outer;
@@ -167,7 +167,7 @@ TYPED_TEST(ComObject, IsDestroyedWhenItsLockCannotBeMade) {
   EXPECT_EQ(this->module_.GetLockCount(), 0);
 }
 
-TYPED_TEST(ComObject, TakesAFailureWithoutAnErrorForALock) {
+TYPED_TEST(ComObject, IgnoresAFailureOfItsLockThatSetsNoError) {
   const ImportPatch none(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount",
                          &NoSectionAndNoReason);
   ComPtr<CComObject<Probe<TypeParam>>> object;
@@ -205,7 +205,7 @@ TEST(CriticalSection, IsNotEnteredWhenItsCreationFailedWithoutAnError) {
 TYPED_TEST(ComObject, IsNotMadeWithoutMemory) {
   Outer outer;
   for (IUnknown* const aggregating : {static_cast<IUnknown*>(nullptr), static_cast<IUnknown*>(&outer)}) {
-    for (const int allocation : {0, 1}) {  // of the object, and in its constructor
+    for (const int allocation : {0, 1}) {  // the object, then the memory of its constructor
       void* answer = &answer;
       HRESULT result = S_OK;
       {
@@ -274,7 +274,7 @@ TYPED_TEST(ComObject, IsMadeByTheFactoryOfItsClass) {
   EXPECT_EQ(g_alive, 1);
 }
 
-TEST(ComPtr, ReleasesWhatItHeldBeforeItTakesAnother) {
+TEST(ComPtr, ReleasesItsObjectBeforeItTakesAnother) {
   Outer first;
   Outer second;
   ComPtr<IUnknown> pointer(&first);

@@ -33,7 +33,7 @@ TEST(LoadLittleEndian, NeedsNoAlignment) {
   EXPECT_EQ(LoadLittleEndian<std::uint64_t>(kBytes + 1), 0x8988878685848382u);
 }
 
-TEST(LoadLittleEndian, KnowsFloatsAndDoubles) {
+TEST(LoadLittleEndian, DecodesFloatsAndDoubles) {
   constexpr unsigned char kFloat[] = {0x00, 0x00, 0x20, 0xC0};
   EXPECT_EQ(LoadLittleEndian<float>(kFloat), -2.5f);
   constexpr unsigned char kDouble[] = {0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x04, 0xC0};
@@ -47,14 +47,14 @@ TEST(ReadLittleEndian, ReadsOneNumberAfterTheOther) {
   EXPECT_TRUE(stream.good());
 }
 
-TEST(ReadLittleEndian, LackOfBytesFailsTheStream) {
+TEST(ReadLittleEndian, FailsTheStreamWhenBytesAreMissing) {
   std::istringstream stream("\1\2\3");
   EXPECT_EQ(ReadLittleEndian<std::uint32_t>(stream), 0x030201u);
   EXPECT_TRUE(stream.fail());
   EXPECT_EQ(ReadLittleEndian<std::uint32_t>(stream), 0u);
 }
 
-TEST(SkipBytes, MovesOnByAnyNumberThatIsThere) {
+TEST(SkipBytes, SkipsAnyNumberOfBytesThatTheStreamHolds) {
   for (const std::uint32_t count : {0u, 1u, 511u, 512u, 513u, 99998u}) {
     std::istringstream stream('a' + std::string(count, 'x') + 'z');
     stream.get();
@@ -74,8 +74,8 @@ TEST(SkipBytes, FailsTheStreamAtItsEnd) {
   }
 }
 
-TEST(SkipBytes, NoticesThatTheLastByteIsMissing) {
-  // A file, unlike a stream of a string, can be positioned after its end.
+TEST(SkipBytes, FailsWhenTheLastByteIsMissing) {
+  // Unlike a string stream, a file can be positioned after its end.
   const std::string bytes(1000, 'x');
   for (const std::uint32_t count : {512u, 513u, 999u, 1000u, 1001u, 1002u, 5000u}) {
     Testing::MemoryBuffer buffer(bytes);

@@ -16,21 +16,21 @@ constexpr int kEnd = std::char_traits<char>::eof();
 constexpr HRESULT kReadFault = STG_E_READFAULT;
 constexpr HRESULT kAccessDenied = STG_E_ACCESSDENIED;
 
-/// `count` bytes of all values that repeat only after 251, so that no two buffers look alike.
+/// Returns `count` bytes of a pattern that repeats after 251 bytes, so that no two buffers hold the same.
 std::string Bytes(std::size_t count) {
   std::string bytes;
   for (std::size_t i = 0; i < count; ++i) bytes += static_cast<char>(i % 251);
   return bytes;
 }
 
-/// All that `buffer` brings, one character at a time.
+/// Reads `buffer` to its end, one character at a time.
 std::string ReadAll(Buffer& buffer) {
   std::string all;
   for (int c = buffer.sbumpc(); c != kEnd; c = buffer.sbumpc()) all += static_cast<char>(c);
   return all;
 }
 
-/// A buffer of `size` characters on `stream`.
+/// A buffer of `size` characters, attached to `stream`.
 struct OpenBuffer : Buffer {
   OpenBuffer(ScriptedStream& stream, std::size_t size) {
     Allocate(size);
@@ -38,20 +38,20 @@ struct OpenBuffer : Buffer {
   }
 };
 
-TEST(ComBufferReading, BringsTheBytesInOrderForEveryBufferAndPieceSize) {
+TEST(ComBufferReading, ReturnsTheBytesInOrderForEveryBufferAndPieceSize) {
   const std::string bytes = Bytes(300);
   for (const std::size_t size : {5u, 6u, 8u, 9u, 64u, 303u, 304u, 305u, 5000u}) {
     for (const ULONG piece : {1u, 2u, 3u, 7u, 299u, 1000u}) {
       ScriptedStream source(bytes);
       source.maxPerRead = piece;
       OpenBuffer buffer(source, size);
-      EXPECT_EQ(ReadAll(buffer), bytes) << size << " " << piece;
+      EXPECT_EQ(ReadAll(buffer), bytes) << "buffer of " << size << ", pieces of " << piece;
       EXPECT_EQ(source.otherCalls, 0);
     }
   }
 }
 
-TEST(ComBufferReading, AsksForTheBufferLessTheReserve) {
+TEST(ComBufferReading, RequestsTheBufferSizeLessTheReserve) {
   ScriptedStream source(Bytes(100));
   OpenBuffer buffer(source, 64);
   EXPECT_EQ(buffer.sgetc(), 0);
@@ -67,7 +67,7 @@ TEST(ComBufferReading, DoesNotReadWhileCharactersAreLeft) {
   }
 }
 
-TEST(ComBufferReading, BringsBytesAboveHalfRangeAsPositiveCharacters) {
+TEST(ComBufferReading, ReturnsBytesFrom128UpAsPositiveCharacters) {
   ScriptedStream source("\xFF\x80");
   OpenBuffer buffer(source, 16);
   EXPECT_EQ(buffer.sbumpc(), 0xFF);
@@ -75,19 +75,19 @@ TEST(ComBufferReading, BringsBytesAboveHalfRangeAsPositiveCharacters) {
   EXPECT_EQ(buffer.sbumpc(), kEnd);
 }
 
-TEST(ComBufferReading, TakesBytesThatComeWithFalse) {
+TEST(ComBufferReading, AcceptsBytesThatComeWithFalse) {
   ScriptedStream source(Bytes(10));
   source.readResult = S_FALSE;
   OpenBuffer buffer(source, 64);
   EXPECT_EQ(ReadAll(buffer), Bytes(10));
 }
 
-TEST(ComBufferReading, NeverReadsBehindTheBufferForAStreamThatClaimsMoreThanItWasAsked) {
+TEST(ComBufferReading, NeverReadsPastTheBufferWhenAStreamClaimsMoreThanItWasAskedFor) {
   const std::string bytes = Bytes(30);
   ScriptedStream source(bytes);
   source.overclaim = 1000;
   OpenBuffer buffer(source, 14);
-  // Three Reads of ten bytes; each claims more than there is room for.
+  // The buffer has room for ten bytes. Each of the three Reads claims more.
   EXPECT_EQ(ReadAll(buffer), bytes);
 }
 
@@ -110,7 +110,7 @@ TEST(ComBufferReading, IsAtItsEndWithoutABufferLargerThanTheReserve) {
   }
 }
 
-TEST(ComBufferReading, FailsAtEveryCallWithTheBytesBeforeItIntact) {
+TEST(ComBufferReading, KeepsTheBytesBeforeAReadThatFails) {
   const std::string bytes = Bytes(40);
   for (int failing = 1; failing <= 11; ++failing) {
     ScriptedStream source(bytes);
@@ -137,7 +137,7 @@ TEST(ComBufferPutBack, KeepsFourCharactersAcrossARefill) {
     ScriptedStream source(bytes);
     OpenBuffer buffer(source, 12);
     for (std::size_t i = 0; i < consumed; ++i) ASSERT_EQ(buffer.sbumpc(), bytes[i]);
-    buffer.sgetc();  // refills where a refill is due
+    buffer.sgetc();  // refills the buffer if it is empty
     const std::size_t back = std::min<std::size_t>(consumed, 4);
     for (std::size_t i = 1; i <= back; ++i) EXPECT_EQ(buffer.sungetc(), bytes[consumed - i]) << consumed;
     EXPECT_EQ(ReadAll(buffer), bytes.substr(consumed - back)) << consumed;
@@ -197,7 +197,7 @@ TEST(ComBufferPutBack, SurvivesAFailureThatSpoilsTheBuffer) {
   for (int i = 7; i >= 4; --i) EXPECT_EQ(buffer.sungetc(), i);
 }
 
-TEST(ComBufferResult, IsFalseWhereTheEndIsSaidSo) {
+TEST(ComBufferResult, IsFalseWhenTheStreamReportsItsEndSo) {
   ScriptedStream source("");
   source.endResult = S_FALSE;
   OpenBuffer buffer(source, 16);
@@ -206,7 +206,7 @@ TEST(ComBufferResult, IsFalseWhereTheEndIsSaidSo) {
   EXPECT_EQ(buffer.result(), S_FALSE);
 }
 
-TEST(ComBufferResult, IsReplacedAsLongAsItIsNoFailure) {
+TEST(ComBufferResult, IsReplacedUnlessItIsAFailure) {
   ScriptedStream source("");
   source.endResult = S_FALSE;
   OpenBuffer buffer(source, 16);
@@ -251,7 +251,7 @@ TEST(ComBufferResult, KeepsTheFirstFailure) {
   EXPECT_EQ(buffer.result(), kReadFault);
 }
 
-TEST(ComBufferResult, IsForgottenWithTheNextStreamAlsoIfItIsTheSame) {
+TEST(ComBufferResult, IsResetByEveryAttachmentEvenOfTheSameStream) {
   ScriptedStream source("");
   source.failingRead = 1;
   OpenBuffer buffer(source, 16);
@@ -261,7 +261,7 @@ TEST(ComBufferResult, IsForgottenWithTheNextStreamAlsoIfItIsTheSame) {
   EXPECT_EQ(buffer.result(), S_OK);
 }
 
-TEST(ComBufferResult, SaysNothingOfReadsThatBringBytes) {
+TEST(ComBufferResult, IgnoresReadsThatReturnBytes) {
   ScriptedStream source(Bytes(4));
   source.readResult = S_FALSE;
   OpenBuffer buffer(source, 16);
@@ -304,7 +304,7 @@ TEST(ComBufferWriting, WritesWhatIsPendingWhenItIsDestroyed) {
   EXPECT_EQ(sink.references, 1u);
 }
 
-TEST(ComBufferWriting, NeverAsksAStreamThatIsOnlyReadToWrite) {
+TEST(ComBufferWriting, NeverCallsWriteOnAStreamThatIsOnlyRead) {
   ScriptedStream source(Bytes(4));
   {
     OpenBuffer buffer(source, 8);
@@ -356,7 +356,7 @@ TEST(ComBufferWriting, FailsWithoutABuffer) {
   EXPECT_EQ(sink.writes, 0);
 }
 
-TEST(ComBufferWriting, TakesATooShortWriteForAFailure) {
+TEST(ComBufferWriting, TreatsAShortWriteAsAFailure) {
   ScriptedStream sink("");
   sink.maxPerWrite = 2;
   OpenBuffer buffer(sink, 8);
@@ -365,12 +365,12 @@ TEST(ComBufferWriting, TakesATooShortWriteForAFailure) {
   EXPECT_EQ(buffer.result(), S_OK);
 }
 
-TEST(ComBufferWriting, StaysInsideOfItsBufferWhenTheStreamKeepsFailing) {
+TEST(ComBufferWriting, StaysInsideItsBufferWhenTheStreamKeepsFailing) {
   ScriptedStream sink("");
   sink.writeResult = kAccessDenied;
   OpenBuffer buffer(sink, 8);
   const std::string bytes = Bytes(100);
-  // Seven fit, the eighth is stored and cannot be written, and no other finds room.
+  // The buffer holds seven characters. The eighth is stored too but cannot be written, and no more fit.
   EXPECT_EQ(buffer.sputn(bytes.data(), 100), 7);
   EXPECT_EQ(buffer.sputn(bytes.data(), 100), 0);
   for (int i = 0; i < 10; ++i) EXPECT_EQ(buffer.sputc('z'), kEnd);
@@ -379,7 +379,7 @@ TEST(ComBufferWriting, StaysInsideOfItsBufferWhenTheStreamKeepsFailing) {
   EXPECT_EQ(sink.written, bytes.substr(0, 8));
 }
 
-TEST(ComBufferWriting, WritesOnAsSoonAsTheStreamTakesBytesAgain) {
+TEST(ComBufferWriting, ResumesAsSoonAsTheStreamAcceptsBytesAgain) {
   ScriptedStream sink("");
   sink.writeResult = kAccessDenied;
   OpenBuffer buffer(sink, 4);
@@ -408,7 +408,7 @@ TEST(ComBufferAttaching, HoldsOneReferenceAtATime) {
   EXPECT_EQ(second.references, 1u);
 }
 
-TEST(ComBufferAttaching, DropsWhatWasReadAheadAndWhatIsPending) {
+TEST(ComBufferAttaching, DropsBytesReadAheadAndPendingBytes) {
   ScriptedStream source(Bytes(20));
   OpenBuffer buffer(source, 12);
   EXPECT_EQ(buffer.sbumpc(), 0);
@@ -423,7 +423,7 @@ TEST(ComBufferAttaching, DropsWhatWasReadAheadAndWhatIsPending) {
   EXPECT_EQ(source.writes, 0);
 }
 
-TEST(ComStream, BeginsGoodAndEmpty) {
+TEST(ComStream, IsGoodAndEmptyAtFirst) {
   Stream stream;
   EXPECT_TRUE(stream.good());
   EXPECT_EQ(stream.get(), kEnd);
@@ -447,7 +447,7 @@ TEST(ComStream, ReadsAcrossRefillsAndUngetsFour) {
   EXPECT_TRUE(stream.good());
 }
 
-TEST(ComStream, FailsToSeekAndReadsOnAfterwards) {
+TEST(ComStream, FailsToSeekAndContinuesReadingAfterwards) {
   const std::string bytes = Bytes(100);
   ScriptedStream source(bytes);
   Stream stream;

@@ -31,7 +31,7 @@ TEST(DataType, HasItsNameAndBits) {
   }
 }
 
-TEST(DataType, IsUnknownInTheGapsAndBehindThem) {
+TEST(DataType, IsUnknownInTheGapsAndAboveTheLast) {
   std::vector<std::uint32_t> values = {1000, 0x10000, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};
   for (std::uint32_t value = 0; value < 40; ++value) values.push_back(value);
   for (const std::uint32_t value : values) {

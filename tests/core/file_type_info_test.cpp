@@ -12,7 +12,7 @@ namespace {
 TEST(FileTypeInfo, IsAPureInterface) {
   EXPECT_TRUE(std::is_abstract_v<FileTypeInfo>);
   EXPECT_TRUE(std::has_virtual_destructor_v<FileTypeInfo>);
-  EXPECT_EQ(sizeof(FileTypeInfo), sizeof(void*));  // nothing but its virtual functions
+  EXPECT_EQ(sizeof(FileTypeInfo), sizeof(void*));  // only the pointer to its virtual functions
   EXPECT_FALSE(std::is_copy_constructible_v<FileTypeInfo>);
 }
 
@@ -28,7 +28,7 @@ TEST(FileTypeInfo, HasItsOperationsInOrder) {
   EXPECT_EQ(VirtualSlot(&FileTypeInfo::CreateThumbnail), 7u);
 }
 
-/// Counts how many of it are destroyed.
+/// Counts the destroyed objects of this class.
 class Destroyed final : public FileTypeInfo {
  public:
   explicit Destroyed(int& count) : count_(count) {}
@@ -50,7 +50,7 @@ class Destroyed final : public FileTypeInfo {
 TEST(FileTypeInfo, HasItsDestructorLast) {
   int count = 0;
   FileTypeInfo* const info = new Destroyed(count);
-  // Of the two forms of a destructor in the table the second one deletes the object too.
+  // An Itanium virtual table has two entries for a destructor. The second one also deletes the object.
   using Delete = void(FileTypeInfo*);
   void* const* const table = *reinterpret_cast<void***>(info);
   reinterpret_cast<Delete*>(table[9])(info);

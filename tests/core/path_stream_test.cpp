@@ -26,7 +26,7 @@ void Append(const std::filesystem::path& path, const std::string& bytes) {
 TEST(PathStream, ReadsEveryByteAsItIs) {
   std::string bytes;
   for (int i = 0; i < 3 * 256; ++i) bytes += static_cast<char>(i);
-  bytes += "\r\n\n\x1A\r";  // what a text file would change or end at
+  bytes += "\r\n\n\x1A\r";  // a stream in text mode changes these or ends at them
   const TempFolder folder;
   std::ifstream stream;
   OpenPath(stream, folder.Write("file", bytes).wstring().c_str());
@@ -34,7 +34,7 @@ TEST(PathStream, ReadsEveryByteAsItIs) {
   EXPECT_EQ(ReadAll(stream), bytes);
 }
 
-TEST(PathStream, OpensPathsOfAnyLetters) {
+TEST(PathStream, OpensPathsWithAnyCharacters) {
   const TempFolder folder;
   folder.Write(u8"\u00E5ngstr\u00F6m/\u96FB\u5B50 \u03B1 \U0001F52C.mrc", "x");
   const std::wstring name = L"/\u00E5ngstr\u00F6m/\u96FB\u5B50 \u03B1 \U0001F52C.mrc";
@@ -52,7 +52,7 @@ TEST(PathStream, ClearsTheStateOnSuccess) {
   EXPECT_TRUE(stream.good());
 }
 
-TEST(PathStream, FailsForWhatIsNoFile) {
+TEST(PathStream, FailsWhenThereIsNoFile) {
   const TempFolder folder;
   for (const std::filesystem::path& path : {folder.path() / "absent", folder.path() / "absent" / "file",
                                             folder.path(), std::filesystem::path()}) {
@@ -64,7 +64,7 @@ TEST(PathStream, FailsForWhatIsNoFile) {
   }
 }
 
-TEST(PathStream, StreamThatIsOpenCannotBeOpenedAgain) {
+TEST(PathStream, FailsForAStreamThatIsAlreadyOpen) {
   const TempFolder folder;
   const std::wstring first = folder.Write("first", "1").wstring();
   const std::wstring second = folder.Write("second", "2").wstring();
@@ -72,10 +72,10 @@ TEST(PathStream, StreamThatIsOpenCannotBeOpenedAgain) {
   OpenPath(stream, first.c_str());
   OpenPath(stream, second.c_str());
   EXPECT_TRUE(stream.fail());
-  // It is still open on the first file.
+  // The stream still reads the first file.
   stream.clear();
   EXPECT_EQ(ReadAll(stream), "1");
-  // Closed, it can be used again.
+  // Once closed, it can be opened again.
   stream.close();
   OpenPath(stream, second.c_str());
   EXPECT_TRUE(stream.good());
@@ -91,7 +91,7 @@ TEST(PathStream, OthersMayWriteWhileItIsOpen) {
   EXPECT_EQ(ReadAll(stream), "one two");
 }
 
-TEST(PathStream, OpensWhatAnotherIsWriting) {
+TEST(PathStream, OpensAFileThatAnotherIsWriting) {
   const TempFolder folder;
   const auto path = folder.path() / "file";
   std::ofstream writer(path, std::ios::binary);
@@ -111,7 +111,7 @@ TEST(PathStream, OthersMayRenameAndDeleteWhileItIsOpen) {
   EXPECT_EQ(ReadAll(stream), "text");
 }
 
-TEST(PathStream, ReadsBehind4GiB) {
+TEST(PathStream, ReadsBeyond4GiB) {
   constexpr std::int64_t kPosition = (std::int64_t{5} << 30) + 1;
   const TempFolder folder;
   const auto path = folder.Write("file", "");

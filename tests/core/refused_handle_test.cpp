@@ -1,4 +1,4 @@
-// A file handle that the C runtime does not take.
+// Opening a file whose handle the C runtime refuses.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -25,7 +25,7 @@ TEST(PathStream, ClosesAHandleThatTheRuntimeRefuses) {
   }
   EXPECT_TRUE(stream.fail());
   EXPECT_FALSE(stream.is_open());
-  // An exclusive open fails as long as any handle on the file is left.
+  // An exclusive open fails while any other handle of the file is open.
   const HANDLE file =
       CreateFileW(path.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL, nullptr);
   EXPECT_NE(file, INVALID_HANDLE_VALUE);

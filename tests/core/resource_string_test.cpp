@@ -1,4 +1,4 @@
-// Strings of the test program's own table, strings.rc. What is in the DLL's is in string_table_test.
+// Loads strings of this program's own string table, strings.rc. string_table_test tests the DLL's table.
 #include <gtest/gtest.h>
 
 #include <string>
@@ -8,14 +8,14 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// The first `length` letters of the endless alphabet.
+/// Returns the first `length` letters of the alphabet, repeated without end.
 std::wstring Letters(std::size_t length) {
   std::wstring letters;
   for (std::size_t i = 0; i < length; ++i) letters += static_cast<wchar_t>(L'a' + i % 26);
   return letters;
 }
 
-TEST(LoadResourceString, ReturnsWhatTheTableHolds) {
+TEST(LoadResourceString, ReturnsTheStringOfTheTable) {
   EXPECT_EQ(LoadResourceString(1), L"first");
   EXPECT_EQ(LoadResourceString(2), L"second");
 }

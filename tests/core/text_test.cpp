@@ -29,7 +29,7 @@ TEST(WidenComment, KeepsTheLength) {
   EXPECT_EQ(WidenComment(std::string_view("a\0b", 3)), std::wstring(L"a\0b", 3));
 }
 
-TEST(SameIgnoringCase, KnowsTheCaseOfAToZOnly) {
+TEST(SameIgnoringCase, IgnoresTheCaseOfAToZOnly) {
   EXPECT_TRUE(SameIgnoringCase(L"", L""));
   EXPECT_TRUE(SameIgnoringCase(L"AbyZ@[`{", L"aBYz@[`{"));
   EXPECT_FALSE(SameIgnoringCase(L"ab", L"abc"));
@@ -37,7 +37,7 @@ TEST(SameIgnoringCase, KnowsTheCaseOfAToZOnly) {
   EXPECT_FALSE(SameIgnoringCase(L"@", L"`"));
   EXPECT_FALSE(SameIgnoringCase(L"[", L"{"));
   EXPECT_FALSE(SameIgnoringCase(L"\u00C9", L"\u00E9"));
-  EXPECT_FALSE(SameIgnoringCase(L"\u212A", L"k"));  // the sign for kelvin
+  EXPECT_FALSE(SameIgnoringCase(L"\u212A", L"k"));  // the kelvin sign
 }
 
 }  // namespace

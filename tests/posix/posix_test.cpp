@@ -1,5 +1,5 @@
-// Where the stand-in for Windows has to refuse what Windows refuses. All else of it is tested with the layers
-// above.
+// Tests where the POSIX stand-in must fail as Windows does. The tests of the layers above cover the rest of
+// it.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -23,7 +23,7 @@ TEST(Posix, MakesNoBitmapWithoutPixels) {
   EXPECT_EQ(MakeBitmap(1, 0, 8, nullptr), nullptr);
 }
 
-TEST(Posix, MakesNoBitmapOfMoreBytesThan32BitsCanCount) {
+TEST(Posix, MakesNoBitmapWhoseSizeExceeds32Bits) {
   constexpr LONG kMax = std::numeric_limits<LONG>::max();
   constexpr LONG kMin = std::numeric_limits<LONG>::min();
   void* bytes = &bytes;
@@ -33,13 +33,13 @@ TEST(Posix, MakesNoBitmapOfMoreBytesThan32BitsCanCount) {
   EXPECT_EQ(MakeBitmap(kMax, kMin, 24, &bytes), nullptr);
 }
 
-TEST(Posix, HasNothingToSayOfNoBitmap) {
+TEST(Posix, DescribesNoBitmapForNull) {
   BITMAP bitmap{};
   EXPECT_EQ(GetObjectW(nullptr, sizeof bitmap, &bitmap), 0);
   EXPECT_TRUE(DeleteObject(nullptr));
 }
 
-TEST(Posix, OpensNoFileWhoseNameCannotBeWritten) {
+TEST(Posix, OpensNoFileWhoseNameHasNoEncoding) {
   const wchar_t name[] = {static_cast<wchar_t>(0x110000), L'\0'};
   EXPECT_EQ(CreateFileW(name, GENERIC_READ, FILE_SHARE_READ, nullptr, OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL,
                         nullptr),

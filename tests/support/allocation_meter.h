@@ -1,5 +1,6 @@
-// What a test program takes from the heap, and a heap that gives no more. A program that is linked with this
-// has its operator new and delete replaced; memory from elsewhere, such as the system's bitmaps, is not seen.
+// Measures what a test program allocates on the heap, and makes allocations fail. A program that links this
+// gets its own
+// operator new and delete. Memory from elsewhere, such as the system's bitmaps, does not count.
 #pragma once
 
 #include <cstdint>
@@ -13,36 +14,36 @@ struct HeapUse {
   friend bool operator==(const HeapUse&, const HeapUse&) = default;
 };
 
-/// What is allocated now by all threads.
+/// Returns what all threads have allocated and not freed.
 HeapUse CurrentHeapUse();
 
-/// Measures from its construction on.
+/// Measures from its construction on. One at a time: the next one resets the maxima.
 class HeapMeter {
  public:
   HeapMeter();
 
-  /// The most bytes in use at a time beyond those that were in use at the beginning.
+  /// Returns how far the bytes in use have risen at most above those in use at construction.
   std::int64_t Peak() const;
 
-  /// The largest single allocation.
+  /// Returns the bytes of the largest single allocation.
   std::int64_t Largest() const;
 
  private:
   std::int64_t before_;
 };
 
-/// As long as it lives, one allocation of this thread fails, and if asked so all after it.
+/// Makes one allocation of this thread fail while it exists, and all later ones too if `then` says so.
 class FailingHeap {
  public:
   enum class Then { kRecovers, kStaysFull };
 
-  /// `allocation` is the one that fails, counted from 0.
+  /// `allocation` is the index, from 0, of the allocation that fails.
   FailingHeap(std::int64_t allocation, Then then);
   ~FailingHeap();
   FailingHeap(const FailingHeap&) = delete;
   FailingHeap& operator=(const FailingHeap&) = delete;
 
-  /// Whether it has come to the failure.
+  /// Returns whether an allocation has failed.
   bool Failed() const;
 };
 

@@ -17,38 +17,42 @@ auto Metadata(const FileTypeInfo& reader) {
                     reader.GetBitDepth(), reader.GetDataTypeName(), reader.GetComment());
 }
 
-/// The only exceptions that may leave a constructor.
+/// Makes the reader of `extension`. Returns null after one of the only two exceptions that its constructor
+/// may throw.
 std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream, const std::wstring& extension) {
   try {
     return CreateFileTypeInfo(stream, extension);
-  } catch (const std::invalid_argument&) {  // an item outside of the object that it belongs to
+  } catch (const std::invalid_argument&) {  // an item that lies outside its object
     if (!IsEmiExtension(extension)) throw;
-  } catch (const std::length_error&) {  // a negative length of a text
+  } catch (const std::length_error&) {  // a negative string length
     if (!IsSerExtension(extension)) throw;
   }
   return nullptr;
 }
 
-/// The edge of the blocks that become one pixel. Written down once more, independently of what it checks.
+/// Returns the edge, in pixels of the frame, of the blocks that are averaged to one pixel of the thumbnail.
+/// This repeats
+/// the rule of render/reduction.cpp on purpose: the check must not share code with what it checks.
 std::int64_t Factor(Size2 frame, bool colour, const SIZE& request) {
   const std::int64_t factor =
       std::max(std::int64_t{frame.width} / request.cx, std::int64_t{frame.height} / request.cy);
   return colour ? factor : std::max<std::int64_t>(factor, 1);
 }
 
-/// Checks the shape of `bitmap`, reads all of it and deletes it.
+/// Checks the size and pixel format of `bitmap`, reads all of its bytes and deletes it.
 void Take(HBITMAP bitmap, Size2 frame, bool colour, const SIZE& request, Answers& answers) {
   DIBSECTION section{};
   if (GetObjectW(bitmap, sizeof section, &section) != static_cast<int>(sizeof section)) {
-    answers.wrong = "a thumbnail is no DIB section";
+    answers.wrong = "a thumbnail is not a DIB section";
     return;
   }
   const BITMAP& shape = section.dsBm;
   const std::int64_t factor = Factor(frame, colour, request);
   if (shape.bmWidth != frame.width / factor || shape.bmHeight != frame.height / factor) {
-    answers.wrong = "a thumbnail has another size than the frame and the request give";
+    answers.wrong = "a thumbnail does not have the size that follows from the frame and the request";
   }
-  if (shape.bmBitsPixel != (colour ? 24 : 8)) answers.wrong = "a thumbnail has another depth than its kind";
+  if (shape.bmBitsPixel != (colour ? 24 : 8))
+    answers.wrong = "a thumbnail does not have the bit depth of its kind";
   const auto* const bits = static_cast<const std::uint8_t*>(shape.bmBits);
   const std::int64_t bytes = std::int64_t{shape.bmWidthBytes} * shape.bmHeight;
   answers.bitmapSum = std::accumulate(bits, bits + bytes, answers.bitmapSum);
@@ -77,7 +81,7 @@ Answers AskEverything(std::istream& stream, const std::wstring& extension, std::
     const HBITMAP bitmap = reader->CreateThumbnail(request);
     if (bitmap != nullptr) Take(bitmap, frame, colour, request, answers);
   }
-  if (Metadata(*reader) != metadata) answers.wrong = "the metadata changed with the thumbnails";
+  if (Metadata(*reader) != metadata) answers.wrong = "the metadata changed when thumbnails were made";
   return answers;
 }
 

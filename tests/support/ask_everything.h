@@ -1,5 +1,6 @@
-// Asks a reader all that the shell ever asks of a file, in one call: what the fuzzers do with every input and
-// the reliability tests with every damaged file.
+// Asks a reader everything that the shell asks of a file. The fuzzers do so with every input, the reliability
+// tests with
+// every damaged file.
 #pragma once
 
 #include <windows.h>
@@ -15,25 +16,28 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct Answers {
-  bool constructed = false;     // false after one of the exceptions that a constructor may end with
-  bool valid = false;           // as first answered
-  int bitmaps = 0;              // of the requests, how many were answered by a bitmap
-  std::uint64_t bitmapSum = 0;  // of all their bytes
-  std::string wrong;            // what no file may bring about; empty if all is well
+  bool constructed = false;     // false if the constructor threw one of its two exceptions
+  bool valid = false;           // the first answer
+  int bitmaps = 0;              // the number of requests that returned a bitmap
+  std::uint64_t bitmapSum = 0;  // the sum of all bytes of the bitmaps
+  std::string wrong;            // what broke a rule that holds for every file; empty if nothing did
 };
 
-/// Requests of every kind: smaller and larger than a frame, of one pixel, out of proportion and negative.
+/// Requests of every kind: smaller and larger than a frame, one pixel, far from a frame's proportions, and
+/// negative.
 inline constexpr LONG kMaxRequest = std::numeric_limits<LONG>::max();
 inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
                                         {1, 256}, {-5, 40}, {-3, -2}, {kMaxRequest, kMaxRequest}};
 
-/// Makes the reader of `extension` on `stream` and asks a valid one for its metadata, for thumbnails of
-/// the sizes `requests` and for its metadata again.
+/// Makes the reader of `extension` on `stream`. If the file is valid, asks for its metadata, then for
+/// thumbnails of the
+/// sizes `requests`, then for its metadata again.
 Answers AskEverything(std::istream& stream, const std::wstring& extension,
                       std::span<const SIZE> requests = kAllRequests);
 
-/// Whether asking for a thumbnail ends the process by design: a request of 0, and a colour frame that is
-/// smaller than the request in both dimensions. Such requests are left out.
+/// Returns whether a request for a thumbnail ends the process by design: a request of 0 does, and so does one
+/// that
+/// exceeds a colour frame in both dimensions. AskEverything leaves out such requests.
 bool IsRequiredFault(Size2 frame, bool colour, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -13,7 +13,8 @@ const T* At(HMODULE module, std::size_t offset) {
   return reinterpret_cast<const T*>(reinterpret_cast<const char*>(module) + offset);
 }
 
-/// The cell of the module's import address table through which it calls the function; null if there is none.
+/// Returns the slot in the module's import address table through which it calls the function; null if there
+/// is none.
 void** FindSlot(HMODULE module, std::string_view name) {
   const auto* dos = At<IMAGE_DOS_HEADER>(module, 0);
   const auto* headers = At<IMAGE_NT_HEADERS64>(module, static_cast<std::size_t>(dos->e_lfanew));

@@ -1,5 +1,6 @@
-// Puts a function of the test in the place of one that a loaded module imports, so that a test sees how the
-// module uses Windows and can make it fail. Only that module's own calls are diverted.
+// Replaces a function that a loaded module imports by one of the test. The test sees how the module uses
+// Windows and can
+// make a call fail. Calls by other modules are not affected.
 #pragma once
 
 #include <windows.h>
@@ -8,8 +9,9 @@ namespace Qel::Lumetra::ShellExt::Testing {
 
 class ImportPatch {
  public:
-  /// `replacement` has the signature of the function `name`, which `module` imports from whatever DLL.
-  /// Throws std::runtime_error if it does not import it. The module stays loaded as long as this lives.
+  /// `replacement` has the signature of the function `name`, which `module` may import from any DLL. Throws
+  /// std::runtime_error if the module does not import it. The module must stay loaded while this object
+  /// exists.
   template <class Function>
   ImportPatch(HMODULE module, const char* name, Function* replacement)
       : ImportPatch(module, name, reinterpret_cast<void*>(replacement)) {}

@@ -1,4 +1,4 @@
-// A file in memory that counts what is read of it and fails when it is told to.
+// A file in memory that counts the reads of it and can make one fail.
 #pragma once
 
 #include <algorithm>
@@ -9,19 +9,21 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Every read is one read of the file: nothing is buffered. It can be positioned after its end, as a file.
+/// Reads without buffering: every read of the stream is one read of the file. Like a file, it can be
+/// positioned after
+/// its end.
 class MemoryBuffer : public std::streambuf {
  public:
-  /// What the failing read does. Reads after it work again.
+  /// What the failing read does. Later reads succeed again.
   enum class Failure { kBringsNothing, kBringsHalf, kThrows };
 
   /// `bytes` must outlive the buffer.
   explicit MemoryBuffer(std::string_view bytes) : bytes_(bytes) {}
 
-  std::int64_t failingRead = -1;  // counted from 0; -1 for none
+  std::int64_t failingRead = -1;  // its index, from 0; -1 for none
   Failure failure = Failure::kBringsNothing;
   bool seekable = true;
-  std::int64_t zerosBehind = 0;  // how many bytes of 0 the file has behind its own, as sparse files have
+  std::int64_t zerosBehind = 0;  // the zero bytes that follow the file's own, as in a sparse file
 
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
@@ -29,7 +31,7 @@ class MemoryBuffer : public std::streambuf {
 
  protected:
   std::streamsize xsgetn(char* target, std::streamsize count) override {
-    if (count == 0) return 0;  // is no read
+    if (count == 0) return 0;  // not a read of the file
     const auto stored = static_cast<std::streamsize>(bytes_.size());
     std::streamsize got = std::clamp<std::streamsize>(stored + zerosBehind - position_, 0, count);
     if (reads++ == failingRead) {

@@ -1,5 +1,6 @@
-// The expected picture of a frame, by the shortest way there is: the whole frame in memory as a vector of
-// values, top row first, and one loop after the other. It shares no code with what it checks.
+// Computes the expected picture of a frame in the simplest way: the whole frame is a vector of values, top
+// row first, and
+// each step is a plain loop. It shares no code with what it checks.
 #pragma once
 
 #include <array>
@@ -17,7 +18,7 @@ template <class T>
 struct NaiveFrame {
   int width = 0;
   int height = 0;
-  std::vector<T> values;  // row by row from the top
+  std::vector<T> values;  // rows from the top
 
   const T& at(int x, int y) const {
     return values[static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
@@ -25,7 +26,7 @@ struct NaiveFrame {
   }
 };
 
-/// The average of each whole f by f block, in doubles.
+/// Returns the average of each whole block of f by f pixels, summed as doubles.
 template <class T>
 NaiveFrame<T> NaiveReduce(const NaiveFrame<T>& frame, int f) {
   NaiveFrame<T> reduced{frame.width / f, frame.height / f, {}};
@@ -66,7 +67,7 @@ double NaiveDifference(T a, T b) {
   }
 }
 
-/// The grey picture of a frame of one of the eight scalar types, asked at `cx` by `cy`.
+/// Returns the grey picture of a frame of one of the eight scalar types, for a request of `cx` by `cy`.
 template <class T>
 BitmapPixels NaiveGreyThumbnail(const NaiveFrame<T>& frame, int cx, int cy) {
   int f = frame.width / cx;
@@ -97,7 +98,7 @@ BitmapPixels NaiveGreyThumbnail(const NaiveFrame<T>& frame, int cx, int cy) {
   picture.bits = 8;
   for (const T value : reduced.values) {
     const double grey = std::trunc(NaiveDifference(value, minimum) * scale);
-    // A number that 32 bits cannot hold has no low 8 bits: black.
+    // The result is the low 8 bits of a 32-bit integer. A value outside its range gives black.
     const bool fits = grey >= -2147483648.0 && grey <= 2147483647.0;
     const std::int64_t level = fits ? static_cast<std::int64_t>(grey) : 0;
     picture.bytes.push_back(static_cast<std::uint8_t>(level & 0xFF));
@@ -111,7 +112,7 @@ struct NaiveComplex {
   T im;
 };
 
-/// The grey picture of the logarithm of the squared magnitude.
+/// Returns the grey picture of ln(re² + im²).
 template <class T>
 BitmapPixels NaiveComplexThumbnail(const NaiveFrame<NaiveComplex<T>>& frame, int cx, int cy) {
   NaiveFrame<float> logarithms{frame.width, frame.height, {}};
@@ -125,7 +126,7 @@ BitmapPixels NaiveComplexThumbnail(const NaiveFrame<NaiveComplex<T>>& frame, int
 
 using NaiveColour = std::array<std::uint8_t, 3>;  // red, green, blue
 
-/// The colour picture; its bytes are blue first. The frame must not be smaller than the request.
+/// Returns the colour picture, whose bytes are blue first. The frame must not be smaller than the request.
 inline BitmapPixels NaiveColourThumbnail(const NaiveFrame<NaiveColour>& frame, int cx, int cy) {
   const int f = std::max(frame.width / cx, frame.height / cy);
   BitmapPixels picture;

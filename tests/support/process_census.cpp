@@ -22,7 +22,9 @@ void CountHeaps(ProcessCensus& census) {
   }
 }
 
-/// Handles are small multiples of 4; GetProcessHandleCount answers 0 under some versions of Wine.
+/// Counts by trying every value that a handle can have, as they are small multiples of 4.
+/// GetProcessHandleCount returns
+/// 0 under some versions of Wine.
 std::size_t CountHandles() {
   constexpr ULONG_PTR kEnd = 4 * 4096;
   std::size_t count = 0;
@@ -33,7 +35,7 @@ std::size_t CountHandles() {
   return count;
 }
 
-/// How many slots are taken, found by taking all that are free and giving them back.
+/// Returns how many slots are in use, by allocating all free ones and freeing them again.
 template <std::size_t kLimit, class Allocate, class Free>
 std::size_t CountSlots(Allocate allocate, Free free) {
   static std::array<DWORD, kLimit> taken;
@@ -48,14 +50,15 @@ std::size_t CountSlots(Allocate allocate, Free free) {
 }
 static_assert(TLS_OUT_OF_INDEXES == FLS_OUT_OF_INDEXES);  // NOLINT(misc-redundant-expression): it is not
 
-// The GDI handles as the process block refers to them, under Wine those of this process: GetGuiResources
-// answers 0 under some versions of it.
+// An entry of the table of GDI handles that the process block points to. Under Wine the table lists the
+// handles of this
+// process only. Needed because GetGuiResources returns 0 under some versions of Wine.
 struct GdiHandleEntry {
   void* object;
-  WORD owner;  // process id; 0 for the system, or where that is not kept
+  WORD owner;  // process id; 0 for the system, or if Wine does not record it
   WORD count;
   WORD generation;
-  WORD type;  // 0: not in use
+  WORD type;  // 0 if unused
   void* userData;
 };
 static_assert(sizeof(GdiHandleEntry) == 24);
@@ -66,7 +69,7 @@ std::size_t CountGdiObjects() {
     return GetGuiResources(GetCurrentProcess(), GR_GDIOBJECTS);
   }
   constexpr std::size_t kHandleTable = 0xF8;  // offset in the process block
-  constexpr std::size_t kEntries = 0x4000;    // as many as the smallest table of any system has
+  constexpr std::size_t kEntries = 0x4000;    // the size of the smallest table of any system
   using GetProcessBlock = const std::byte*();
   const auto getProcessBlock =
       reinterpret_cast<GetProcessBlock*>(reinterpret_cast<void*>(GetProcAddress(system, "RtlGetCurrentPeb")));
@@ -85,7 +88,7 @@ ProcessCensus ProcessCensus::Take() {
   ProcessCensus census;
   census.handles = CountHandles();
   census.gdiObjects = CountGdiObjects();
-  // 64 slots and 1,024 more is what a process has; fiber-local ones are no more than 4,096 anywhere.
+  // A process has 64 + 1,024 thread-local slots. No system has more than 4,096 fiber-local ones.
   census.threadSlots = CountSlots<1088>(&TlsAlloc, &TlsFree);
   census.fiberSlots = CountSlots<4096>([] { return FlsAlloc(nullptr); }, &FlsFree);
   CountHeaps(census);

@@ -1,4 +1,4 @@
-// What a process holds of the things that a DLL may forget to give back.
+// Counts the resources of a process that a DLL may fail to release.
 #pragma once
 
 #include <cstddef>
@@ -6,14 +6,14 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct ProcessCensus {
-  std::size_t heapBlocks = 0;  // of all heaps
+  std::size_t heapBlocks = 0;  // in all heaps
   std::size_t heapBytes = 0;
-  std::size_t threadSlots = 0;  // thread-local
-  std::size_t fiberSlots = 0;   // fiber-local
-  std::size_t handles = 0;      // of the kernel
+  std::size_t threadSlots = 0;  // thread-local storage
+  std::size_t fiberSlots = 0;   // fiber-local storage
+  std::size_t handles = 0;      // of kernel objects
   std::size_t gdiObjects = 0;
 
-  /// Counts while no other thread runs.
+  /// Counts what the process holds now. No other thread may run meanwhile.
   static ProcessCensus Take();
 };
 

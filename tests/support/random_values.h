@@ -1,4 +1,4 @@
-// Random frames for comparisons with the naive pictures: seeded, and the same on every platform.
+// Random frames for comparisons with the naive pictures. They are seeded, and the same on every platform.
 #pragma once
 
 #include <bit>
@@ -11,7 +11,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// The kinds of value distributions that have found faults in such code.
+/// Distributions of values. Each has found faults in code like the renderer's.
 enum class Values { kSmall, kWholeRange, kMinimum, kMaximum, kSparse, kNotFinite, kNaNFirst, kCount };
 
 class Random {
@@ -20,7 +20,7 @@ class Random {
 
   std::uint64_t Bits() { return (std::uint64_t{engine_()} << 32) | engine_(); }
 
-  /// A number from `first` to `last`, both included.
+  /// Returns a number from `first` to `last`, both included.
   int Between(int first, int last) {
     return first + static_cast<int>(Bits() % static_cast<std::uint64_t>(last - first + 1));
   }

@@ -24,7 +24,7 @@ bool IsToFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
   return true;
 }
 
-/// Calls the function itself, or answers `kFailure` without it.
+/// Calls the function, or returns `kFailure` instead.
 template <auto kFunction, auto kFailure, ScarceSystem::Lack kLack, class Result, class... Arguments>
 Result Scarce(Arguments... arguments) {
   return IsToFail(kLack) ? static_cast<Result>(kFailure) : kFunction(arguments...);
@@ -36,7 +36,7 @@ ImportPatch Patch(HMODULE module, const char* name, Result (*)(Arguments...)) {
   return {module, name, &Scarce<kFunction, kFailure, kLack, Result, Arguments...>};
 }
 
-/// The task allocator, which may have no more.
+/// A task allocator whose allocations can fail.
 class ScarceAllocator final : public IMalloc {
  public:
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void**) override { return E_NOINTERFACE; }

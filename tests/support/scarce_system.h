@@ -1,5 +1,6 @@
-// A system that runs out of things at a chosen moment, for one loaded module: memory, above all, but also the
-// texts, locks and bitmaps that it takes from Windows.
+// Makes calls of one loaded module fail at a chosen moment: its allocations, and the strings, locks and
+// bitmaps that it
+// requests from Windows.
 #pragma once
 
 #include <windows.h>
@@ -11,25 +12,26 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Diverts the module's imports as long as it lives. One at a time; the module is used by one thread at a
-/// time.
+/// Replaces the module's imports while it exists. Only one may exist at a time, and only one thread may use
+/// the module.
 class ScarceSystem {
  public:
   enum class Then { kRecovers, kStaysEmpty };
 
-  /// What the system lacks.
+  /// What failed first: an allocation of the C runtime, or another request.
   enum class Lack { kNothing, kMemory, kOther };
 
-  /// Nothing fails yet.
+  /// Replaces the imports. Nothing fails before FailAt.
   explicit ScarceSystem(HMODULE module);
   ~ScarceSystem();
   ScarceSystem(const ScarceSystem&) = delete;
   ScarceSystem& operator=(const ScarceSystem&) = delete;
 
-  /// Lets fail what the module asks for, counted from 0 from now on, and if so chosen all after it.
+  /// Makes the request with the index `request` fail, counted from 0 from now on, and all later ones too if
+  /// `then` says so.
   static void FailAt(std::int64_t request, Then then);
 
-  /// Lets nothing fail. Returns what has failed first: the C runtime's memory or anything else.
+  /// Makes all requests succeed again. Returns what failed first since FailAt.
   static Lack Recover();
 
  private:

@@ -1,5 +1,4 @@
-// A COM stream that lives in a test: it serves the bytes that it is given in pieces of any size, fails when
-// it is told to, and counts what is asked of it.
+// A COM stream of a test: it returns its bytes in pieces of any size, fails on demand and counts the calls.
 #pragma once
 
 #include <objidl.h>
@@ -13,19 +12,19 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Lives as long as the test, whatever its reference count, which the test reads.
+/// The test owns it. The reference count does not control its lifetime; the test checks it.
 class ScriptedStream final : public IStream {
  public:
   explicit ScriptedStream(std::string bytes) : content(std::move(bytes)) {}
 
   ULONG maxPerRead = std::numeric_limits<ULONG>::max();
   ULONG maxPerWrite = std::numeric_limits<ULONG>::max();
-  HRESULT readResult = S_OK;  // of a Read that brings bytes
-  HRESULT endResult = S_OK;   // of a Read at the end
-  int failingRead = 0;        // which Read fails, counted from 1; 0 for none
+  HRESULT readResult = S_OK;  // of a Read that returns bytes
+  HRESULT endResult = S_OK;   // of a Read at the end of the bytes
+  int failingRead = 0;        // the Read that fails, counted from 1; 0 for none
   HRESULT readFailure = STG_E_READFAULT;
-  HRESULT writeResult = S_OK;  // a failure writes nothing
-  ULONG overclaim = 0;         // how many bytes more than it brings a Read says it brought
+  HRESULT writeResult = S_OK;  // a Write that fails writes nothing
+  ULONG overclaim = 0;         // by how many bytes a Read overstates what it returned
 
   std::string content;
   std::size_t position = 0;
@@ -34,8 +33,8 @@ class ScriptedStream final : public IStream {
   ULONG references = 1;
   int reads = 0;
   int writes = 0;
-  int otherCalls = 0;         // whatever is neither counting references nor reading nor writing
-  std::vector<ULONG> wanted;  // bytes that each Read asked for
+  int otherCalls = 0;         // all except AddRef, Release, Read and Write
+  std::vector<ULONG> wanted;  // the bytes that each Read requested
 
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void** object) override {
     ++otherCalls;
@@ -48,7 +47,7 @@ class ScriptedStream final : public IStream {
   HRESULT STDMETHODCALLTYPE Read(void* bytes, ULONG count, ULONG* read) override {
     wanted.push_back(count);
     if (++reads == failingRead) {
-      // A failing stream may have written to its buffer all the same.
+      // A failing stream may still have written to the buffer.
       std::memset(bytes, '!', count);
       *read = 0;
       return readFailure;

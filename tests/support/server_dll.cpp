@@ -28,7 +28,7 @@ ServerDll::~ServerDll() {
 }
 
 std::filesystem::path ServerDll::Path() {
-  // Tests lie in a folder next to the DLL.
+  // The tests are in a folder next to the DLL.
   std::array<wchar_t, 1024> program{};
   GetModuleFileNameW(nullptr, program.data(), static_cast<DWORD>(program.size()));
   return std::filesystem::path(program.data()).parent_path().parent_path() / L"QelShellExt.dll";
@@ -44,7 +44,7 @@ LONG ServerDll::LockCount() const {
   constexpr LONG kLimit = 1000;
   LONG count = 0;
   {
-    // While this reference is held it may count itself, as nobody else may hold the factory.
+    // This reference may count as a lock by itself: it does if nobody else holds the factory.
     const ComPtr<IClassFactory> factory = Factory(kRawHandlerClass);
     const bool countsItself = References(factory) == 1;
     while (CanUnloadNow() != S_OK && count <= kLimit) {

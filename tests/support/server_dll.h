@@ -1,4 +1,4 @@
-// The built DLL as a test sees it: loaded from the build folder, spoken to through its exports only.
+// The built DLL as tests use it: loaded from the build folder and called through its exports only.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -14,7 +14,7 @@ namespace Qel::Lumetra::ShellExt::Testing {
 
 using Com::ComPtr;
 
-// The classes that clients know, by identifiers that must never change.
+// The classes that clients create. These identifiers must never change.
 inline constexpr CLSID kShellExtClass = {
     0x79E696A1, 0x2FA5, 0x4B3E, {0x96, 0x10, 0xD5, 0xF7, 0x60, 0x41, 0x7E, 0x62}};
 inline constexpr CLSID kEbnHandlerClass = {
@@ -24,7 +24,7 @@ inline constexpr CLSID kRawHandlerClass = {
 inline constexpr CLSID kMrcHandlerClass = {
     0xADF28042, 0x3A9F, 0x4409, {0x9C, 0x62, 0x44, 0x4B, 0x01, 0x8A, 0x78, 0x10}};
 
-/// QelShellExt.dll, loaded as long as this lives.
+/// Keeps QelShellExt.dll loaded while it exists.
 class ServerDll {
  public:
   /// Throws std::runtime_error if the DLL does not load.
@@ -43,10 +43,10 @@ class ServerDll {
   }
   HRESULT CanUnloadNow() const { return canUnloadNow_(); }
 
-  /// The class factory of `clsid`; a test failure and null when there is none.
+  /// Returns the class factory of `clsid`. Without one it fails the test and returns null.
   ComPtr<IClassFactory> Factory(REFCLSID clsid) const;
 
-  /// A new object of the class; a test failure and null when there is none.
+  /// Returns a new object of the class. If there is none, it fails the test and returns null.
   template <class Interface>
   ComPtr<Interface> CreateInstance(REFCLSID clsid, REFIID iid, IUnknown* outer = nullptr) const {
     ComPtr<Interface> object;
@@ -56,9 +56,9 @@ class ServerDll {
     return object;
   }
 
-  /// The module's lock count. It is found by unlocking the server until it may be unloaded, and locking it
-  /// as often again, so no other thread may use the server meanwhile. A test failure and -1 when the count is
-  /// negative or above 1,000.
+  /// Returns the module's lock count. It unlocks the server until it may be unloaded, then locks it as often
+  /// again, so no other thread may use the server meanwhile. If the count is negative or above 1,000, it
+  /// fails the test and returns -1.
   LONG LockCount() const;
 
  private:
@@ -67,7 +67,7 @@ class ServerDll {
   LPFNCANUNLOADNOW canUnloadNow_;
 };
 
-/// The object's `Interface`; a test failure and null when it has none.
+/// Returns the object's `Interface`. Without one it fails the test and returns null.
 template <class Interface, class Object>
 ComPtr<Interface> As(const ComPtr<Object>& object, REFIID iid) {
   ComPtr<Interface> answer;
@@ -75,14 +75,14 @@ ComPtr<Interface> As(const ComPtr<Object>& object, REFIID iid) {
   return answer;
 }
 
-/// How many references others hold on `object`.
+/// Returns how many references exist on `object` besides this one.
 template <class Object>
 ULONG References(const ComPtr<Object>& object) {
   object->AddRef();
   return object->Release() - 1;
 }
 
-/// A test of the DLL, which must leave nothing behind: no lock, and so a DLL that unloads.
+/// A test of the DLL. Afterwards the DLL must have no lock, so that it can be unloaded.
 class ServerTest : public testing::Test {
  protected:
   ~ServerTest() override { EXPECT_EQ(dll_.CanUnloadNow(), S_OK); }
@@ -90,7 +90,7 @@ class ServerTest : public testing::Test {
   ServerDll dll_;
 };
 
-/// The outer half of an aggregate, on the caller's stack. The inner half is released when this goes.
+/// The outer object of an aggregate, on the caller's stack. Its destructor releases the inner object.
 class OuterObject final : public IUnknown {
  public:
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override;

@@ -1,5 +1,4 @@
-// The properties by which the shell asks, and the values that it gets, in a form that tests compare and
-// print.
+// The properties that the shell requests, and their values in a form that tests can compare and print.
 #pragma once
 
 #include <windows.h>
@@ -19,7 +18,7 @@ inline constexpr FMTID kSummary{0xF29F85E0, 0x4FF9, 0x1068, {0xAB, 0x91, 0x08, 0
 inline constexpr FMTID kImageSummary{
     0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x03}};
 
-/// A set that no image file has.
+/// A property set that no image file has.
 inline constexpr FMTID kOtherSet{
     0x6444048F, 0x4C8B, 0x11D1, {0x8B, 0x70, 0x08, 0x00, 0x36, 0xB1, 0x1A, 0x04}};
 
@@ -32,7 +31,7 @@ inline constexpr PROPERTYKEY kCommentsKey{kSummary, 6};
 inline constexpr PROPERTYKEY kAllKeys[] = {kWidthKey,      kHeightKey,     kBitDepthKey,
                                            kFrameCountKey, kDimensionsKey, kCommentsKey};
 
-/// The type of a value, and its number or text.
+/// The type of a value, and its number or string.
 struct Value {
   VARTYPE type = VT_EMPTY;
   std::int64_t number = 0;
@@ -48,8 +47,9 @@ inline Value Text(VARTYPE type, std::wstring text) {
   return {type, 0, std::move(text)};
 }
 
-/// Reads a VARIANT or PROPVARIANT. A text without memory behind it, and a type that is not the shell's
-/// business here, give an unlikely text.
+/// Reads a VARIANT or PROPVARIANT. Returns the string "<unexpected>" for a null string, and for a type that
+/// the extension
+/// does not use.
 template <class Variant>
 Value ReadValue(const Variant& variant) {
   switch (variant.vt) {
@@ -80,7 +80,7 @@ inline Value TakeValue(VARIANT& variant) {
   return value;
 }
 
-/// For the messages of failed tests.
+/// Prints a value in the message of a failed test.
 inline void PrintTo(const Value& value, std::ostream* stream) {
   *stream << "type " << value.type << ", " << value.number << ", \"";
   for (const wchar_t c : value.text) *stream << (c < 0x80 ? static_cast<char>(c) : '?');

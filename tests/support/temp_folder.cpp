@@ -38,7 +38,7 @@ std::filesystem::path TempFolder::Write(const std::filesystem::path& name, std::
 
 void Lengthen(const std::filesystem::path& file, std::uintmax_t size) {
 #ifdef _WIN32
-  // Else Windows writes the zeros.
+  // Without this, Windows writes the zeros to the disk.
   const HANDLE handle = CreateFileW(file.c_str(), GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, nullptr,
                                     OPEN_EXISTING, 0, nullptr);
   DWORD returned = 0;

@@ -1,4 +1,4 @@
-// A folder of a test's own for the files that it writes.
+// A temporary folder for the files that a test writes.
 #pragma once
 
 #include <cstdint>
@@ -7,7 +7,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Makes an empty folder, and deletes it with all it holds when it goes.
+/// Makes an empty folder. The destructor deletes it and everything in it.
 class TempFolder {
  public:
   TempFolder();
@@ -17,14 +17,14 @@ class TempFolder {
 
   const std::filesystem::path& path() const { return path_; }
 
-  /// Writes the file `name`, with the folders on the way to it; returns its full path.
+  /// Writes the file `name`, making its folders first. Returns its full path.
   std::filesystem::path Write(const std::filesystem::path& name, std::string_view bytes) const;
 
  private:
   std::filesystem::path path_;
 };
 
-/// Makes a file larger. What is new holds zeros and takes no space on the disk.
+/// Extends a file to `size` bytes. The added bytes are zeros and take no space on the disk.
 void Lengthen(const std::filesystem::path& file, std::uintmax_t size);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

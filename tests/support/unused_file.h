@@ -1,4 +1,4 @@
-// Whether an object has let go of its file.
+// Tells whether an object has closed its file.
 #pragma once
 
 #include <windows.h>
@@ -7,7 +7,8 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Whether nobody has the file open. A scanner of the system, which may have it for a moment, is waited for.
+/// Returns whether nobody has the file open. It retries for a while, as a virus scanner may hold the file
+/// briefly.
 inline bool IsUnused(const std::filesystem::path& file) {
   for (int i = 0; i < 100; ++i) {
     const HANDLE handle = CreateFileW(file.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
