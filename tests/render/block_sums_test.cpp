@@ -1,4 +1,4 @@
-// Sums at the limits of the lanes and folds, where a type one size too narrow would overflow.
+// Sums at the limits of the lanes and folds. A type one size too narrow would overflow here.
 #include "block_sums.h"
 
 #include <gtest/gtest.h>
@@ -12,12 +12,12 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// The sum of a block of equal samples.
+/// Returns the sum of a block of `factor` by `factor` samples that are all `value`.
 template <class T>
 std::int64_t SumOfSquare(std::int32_t factor, T value) {
   const std::vector<T> row(static_cast<std::size_t>(factor), value);
   ExactBlockSums<T> sums(1, factor);
-  sums.Add({factor, factor, row.data(), sizeof(T), 0}, 0);  // every row is the same one
+  sums.Add({factor, factor, row.data(), sizeof(T), 0}, 0);  // the row stride is 0: all rows are the same
   return static_cast<std::int64_t>(sums.sums()[0]);
 }
 
@@ -28,7 +28,7 @@ TYPED_TEST_SUITE(ExactBlockSumsOf, ExactSamples);
 
 TYPED_TEST(ExactBlockSumsOf, ExtremeValuesDoNotOverflowAtAnyFactor) {
   using Limits = std::numeric_limits<TypeParam>;
-  // 181 squared is the last count of 16-bit samples that is folded in 32 bits. 8-bit lanes hold 255 rows.
+  // 181 squared is the largest number of 16-bit samples that is summed in 32 bits. 8-bit lanes hold 255 rows.
   for (const std::int32_t factor : {2, 8, 15, 16, 181, 182, 200, 255, 256, 257, 258, 259, 300, 600}) {
     for (const TypeParam value : {Limits::min(), Limits::max()}) {
       EXPECT_EQ(SumOfSquare(factor, value), std::int64_t{factor} * factor * value) << factor;
@@ -38,7 +38,7 @@ TYPED_TEST(ExactBlockSumsOf, ExtremeValuesDoNotOverflowAtAnyFactor) {
 
 TYPED_TEST(ExactBlockSumsOf, ExtremeValuesDoNotOverflowInBlocksOfManyRows) {
   using Limits = std::numeric_limits<TypeParam>;
-  // Only some columns of a block of 40,000 by 40,000 pixels, whose rows are all the same.
+  // Sums a few columns of a block of 40,000 by 40,000 pixels, whose rows are all the same.
   constexpr std::int32_t kFactor = 40000;
   for (const TypeParam value : {Limits::min(), Limits::max()}) {
     std::array<TypeParam, 9> row;

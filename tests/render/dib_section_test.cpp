@@ -9,7 +9,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-TEST(DibSection, GreyBitsHaveOneByteAPixel) {
+TEST(DibSection, GreyBitsHaveOneBytePerPixel) {
   DibSection section;
   section.CreateGrey(5, 3);
   EXPECT_EQ(section.Bits().width, 5);
@@ -58,7 +58,7 @@ TEST(DibSection, HeaderIsTopDown) {
   EXPECT_EQ(colour.biClrUsed, 0u);
 }
 
-TEST(DibSection, ColourBitsHaveThreeBytesAPixel) {
+TEST(DibSection, ColourBitsHaveThreeBytesPerPixel) {
   DibSection section;
   section.CreateColour(3, 2);
   EXPECT_EQ(section.Bits().pixelStride, 3);
@@ -82,7 +82,7 @@ TEST(DibSection, ANewBitmapReplacesTheOld) {
   EXPECT_EQ(Testing::TakeBitmap(section.Release()).bits, 24);
 }
 
-TEST(DibSection, ASizeThatIsNoBitmapGivesNull) {
+TEST(DibSection, InvalidSizeGivesNull) {
   DibSection section;
   section.CreateGrey(0, 0);
   EXPECT_EQ(section.Bits().data, nullptr);

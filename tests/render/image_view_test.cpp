@@ -25,7 +25,7 @@ TEST(ImageView, HasItsFieldsInOrder) {
 
 TEST(ImageView, FindsPixelsByTheirStrides) {
   const std::uint16_t pixels[] = {0, 1, 2, 3, 4, 5};
-  // Three columns by two rows, bottom-up and mirrored.
+  // Three columns and two rows, bottom-up and mirrored.
   const ImageView<const std::uint16_t> view{3, 2, pixels + 5, -2, -6};
   EXPECT_EQ(view.Load(0, 0), 5);
   EXPECT_EQ(view.Load(2, 0), 3);

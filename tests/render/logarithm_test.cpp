@@ -16,7 +16,7 @@ namespace {
 using Testing::Random;
 using Body = void (*)(const double*, std::size_t, float*);
 
-/// Compares bits, so that a zero's sign and a NaN count.
+/// Compares bits, so that the sign of a zero and a NaN count.
 void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
   std::vector<float> logarithms(values.size());
   body(values.data(), values.size(), logarithms.data());
@@ -34,7 +34,7 @@ void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
 class EveryBody : public testing::TestWithParam<Body> {
  protected:
   void SetUp() override {
-    // A processor without the instructions never gets to this body.
+    // A processor without AVX2 never runs this body.
     if (GetParam() == LogarithmsToFloatAvx2 && !HasAvx2()) bodies_ = {};
   }
 

@@ -1,4 +1,4 @@
-// The divisions by zero that are meant to end the process, each in a child process of its own.
+// Divisions by zero that end the process by design. Each is tested in a child process.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -10,12 +10,12 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Sanitizers report the signal themselves; the child process must end as any other would.
+/// Restores the default action. A sanitizer would handle the signal, but the child process must end by it.
 void LeaveFaultsToTheSystem() {
   std::signal(SIGFPE, SIG_DFL);
 }
 
-/// Whether a process ended by an integer division by zero.
+/// Returns whether a process was ended by an integer division by zero.
 bool EndedByDivideFault(int status) {
 #ifdef _WIN32
   return static_cast<DWORD>(status) == EXCEPTION_INT_DIVIDE_BY_ZERO;

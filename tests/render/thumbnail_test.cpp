@@ -1,4 +1,5 @@
-// Whole pictures against the naive reference, and the rules that a picture follows.
+// Compares whole pictures with the naive reference, and tests the rules for the size and the values of a
+// picture.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -24,7 +25,7 @@ using Testing::Random;
 using Testing::TakeBitmap;
 using Testing::Values;
 
-/// A frame's pixels in memory, laid out as a view says: with any strides, on any alignment.
+/// A frame's pixels in memory, with any strides and alignment.
 template <class Pixel>
 class StoredFrame {
  public:
@@ -76,7 +77,7 @@ NaiveFrame<T> Constant(int width, int height, T value) {
   return {width, height, std::vector<T>(static_cast<std::size_t>(width * height), value)};
 }
 
-/// Strides of a random layout: packed, padded, interleaved, bottom-up, mirrored.
+/// Returns a random pixel stride and row stride: packed, padded, interleaved, bottom-up or mirrored.
 template <class Pixel>
 std::pair<std::int64_t, std::int64_t> RandomStrides(Random& random, int width) {
   std::int64_t pixel = sizeof(Pixel);
@@ -110,7 +111,7 @@ TYPED_TEST(EveryScalar, EqualsTheNaivePictureOverRandomShapes) {
                  [](const T& value) { return value; });
     ASSERT_EQ(TakeBitmap(RenderGreyThumbnail<T>(stored.view(), {cx, cy})),
               Testing::NaiveGreyThumbnail(frame, cx, cy))
-        << width << " x " << height << " asked at " << cx << " x " << cy << ", values "
+        << width << " x " << height << " requested as " << cx << " x " << cy << ", values "
         << static_cast<int>(values) << ", strides " << pixelStride << " and " << rowStride;
   }
 }
@@ -125,7 +126,7 @@ TYPED_TEST(EveryScalar, EqualsTheNaivePictureOfWideFrames) {
     const auto values = static_cast<Values>(random.Between(0, static_cast<int>(Values::kCount) - 1));
     const auto frame = random.Frame<T>(width, height, values);
     ASSERT_EQ(Grey(frame, {cx, height}), Testing::NaiveGreyThumbnail(frame, cx, height))
-        << width << " x " << height << " asked at " << cx << ", values " << static_cast<int>(values);
+        << width << " x " << height << " requested as " << cx << ", values " << static_cast<int>(values);
   }
 }
 
@@ -152,14 +153,14 @@ TYPED_TEST(EveryScalar, StretchesItsOwnRange) {
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 127, 255}));
 }
 
-TYPED_TEST(EveryScalar, MaximumIs254WhereTheProductFallsShort) {
+TYPED_TEST(EveryScalar, MaximumIs254WhenTheProductIsBelow255) {
   using T = TypeParam;
   // 255.0 / 100 is a little less than 2.55.
   const NaiveFrame<T> frame{2, 1, {T{10}, T{110}}};
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 254}));
 }
 
-TYPED_TEST(EveryScalar, RangeIsThatOfTheReducedImage) {
+TYPED_TEST(EveryScalar, StretchesTheRangeOfTheReducedImage) {
   using T = TypeParam;
   // The hot pixel of 100 is averaged with three zeros to 25; the other block is 76.
   const NaiveFrame<T> frame{4, 2, {T{100}, T{0}, T{76}, T{76}, T{0}, T{0}, T{76}, T{76}}};
@@ -182,7 +183,7 @@ TEST(GreyThumbnail, HasPaddedRowsAndAGreyRamp) {
   }
 }
 
-TEST(GreyThumbnail, DropsWhatIsLeftOverAtTheRightAndTheBottom) {
+TEST(GreyThumbnail, DropsPartialBlocksAtTheRightAndTheBottom) {
   Random random(5);
   auto frame = random.Frame<std::uint16_t>(1000, 602, Values::kSmall);
   const auto before = Grey(frame, {256, 256});
@@ -204,7 +205,7 @@ TEST(GreyThumbnail, CanBeNearlyTwiceTheRequest) {
 }
 
 TEST(GreyThumbnail, FrameThatReducesToNothingHasNoBitmap) {
-  // 5000 by 1 asked at 256 by 256 is reduced by 19, which leaves no row.
+  // A request of 256 by 256 reduces 5000 by 1 pixels by 19, which leaves no row.
   EXPECT_EQ(
       RenderGreyThumbnail<std::uint8_t>(StorePacked(Constant<std::uint8_t>(5000, 1, 5)).view(), {256, 256}),
       nullptr);
@@ -216,13 +217,13 @@ TEST(GreyThumbnail, FrameWithoutPixelsHasNoBitmap) {
             nullptr);
 }
 
-TEST(GreyThumbnail, NegativeRequestInOneDirectionIsIgnored) {
+TEST(GreyThumbnail, IgnoresANegativeRequestInOneDirection) {
   Random random(8);
   const auto frame = random.Frame<std::uint8_t>(40, 40, Values::kWholeRange);
   EXPECT_EQ(Grey(frame, {-5, 10}), Testing::NaiveGreyThumbnail(frame, 10, 10));
 }
 
-TEST(GreyThumbnail, NegativeRequestInBothDirectionsKeepsTheSize) {
+TEST(GreyThumbnail, KeepsTheSizeForARequestNegativeInBothDirections) {
   Random random(8);
   const auto frame = random.Frame<std::uint8_t>(40, 30, Values::kWholeRange);
   for (const SIZE& request : {SIZE{-5, -5}, SIZE{-1, -1}, SIZE{-100, -2}}) {
@@ -230,8 +231,8 @@ TEST(GreyThumbnail, NegativeRequestInBothDirectionsKeepsTheSize) {
   }
 }
 
-TEST(GreyThumbnail, ReducedImageOfMorePixelsThan32BitsCountHasNoMemory) {
-  constexpr std::int32_t kEdge = 46341;  // the smallest whose square does not fit
+TEST(GreyThumbnail, ReducedImageOfMorePixelsThan32BitsFailsToAllocate) {
+  constexpr std::int32_t kEdge = 46341;  // the smallest edge whose square exceeds 31 bits
   const auto make = [] {
     MakeFrameRenderer(std::type_identity<std::uint8_t>(), {kEdge, kEdge}, {kEdge, kEdge});
   };
@@ -244,7 +245,7 @@ TEST(GreyThumbnail, FirstValueNaNIsBlack) {
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 0, 0, 0}));
 }
 
-TEST(GreyThumbnail, NaNElsewhereIsZeroAndLeavesTheRangeAlone) {
+TEST(GreyThumbnail, NaNElsewhereIsBlackAndDoesNotChangeTheRange) {
   constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
   const NaiveFrame<double> frame{4, 1, {1.0, kNaN, 3.0, 2.0}};
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 0, 255, 127}));
@@ -257,8 +258,9 @@ TEST(GreyThumbnail, InfinityMakesTheRestBlack) {
 }
 
 TEST(GreyThumbnail, FloatDifferencesAreFormedInSinglePrecision) {
-  // The range is 255 and the middle difference 100, both only after they are rounded to float. In double
-  // precision they would be 255.000007 and 99.999999, and the middle level 99.
+  // Rounded to float, the range is 255 and the difference of the middle value is 100. In double precision
+  // they would be
+  // 255.000007 and 99.999999, and the middle level would be 99.
   const NaiveFrame<float> frame{3, 1, {-0.000007f, std::nextafter(100.0f, 0.0f), 255.0f}};
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 100, 255}));
 }
@@ -276,7 +278,7 @@ TEST(GreyThumbnail, UnsignedDifferencesAreExact) {
 }
 
 TEST(GreyThumbnail, IntegerAveragesTruncateTowardZero) {
-  // -3 / 4 and 3 / 4 both become 0, -8 / 4 stays -2.
+  // -3 / 4 and 3 / 4 both become 0; -8 / 4 is exactly -2.
   const NaiveFrame<std::int8_t> frame{6, 2, {0, 0, 0, 0, -2, -2, 0, -3, 0, 3, -2, -2}};
   EXPECT_EQ(Grey(frame, {3, 1}).bytes, (std::vector<std::uint8_t>{255, 255, 0}));
 }
@@ -327,7 +329,7 @@ TYPED_TEST(EveryComplex, EqualsTheNaivePictureOverRandomShapes) {
         [](const NaiveComplex<T>& value) { return ComplexPixel<T>{value.re, value.im}; });
     ASSERT_EQ(TakeBitmap(RenderComplexThumbnail<T>(stored.view(), {cx, cy})),
               Testing::NaiveComplexThumbnail(frame, cx, cy))
-        << width << " x " << height << " asked at " << cx << " x " << cy;
+        << width << " x " << height << " requested as " << cx << " x " << cy;
   }
 }
 
@@ -343,7 +345,7 @@ TYPED_TEST(EveryComplex, ZeroSampleMakesThePictureBlack) {
 }
 
 TEST(ComplexThumbnail, ShowsTheLogarithm) {
-  // Magnitudes 1, 10 and 100 are evenly spaced.
+  // Magnitudes of 1, 10 and 100 give evenly spaced levels.
   StoredFrame<ComplexPixel<float>> stored(3, 1, 8, 24, 0);
   stored.Set(0, 0, {1, 0});
   stored.Set(1, 0, {0, 10});
@@ -378,7 +380,7 @@ void CompareColoursWithTheNaivePicture() {
   for (int round = 0; round < 300; ++round) {
     const int width = random.Between(1, 180);
     const int height = random.Between(1, 180);
-    // At least one dimension is not below the request, or the factor is 0.
+    // The frame must not be smaller than the request in both dimensions: the factor would be 0.
     const int cx = random.Between(1, width);
     const int cy = random.Between(1, 200);
     const auto values = static_cast<Values>(random.Between(0, static_cast<int>(Values::kCount) - 1));
@@ -396,7 +398,7 @@ void CompareColoursWithTheNaivePicture() {
     });
     ASSERT_EQ(TakeBitmap(RenderColourThumbnail<kOrder>(stored.view(), {cx, cy})),
               Testing::NaiveColourThumbnail(frame, cx, cy))
-        << width << " x " << height << " asked at " << cx << " x " << cy;
+        << width << " x " << height << " requested as " << cx << " x " << cy;
   }
 }
 

@@ -1,5 +1,6 @@
-// The DLL's own functions of POSIX threads, under other names (tests/CMakeLists.txt), as this program has a
-// library of them.
+// The DLL's own functions of POSIX threads. They have other names here (tests/CMakeLists.txt), because this
+// program links
+// a library with the same names.
 #include <gtest/gtest.h>
 #include <pthread.h>
 #include <windows.h>
@@ -28,14 +29,15 @@ void RunSlowly() {
   WaitForSingleObject(g_mayEnd, INFINITE);
 }
 
-/// Says that a thread is about to wait. It has the lock until it sleeps, so nobody can wake it too early.
+/// Signals that a thread is about to wait. The thread holds the lock until it sleeps, so no wake-up can be
+/// missed.
 BOOL WINAPI SayAndSleep(PCONDITION_VARIABLE condition, PSRWLOCK lock, DWORD milliseconds, ULONG flags) {
   SetEvent(g_mayEnd);
   return g_sleep(condition, lock, milliseconds, flags);
 }
 
 TEST(RuntimeThreads, OnceWakesTheThreadsThatWaitForItsEnd) {
-  g_sleep = &SleepConditionVariableSRW;  // read before it is replaced
+  g_sleep = &SleepConditionVariableSRW;  // the original: the next line replaces the import
   const ImportPatch sleep(GetModuleHandleW(nullptr), "SleepConditionVariableSRW", &SayAndSleep);
   g_started = CreateEventW(nullptr, TRUE, FALSE, nullptr);
   g_mayEnd = CreateEventW(nullptr, TRUE, FALSE, nullptr);

@@ -1,4 +1,4 @@
-// This program's own stack is guarded as the DLL's is.
+// This program's stack is guarded in the same way as the DLL's.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -10,13 +10,13 @@ extern "C" std::uintptr_t __stack_chk_guard;
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-TEST(StackGuard, IsANumberThatEndsTexts) {
+TEST(StackGuard, BeginsWithAByteThatEndsStrings) {
   EXPECT_NE(__stack_chk_guard >> 8, 0u);
   EXPECT_EQ(__stack_chk_guard & 0xFF, 0u);
-  EXPECT_NE(__stack_chk_guard, 0xBB40E64EDA205900);  // what it is until the program starts
+  EXPECT_NE(__stack_chk_guard, 0xBB40E64EDA205900);  // its value before it is initialized
 }
 
-/// Writes `count` bytes into eight.
+/// Writes `count` bytes into an array of eight.
 [[gnu::noinline]] void Overrun(std::size_t count) {
   volatile char bytes[8] = {};
   volatile char* const begin = bytes;

@@ -16,7 +16,7 @@ namespace {
 
 struct CreatableClass {
   CLSID clsid;
-  IID otherInterface;  // one that the class has besides IUnknown
+  IID otherInterface;  // another interface of the class besides IUnknown
 };
 
 const CreatableClass kClasses[] = {
@@ -28,7 +28,7 @@ const CreatableClass kClasses[] = {
 
 using ClassObjects = ServerTest;
 
-TEST_F(ClassObjects, RequireAPlaceForTheAnswer) {
+TEST_F(ClassObjects, RequireAnOutputPointer) {
   EXPECT_EQ(dll_.GetClassObject(kShellExtClass, IID_IClassFactory, nullptr), E_POINTER);
 }
 
@@ -73,7 +73,7 @@ TEST_F(ClassObjects, AreKeptButDoNotKeepTheServerLoaded) {
     {
       const ComPtr<IClassFactory> factory = dll_.Factory(creatable.clsid);
       first = factory.Get();
-      EXPECT_EQ(References(factory), 1u);  // the module's
+      EXPECT_EQ(References(factory), 1u);  // held by the module
       EXPECT_EQ(dll_.CanUnloadNow(), S_FALSE);
     }
     EXPECT_EQ(dll_.CanUnloadNow(), S_OK);
@@ -124,7 +124,7 @@ TEST_F(ClassObjects, MakeObjectsThatKeepTheServerLoaded) {
   }
 }
 
-TEST_F(ClassObjects, MakeNothingWithoutAPlaceForIt) {
+TEST_F(ClassObjects, MakeNothingWithoutAnOutputPointer) {
   OuterObject outer;
   for (const CreatableClass& creatable : kClasses) {
     const ComPtr<IClassFactory> factory = dll_.Factory(creatable.clsid);
@@ -166,7 +166,8 @@ TEST_F(ClassObjects, AggregatedObjectsBelongToTheirOuterObject) {
     EXPECT_EQ(dll_.LockCount(), 1);
     EXPECT_EQ(outer.references(), 1u);
     {
-      // The inner object's own IUnknown counts the inner object, every other interface the outer one.
+      // The inner object's IUnknown counts references on the inner object, its other interfaces on the outer
+      // one.
       const auto same = As<IUnknown>(outer.inner, IID_IUnknown);
       EXPECT_EQ(same.Get(), outer.inner.Get());
       EXPECT_EQ(References(outer.inner), 1u);
@@ -204,7 +205,7 @@ TEST_F(ClassObjects, MakeObjectsInManyThreads) {
   EXPECT_EQ(dll_.LockCount(), 0);
 }
 
-TEST(ClassObjectsOfAFreshServer, AreOneForAllThreadsThatAskAtOnce) {
+TEST(ClassObjectsOfAFreshServer, AreTheSameForAllThreadsThatAskAtOnce) {
   constexpr std::size_t kThreads = 16;
   for (int round = 0; round < 5; ++round) {
     for (const CreatableClass& creatable : kClasses) {

@@ -1,5 +1,6 @@
-// What the DLL does when the system tells it that it is loaded, that a thread comes or goes, and that it is
-// unloaded: next to nothing, as the system holds the lock of its loader meanwhile.
+// What the DLL calls when the system loads and unloads it, and when a thread starts or ends. It must be next
+// to nothing,
+// because the system holds the loader lock meanwhile.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -14,9 +15,11 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// What the C++ runtime asks for when it starts and ends: memory, and from the environment how much of it;
-/// its own locks, the classification of all characters, the streams of the console, a slot for exceptions,
-/// and a random number for the protection of the stack.
+/// What the C++ runtime calls when it starts and ends: memory, and the environment variable that sets its
+/// pool of
+/// memory; its own locks, the character classification, the console streams, a slot for exceptions, and a
+/// random
+/// number for the stack guard.
 const std::set<std::string> kRuntime = {
     "AcquireSRWLockExclusive",
     "GetCurrentProcessId",
@@ -44,7 +47,7 @@ const std::set<std::string> kRuntime = {
 
 using Calls = std::map<std::string, int>;
 
-/// Without those of the runtime.
+/// Returns the calls of the DLL without those of the C++ runtime.
 Calls OwnCalls(UnstartedModule& module) {
   Calls calls = module.TakeCalls();
   std::erase_if(calls, [](const auto& call) { return kRuntime.contains(call.first); });
@@ -57,7 +60,7 @@ class EntryPoint : public testing::Test {
 };
 
 TEST_F(EntryPoint, MakesTwoLocksAndNothingElse) {
-  EXPECT_EQ(OwnCalls(module_), Calls());  // not started yet
+  EXPECT_EQ(OwnCalls(module_), Calls());  // the DLL has not started yet
   EXPECT_TRUE(module_.Notify(DLL_PROCESS_ATTACH));
   EXPECT_EQ(OwnCalls(module_), (Calls{{"InitializeCriticalSectionAndSpinCount", 2}}));
   EXPECT_TRUE(module_.Notify(DLL_PROCESS_DETACH));
@@ -73,7 +76,7 @@ TEST_F(EntryPoint, DoesNothingForThreads) {
   EXPECT_TRUE(module_.Notify(DLL_PROCESS_DETACH));
 }
 
-/// Which lock cannot be made, counted from 0, and the error that is given for it.
+/// The index, from 0, of the lock whose creation fails, and the error that the failure sets.
 int g_failingSection = 0;
 DWORD g_sectionError = ERROR_SUCCESS;
 
@@ -92,7 +95,7 @@ TEST_F(EntryPoint, RefusesToBeLoadedWithoutItsLocks) {
   }
 }
 
-TEST_F(EntryPoint, TakesAFailureWithoutAnErrorForALock) {
+TEST_F(EntryPoint, IgnoresAFailureOfALockThatSetsNoError) {
   const ImportPatch patch(module_.module(), "InitializeCriticalSectionAndSpinCount", &MakeSection);
   g_sectionError = ERROR_SUCCESS;
   for (const int section : {0, 1}) {

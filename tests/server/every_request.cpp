@@ -15,7 +15,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// As many of anything as the server could possibly enumerate.
+/// More than any enumerator of the server lists.
 constexpr DWORD kMany = 8;
 
 void AskForThumbnail(IExtractImage& image) {
@@ -64,7 +64,7 @@ void AskForColumns(IColumnProvider& columns, const std::filesystem::path& path) 
   }
 }
 
-/// Uses an enumerator up, as well as a copy of it, and returns what it lists.
+/// Reads an enumerator and a copy of it to the end. Returns what the enumerator lists.
 template <class Stat, class Enumerator>
 std::vector<Stat> List(Enumerator& enumerator) {
   ComPtr<Enumerator> copy;

@@ -1,4 +1,4 @@
-// Everything that a shell can ask the server for one file, with the answers taken and given back.
+// Sends the server every request that a shell can make for one file, and frees the answers.
 #pragma once
 
 #include <filesystem>
@@ -7,9 +7,11 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Sends every request of every class for the file at `path`, except those that end the process: `path` must
-/// not be a colour frame smaller than 8 by 8 pixels. What the answers say is for other tests. An exception
-/// that a request lets out is caught; returns how many there were.
+/// Sends every request to every class for the file at `path`, except those that end the process: `path` must
+/// not be a
+/// colour frame smaller than 8 by 8 pixels. Other tests check the answers. Returns the number of exceptions
+/// that left a
+/// request; they are caught.
 int MakeEveryRequest(const ServerDll& dll, const std::filesystem::path& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,5 +1,6 @@
-// The release DLL as a guest in a process that is not its own: what it asks of the process, and what it
-// leaves behind.
+// The release DLL as a guest in another program's process: what it requests of the process, and that it
+// releases all of
+// it.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -43,8 +44,8 @@ TEST(ReleaseDll, ImportsFromTheSystemsOwnModulesOnly) {
   }
 }
 
-TEST(ReleaseDll, AsksForNothingThatOutlivesItInTheProcess) {
-  // Not a thread, not a handler of the process's faults, and not a thread-local or fiber-local slot.
+TEST(ReleaseDll, ImportsNothingThatCouldOutliveIt) {
+  // No threads, no handlers of the process's exceptions, and no thread-local or fiber-local slots.
   for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
     for (const char* const function :
          {"createthread", "_beginthreadex", "addvectoredexceptionhandler", "setunhandledexceptionfilter",
@@ -61,7 +62,7 @@ TEST(ReleaseDll, IsHardened) {
   EXPECT_FALSE(module.fileCharacteristics & IMAGE_FILE_RELOCS_STRIPPED);
   EXPECT_TRUE(module.dllCharacteristics & IMAGE_DLLCHARACTERISTICS_DYNAMIC_BASE);
   EXPECT_TRUE(module.dllCharacteristics & IMAGE_DLLCHARACTERISTICS_NX_COMPAT);
-  EXPECT_TRUE(module.dllCharacteristics & 0x20);  // high-entropy addresses
+  EXPECT_TRUE(module.dllCharacteristics & 0x20);  // HIGH_ENTROPY_VA
   EXPECT_FALSE(module.sections.empty());
   for (const auto& section : module.sections) {
     EXPECT_FALSE((section.characteristics & IMAGE_SCN_MEM_WRITE) != 0 &&
@@ -70,12 +71,12 @@ TEST(ReleaseDll, IsHardened) {
   }
 }
 
-TEST(ReleaseDll, IsProtectedAgainstOverrunsOfTheStack) {
+TEST(ReleaseDll, IsProtectedAgainstStackOverruns) {
   const std::string code = PortableExecutable::Read(ServerDll::Path()).code;
-  // How a function ends the process that finds its stack overrun: mov ecx, 2; int 29h.
+  // The code that ends the process when a function finds its stack overrun: mov ecx, 2; int 29h.
   const std::size_t end = code.find("\xB9\x02\0\0\0\xCD\x29"s);
   ASSERT_NE(end, std::string::npos);
-  // Every function that is protected calls it.
+  // Every protected function calls it.
   int calls = 0;
   for (std::size_t i = code.find('\xE8'); i != std::string::npos && i + 5 <= code.size();
        i = code.find('\xE8', i + 1)) {
@@ -86,7 +87,7 @@ TEST(ReleaseDll, IsProtectedAgainstOverrunsOfTheStack) {
   EXPECT_GT(calls, 50);
 }
 
-/// A text of the version resource.
+/// Returns a string of the version resource.
 std::wstring VersionText(const std::vector<char>& resource, const std::wstring& name) {
   void* text = nullptr;
   UINT length = 0;
@@ -94,7 +95,7 @@ std::wstring VersionText(const std::vector<char>& resource, const std::wstring& 
   return text == nullptr ? L"" : static_cast<const wchar_t*>(text);
 }
 
-TEST(ReleaseDll, TellsItsProductDescriptionAndVersion) {
+TEST(ReleaseDll, HasItsProductDescriptionAndVersionInItsResource) {
   const std::wstring path = ServerDll::Path().wstring();
   std::vector<char> resource(GetFileVersionInfoSizeW(path.c_str(), nullptr));
   ASSERT_TRUE(GetFileVersionInfoW(path.c_str(), 0, static_cast<DWORD>(resource.size()), resource.data()));
@@ -117,11 +118,11 @@ TEST(ReleaseDll, TellsItsProductDescriptionAndVersion) {
   EXPECT_EQ(fixed.dwProductVersionLS, fixed.dwFileVersionLS);
 }
 
-TEST(ReleaseDll, CarriesNoTimeOfItsBuild) {
+TEST(ReleaseDll, HasNoBuildTime) {
   EXPECT_EQ(PortableExecutable::Read(ServerDll::Path()).timeStamp, 0u);
 }
 
-/// Sound and damaged files of every kind.
+/// Writes intact and damaged files of every kind. Returns their paths.
 std::vector<std::filesystem::path> WriteFiles(const TempFolder& folder) {
   std::vector<std::filesystem::path> files;
   const auto write = [&](const char* name, const std::string& bytes) {
@@ -174,7 +175,8 @@ std::vector<std::filesystem::path> WriteFiles(const TempFolder& folder) {
 
 class Unloading : public testing::Test {
  protected:
-  // What the DLL uses stays loaded, as it is in a process with a shell, so that only the DLL comes and goes.
+  // Keeps the modules that the DLL imports loaded, as they are in a shell, so that only the DLL is loaded and
+  // unloaded.
   Unloading() {
     for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
       system_.push_back(LoadLibraryA(name.c_str()));
@@ -187,7 +189,7 @@ class Unloading : public testing::Test {
     for (const HMODULE module : system_) FreeLibrary(module);
   }
 
-  /// Loads the DLL, sends it every request for `file`, and unloads it.
+  /// Loads the DLL, sends it every request for `file`, and unloads it. Returns the number of exceptions.
   int Cycle(const std::filesystem::path& file) {
     const ServerDll dll;
     const int exceptions = MakeEveryRequest(dll, file);
@@ -199,7 +201,7 @@ class Unloading : public testing::Test {
   std::vector<HMODULE> system_;
 };
 
-/// Whether there is no more of anything than before.
+/// Returns success if no count has grown.
 AssertionResult NothingIsLeft(const ProcessCensus& before, const ProcessCensus& after) {
   const auto grown = [](std::size_t from, std::size_t to) { return to > from ? to - from : 0; };
   const std::size_t blocks = grown(before.heapBlocks, after.heapBlocks);
@@ -216,7 +218,7 @@ AssertionResult NothingIsLeft(const ProcessCensus& before, const ProcessCensus& 
                                      << handles << " handles and " << gdiObjects << " GDI objects are left";
 }
 
-TEST(ProcessCensus, SeesWhatIsTaken) {
+TEST(ProcessCensus, CountsEveryResource) {
   const auto before = ProcessCensus::Take();
   const auto unchanged = ProcessCensus::Take();
   EXPECT_EQ(unchanged.heapBlocks, before.heapBlocks);
@@ -241,10 +243,13 @@ TEST(ProcessCensus, SeesWhatIsTaken) {
   EXPECT_GT(after.gdiObjects, before.gdiObjects);
 }
 
-/// Runs batches of cycles, each over all files `times` times, until one of them leaves nothing. The system's
-/// heap grows for a while, and this program's own thread library makes an event for good for each of its
-/// locks that two threads happen to want at once: some batches show that, but all of them show what the DLL
-/// leaves.
+/// Runs up to eight batches of cycles until one of them leaves nothing. Each batch runs the cycle over all
+/// files, `times`
+/// times. Some batches leave something that is not the DLL's: the system's heap grows for a while, and this
+/// program's own
+/// thread library makes a permanent event for each of its locks that two threads happen to request at once.
+/// What the DLL
+/// leaves appears in every batch.
 template <class Cycle>
 AssertionResult EndsUpLeavingNothing(const std::vector<std::filesystem::path>& files, int times,
                                      const Cycle& cycle) {
@@ -265,7 +270,8 @@ TEST_F(Unloading, LeavesNothingAfterManyCycles) {
   for (const auto& file : files) exceptions += Cycle(file);
   EXPECT_GT(exceptions, 0);  // thrown by the DLL, caught here
 
-  // Heaps that keep small blocks in groups show a group of them as one. Wine's have up to 31 in a group.
+  // Some heaps keep small blocks in groups and show a group as one block. Wine has up to 31 blocks in a
+  // group.
   constexpr int kTimes = 40;
   EXPECT_TRUE(EndsUpLeavingNothing(files, kTimes, [this](const auto& file) { Cycle(file); }));
 }
@@ -274,7 +280,7 @@ TEST_F(Unloading, LeavesNothingInOtherThreads) {
   const TempFolder folder;
   const auto files = WriteFiles(folder);
 
-  // One thread lives on when the DLL is unloaded, one has ended before.
+  // One thread outlives the DLL, the other ends before it is unloaded.
   const HANDLE go = CreateEventW(nullptr, FALSE, FALSE, nullptr);
   const HANDLE done = CreateEventW(nullptr, FALSE, FALSE, nullptr);
   const ServerDll* dll = nullptr;

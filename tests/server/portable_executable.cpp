@@ -12,7 +12,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// A module's bytes as they lie in its file, addressed as they will lie in memory.
+/// The bytes of a module's file, addressed by their offset in memory once the module is loaded.
 class Image {
  public:
   explicit Image(const std::filesystem::path& path) {

@@ -1,4 +1,4 @@
-// What a module's file says about itself: the tables of the Portable Executable format that a test looks at.
+// Reads those tables of a module's file that the tests check, in the Portable Executable format.
 #pragma once
 
 #include <cstdint>
@@ -22,11 +22,11 @@ struct PortableExecutable {
   std::uint32_t timeStamp = 0;
   std::vector<Section> sections;
   std::string code;                                      // the bytes of the section .text
-  std::string exportedName;                              // of the module
-  std::vector<std::string> exports;                      // in their order
+  std::string exportedName;                              // the name of the module in its export table
+  std::vector<std::string> exports;                      // in the order of the table
   std::map<std::string, std::set<std::string>> imports;  // functions by module, names in lower case
 
-  /// Reads a 64-bit module. Throws std::exception for a file that is none.
+  /// Reads a 64-bit module. Throws std::exception for any other file.
   static PortableExecutable Read(const std::filesystem::path& path);
 };
 

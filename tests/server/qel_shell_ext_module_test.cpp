@@ -14,7 +14,7 @@ namespace {
 
 constexpr CLSID kClass = {0x12345678, 0x1234, 0x1234, {1, 2, 3, 4, 5, 6, 7, 8}};
 
-/// Answers IUnknown, and IClassFactory with success but without an object.
+/// Has IUnknown. For IClassFactory it returns success without an object.
 class FaultyFactory final : public IUnknown {
  public:
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override {
@@ -49,7 +49,7 @@ class Module : public testing::Test {
     g_makerResult = S_OK;
   }
 
-  /// What the module answers for the class object of `kClass`.
+  /// Returns the module's result for the class object of `kClass`.
   static HRESULT GetClassObject(CQelShellExtModule& module, REFIID iid = IID_IUnknown) {
     void* answer = &answer;
     const HRESULT result = module.GetClassObject(kClass, iid, &answer);
@@ -75,7 +75,7 @@ TEST_F(Module, ListsItsClassesInTheOrderOfTheirRegistration) {
 }
 
 TEST_F(Module, HasItsVirtualFunctionsInOrder) {
-  // The destructor takes two.
+  // The destructor occupies slots 0 and 1.
   EXPECT_EQ(VirtualSlot(&CQelShellExtModule::Lock), 2u);
   EXPECT_EQ(VirtualSlot(&CQelShellExtModule::Unlock), 3u);
   EXPECT_EQ(VirtualSlot(&CQelShellExtModule::GetLockCount), 4u);
@@ -83,7 +83,7 @@ TEST_F(Module, HasItsVirtualFunctionsInOrder) {
   EXPECT_EQ(VirtualSlot(&CQelShellExtModule::AddCommonRGSReplacements), 6u);
 }
 
-TEST_F(Module, MakesPropertyStoresThatBuildTheirReaderByTheFunctionAfterInitialize) {
+TEST_F(Module, MakesPropertyStoresWithCreateFileInfoAfterInitialize) {
   EXPECT_EQ(VirtualSlot(&CShellExtVista::Initialize), 3u);
   EXPECT_EQ(VirtualSlot(&CShellExtVista::CreateFileInfo), 4u);
 }
@@ -113,7 +113,7 @@ TEST_F(Module, KeepsTheClassObjectEncodedUntilItGoes) {
   EXPECT_EQ(g_factory.references, 1u);
 }
 
-TEST_F(Module, ReturnsTheFailureOfTheMakerAndAsksItAgain) {
+TEST_F(Module, ReturnsTheMakersFailureAndCallsItAgain) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
   CQelShellExtModule module(map);
   g_makerResult = E_OUTOFMEMORY;
@@ -124,7 +124,7 @@ TEST_F(Module, ReturnsTheFailureOfTheMakerAndAsksItAgain) {
   EXPECT_EQ(g_makerCalls, 2);
 }
 
-TEST_F(Module, TakesSuccessWithoutAnObjectForAClassThatIsNotAvailable) {
+TEST_F(Module, TreatsSuccessWithoutAnObjectAsAnUnavailableClass) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeNoFactory}}};
   CQelShellExtModule module(map);
   EXPECT_EQ(GetClassObject(module), CLASS_E_CLASSNOTAVAILABLE);
@@ -134,7 +134,7 @@ TEST_F(Module, TakesSuccessWithoutAnObjectForAClassThatIsNotAvailable) {
   EXPECT_EQ(GetClassObject(faulty, IID_IClassFactory), CLASS_E_CLASSNOTAVAILABLE);
 }
 
-/// Which critical section cannot be made, counted from 0, and the error that is given for it.
+/// The index, from 0, of the critical section whose creation fails, and the error that the failure sets.
 int g_failingSection = 0;
 DWORD g_sectionError = ERROR_SUCCESS;
 
@@ -147,7 +147,7 @@ BOOL WINAPI MakeSection(CRITICAL_SECTION* section, DWORD) {
   return TRUE;
 }
 
-TEST_F(Module, IsNotToBeLoadedWithoutItsLocks) {
+TEST_F(Module, RefusesToBeLoadedWithoutItsLocks) {
   const ImportPatch patch(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &MakeSection);
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
   g_sectionError = ERROR_NOT_ENOUGH_MEMORY;
@@ -155,13 +155,13 @@ TEST_F(Module, IsNotToBeLoadedWithoutItsLocks) {
     g_failingSection = 0;
     CQelShellExtModule module(map);
     EXPECT_TRUE(module.initFailed());
-    EXPECT_EQ(GetClassObject(module), E_UNEXPECTED);  // its classes have no lock
+    EXPECT_EQ(GetClassObject(module), E_UNEXPECTED);  // the lock of the class objects is missing
   }
   {
     g_failingSection = 1;
     CQelShellExtModule module(map);
     EXPECT_TRUE(module.initFailed());
-    EXPECT_EQ(GetClassObject(module), S_OK);  // its classes have one
+    EXPECT_EQ(GetClassObject(module), S_OK);  // the lock of the class objects exists
   }
   {
     g_failingSection = 2;
@@ -170,7 +170,7 @@ TEST_F(Module, IsNotToBeLoadedWithoutItsLocks) {
   }
 }
 
-TEST_F(Module, TakesAFailureWithoutAnErrorForALock) {
+TEST_F(Module, IgnoresAFailureOfALockThatSetsNoError) {
   const ImportPatch patch(GetModuleHandleW(nullptr), "InitializeCriticalSectionAndSpinCount", &MakeSection);
   g_sectionError = ERROR_SUCCESS;
   for (const int section : {0, 1}) {
@@ -191,7 +191,7 @@ TEST_F(Module, CountsItsLocks) {
   EXPECT_EQ(module.Unlock(), 0);
 }
 
-TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
+TEST_F(Module, ReturnsTheInterfaceTableOfTheProcess) {
   CQelShellExtModule module({});
   EXPECT_EQ(module.GetGITPtr(nullptr), E_POINTER);
 
@@ -211,7 +211,7 @@ TEST_F(Module, HandsOutTheProcesssInterfaceTable) {
   CoUninitialize();
 }
 
-/// An interface table that counts the references on it.
+/// An interface table that counts its references.
 class FakeTable final : public IUnknown {
  public:
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void**) override { return E_NOINTERFACE; }
@@ -241,13 +241,13 @@ TEST_F(Module, AddsAReferenceToTheInterfaceTableForEveryCaller) {
       IGlobalInterfaceTable* table = nullptr;
       EXPECT_EQ(module.GetGITPtr(&table), S_OK);
       EXPECT_EQ(static_cast<void*>(table), &g_table);
-      EXPECT_EQ(g_table.references, 1 + callers);  // the module has one
+      EXPECT_EQ(g_table.references, 1 + callers);  // the module holds one
     }
   }
   EXPECT_EQ(g_table.references, 2u);
 }
 
-TEST_F(Module, TellsTheRegistryScriptsItsAppId) {
+TEST_F(Module, GivesTheRegistryScriptsItsAppId) {
   const CQelShellExtModule module({});
   std::vector<Replacement> replacements;
   EXPECT_EQ(module.AddCommonRGSReplacements(replacements), S_OK);

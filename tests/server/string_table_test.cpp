@@ -24,7 +24,7 @@ class StringTable : public ::testing::Test {
   }
 
   ServerDll dll_;
-  std::vector<wchar_t*> blocks_;  // resources of 16 strings each; block N holds the ids from 16 (N - 1)
+  std::vector<wchar_t*> blocks_;  // resources of 16 strings each; block N begins with id 16 (N - 1)
 };
 
 TEST_F(StringTable, HoldsTheseStringsAndNoOther) {

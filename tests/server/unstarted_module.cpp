@@ -19,7 +19,7 @@ const IMAGE_NT_HEADERS64& Headers(HMODULE module) {
   return *At<IMAGE_NT_HEADERS64>(module, static_cast<std::size_t>(At<IMAGE_DOS_HEADER>(module, 0)->e_lfanew));
 }
 
-/// Variables are imported too, and are no code to be called.
+/// Returns whether an import is code. Variables are imported too, and must not be replaced by code.
 bool IsFunction(const void* address) {
   MEMORY_BASIC_INFORMATION memory{};
   VirtualQuery(address, &memory, sizeof memory);
@@ -29,7 +29,7 @@ bool IsFunction(const void* address) {
 
 }  // namespace
 
-/// Counts a call and goes on to the function, with every argument where it was:
+/// Counts a call and jumps to the function, with all arguments unchanged:
 ///
 ///   lock inc qword [calls]
 ///   jmp [function]

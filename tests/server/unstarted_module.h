@@ -1,5 +1,6 @@
-// A DLL that is mapped into the process but not started, so that a test can start it by hand and see every
-// call that its entry point makes.
+// Maps a DLL into the process without starting it. A test can then call its entry point and see every call
+// that the
+// entry point makes.
 #pragma once
 
 #include <windows.h>
@@ -12,11 +13,12 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Its imports are bound to stubs which count and call on. While it lives, the process must not have loaded
-/// the DLL in the ordinary way.
+/// Binds the imports to stubs that count each call and pass it on. The process must not load the DLL in the
+/// ordinary way
+/// while this exists.
 class UnstartedModule {
  public:
-  /// Throws std::runtime_error if the DLL cannot be mapped or something that it imports is not there.
+  /// Throws std::runtime_error if the DLL cannot be mapped, or if one of its imports does not exist.
   explicit UnstartedModule(const std::filesystem::path& dll);
   ~UnstartedModule();
   UnstartedModule(const UnstartedModule&) = delete;
@@ -24,11 +26,11 @@ class UnstartedModule {
 
   HMODULE module() const { return module_; }
 
-  /// Calls the entry point as the system does when something happens that `reason` names.
+  /// Calls the entry point with `reason`, as the system does.
   BOOL Notify(DWORD reason);
 
-  /// How often the module has called each imported function since this was last asked; without those that it
-  /// has not called.
+  /// Returns how often the module has called each imported function since the last TakeCalls. Functions
+  /// without a call are left out.
   std::map<std::string, int> TakeCalls();
 
  private:
@@ -39,7 +41,7 @@ class UnstartedModule {
   HMODULE module_;
   Stub* stubs_ = nullptr;  // executable memory
   std::size_t count_ = 0;
-  std::vector<std::string> names_;  // of the stubs
+  std::vector<std::string> names_;  // the function names of the stubs
   std::vector<HMODULE> libraries_;
 };
 
