@@ -1,4 +1,4 @@
-// The class object of every creatable class, and the form in which a module keeps one for good.
+// The class object of every creatable class, and the form of it that a module keeps until it is unloaded.
 #pragma once
 
 #include <windows.h>
@@ -13,11 +13,12 @@ namespace Qel::Com {
 
 class CComClassFactory : public CComRoot<FreeThreaded, IClassFactory> {
  public:
-  /// The factory of the objects that `makeInstance` makes.
+  /// Creates the factory of the objects that `makeInstance` makes.
   explicit CComClassFactory(InstanceMaker makeInstance) : makeInstance_(makeInstance) {}
 
-  /// With an outer object only IUnknown may be asked for (CLASS_E_NOAGGREGATION), because any other
-  /// interface of the new object would belong to the outer one.
+  /// Makes an object and queries it for `iid`. Returns E_POINTER for a null `object` and
+  /// CLASS_E_NOAGGREGATION for an outer object with any interface but IUnknown, because every other interface
+  /// of the new object would belong to the outer one.
   HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown* outer, REFIID iid, void** object) override;
 
   HRESULT STDMETHODCALLTYPE LockServer(BOOL lock) override;
@@ -29,8 +30,8 @@ class CComClassFactory : public CComRoot<FreeThreaded, IClassFactory> {
   InstanceMaker makeInstance_;
 };
 
-/// An object that the module itself keeps a reference on. That first reference does not keep the module
-/// loaded, every further one does.
+/// An object to which the module itself keeps a reference. That first reference does not keep the module
+/// loaded; every further one does.
 template <class Class>
 class CComObjectCached final : public Class {
  public:
@@ -41,8 +42,8 @@ class CComObjectCached final : public Class {
     return this->InternalQueryInterface(iid, object);
   }
 
-  // The count and the module's lock change together: when one thread has raised the count to 2, another
-  // must not come by a reference before the module is locked.
+  // The count and the module's lock change together: once one thread has raised the count to 2, no other
+  // thread may obtain a reference before the module is locked.
 
   ULONG STDMETHODCALLTYPE AddRef() override {
     const std::lock_guard guard(this->section());
@@ -66,7 +67,8 @@ class CComObjectCached final : public Class {
   }
 };
 
-/// The signature of a class-object maker: the class object for `makeInstance`, with one reference.
+/// The signature of a function that makes the class object of the objects of `makeInstance`, with one
+/// reference.
 using ClassObjectMaker = HRESULT (*)(InstanceMaker makeInstance, REFIID iid, void** classObject);
 
 /// Makes a CComObjectCached<CComClassFactory>.

@@ -1,8 +1,8 @@
-// How an object of a COM class comes to be: alone (CComObject), as part of another object (CComAggObject
-// around a CComContainedObject), and the makers that class factories and the classes themselves call.
+// Objects of COM classes: standalone (CComObject) or aggregated (a CComAggObject around a
+// CComContainedObject), and the functions that make them for class factories and for the classes themselves.
 //
-// Both kinds keep the module loaded as long as they live, also when they are made by another object of the
-// module and outlive it: code must not be unloaded while a client can still call into it.
+// Both kinds keep the module loaded while they exist, even if another object of the module made them and they
+// outlive it: code must not be unloaded while a client can still call it.
 #pragma once
 
 #include <windows.h>
@@ -17,7 +17,7 @@
 
 namespace Qel::Com {
 
-/// An object of `Class` that stands alone.
+/// A standalone object of `Class`.
 template <class Class>
 class CComObject final : public Class {
  public:
@@ -43,11 +43,11 @@ class CComObject final : public Class {
   ModuleLock moduleLock_;
 };
 
-/// An object of `Class` inside of a CComAggObject: its IUnknown is the outer object's.
+/// The object of `Class` inside a CComAggObject. Its IUnknown is the outer object's.
 template <class Class>
 class CComContainedObject final : public Class {
  public:
-  /// `outer` owns this object, so that no reference is taken on it.
+  /// Takes no reference to `outer`, because `outer` owns this object.
   explicit CComContainedObject(IUnknown* outer) : outer_(outer) {}
 
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override {
@@ -60,8 +60,8 @@ class CComContainedObject final : public Class {
   IUnknown* outer_;
 };
 
-/// The inner half of an aggregate. Its own IUnknown, which the outer object holds, counts its life and
-/// finds the interfaces of `Class`; those interfaces belong to the outer object.
+/// The inner object of an aggregate. Its own IUnknown, which the outer object holds, counts the references
+/// and finds the interfaces of `Class`; those interfaces delegate their IUnknown to the outer object.
 template <class Class>
 class CComAggObject final : public IUnknown {
  public:
@@ -97,10 +97,10 @@ class CComAggObject final : public IUnknown {
   ModuleLock moduleLock_;
 };
 
-/// Makes an `Object` (one of the templates above or CComObjectCached) with the constructor's `arguments`
-/// and one reference, held by `made`. Without memory for the object or for what its constructor needs
-/// E_OUTOFMEMORY; when the object's lock or its final construction fails, that failure, and the object is
-/// destroyed.
+/// Makes an `Object` (one of the templates above or CComObjectCached) from the constructor's `arguments`,
+/// with one reference, which `made` holds. Returns E_OUTOFMEMORY without memory for the object or for what
+/// its constructor allocates. If creating the object's lock or its final construction fails, destroys the
+/// object and returns that failure.
 template <class Object, class... Arguments>
 HRESULT MakeObject(ComPtr<Object>& made, Arguments&&... arguments) {
   std::unique_ptr<Object> unreferenced;
@@ -117,7 +117,7 @@ HRESULT MakeObject(ComPtr<Object>& made, Arguments&&... arguments) {
   return result;
 }
 
-/// Makes an `Object` and asks it for the interface `iid`.
+/// Makes an `Object` and queries it for `iid`. Returns the failure of either step.
 template <class Object, class... Arguments>
 HRESULT MakeObjectAs(REFIID iid, void** answer, Arguments&&... arguments) {
   ComPtr<Object> object;
@@ -125,11 +125,12 @@ HRESULT MakeObjectAs(REFIID iid, void** answer, Arguments&&... arguments) {
   return SUCCEEDED(result) ? object->QueryInterface(iid, answer) : result;
 }
 
-/// The signature of an instance maker: an object for the interface `iid`, aggregated by `outer` if that is
-/// not null.
+/// The signature of a function that makes an object and queries it for `iid`. The object is aggregated by
+/// `outer` unless that is null.
 using InstanceMaker = HRESULT (*)(IUnknown* outer, REFIID iid, void** object);
 
-/// The instance maker of `Class`. A null `object` is E_POINTER; otherwise it is null after a failure.
+/// Makes an instance of `Class`. Returns E_POINTER for a null `object`; on any other failure `*object` is
+/// null.
 template <class Class>
 HRESULT MakeInstance(IUnknown* outer, REFIID iid, void** object) {
   if (object == nullptr) return E_POINTER;

@@ -1,17 +1,17 @@
-// One counted reference on a COM object.
+// A smart pointer that owns one reference to a COM object.
 #pragma once
 
 #include <utility>
 
 namespace Qel::Com {
 
-/// Holds a reference or none; releases it when it goes.
+/// Owns a reference or none, and releases it in its destructor.
 template <class Interface>
 class ComPtr {
  public:
   ComPtr() = default;
 
-  /// Takes a reference of its own on `object`, which may be null.
+  /// Adds a reference to `object`, which may be null.
   explicit ComPtr(Interface* object) : object_(object) {
     if (object_ != nullptr) object_->AddRef();
   }
@@ -32,13 +32,13 @@ class ComPtr {
   Interface* operator->() const { return object_; }
   explicit operator bool() const { return object_ != nullptr; }
 
-  /// The place for a call that hands out a reference. Releases what was held before.
+  /// Releases the reference and returns the address for a call that returns a new one.
   Interface** Put() {
     *this = ComPtr();
     return &object_;
   }
 
-  /// The reference, which is the caller's from now on.
+  /// Returns the reference without releasing it; the caller owns it from now on.
   [[nodiscard]] Interface* Detach() { return std::exchange(object_, nullptr); }
 
  private:

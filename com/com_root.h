@@ -1,10 +1,10 @@
-// The base of every COM class. A class derives from CComRoot with its threading model and its interfaces,
-// and that list is its interface map:
+// The base of every COM class. A class derives from CComRoot with its threading model and its interfaces, and
+// that list is its interface map:
 //
 //   class CShape : public CComRoot<SingleThreaded, IDraw, IPersistStream> { ... };
 //
-// What is missing in such a class, the three methods of IUnknown, comes from the templates of
-// com_object.h, which decide whether an object stands alone or is part of another.
+// Such a class lacks the three methods of IUnknown. The templates of com_object.h add them, for standalone
+// and for aggregated objects.
 #pragma once
 
 #include <windows.h>
@@ -15,13 +15,13 @@
 
 namespace Qel::Com {
 
-/// The identifier of an interface. To be specialised where the platform's headers attach none to the type.
+/// The identifier of an interface. Specialise it where the platform's headers attach none to the type.
 template <class Interface>
 inline constexpr IID kInterfaceId = __uuidof(Interface);
 
-/// Objects answer IUnknown with their first interface, each interface that is listed, and no other: a base
-/// of a listed interface, such as IPersist of IPersistFile, has to be listed to be answered.
-/// The interfaces lie in the object in the order of the list, before every other member.
+/// QueryInterface finds IUnknown, which is the first interface, every interface in the list, and no other: a
+/// base of a listed interface, such as IPersist of IPersistFile, must itself be listed. The interfaces are
+/// laid out in the object in the order of the list, before every other member.
 template <class Threading, class Primary, class... Others>
 class CComRoot : public Primary, public Others... {
  public:
@@ -30,23 +30,24 @@ class CComRoot : public Primary, public Others... {
   CComRoot(const CComRoot&) = delete;
   CComRoot& operator=(const CComRoot&) = delete;
 
-  /// The part of creation that can fail, for a class to hide with its own. It runs after the constructor,
-  /// when references may be taken; a failure destroys the object.
+  /// The part of construction that can fail. A class hides this function with its own. It runs after the
+  /// constructor, when references may be taken; a failure destroys the object.
   HRESULT FinalConstruct() { return S_OK; }
 
-  // One IUnknown for all the interfaces; com_object.h says what it does.
+  // All interfaces share one IUnknown, which com_object.h implements.
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override = 0;
   ULONG STDMETHODCALLTYPE AddRef() override = 0;
   ULONG STDMETHODCALLTYPE Release() override = 0;
 
-  // The rest is for the templates of com_object.h and class_factory.h.
+  // The following functions are for the templates of com_object.h and class_factory.h.
 
   HRESULT CreateSection() { return section_.Create(); }
 
   ULONG InternalAddRef() { return ++count_; }
   ULONG InternalRelease() { return --count_; }
 
-  /// Looks `iid` up in the list. On success the caller has a reference, by the object's own AddRef.
+  /// Finds `iid` in the list and adds a reference with the object's own AddRef. Returns E_NOINTERFACE for an
+  /// interface that is not in the list and E_POINTER for a null `object`.
   HRESULT InternalQueryInterface(REFIID iid, void** object) {
     if (object == nullptr) return E_POINTER;
     *object = nullptr;
@@ -64,7 +65,7 @@ class CComRoot : public Primary, public Others... {
   CComRoot() = default;
   ~CComRoot() = default;
 
-  /// The object's own lock, which does nothing for SingleThreaded.
+  /// Returns the object's lock, which does nothing for SingleThreaded.
   typename Threading::Section& section() { return section_; }
 
  private:

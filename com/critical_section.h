@@ -1,4 +1,4 @@
-// A lock between the threads of the process whose creation can fail and says so.
+// A lock between the threads of the process that reports when its creation fails.
 #pragma once
 
 #include <windows.h>
@@ -7,7 +7,7 @@
 
 namespace Qel::Com {
 
-/// Meets the standard library's BasicLockable: std::lock_guard holds it.
+/// Meets the BasicLockable requirements of the standard library, so that std::lock_guard can hold it.
 class CriticalSection {
  public:
   CriticalSection() = default;
@@ -15,8 +15,8 @@ class CriticalSection {
   CriticalSection(const CriticalSection&) = delete;
   CriticalSection& operator=(const CriticalSection&) = delete;
 
-  /// To be called once, before the first lock. A failure is the system's error as an HRESULT; one without
-  /// an error code counts as success, and then there is nothing to lock.
+  /// Must be called once, before the first lock. Returns the system's error as an HRESULT. A failure without
+  /// an error code counts as success; locking then does nothing.
   HRESULT Create();
 
   void lock() {

@@ -1,4 +1,4 @@
-// Owns a handle of the system, as ComPtr owns an interface.
+// Owns a system handle, as ComPtr owns an interface.
 #pragma once
 
 #include <windows.h>
@@ -7,13 +7,14 @@
 
 namespace Qel::Com {
 
-/// Holds a handle or none and closes it in its destructor.
+/// Owns a handle or none, and closes it in its destructor.
 template <class Handle, auto close>
 class HandleOwner {
  public:
   HandleOwner() = default;
 
-  /// Functions that create files return -1 instead of null when they fail; it counts as no handle, too.
+  /// Takes ownership of `handle`. A handle of -1, which functions that create files return on failure, counts
+  /// as none, as null does.
   explicit HandleOwner(Handle handle)
       : handle_(reinterpret_cast<LONG_PTR>(handle) == -1 ? nullptr : handle) {}
 
@@ -31,10 +32,10 @@ class HandleOwner {
   Handle Get() const { return handle_; }
   explicit operator bool() const { return handle_ != nullptr; }
 
-  /// Closes the handle before the owner ends.
+  /// Closes the handle now.
   void Reset() { *this = HandleOwner(); }
 
-  /// Closes the handle and returns the place for a new one, for a function that stores it there.
+  /// Closes the handle and returns the address for a call that returns a new one.
   Handle* Put() {
     Reset();
     return &handle_;

@@ -1,5 +1,6 @@
-// What the objects of this library need of the module that they live in: a count of the reasons to stay
-// loaded. The server derives its module object from this and makes it current before the first object.
+// The services that the objects of this library need from their module, above all a count of the reasons to
+// stay loaded. The server derives its module object from Module and makes it current before it creates the
+// first object.
 #pragma once
 
 #include <windows.h>
@@ -14,17 +15,17 @@ class Module {
   Module(const Module&) = delete;
   Module& operator=(const Module&) = delete;
 
-  /// One more and one less reason to stay loaded; both return the new count.
+  /// Add and remove one reason to stay loaded. Both return the new count.
   virtual LONG Lock() = 0;
   virtual LONG Unlock() = 0;
 
-  /// The module may be unloaded while this is 0.
+  /// Returns the count. The module may be unloaded while it is 0.
   virtual LONG GetLockCount() const = 0;
 
-  /// The process's global interface table, with a reference for the caller.
+  /// Returns the process's global interface table, with a reference for the caller.
   virtual HRESULT GetGITPtr(IGlobalInterfaceTable** table) = 0;
 
-  /// The one module of this DLL or program.
+  /// Returns the module of this DLL or program.
   static Module& Current();
   static void MakeCurrent(Module* module);
 
@@ -32,7 +33,7 @@ class Module {
   Module() = default;
 };
 
-/// Keeps the current module loaded as long as it lives.
+/// Keeps the current module loaded for its own lifetime.
 class ModuleLock {
  public:
   ModuleLock() { Module::Current().Lock(); }

@@ -1,5 +1,5 @@
-// The two ways in which an object lives with threads: what its reference count is made of, and the lock
-// that each object brings along. CComRoot takes one of them as its first argument.
+// The two threading models of objects. Each defines the type of the reference count and of the lock in every
+// object. CComRoot takes one of them as its first argument.
 #pragma once
 
 #include <windows.h>
@@ -10,7 +10,7 @@
 
 namespace Qel::Com {
 
-/// For classes registered "Apartment": one thread at a time, nothing is locked.
+/// For classes registered "Apartment": only one thread at a time uses an object, so nothing is locked.
 struct SingleThreaded {
   using Count = ULONG;
 
@@ -21,7 +21,7 @@ struct SingleThreaded {
   };
 };
 
-/// For classes registered "Both": any thread at any time.
+/// For classes registered "Both": any thread may use an object at any time.
 struct FreeThreaded {
   using Count = std::atomic<ULONG>;
   using Section = CriticalSection;

@@ -1,4 +1,4 @@
-// Numbers out of file bytes, whatever the host's byte order and the bytes' alignment.
+// Decodes the little-endian numbers of a file, whatever the host's byte order and the alignment of the bytes.
 #pragma once
 
 #include <array>
@@ -11,7 +11,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The integer, or the IEEE float or double, whose sizeof(Number) bytes at `bytes` begin with the low one.
+/// Decodes an integer or an IEEE float or double from the sizeof(Number) bytes at `bytes`, least significant
+/// byte first.
 template <class Number>
 constexpr Number LoadLittleEndian(const unsigned char* bytes) {
   if constexpr (std::floating_point<Number>) {
@@ -26,7 +27,8 @@ constexpr Number LoadLittleEndian(const unsigned char* bytes) {
   }
 }
 
-/// The number at the stream's position. Bytes that are not there count as 0, and their lack fails the stream.
+/// Reads and decodes the number at the stream's position. If the stream ends before the number does, the
+/// missing bytes count as 0 and the stream fails.
 template <class Number>
 Number ReadLittleEndian(std::istream& stream) {
   std::array<unsigned char, sizeof(Number)> bytes{};

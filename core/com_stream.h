@@ -1,8 +1,8 @@
-// The byte source of a file that comes as a COM stream: a standard stream over an IStream.
+// A standard stream over a COM stream, for files that the shell hands over as an IStream.
 //
-// The property-store handlers own one each, so that the readers need not know where their bytes come from.
-// A COM stream is never repositioned here: a reader takes the bytes in the order in which they come, and a
-// seek fails as it does for any stream that cannot be repositioned. One thread at a time may use it.
+// Every property-store handler owns one, so that the readers need not know where their bytes come from. The
+// COM stream is never repositioned: a reader takes the bytes in the order in which they arrive, and a seek
+// fails as on any stream without positions. Only one thread at a time may use the stream.
 #pragma once
 
 #include <objidl.h>
@@ -15,13 +15,13 @@
 #include <streambuf>
 #include <vector>
 
-/// A stream buffer that holds one reference on the attached COM stream. Without a COM stream, or before it
-/// has been given a buffer, it is at its end and writes nothing. Nothing is thrown for failures of the COM
-/// stream: they end the input or fail the output.
+/// A stream buffer that owns one reference to the attached COM stream. Without a COM stream, or before
+/// Allocate, reading meets the end of the stream and writing fails. Failures of the COM stream never throw:
+/// they end the input or fail the output.
 ///
-/// One array serves both directions. The get area follows a reserve of four characters, which keeps what
-/// was read last across a refill; the put area begins at the first character and leaves the last one free
-/// for the character that overflow brings. Input and output are therefore not to be mixed.
+/// One array serves both directions. The get area follows a reserve of four characters, which keeps the last
+/// characters read across a refill. The put area begins at the first character and leaves the last one free
+/// for the character that is passed to overflow. Input and output must therefore not be mixed.
 template <class Char, class Traits = std::char_traits<Char>, class Allocator = std::allocator<Char>>
 class basic_combuf : public std::basic_streambuf<Char, Traits> {
   static_assert(sizeof(Char) == 1, "a COM stream counts bytes");
@@ -31,11 +31,11 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
 
   basic_combuf() = default;
 
-  /// Writes what is pending.
+  /// Writes the pending characters.
   ~basic_combuf() override { Flush(); }
 
-  /// Makes the buffer `size` characters large; it takes more than the put-back reserve to read anything.
-  /// What was read ahead or is pending is dropped. Without memory there is no buffer.
+  /// Gives the buffer room for `size` characters and drops characters that were read ahead or are pending.
+  /// Reading needs more room than the put-back reserve. Without memory the buffer stays empty.
   void Allocate(std::size_t size) {
     try {
       buffer_.assign(size, Char());
@@ -45,8 +45,8 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
     ResetAreas();
   }
 
-  /// Reads on from where `stream` (null for none) stands, and forgets the recorded result. What was read
-  /// ahead or is pending is dropped.
+  /// Attaches `stream` (null for none), which is read from its current position. Clears the recorded result
+  /// and drops characters that were read ahead or are pending.
   void Attach(IStream* stream) {
     if (stream != stream_.get()) {
       if (stream != nullptr) stream->AddRef();
@@ -56,8 +56,8 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
     ResetAreas();
   }
 
-  /// What the COM stream answered when it first failed. As long as it has not, its last answer that brought
-  /// no bytes or took too few: S_OK, or another success such as S_FALSE.
+  /// Returns the COM stream's first failure. Without a failure, returns its last result for a call that read
+  /// nothing or wrote too little: S_OK or another success such as S_FALSE.
   HRESULT result() const { return result_; }
 
  protected:
@@ -79,7 +79,7 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
     Char* const first = Begin() + kPutBack;
     const auto kept = std::min(std::ptrdiff_t{kPutBack}, this->gptr() - this->eback());
     Traits::move(first - kept, this->gptr() - kept, static_cast<std::size_t>(kept));
-    // Even a Read that fails may write to its buffer, so that only the reserve can be put back now.
+    // Even a failing Read may write to its buffer, so only the reserve can be put back now.
     this->setg(first - kept, first, first);
 
     const auto wanted = static_cast<ULONG>(buffer_.size() - kPutBack);
@@ -89,7 +89,7 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
       Record(result);
       return Traits::eof();
     }
-    // Whatever the stream says, it had room for no more than was wanted.
+    // A count above `wanted` would lie outside of the buffer, whatever the stream reports.
     this->setg(first - kept, first, first + std::min(read, wanted));
     return Traits::to_int_type(*first);
   }
@@ -113,13 +113,14 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
     MovePutPosition(Begin());
   }
 
-  /// The put area ends before the last character, but never before its position: the base class counts on it.
+  /// Ends the put area before the last character, but never before `position`: the base class relies on that.
   void MovePutPosition(Char* position) {
     this->setp(Begin(), buffer_.empty() ? End() : std::max(End() - 1, position));
     this->pbump(static_cast<int>(position - Begin()));
   }
 
-  /// A stream that is only read is never asked to write, not even zero bytes.
+  /// Writes the pending characters; returns whether the COM stream took them all. A stream that is only read
+  /// never gets a Write call, not even for zero bytes.
   bool Flush() {
     if (stream_ == nullptr) return false;
     const auto pending = static_cast<ULONG>(this->pptr() - this->pbase());
@@ -143,8 +144,8 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
   HRESULT result_ = S_OK;
 };
 
-/// A stream that owns its stream buffer. It begins without a COM stream and without memory; its owner gives
-/// the buffer both.
+/// A stream that owns its stream buffer. It starts without a COM stream and without memory; its owner
+/// provides both through the buffer.
 template <class Char, class Traits = std::char_traits<Char>>
 class basic_comstream : public std::basic_iostream<Char, Traits> {
  public:

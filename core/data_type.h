@@ -1,5 +1,5 @@
-// The vocabulary of pixel types that the RAW, EBN, SER and EMI readers share. The MRC family numbers its
-// pixel types itself (mrc_parser.h).
+// The pixel types that the RAW, EBN, SER and EMI readers share. The MRC family has an enumeration of its own
+// (mrc_parser.h).
 #pragma once
 
 #include <cstdint>
@@ -9,7 +9,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The values are part of the vocabulary, gaps included; any value that is not listed is unknown.
+/// The values are fixed, gaps included. A value that is not listed is an unknown type.
 enum class DataType : std::uint32_t {
   kUInt8 = 0,
   kUInt16 = 1,
@@ -25,13 +25,13 @@ enum class DataType : std::uint32_t {
   kBgr24 = 18,
 };
 
-/// The unknown type for a value that is not listed.
+/// Returns the default PixelType, "Unknown" with 0 bits, for a value that is not listed.
 PixelType PixelTypeOf(DataType type);
 
-/// The display name, for instance "16 bit signed"; "Unknown" for a value that is not listed.
+/// Returns the display name, for instance "16 bit signed"; "Unknown" for a value that is not listed.
 std::wstring DataTypeName(DataType type);
 
-/// Bits of one pixel; 0 for a value that is not listed.
+/// Returns the bits of one pixel; 0 for a value that is not listed.
 std::int32_t BitsPerPixel(DataType type);
 
 }  // namespace Qel::Lumetra::ShellExt

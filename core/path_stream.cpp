@@ -12,11 +12,11 @@ namespace {
 
 constexpr auto kMode = std::ios_base::in | std::ios_base::binary;
 
-// Room for any header in one read, and not more: the buffer is filled anew after each seek, which would make
-// reading the headers of many elements slower.
+// Large enough to read any header at once, and no larger: the buffer is refilled after each seek, so a larger
+// one would slow down reading the headers of many elements.
 constexpr std::size_t kBufferBytes = 2048;
 
-/// An open file descriptor, or -1.
+/// Returns an open file descriptor, or -1 on failure.
 int OpenShared(const wchar_t* path) {
   const HANDLE file = CreateFileW(path, GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
                                   nullptr, OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL, nullptr);
@@ -30,8 +30,8 @@ int OpenShared(const wchar_t* path) {
 
 void OpenPath(std::ifstream& stream, const wchar_t* path) {
   if (!stream.is_open()) {
-    // The standard library's own open does not share deleting, so the descriptor is opened here and
-    // handed to the stream's file buffer.
+    // The standard library opens files without FILE_SHARE_DELETE, so the descriptor is opened here and handed
+    // to the stream's file buffer.
     if (const int descriptor = OpenShared(path); descriptor != -1) {
       *stream.rdbuf() = __gnu_cxx::stdio_filebuf<char>(descriptor, kMode, kBufferBytes);
       if (stream.is_open()) {

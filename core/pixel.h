@@ -1,18 +1,18 @@
-// C++ types of pixels that are more than one number, laid out as a file stores them.
+// C++ types of the pixels that consist of more than one number, with the memory layout that files use.
 #pragma once
 
 #include <cstdint>
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Real part first, then the imaginary part.
+/// The real part is stored first.
 template <class T>
 struct ComplexPixel {
   T re;
   T im;
 };
 
-/// Byte order of a colour pixel: red, green, blue or blue, green, red. Bitmaps hold blue first.
+/// The byte order of a colour pixel: red, green, blue or blue, green, red. Bitmaps store blue first.
 enum class ColourOrder { kRedFirst, kBlueFirst };
 
 template <ColourOrder kOrder>

@@ -1,4 +1,4 @@
-// Comparison of names without regard to case.
+// Compares names without regard to case.
 #pragma once
 
 #include <algorithm>
@@ -6,7 +6,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Only the letters A to Z have a case here, whatever the locale.
+/// Returns whether two strings are equal apart from the case of the letters A to Z. The locale has no
+/// influence.
 inline bool SameIgnoringCase(std::wstring_view a, std::wstring_view b) {
   const auto lower = [](wchar_t c) {
     return c >= L'A' && c <= L'Z' ? static_cast<wchar_t>(c - L'A' + L'a') : c;

@@ -5,11 +5,11 @@
 namespace Qel::Lumetra::ShellExt {
 
 void SkipBytes(std::istream& stream, std::uint32_t count) {
-  // Reading on in the stream's own buffer is faster than a seek, which throws that buffer away.
+  // Reading ahead in the stream's own buffer is faster than a seek, which discards the buffer.
   std::array<char, 512> bytes;
   std::streamsize rest = count;
   if (count > bytes.size()) {
-    // A position after the end of a file is valid. Its last byte tells whether the part is there.
+    // A position after the end of a file is valid, so reading the last byte shows whether the part exists.
     stream.seekg(rest - 1, std::ios_base::cur);
     rest = 1;
   }

@@ -1,4 +1,4 @@
-// The way past the parts of a file that nobody asks for.
+// Skips the parts of a file that no reader needs.
 #pragma once
 
 #include <cstdint>
@@ -6,8 +6,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Moves `stream` on by `count` bytes, and fails it when it does not hold them all. A count out of a file may
-/// be anything: neither memory nor time grows with it.
+/// Advances `stream` by `count` bytes; fails the stream if it has fewer. Neither memory nor time grows with
+/// `count`, which may be any number from a damaged file.
 void SkipBytes(std::istream& stream, std::uint32_t count);
 
 }  // namespace Qel::Lumetra::ShellExt

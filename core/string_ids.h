@@ -1,8 +1,8 @@
-// Resource ids of the module's strings, for C++ and for the resource compiler, which knows macros only. Their
-// texts are in the server's string table (string_table.rc).
+// Resource identifiers of the module's strings, for C++ and for the resource compiler, which understands only
+// macros. The strings are in the server's string table (string_table.rc).
 //
-// The type descriptions of the readers have ids too, 101 and 210 to 215. The table leaves them out on
-// purpose, so every type description is empty.
+// The type descriptions of the readers have identifiers too, 101 and 210 to 215. The table intentionally
+// omits them, so every type description is empty.
 #pragma once
 
 // NOLINTBEGIN(modernize-macro-to-enum)

@@ -6,8 +6,8 @@
 #include <array>
 #include <iterator>
 
-// Defined by the linker for every module: its address is the instance handle of the module that this
-// code is linked into, be that the DLL or a test program.
+// The linker defines this symbol in every module. Its address is the instance handle of the module that this
+// code is linked into, the DLL or a test program.
 extern "C" IMAGE_DOS_HEADER __ImageBase;
 
 namespace Qel::Lumetra::ShellExt {

@@ -1,4 +1,4 @@
-// DIB sections as blocks of memory.
+// Implements DIB sections as blocks of memory.
 #include <windows.h>
 
 #include <algorithm>
@@ -28,8 +28,7 @@ BOOL DeleteDC(HDC dc) {
   return 1;
 }
 
-// Without memory for it, or for more bytes than the header's 32 bits can count, there is no bitmap, and no
-// exception.
+// Returns null, and never throws, without memory or for more bytes than the header's 32 bits can count.
 HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE, DWORD) try {
   if (bits != nullptr) *bits = nullptr;
   const BITMAPINFOHEADER& header = info->bmiHeader;

@@ -1,4 +1,4 @@
-// Files and strings.
+// Implements files and strings.
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -14,18 +14,18 @@ extern "C" {
 IMAGE_DOS_HEADER __ImageBase{};
 }
 
-// Native programs carry no resources.
+// Returns 0, no string: native programs have no resources.
 int LoadStringW(HINSTANCE, UINT, wchar_t*, int) {
   return 0;
 }
 
-// Wide paths are UTF-8 on disk, whatever the locale. What UTF-8 cannot say is the name of no file.
+// Converts the path to UTF-8, whatever the locale. A path that UTF-8 cannot represent names no file.
 HANDLE CreateFileW(const wchar_t* path, DWORD, DWORD, void*, DWORD, DWORD, HANDLE) try {
   const std::filesystem::path name(std::u32string(path, path + std::wcslen(path)));
   const int descriptor = open(name.c_str(), O_RDONLY | O_CLOEXEC);
   struct stat status{};
   if (descriptor == -1) return INVALID_HANDLE_VALUE;
-  // Windows opens no folders this way.
+  // Windows does not open folders with these arguments.
   if (fstat(descriptor, &status) != 0 || S_ISDIR(status.st_mode)) {
     close(descriptor);
     return INVALID_HANDLE_VALUE;

@@ -1,4 +1,4 @@
-// Stand-in for the platform C runtime's low-level file calls.
+// Stand-in for the header of the Windows C runtime's low-level file functions.
 #pragma once
 
 #include <cstdint>

@@ -1,6 +1,5 @@
-// Stand-in for the header of Windows where there is none: what core, render and formats use of it, with the
-// names, layouts and results that it has there. Bitmaps are blocks of memory, handles of files are file
-// descriptors.
+// Stand-in for the main Windows header: the part that core, render and formats use, with the names, layouts
+// and results of Windows. Bitmaps are blocks of memory, file handles are file descriptors.
 #pragma once
 
 #include <cstdint>

@@ -1,6 +1,6 @@
-// The inner loops of block_sums.h that are written for a processor's vectors, and for other processors in
-// plain C++. Both give the same bits. GCC makes no such code of vectors that are written for all processors:
-// it widens 8 bytes one number at a time.
+// The inner loops of block_sums.h, with vector instructions for x86 and in plain C++ for other processors.
+// Both give the same bits. GCC's portable vectors do not compile to such code: widening 8 bytes, for
+// instance, becomes eight scalar conversions.
 #pragma once
 
 #ifdef __SSE2__
@@ -29,7 +29,7 @@ double LoadAsDouble(const std::byte* bytes) {
 
 #ifdef __SSE2__
 
-/// Moves every second of 2 * `columns` sums to the front. Returns how many of the `columns` are done.
+/// Moves every second of 2 * `columns` sums to the front. Returns the number of columns that are done.
 inline std::size_t DropOddColumns(std::int32_t* sums, std::size_t columns) {
   std::size_t column = 0;
   for (; column + 4 < columns; column += 4) {
@@ -40,8 +40,8 @@ inline std::size_t DropOddColumns(std::int32_t* sums, std::size_t columns) {
   return column;
 }
 
-/// Adds an even number of rows of signed 16-bit samples to `sums`, or sets these if the rows are the first.
-/// The processor widens and adds two rows at a time. Returns how many of the `count` columns are done.
+/// Adds an even number of rows of signed 16-bit samples to `sums`, or overwrites `sums` if the rows are the
+/// first. The processor widens and adds two rows at a time. Returns how many of the `count` columns are done.
 template <std::size_t kRows, bool kFirst>
 std::size_t AddPairsOfRows(const std::array<const std::byte*, kRows>& row, std::size_t count,
                            std::int32_t* sums) {
@@ -63,8 +63,8 @@ std::size_t AddPairsOfRows(const std::array<const std::byte*, kRows>& row, std::
   return i;
 }
 
-/// Adds `factor` colours to the sums of their three channels, in the opposite order if `kSwaps`. A Sum has
-/// room for the sum of a channel. Reads five lanes past the last colour.
+/// Adds `factor` colours to the sums of their three channels, in the opposite order if `kSwaps`. Sum must be
+/// able to hold the sum of a channel. Reads five lanes past the last colour.
 template <class Sum, bool kSwaps, class Factor>
 void FoldColours(const std::uint16_t* lanes, double* sums, Factor factor) {
   constexpr std::size_t kChannels = 3;
@@ -74,7 +74,7 @@ void FoldColours(const std::uint16_t* lanes, double* sums, Factor factor) {
   const auto widened = [](__m128i narrow) { return _mm_unpacklo_epi16(narrow, _mm_setzero_si128()); };
   __m128i sum = _mm_setzero_si128();
   if constexpr (sizeof(Sum) == 2) {
-    // Two columns at a time, the second in the lanes after the first.
+    // Adds two columns at a time; the second one is in the lanes after the first.
     for (std::size_t i = 0; i + 2 <= factor; i += 2) sum = _mm_add_epi16(sum, load(i));
     sum = _mm_add_epi16(sum, _mm_srli_si128(sum, kChannels * sizeof *lanes));
     if (factor % 2 != 0) sum = _mm_add_epi16(sum, load(factor - 1));
@@ -96,7 +96,7 @@ __m128d LoadTwoAsDoubles(const std::byte* bytes) {
     const __m128i samples = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(bytes));
     if constexpr (std::is_same_v<Sample, float>) return _mm_cvtps_pd(_mm_castsi128_ps(samples));
     if constexpr (std::is_same_v<Sample, std::int32_t>) return _mm_cvtepi32_pd(samples);
-    // No instruction converts unsigned numbers: each becomes the low half of a double of 2^52 and more.
+    // SSE2 has no conversion of unsigned numbers: each becomes the low half of a double of at least 2^52.
     const __m128i raised = _mm_unpacklo_epi32(samples, _mm_set1_epi32(0x43300000));
     return _mm_sub_pd(_mm_castsi128_pd(raised), _mm_set1_pd(4503599627370496.0));
   }
@@ -144,7 +144,7 @@ inline std::size_t DropOddColumns(std::int32_t* sums, std::size_t columns) {
 
 template <std::size_t kRows, bool kFirst>
 std::size_t AddPairsOfRows(const std::array<const std::byte*, kRows>&, std::size_t, std::int32_t*) {
-  return 0;  // the caller's loop is as good
+  return 0;  // the caller's scalar loop adds all columns
 }
 
 template <class Sum, bool kSwaps, class Factor>

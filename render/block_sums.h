@@ -43,16 +43,16 @@ struct SamplesOf<ColourPixel<kOrder>> {
   static constexpr std::size_t TargetIndex(std::size_t i) { return kSwaps ? 2 - i : i; }
 };
 
-/// For samples whose sums are exact in any order.
+/// Sums samples whose sums are exact in any order.
 template <class Pixel>
 class ExactBlockSums {
  public:
   ExactBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
 
-  /// Whether rows with this distance between pixels can be added directly. The bytes between pixels are then
-  /// added too, as columns that are dropped afterwards; above a certain distance gathering the pixels is
-  /// cheaper.
+  /// Returns whether Add takes rows with this distance in bytes between pixels. It also adds the bytes
+  /// between the pixels, as columns that are dropped afterwards; above a certain distance gathering the
+  /// pixels is cheaper.
   static bool Takes(std::int64_t pixelStride) {
     constexpr std::int64_t kSampleBytes = sizeof(Sample);
     constexpr std::int64_t kPixelBytes = kSampleBytes * kSamples;
@@ -69,8 +69,8 @@ class ExactBlockSums {
     }
   }
 
-  /// The sums of every block's samples, in the order of the target's samples. The caller resets those that it
-  /// has used to 0.
+  /// Returns the sums of every block's samples, in the order of the target's samples. The caller resets the
+  /// sums that it has used to 0.
   double* sums() { return sums_.data(); }
 
  private:
@@ -78,7 +78,8 @@ class ExactBlockSums {
   static constexpr std::size_t kSamples = SamplesOf<Pixel>::kCount;
   static_assert(sizeof(Sample) <= 2);
 
-  // Wide enough for the sum of kMaxRows samples. Narrow lanes make the pass over the rows fast.
+  // The type of a column sum, wide enough for kMaxRows samples. Narrow lanes make the pass over the rows
+  // fast.
   using Lane = std::conditional_t<sizeof(Sample) == 1,
                                   std::conditional_t<std::is_signed_v<Sample>, std::int16_t, std::uint16_t>,
                                   std::int32_t>;
@@ -102,13 +103,13 @@ class ExactBlockSums {
     Lane* const sums = columnSums_.data();
     std::size_t column = 1;
     if constexpr (sizeof(Lane) == 4) {
-      // Two interleaved images are the common case.
+      // This step is common: two interleaved images have it.
       if (step == 2) column = DropOddColumns(sums, columns_);
     }
     for (; column < columns_; ++column) std::copy_n(sums + column * step, kSamples, sums + column * kSamples);
   }
 
-  /// Adds `count` samples of each row to the column sums, or sets these if the first row is row 0.
+  /// Adds `count` samples of each row to the column sums, or overwrites the sums if the first row is row 0.
   template <std::size_t kRows>
   void AddRows(const ImageView<const Pixel>& rows, std::int32_t y, std::size_t count) {
     y == 0 ? AddRows<kRows, true>(rows, y, count) : AddRows<kRows, false>(rows, y, count);
@@ -134,7 +135,8 @@ class ExactBlockSums {
     }
   }
 
-  /// Folds with the narrowest type that holds the sum of `samples` samples, which is the fastest.
+  /// Folds the column sums into the blocks' sums, with the narrowest type that holds the sum of `samples`
+  /// samples, which is the fastest.
   void FoldColumns(std::size_t x, std::size_t samples) {
     if constexpr (sizeof(Lane) < sizeof(std::int32_t)) {
       if (samples <= kMaxRows) return FoldColumns<Lane>(x);
@@ -150,7 +152,7 @@ class ExactBlockSums {
     const std::size_t blocks = (columns_ - column) / factor_;
     const Lane* const lanes = &columnSums_[column * kSamples];
     double* const sums = &sums_[(x + column) / factor_ * kSamples];
-    // A factor that the compiler knows lets it fold many small blocks at once.
+    // A factor known at compile time lets the compiler fold many small blocks at once.
     switch (factor_) {
       case 2: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 2>()); break;
       case 3: FoldBlocks<Sum>(lanes, sums, blocks, std::integral_constant<std::size_t, 3>()); break;
@@ -173,8 +175,8 @@ class ExactBlockSums {
         FoldColours<Sum, SamplesOf<Pixel>::kSwaps>(lanes + block * factor * kSamples, sums + block * kSamples,
                                                    factor);
       } else {
-        // No array of sums: indexing one, even with a constant, can keep GCC from folding blocks side by
-        // side.
+        // An array of sums would be slower: indexing one, even with a constant, can keep GCC from folding
+        // blocks side by side.
         for (std::size_t sample = 0; sample < kSamples; ++sample) {
           Sum sum = 0;
           for (std::size_t i = 0; i < factor; ++i) {
@@ -186,7 +188,7 @@ class ExactBlockSums {
     }
   }
 
-  /// Folds some columns of one block; returns the column after them.
+  /// Folds some columns of one block; returns the next column.
   template <class Sum>
   std::size_t FoldPart(std::size_t x, std::size_t column, std::size_t columns) {
     FoldBlocks<Sum>(&columnSums_[column * kSamples], &sums_[(x + column) / factor_ * kSamples], 1, columns);
@@ -199,7 +201,7 @@ class ExactBlockSums {
   std::vector<Lane> columnSums_;
 };
 
-/// For samples that must be added as doubles, in order.
+/// Sums samples that must be added as doubles, in order.
 template <class Sample>
 class OrderedBlockSums {
  public:
@@ -217,7 +219,7 @@ class OrderedBlockSums {
     if (x % factor_ != 0) column = AddPart(rows, x, 0, std::min(rows.width, factor_ - x % factor_));
     const std::int32_t blocks = (rows.width - column) / factor_ / kBlocksSideBySide * kBlocksSideBySide;
     double* const sums = sums_.data() + (x + column) / factor_;
-    // A factor that the compiler knows makes small blocks faster.
+    // A factor known at compile time makes small blocks faster.
     switch (factor_) {
       case 2: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 2>(), sums); break;
       case 3: AddBlocks(rows, column, blocks, std::integral_constant<std::int32_t, 3>(), sums); break;
@@ -228,11 +230,11 @@ class OrderedBlockSums {
     while (column < rows.width) column = AddPart(rows, x, column, std::min(rows.width - column, factor_));
   }
 
-  /// The sums of every block. The caller resets those that it has used to 0.
+  /// Returns the sums of every block. The caller resets the sums that it has used to 0.
   double* sums() { return sums_.data(); }
 
  private:
-  /// Adds all columns of neighbouring blocks from a column on, kBlocksSideBySide at a time.
+  /// Adds all columns of `blocks` neighbouring blocks from `column` on, kBlocksSideBySide at a time.
   template <class Factor>
   static void AddBlocks(const ImageView<const Sample>& rows, std::int32_t column, std::int32_t blocks,
                         Factor factor, double* sums) {
@@ -241,7 +243,7 @@ class OrderedBlockSums {
     }
   }
 
-  /// Adds some columns of one block; returns the column after them.
+  /// Adds some columns of one block; returns the next column.
   std::int32_t AddPart(const ImageView<const Sample>& rows, std::int32_t x, std::int32_t column,
                        std::int32_t columns) {
     double& sum = sums_[static_cast<std::size_t>((x + column) / factor_)];

@@ -71,7 +71,7 @@ class BoxReducer {
 
   void AddToBlockRow(const ImageView<const Pixel>& rows, std::int32_t x) {
     if (BlockSums::Takes(rows.pixelStride)) return sums_.Add(rows, x);
-    // Other pixels are gathered first, as many rows at a time as fit.
+    // Gathers all other pixels first, as many rows at a time as fit.
     const std::int32_t columns = std::min(rows.width, kMaxGathered);
     const std::int32_t maxRows = kMaxGathered / columns;
     for (std::int32_t y = 0; y < rows.height; y += maxRows) {
@@ -112,7 +112,7 @@ class BoxReducer {
 
   /// Truncates to an integer toward zero, rounds to the nearest float, or keeps a double.
   static Sample ToSample(double average) {
-    // The average of values that fit into signed 32 bits fits as well, and converts faster.
+    // Averages of values that fit into signed 32 bits fit as well, and the 32-bit conversion is faster.
     using Whole = std::conditional_t<std::is_same_v<Sample, std::uint32_t>, std::int64_t, std::int32_t>;
     if constexpr (std::is_integral_v<Sample>) {
       return static_cast<Sample>(static_cast<Whole>(average));

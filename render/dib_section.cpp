@@ -8,7 +8,7 @@ namespace {
 constexpr int kGreyLevels = 256;
 constexpr LONG kPixelsPerMetre = 1200;
 
-// BITMAPINFO with room for a whole colour table.
+// A BITMAPINFO with room for a whole colour table.
 struct BitmapInfo {
   BITMAPINFOHEADER header;
   RGBQUAD colours[kGreyLevels];
@@ -30,7 +30,7 @@ BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int3
   header.biPlanes = 1;
   header.biBitCount = static_cast<WORD>(8 * bytesPerPixel);
   header.biCompression = BI_RGB;
-  // The padding of the last row is not counted.
+  // The size omits the padding of the last row.
   header.biSizeImage =
       static_cast<DWORD>((height - std::int64_t{1}) * BitmapRowStride(width, bytesPerPixel) + rowBytes);
   header.biXPelsPerMeter = kPixelsPerMetre;

@@ -1,4 +1,4 @@
-// The owner of one device-independent bitmap until it is handed out.
+// Owns one device-independent bitmap until it is handed out.
 #pragma once
 
 #include <windows.h>
@@ -10,10 +10,11 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Bytes from one row of a bitmap to the next.
+/// Returns the bytes from one row of a bitmap to the next.
 std::int64_t BitmapRowStride(std::int32_t width, std::int32_t bytesPerPixel);
 
-/// The header of a top-down bitmap of 1 (grey) or 3 (colour) bytes per pixel, rows padded to 4 bytes.
+/// Returns the header of a top-down bitmap of 1 (grey) or 3 (colour) bytes per pixel, with rows padded to 4
+/// bytes.
 BITMAPINFOHEADER BitmapHeader(std::int32_t width, std::int32_t height, std::int32_t bytesPerPixel);
 
 /// Holds a top-down bitmap (row 0 is the top row, rows padded to 4 bytes) until Release hands it out; deletes

@@ -6,8 +6,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Ends the process as a division by zero does, by an instruction where the processor has one that faults:
-/// the compiler may assume that C++ code does not divide by zero.
+/// Ends the process as a division by zero does. On x86-64 it executes a faulting instruction, because the
+/// compiler may assume that C++ code never divides by zero.
 [[noreturn]] void RaiseDivideFault() {
 #ifdef __x86_64__
   asm volatile("xorl %%ecx, %%ecx\n\tmovl $1, %%eax\n\tcltd\n\tidivl %%ecx" : : : "eax", "ecx", "edx", "cc");

@@ -15,8 +15,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Memory for the values of a reduced image. Throws std::bad_alloc for more than 32 bits can count, which no
-/// bitmap has.
+/// Allocates the values of a reduced image. Throws std::bad_alloc for more values than a signed 32-bit
+/// integer can count, which no bitmap has.
 template <class T>
 std::unique_ptr<T[]> AllocateImage(Size2 size) {
   const std::int64_t count = std::int64_t{size.width} * size.height;
@@ -49,7 +49,7 @@ class GreyRenderer final : public FrameRenderer {
 
  private:
   Reduction reduction_;
-  Size2 size_;  // of the reduced image, 0 by 0 if no block is whole
+  Size2 size_;  // of the reduced image; 0 by 0 if it has no whole block
   std::unique_ptr<T[]> values_;
   BoxReducer<T> reducer_;
 };
@@ -72,7 +72,7 @@ class ComplexRenderer final : public FrameRenderer {
       for (std::int32_t column = 0; column < pixels.width; column += kMaxColumns) {
         const std::int32_t count = std::min(pixels.width - column, kMaxColumns);
         const std::byte* const part = pixels.At(column, row);
-        // A stride that the compiler knows lets it use vectors for the common case.
+        // A stride known at compile time lets the compiler use vectors for the common case.
         dense ? SquareMagnitudes(part, sizeof(ComplexPixel<T>), count)
               : SquareMagnitudes(part, pixels.pixelStride, count);
         LogarithmsToFloat(squares_.data(), static_cast<std::size_t>(count), logarithms_.data());

@@ -1,4 +1,4 @@
-// From a reduced image of scalar values to grey levels.
+// Maps a reduced image of scalar values to grey levels.
 #pragma once
 
 #ifdef __SSE2__
@@ -16,9 +16,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Subtracts two values of T before widening the difference to double. 8- and 16-bit differences are exact.
-/// 32-bit signed differences wrap, so an image that spans more than 2^31 - 1 maps wrongly; this is
-/// intentional.
+/// Returns a - b, subtracted as T and then widened to double. 8- and 16-bit differences are exact. 32-bit
+/// signed differences wrap, so an image that spans more than 2^31 - 1 maps wrongly; this is intentional.
 template <class T>
 double Difference(T a, T b) {
   if constexpr (std::is_floating_point_v<T>) {
@@ -39,7 +38,8 @@ struct ValueRange {
   /// Finds the range of `count` values, at least one.
   ValueRange(const T* values, std::size_t count) : minimum(values[0]), maximum(values[0]) {
     // Each lane sees only some of the values, with the same result: a NaN as the first value stays in every
-    // lane, and every lane ignores any other. Left to itself the compiler does not use vectors for floats.
+    // lane, and every lane ignores any other. The vectors are explicit because GCC does not vectorise this
+    // loop for floats.
     using Vector __attribute__((vector_size(16))) = T;
     constexpr std::size_t kLanes = sizeof(Vector) / sizeof(T);
     constexpr std::size_t kVectors = 4;
@@ -61,8 +61,8 @@ struct ValueRange {
     }
   }
 
-  /// Returns the grey levels per unit. A flat image gets a range of one, formed in T itself: the sum wraps at
-  /// an integer's maximum and equals a large float, and either way every pixel is black.
+  /// Returns the grey levels per unit. A flat image gets a range of one, computed in T: the sum wraps at an
+  /// integer's maximum and equals a large float, and in both cases every pixel is black.
   double Scale() const {
     T upper = maximum;
     if (!(minimum < maximum || minimum > maximum)) {
@@ -87,8 +87,8 @@ struct ValueRange {
   }
 };
 
-/// Truncates each of `count` levels toward zero to 32 bits and writes the low 8 bits; 0 for NaN and for what
-/// 32 bits cannot hold, which is how an x86 processor converts. `levels` has room for a multiple of 8.
+/// Truncates each of `count` levels toward zero to 32 bits and writes the low 8 bits. A NaN and a level that
+/// 32 bits cannot hold give 0, as the conversion of x86 does. The size of `levels` must be a multiple of 8.
 inline void Truncate(const double* levels, std::size_t count, std::uint8_t* bytes) {
 #ifdef __SSE2__
   const auto four = [levels](std::size_t i) {
@@ -110,11 +110,11 @@ inline void Truncate(const double* levels, std::size_t count, std::uint8_t* byte
 #endif
 }
 
-/// Stretches an image's own range linearly to 0..255. `values` are those of the pixels of `bits`, row by row;
-/// there is at least one.
+/// Stretches the image's own range linearly to 0..255 and stores the levels in `bits`. `values` has a value
+/// for each pixel of `bits`, row by row, and at least one.
 template <class T>
 void MapToGreyLevels(const T* values, const ImageView<std::uint8_t>& bits) {
-  // Small enough for the processor's registers; bytes are widened 16 at a time.
+  // Small enough for the processor's registers. Bytes are widened 16 at a time, hence the larger batch.
   constexpr std::size_t kBatch = sizeof(T) == 1 ? 32 : 8;
   const auto width = static_cast<std::size_t>(bits.width);
   const ValueRange<T> range(values, width * static_cast<std::size_t>(bits.height));

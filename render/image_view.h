@@ -20,7 +20,7 @@ struct ImageView {
   std::int64_t pixelStride = 0;  // bytes from a pixel to its right neighbour
   std::int64_t rowStride = 0;    // bytes from a row to the one below it; negative for bottom-up rows
 
-  /// Address of the pixel at column `x` of row `y`. It need not be aligned for T.
+  /// Returns the address of the pixel at column `x` of row `y`. It need not be aligned for T.
   Byte* At(std::int32_t x, std::int32_t y) const {
     return reinterpret_cast<Byte*>(data) + y * rowStride + x * pixelStride;
   }
@@ -35,19 +35,19 @@ struct ImageView {
     std::memcpy(At(x, y), &pixel, sizeof(Pixel));
   }
 
-  /// The part of `columns` by `rows` pixels whose first pixel is at column `x` of row `y`.
+  /// Returns the part of `columns` by `rows` pixels whose first pixel is at column `x` of row `y`.
   ImageView Part(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) const {
     return {columns, rows, reinterpret_cast<T*>(At(x, y)), pixelStride, rowStride};
   }
 };
 
-/// A view of `width` by `height` pixels that lie one after the other, rows from the top.
+/// Returns a view of `width` by `height` contiguous pixels, top row first.
 template <class T>
 ImageView<T> PackedView(T* data, std::int32_t width, std::int32_t height) {
   return {width, height, data, sizeof(T), std::int64_t{width} * std::int64_t{sizeof(T)}};
 }
 
-/// The same pixels, addressed as another type.
+/// Returns a view of the same pixels as another type.
 template <class To, class From>
 ImageView<To> ViewAs(const ImageView<From>& view) {
   return {view.width, view.height, reinterpret_cast<To*>(view.data), view.pixelStride, view.rowStride};

@@ -25,13 +25,13 @@ constexpr std::array<double, 6> kPolynomial = {0x1.fffffffffff12p+0, 0x1.5555555
                                                0x1.9999962c0828ep-2, 0x1.2494381e474b9p-2,
                                                0x1.c620ee95dc85cp-3, 0x1.9192e2aa6c40cp-3};
 
-// Relative bound on the difference between the approximation and the library's logarithm: four times the
-// error of the polynomial, against which rounding is negligible. It leaves four values in a million to the
+// An upper bound of the relative difference between the approximation and the library's logarithm: four times
+// the error of the polynomial, against which rounding is negligible. Only four values in a million need the
 // library.
 constexpr double kMargin = 0x1p-43;
 
-/// Approximates a batch. `low` and `high` differ where the float nearest to the logarithm is in doubt: too
-/// close to the middle between two floats, or a value that is not a positive normal number.
+/// Approximates a batch of logarithms. `low` and `high` differ where the nearest float is in doubt: the
+/// logarithm is too close to the middle between two floats, or the value is not a positive normal number.
 __attribute__((always_inline)) inline void Approximate(const double* values, std::size_t count, float* low,
                                                        float* high) {
   // Adding 2^52 makes a small integer the mantissa of a double, which converts it without a conversion
@@ -81,7 +81,8 @@ void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* l
 
 #ifdef __x86_64__
 
-// The same body with wider vectors. Neither fuses a product and a sum, so both give the same bits.
+// Compiles the same body for wider vectors. Neither version fuses a product and a sum, so both give the same
+// bits.
 __attribute__((target("avx2"))) void LogarithmsToFloatAvx2(const double* values, std::size_t count,
                                                            float* logarithms) {
   Logarithms(values, count, logarithms);

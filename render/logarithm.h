@@ -9,11 +9,12 @@ namespace Qel::Lumetra::ShellExt {
 /// times faster. Uses AVX2 if this processor has it.
 void LogarithmsToFloat(const double* values, std::size_t count, float* logarithms);
 
-/// Its two bodies, which tests compare: for every processor, and for those with AVX2.
+/// The two implementations of LogarithmsToFloat, public for tests that compare them: for every processor, and
+/// for processors with AVX2.
 void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* logarithms);
 void LogarithmsToFloatAvx2(const double* values, std::size_t count, float* logarithms);
 
-/// Whether this processor has AVX2.
+/// Returns whether this processor has AVX2.
 bool HasAvx2();
 
 }  // namespace Qel::Lumetra::ShellExt

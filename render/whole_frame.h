@@ -1,5 +1,5 @@
-// The renderer for a frame that is in memory as a whole: the frame is its only piece. The file readers stream
-// theirs (formats/frame_reader.h) and do not need these functions.
+// Renders a frame that is in memory as a whole, as a single piece. The file readers stream their frames
+// (formats/frame_reader.h) and do not need these functions.
 #pragma once
 
 #include <windows.h>
@@ -16,7 +16,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns the bitmap that MakeFrameRenderer's renderer makes of `frame`, with its faults and exceptions.
+/// Returns the bitmap that the renderer of MakeFrameRenderer makes of `frame`, with its faults and
+/// exceptions.
 template <class Pixel>
 HBITMAP RenderThumbnail(const ImageView<const Pixel>& frame, const SIZE& request) {
   const auto renderer = MakeFrameRenderer(std::type_identity<Pixel>(), {frame.width, frame.height}, request);
@@ -29,7 +30,7 @@ HBITMAP RenderThumbnail(const ImageView<const Pixel>& frame, const SIZE& request
 }
 
 /// Returns the grey bitmap, 8 bits per pixel, of a frame of one of the eight scalar types: the box average,
-/// its own range of values stretched linearly to 0..255.
+/// with its own range of values stretched linearly to 0..255.
 template <class T>
 HBITMAP RenderGreyThumbnail(const ImageView<const T>& frame, const SIZE& request) {
   return RenderThumbnail(frame, request);
@@ -42,15 +43,15 @@ HBITMAP RenderComplexThumbnail(const ImageView<const ComplexPixel<T>>& frame, co
   return RenderThumbnail(frame, request);
 }
 
-/// Returns the bitmap, 24 bits per pixel, of the box average of each channel, values not stretched.
+/// Returns the bitmap, 24 bits per pixel, of the box average of each channel. The values are not stretched.
 template <ColourOrder kOrder>
 HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<kOrder>>& frame, const SIZE& request) {
   return RenderThumbnail(frame, request);
 }
 
 /// Writes the average of every whole block of `factor` by `factor` pixels of `source` into `target`, which
-/// has the size of the source divided by the factor and no gaps between the pixels of a row. What is left
-/// over at the right and the bottom is dropped. A factor below 1 has no blocks.
+/// has the size of the source divided by the factor and no gaps between the pixels of a row. The remainder at
+/// the right and the bottom is dropped. A factor below 1 has no blocks.
 template <class Pixel>
 void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor,
                    const ImageView<typename SamplesOf<Pixel>::Target>& target) {
@@ -60,8 +61,8 @@ void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor,
   BoxReducer<Pixel>(factor, target).Add(source.Part(0, 0, covered.width, covered.height), 0, 0);
 }
 
-/// The same for colours, each channel by itself, into the bits of a bitmap: red-first pixels have their
-/// first and third channel swapped, blue-first pixels keep their order.
+/// Averages each colour channel by itself into the bits of a bitmap: red-first pixels have their first and
+/// third channel swapped, blue-first pixels keep their order.
 template <ColourOrder kOrder>
 void DownsampleBoxRgb(const ImageView<const ColourPixel<kOrder>>& source, std::int32_t factor,
                       const ImageView<std::uint8_t>& bits) {

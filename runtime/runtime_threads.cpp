@@ -1,32 +1,32 @@
-// What the C++ runtime in the DLL needs of POSIX threads, in place of mingw's library of that name.
+// Defines the functions of POSIX threads that the C++ runtime in the DLL needs, in place of mingw's
+// winpthreads.
 //
-// The DLL is a guest in its process: it must leave nothing there when it is unloaded, and the process may
-// load and unload it thousands of times. The library takes a thread-local slot, memory and event handles per
-// thread and an exception handler for the whole process, and gives back none but the last. The runtime uses
-// only these few of its functions, for initialisation on first use and short critical sections, and besides
-// them the thread-local state of exceptions. Defined here, they keep the library out of the DLL; using more
-// of it (std::thread, say) makes the DLL fail to link, as these would then be defined twice.
+// The DLL is a guest in its process. The process may load and unload it thousands of times, and unloading
+// must give back everything. The library allocates a thread-local slot, memory and event handles per thread
+// and an exception handler for the whole process, and frees only the last. The runtime uses just a few of its
+// functions: for initialisation on first use, for short critical sections and for the thread-local state of
+// exceptions. Defining them here keeps the library out of the DLL. Code that uses more of the library (such
+// as std::thread) makes the link fail, because these functions are then defined twice.
 #include <cxxabi.h>
 #include <pthread.h>
 #include <windows.h>
 
 #include <atomic>
 
-// Frees the memory that libstdc++ sets aside for exceptions that are thrown when there is no memory. Not
-// declared in any of its headers.
+// Frees the emergency memory that libstdc++ reserves for exceptions thrown when memory is exhausted. No
+// header of libstdc++ declares it.
 namespace __gnu_cxx {
 void __freeres();
 }
 
-// As the C++ ABI lays it down: the stack of exceptions that are handled, and how many are on their way.
+// Laid out as the C++ ABI defines it: the stack of caught exceptions, and the number of uncaught ones.
 struct abi::__cxa_eh_globals {
   void* caughtExceptions;
   unsigned int uncaughtExceptions;
 };
 
-// The module's thread-local memory: the system's loader makes a copy of it for every thread that there is or
-// comes to be, and frees them. The C runtime defines where it begins and under which number a thread finds
-// it.
+// The module's thread-local memory. The system's loader makes a copy for every present and future thread and
+// frees it. The C runtime defines where the memory begins and the index by which a thread finds its copy.
 extern "C" {
 extern char _tls_start;
 extern ULONG _tls_index;
@@ -34,8 +34,8 @@ extern ULONG _tls_index;
 
 namespace {
 
-/// One lock for everything: the runtime holds a mutex for a few instructions and never waits inside, so that
-/// sharing it costs nothing. The thread that holds it may lock it again.
+/// The one lock for everything. Sharing it costs nothing, because the runtime holds a mutex for a few
+/// instructions only and never waits while it holds one. The owning thread may lock it again.
 class RuntimeLock {
  public:
   void Lock() {
@@ -53,7 +53,7 @@ class RuntimeLock {
     ReleaseSRWLockExclusive(&lock_);
   }
 
-  /// Waits for NotifyAll with the lock, which this thread holds once, given up meanwhile.
+  /// Waits for NotifyAll. Releases the lock while it waits; this thread must hold it exactly once.
   void Wait() {
     owner_ = 0;
     depth_ = 0;
@@ -67,25 +67,25 @@ class RuntimeLock {
  private:
   SRWLOCK lock_ = SRWLOCK_INIT;
   CONDITION_VARIABLE changed_ = CONDITION_VARIABLE_INIT;
-  std::atomic<DWORD> owner_ = 0;  // a thread's id, never 0
+  std::atomic<DWORD> owner_ = 0;  // the owning thread's id, or 0 for none
   int depth_ = 0;
 };
 
 constinit RuntimeLock g_lock;
 
-/// What the runtime keeps of the exceptions of each thread, in the thread-local memory. So a throw needs
-/// neither memory nor a slot, and reaches its caller also in a process that has none left; the runtime's own
-/// way ends the process then. The compiler's thread_local would be the library's again.
+/// The runtime's exception state of each thread, in thread-local memory. A throw therefore needs neither
+/// memory nor a slot and reaches its handler even if the process has run out of both; the runtime's own
+/// implementation would end the process. The compiler's thread_local would bring the library back.
 [[gnu::section(".tls$")]] abi::__cxa_eh_globals g_exceptions{};
 
 abi::__cxa_eh_globals* ExceptionsOfThisThread() {
   char* const* copies = nullptr;
-  asm("mov %%gs:0x58, %0" : "=r"(copies));  // ThreadLocalStoragePointer in the thread's block
+  asm("mov %%gs:0x58, %0" : "=r"(copies));  // ThreadLocalStoragePointer in the thread environment block
   const auto offset = reinterpret_cast<char*>(&g_exceptions) - &_tls_start;
   return reinterpret_cast<abi::__cxa_eh_globals*>(copies[_tls_index] + offset);
 }
 
-/// Made before every other static object and so destroyed after it.
+/// Constructed before every other static object, and so destroyed after all of them.
 struct ExceptionMemory {
   ~ExceptionMemory() { __gnu_cxx::__freeres(); }
 };

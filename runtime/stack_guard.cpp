@@ -1,19 +1,20 @@
-// The number by which functions see that their stack was overrun, and what happens then, in place of the
-// compiler's library of that.
+// The stack guard, with which functions detect that their stack was overrun, and the reaction to an overrun.
+// They replace the compiler's stack protector library.
 //
-// The library asks the system's cryptography for the number, which loads further modules while the DLL itself
-// is being loaded. The loader's lock is held then, and a guest that does so can block the process. As in the
-// system's own modules, the number is mixed of what is different from load to load.
+// That library gets its random number from the system's cryptography functions, which load more modules while
+// the DLL itself is being loaded. The loader lock is held then, so this could deadlock the host process.
+// Instead, the number is mixed from values that differ from load to load, as the system's own modules do.
 #include <windows.h>
 
 #include <cstdint>
 
 extern "C" {
 
-/// Lies between a function's buffers and its return address. Random once the DLL has started.
+/// The number between a function's buffers and its return address. It is random once the DLL has started.
 std::uintptr_t __stack_chk_guard = 0xBB40E64EDA205900;
 
-/// Ends the process at once, by the system's own way for that, as nothing that the stack says can be trusted.
+/// Ends the process at once with the system's fast-fail interrupt, because nothing on the stack can be
+/// trusted.
 [[noreturn]] void __stack_chk_fail() {
   constexpr int kStackWasOverrun = 2;
   asm volatile("int $0x29" : : "c"(kStackWasOverrun));
@@ -24,7 +25,7 @@ std::uintptr_t __stack_chk_guard = 0xBB40E64EDA205900;
 
 namespace {
 
-/// Every bit of the answer depends on all bits of both numbers.
+/// Returns a number of which every bit depends on all bits of both arguments.
 std::uint64_t Mix(std::uint64_t a, std::uint64_t b) {
   std::uint64_t mixed = a * 0x9E3779B97F4A7C15 + b;
   mixed = (mixed ^ (mixed >> 30)) * 0xBF58476D1CE4E5B9;
@@ -32,7 +33,8 @@ std::uint64_t Mix(std::uint64_t a, std::uint64_t b) {
   return mixed ^ (mixed >> 31);
 }
 
-/// Runs before the other static objects are made. It must not be guarded itself, as it changes the number.
+/// Sets the guard before other static objects are constructed. This function must not be guarded itself,
+/// because it changes the number.
 [[gnu::constructor(101), gnu::no_stack_protector]] void MakeGuard() {
   FILETIME time{};
   GetSystemTimeAsFileTime(&time);
@@ -43,7 +45,7 @@ std::uint64_t Mix(std::uint64_t a, std::uint64_t b) {
   number = Mix(number, (std::uint64_t{GetCurrentProcessId()} << 32) | GetCurrentThreadId());
   number = Mix(number, reinterpret_cast<std::uintptr_t>(&__stack_chk_guard));
   number = Mix(number, reinterpret_cast<std::uintptr_t>(&ticks));
-  // A text that overruns ends at the zero.
+  // The zero byte stops an overrunning string function.
   __stack_chk_guard = number & ~std::uint64_t{0xFF};
 }
 

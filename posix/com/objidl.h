@@ -1,6 +1,6 @@
-// Stand-in for the platform's header of COM interfaces: the byte stream, which core reads through and tests
-// implement, and the making of objects of registered classes, of which there are none. Layouts and results
-// are the platform's own.
+// Stand-in for the Windows header of COM interfaces: the byte stream, which core reads and tests implement,
+// and the creation of objects of registered classes, which always fails because no class is registered.
+// Layouts and results are those of Windows.
 #pragma once
 
 #include <unknwn.h>

@@ -1,4 +1,4 @@
-// Stand-in for the header of Windows for locks between threads.
+// Stand-in for the Windows header of thread synchronisation.
 #pragma once
 
 #include <windows.h>
@@ -9,11 +9,12 @@ struct CRITICAL_SECTION {
   void* mutex;
 };
 
-/// Fails only without memory.
+/// Returns FALSE without memory.
 BOOL InitializeCriticalSectionAndSpinCount(CRITICAL_SECTION* section, DWORD spinCount);
 void EnterCriticalSection(CRITICAL_SECTION* section);
 void LeaveCriticalSection(CRITICAL_SECTION* section);
 void DeleteCriticalSection(CRITICAL_SECTION* section);
 
-/// Returns the error of a critical section that could not be made. Nothing else is asked for its error.
+/// Always returns ERROR_NOT_ENOUGH_MEMORY, the only error of the only function whose error is queried,
+/// InitializeCriticalSectionAndSpinCount.
 DWORD GetLastError();

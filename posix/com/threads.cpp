@@ -1,4 +1,4 @@
-// Critical sections, and pointers that are stored in another form than they are used in.
+// Implements critical sections and encoded pointers.
 #include <synchapi.h>
 #include <utilapiset.h>
 
@@ -12,7 +12,7 @@ std::recursive_mutex& Mutex(CRITICAL_SECTION* section) {
   return *static_cast<std::recursive_mutex*>(section->mutex);
 }
 
-/// Its own inverse.
+/// Encodes or decodes a pointer; the function is its own inverse.
 void* Recode(void* pointer) {
   return reinterpret_cast<void*>(~reinterpret_cast<std::uintptr_t>(pointer));
 }

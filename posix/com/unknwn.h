@@ -1,5 +1,4 @@
-// Stand-in for the platform's header of the interfaces that all of COM rests on, and of the identifiers of
-// classes and interfaces.
+// Stand-in for the Windows header of IUnknown, IClassFactory and the identifiers of classes and interfaces.
 #pragma once
 
 #include <windows.h>
@@ -47,7 +46,7 @@ struct IClassFactory : IUnknown {
 inline constexpr IID IID_IUnknown = {0, 0, 0, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
 inline constexpr IID IID_IClassFactory = {1, 0, 0, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
 
-/// The identifiers that the platform's compilers keep with the types.
+/// The identifiers that compilers for Windows attach to the interface types.
 template <class Interface>
 inline constexpr IID kUuidOf{};
 template <>

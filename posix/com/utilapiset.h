@@ -1,4 +1,4 @@
-// Stand-in for the header of Windows for pointers that are stored in another form than they are used in.
+// Stand-in for the Windows header of encoded pointers.
 #pragma once
 
 void* EncodePointer(void* pointer);
