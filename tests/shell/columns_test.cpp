@@ -34,14 +34,14 @@ class Columns : public ServerTest {
     return provider_->GetItemData(&column, &item, value);
   }
 
-  /// The value of a column that is there.
+  /// Returns the value of a column that has one.
   Value Read(const std::filesystem::path& file, const PROPERTYKEY& column) {
     VARIANT value{};
     EXPECT_EQ(GetData(file, column, &value), S_OK);
     return TakeValue(value);
   }
 
-  /// Expects no answer, and nothing written.
+  /// Expects S_FALSE and an unchanged result.
   void ExpectNone(const std::filesystem::path& file, const PROPERTYKEY& column) {
     VARIANT value{};
     value.vt = VT_I4;
@@ -51,7 +51,7 @@ class Columns : public ServerTest {
   }
 };
 
-TEST_F(Columns, AreSix) {
+TEST_F(Columns, ThereAreSix) {
   const struct {
     PROPERTYKEY key;
     VARTYPE type;
@@ -79,7 +79,7 @@ TEST_F(Columns, AreSix) {
   }
 }
 
-TEST_F(Columns, EndBehindTheSixth) {
+TEST_F(Columns, EndAfterTheSixth) {
   for (const DWORD index : {DWORD{6}, DWORD{7}, DWORD{0x80000000}, DWORD{0xFFFFFFFF}}) {
     SHCOLUMNINFO info;
     SHCOLUMNINFO untouched;
@@ -156,7 +156,7 @@ TEST_F(Columns, OfEmi) {
   EXPECT_EQ(Read(file, kCommentsKey), Text(VT_BSTR, L"VRA EMI File"));
 }
 
-TEST_F(Columns, AnswerTheResolutionWithTheSizeInPixels) {
+TEST_F(Columns, GiveTheSizeInPixelsAsTheResolution) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{.nx = 512, .ny = 256}.Bytes());
   EXPECT_EQ(Read(file, {kImageSummary, 5}), Number(VT_I4, 512));
   EXPECT_EQ(Read(file, {kImageSummary, 6}), Number(VT_I4, 256));
@@ -187,14 +187,14 @@ TEST_F(Columns, AreEmptyForAFileThatIsNotValid) {
   }
 }
 
-TEST_F(Columns, AreEmptyForAFileThatIsNotThere) {
+TEST_F(Columns, AreEmptyForAMissingFile) {
   for (const PROPERTYKEY& key : kAllKeys) {
     ExpectNone(L"C:\\no such folder\\image.mrc", key);
     ExpectNone(L"", key);
   }
 }
 
-TEST_F(Columns, NeedNoFileThatWasLoadedAndIgnoreOneThatWas) {
+TEST_F(Columns, NeedNoLoadedFileAndIgnoreOne) {
   const auto loaded = folder_.Write(L"loaded.mrc", MrcFile{.nx = 8, .ny = 8}.Bytes());
   const auto asked = folder_.Write(L"asked.mrc", MrcFile{.nx = 5, .ny = 3}.Bytes());
   EXPECT_EQ(Read(asked, kDimensionsKey), Text(VT_BSTR, L"5 x 3"));
@@ -202,7 +202,7 @@ TEST_F(Columns, NeedNoFileThatWasLoadedAndIgnoreOneThatWas) {
   EXPECT_EQ(Read(asked, kDimensionsKey), Text(VT_BSTR, L"5 x 3"));
 }
 
-TEST_F(Columns, OpenTheFileAfreshAtEveryCall) {
+TEST_F(Columns, OpenTheFileInEveryCall) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{.nx = 5, .ny = 3}.Bytes());
   EXPECT_EQ(Read(file, kWidthKey), Number(VT_I4, 5));
   folder_.Write(L"image.mrc", MrcFile{.nx = 6, .ny = 3}.Bytes());
@@ -216,7 +216,7 @@ TEST_F(Columns, LeaveTheFileClosed) {
   EXPECT_TRUE(IsUnused(file));
 }
 
-TEST_F(Columns, ReadAFileThatAnotherProgramWrites) {
+TEST_F(Columns, ReadAFileThatAnotherProgramIsWriting) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{.nx = 5}.Bytes());
   const HANDLE writer =
       CreateFileW(file.c_str(), GENERIC_READ | GENERIC_WRITE,
@@ -226,7 +226,7 @@ TEST_F(Columns, ReadAFileThatAnotherProgramWrites) {
   CloseHandle(writer);
 }
 
-TEST_F(Columns, ReplaceWhatTheResultHeld) {
+TEST_F(Columns, ReplaceThePreviousResult) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{.nx = 5}.Bytes());
   VARIANT value{};
   value.vt = VT_BSTR;
@@ -245,7 +245,7 @@ TEST_F(Columns, ReportAResultThatCannotBeCleared) {
   EXPECT_EQ(value.vt, 0x7777);
 }
 
-TEST_F(Columns, NeedAPlaceForAnAnswerOnly) {
+TEST_F(Columns, NeedAnOutputPointerForAnAnswerOnly) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{}.Bytes());
   for (const PROPERTYKEY& key : kAllKeys) EXPECT_EQ(GetData(file, key, nullptr), E_POINTER);
   EXPECT_EQ(GetData(file, {kImageSummary, 8}, nullptr), S_FALSE);
@@ -259,14 +259,14 @@ TEST_F(Columns, SurviveNullArguments) {
   EXPECT_EQ(provider_->GetColumnInfo(6, nullptr), S_FALSE);
   EXPECT_EQ(provider_->GetItemData(nullptr, &item, &value), E_POINTER);
   EXPECT_EQ(provider_->GetItemData(&kWidthKey, nullptr, &value), E_POINTER);
-  // For the properties of another set there is no need to look at a file.
+  // The answer for a property of another set does not depend on the file.
   const PROPERTYKEY other{kOtherSet, 3};
   EXPECT_EQ(provider_->GetItemData(&other, nullptr, nullptr), S_FALSE);
 }
 
-TEST_F(Columns, ReadAPathThatFillsItsRoomWithoutATerminator) {
+TEST_F(Columns, ReadAPathThatFillsItsArrayWithoutATerminator) {
   SHCOLUMNDATA item;
-  std::memset(&item, 0x5A, sizeof item);  // whatever comes after the path, too
+  std::memset(&item, 0x5A, sizeof item);  // the fields after the path too
   std::wstring path = L"\\\\?\\" + folder_.path().wstring() + L"\\";
   path.append(std::size(item.wszFile) - path.size() - 4, L'x').append(L".mrc");
   ASSERT_EQ(path.copy(item.wszFile, std::wstring::npos), std::size(item.wszFile));
@@ -284,8 +284,8 @@ TEST_F(Columns, ReadAPathThatFillsItsRoomWithoutATerminator) {
   DeleteFileW(path.c_str());
 }
 
-TEST_F(Columns, LetAReadersExceptionsPassAndLeaveTheFileClosed) {
-  // A text outside of every object.
+TEST_F(Columns, LetAReadersExceptionsThroughAndCloseTheFile) {
+  // The parser throws because of a string outside every object.
   const auto emi = folder_.Write(L"image.emi", EmiFile{.items = EmiText(0x0100, "text") + EmiEnd()}.Bytes());
   VARIANT value{};
   EXPECT_THROW(GetData(emi, kWidthKey, &value), std::invalid_argument);

@@ -1,4 +1,4 @@
-// How often the DLL opens a file of which no picture is requested, and how much it reads of it.
+// Counts how often the DLL opens a file and how much it reads, for requests that need no picture.
 #include <gtest/gtest.h>
 #include <io.h>
 #include <windows.h>
@@ -43,7 +43,7 @@ int CountedRead(int file, void* bytes, unsigned int count) {
 
 class FileUseTest : public ServerTest {
  protected:
-  /// Files whose pixels take many times the bytes of their header.
+  /// Returns files with many more bytes of pixels than of header.
   std::vector<std::filesystem::path> Files() const {
     const std::string pixels(64 * 1024, 'p');
     return {folder_.Write(L"a.mrc", MrcFile{.nx = 256, .ny = 256, .mode = 0, .pixels = pixels}.Bytes()),
@@ -51,7 +51,7 @@ class FileUseTest : public ServerTest {
             folder_.Write(L"a.ebn", EbnFile{.width = 256, .height = 256, .afterHeader = pixels}.Bytes())};
   }
 
-  /// Expects that `work` opens a file once and fills the buffer of a stream once.
+  /// Expects that `work` opens one file and fills the stream's buffer once.
   template <class Work>
   static void ExpectOneHeaderRead(const Work& work) {
     g_use = {};

@@ -43,7 +43,7 @@ class InfoTip : public ServerTest {
     return text;
   }
 
-  /// The tip of a file that is moved away once it has been loaded, so that only its contents can tell.
+  /// Returns the tip of a file that has been renamed after Load, so that only its contents appear.
   std::wstring TipOfContents(const std::filesystem::path& name, const std::string& bytes) {
     const std::filesystem::path file = folder_.Write(name, bytes);
     const Object object = Load(file);
@@ -51,7 +51,7 @@ class InfoTip : public ServerTest {
     return TipOf(object);
   }
 
-  /// What the tip of a file that is not acceptable comes to.
+  /// Returns the result of GetInfoTip for an object without a valid file. The output pointer must not change.
   static HRESULT Refusal(const Object& object) {
     wchar_t untouched[] = L"untouched";
     wchar_t* tip = untouched;
@@ -69,7 +69,7 @@ std::wstring SizeText(LONGLONG bytes) {
   return text.data();
 }
 
-/// Sets the time of the file's last change, and returns it as the user would read it.
+/// Sets the time of the file's last change, in UTC. Returns it in the user's format and time zone.
 std::wstring SetChangeTime(const std::filesystem::path& file, WORD year, WORD month, WORD day, WORD hour,
                            WORD minute) {
   SYSTEMTIME utc{};
@@ -133,7 +133,7 @@ TEST_F(InfoTip, CountsTheImagesOfAStackOnly) {
             L"Dimensions: 1234567 images (1 \u00D7 1) 8 bit unsigned\r\nType: ");
 }
 
-TEST_F(InfoTip, TellsWhatTheContentsOfEveryKindSay) {
+TEST_F(InfoTip, ShowsTheContentsOfEveryKind) {
   EXPECT_EQ(TipOfContents(L"stack.ali", MrcFile{.nx = 5, .labels = {"tilt"}}.Bytes()),
             L"Dimensions: (5 \u00D7 1) 8 bit unsigned\r\nType: \r\ntilt");
   EXPECT_EQ(TipOfContents(L"volume.REC", MrcFile{.ny = 5, .mode = 16}.Bytes()),
@@ -161,7 +161,7 @@ TEST_F(InfoTip, LeavesOutTheFileSystemsLinesForAFileThatIsGone) {
   const Object object = Load(file);
   ASSERT_TRUE(DeleteFileW(file.c_str()));
   const std::wstring tip = TipOf(object);
-  // Until its last handle is closed, the file may still be seen in its folder.
+  // The file remains visible in its folder until its last handle is closed.
   if (GetFileAttributesW(file.c_str()) == INVALID_FILE_ATTRIBUTES) {
     EXPECT_EQ(tip, L"Dimensions: (1 \u00D7 1) 8 bit unsigned\r\nType: \r\nlabel");
   } else {
@@ -208,7 +208,7 @@ TEST_F(InfoTip, IsRefusedWhenTheReaderHasThrown) {
   EXPECT_EQ(Refusal(object), E_FAIL);
 }
 
-TEST_F(InfoTip, SurvivesNullPlacesForItsAnswers) {
+TEST_F(InfoTip, RejectsNullOutputPointers) {
   const Object object = Load(folder_.Write(L"image.mrc", MrcFile{}.Bytes()));
   EXPECT_EQ(object->GetInfoTip(QITIPF_DEFAULT, nullptr), E_POINTER);
   EXPECT_EQ(object->GetInfoFlags(nullptr), E_POINTER);

@@ -40,7 +40,7 @@ class PropertySet : public ServerTest {
     EXPECT_EQ(As<IPersistFile>(object, IID_IPersistFile)->Load(file.c_str(), STGM_READ), S_OK);
   }
 
-  /// The sets of a file with a comment of two lines.
+  /// Returns the property sets of a file with a comment of two lines.
   Sets MakeLoaded() {
     Sets sets = Make();
     Load(sets,
@@ -74,7 +74,7 @@ class PropertySet : public ServerTest {
     return TakeValue(value);
   }
 
-  /// The ids that the enumerator has left to give.
+  /// Returns the ids that the enumerator has not returned yet.
   static std::vector<PROPID> Ids(const Properties& list) {
     std::vector<PROPID> ids;
     STATPROPSTG element{};
@@ -130,7 +130,7 @@ TEST_F(PropertySet, IsTheSameObjectAtEveryOpen) {
   EXPECT_NE(Open(sets, kSummary).Get(), Open(sets, kImageSummary).Get());
 }
 
-TEST_F(PropertySet, IsOpenedInEveryMode) {
+TEST_F(PropertySet, CanBeOpenedInEveryMode) {
   const Sets sets = MakeLoaded();
   for (const DWORD mode : {DWORD{0}, DWORD{STGM_READWRITE | STGM_SHARE_EXCLUSIVE}, DWORD{0xFFFFFFFF}}) {
     Storage storage;
@@ -138,7 +138,7 @@ TEST_F(PropertySet, IsOpenedInEveryMode) {
   }
 }
 
-TEST_F(PropertySet, AnswersNoOtherInterface) {
+TEST_F(PropertySet, HasNoOtherInterface) {
   const Storage storage = Open(MakeLoaded(), kSummary);
   EXPECT_EQ(As<IUnknown>(storage, IID_IPropertyStorage).Get(), storage.Get());
   for (const IID& iid : {IID_IPropertySetStorage, IID_IEnumSTATPROPSTG, IID_IPersist}) {
@@ -188,7 +188,7 @@ TEST_F(PropertySet, IsNotFoundByAnotherFormatId) {
   }
 }
 
-TEST_F(PropertySet, NeedsAPlaceForTheAnswer) {
+TEST_F(PropertySet, NeedsAnOutputPointer) {
   const Sets sets = MakeLoaded();
   EXPECT_EQ(sets->Open(kSummary, STGM_READ, nullptr), E_POINTER);
   EXPECT_EQ(sets->Enum(nullptr), E_POINTER);
@@ -196,7 +196,7 @@ TEST_F(PropertySet, NeedsAPlaceForTheAnswer) {
   EXPECT_EQ(ListSets(sets)->Clone(nullptr), E_POINTER);
 }
 
-TEST_F(PropertySet, IsNeitherCreatedNorDeleted) {
+TEST_F(PropertySet, CannotBeCreatedOrDeleted) {
   for (const Sets& sets : {Make(), MakeLoaded()}) {
     Storage storage;
     EXPECT_EQ(sets->Create(kOtherSet, nullptr, PROPSETFLAG_DEFAULT, STGM_CREATE, storage.Put()),
@@ -232,7 +232,7 @@ TEST_F(PropertySet, RefusesEveryChangeNameAndStatistic) {
   EXPECT_EQ(Ids(ListProperties(storage)), kImageIds);
 }
 
-TEST_F(PropertySet, ReadsSeveralPropertiesInTheOrderAskedFor) {
+TEST_F(PropertySet, ReadsSeveralPropertiesInTheRequestedOrder) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   const PROPSPEC specifiers[] = {ById(13), ById(3), ById(3), ById(12)};
   PROPVARIANT values[4] = {};
@@ -253,7 +253,7 @@ TEST_F(PropertySet, GivesCopies) {
   EXPECT_EQ(Read(storage, 6), Text(VT_BSTR, L"one\r\ntwo"));
 }
 
-TEST_F(PropertySet, StopsAtAPropertyThatIsNotThere) {
+TEST_F(PropertySet, StopsAtAMissingProperty) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   const PROPSPEC specifiers[] = {ById(3), ById(9), ById(4)};
   PROPVARIANT values[3] = {};
@@ -294,12 +294,12 @@ TEST_F(PropertySet, AcceptsIdsOnly) {
   EXPECT_EQ(storage->ReadMultiple(1, &neither, values), STG_E_INVALIDPARAMETER);
 }
 
-TEST_F(PropertySet, SaysFalseWhenAskedForNothing) {
+TEST_F(PropertySet, ReturnsFalseForAnEmptyRequest) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   EXPECT_EQ(storage->ReadMultiple(0, nullptr, nullptr), S_FALSE);
 }
 
-TEST_F(PropertySet, NeedsAPlaceForAValueThatIsThere) {
+TEST_F(PropertySet, NeedsAnOutputPointerForAValueThatExists) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   const PROPSPEC there = ById(3);
   const PROPSPEC notThere = ById(9);
@@ -311,14 +311,14 @@ TEST_F(PropertySet, NeedsAPlaceForAValueThatIsThere) {
 TEST_F(PropertySet, IsBuiltOncePerLoad) {
   const Sets sets = MakeLoaded();
   const Storage before = Open(sets, kImageSummary);
-  // The stream of the first file is still open, so that the second file has none: the sets are gone with it.
+  // The stream is still open on the first file, so the second Load fails and there are no property sets.
   Load(sets, folder_.Write(L"second.mrc", MrcFile{}.Bytes()));
   Storage after;
   EXPECT_EQ(sets->Open(kImageSummary, STGM_READ, after.Put()), E_FAIL);
   EXPECT_EQ(Read(before, 3), Number(VT_INT, 512));
 }
 
-TEST_F(PropertySet, LeavesTheReferencesOnItsFileAsTheyWere) {
+TEST_F(PropertySet, HoldsNoReferenceOnTheObjectOfItsFile) {
   const Sets sets = MakeLoaded();
   const ULONG before = References(sets);
   {
@@ -336,7 +336,7 @@ TEST_F(PropertySet, IsListedInAscendingOrder) {
   EXPECT_EQ(ids[1], kSummary);
 }
 
-TEST_F(PropertySet, IsListedWithItsFormatIdOnlyAndTheSystemsVersionIsLeftAlone) {
+TEST_F(PropertySet, IsListedWithItsFormatIdOnlyAndAnUnchangedSystemVersion) {
   const SetList list = ListSets(MakeLoaded());
   STATPROPSETSTG elements[2];
   std::memset(elements, 0x5A, sizeof elements);
@@ -367,7 +367,7 @@ TEST_F(PropertySet, ListsItsPropertiesWithoutNames) {
   }
 }
 
-TEST_F(PropertySet, ListsTheCommentAsAText) {
+TEST_F(PropertySet, ListsTheCommentAsAString) {
   const Properties list = ListProperties(Open(MakeLoaded(), kSummary));
   STATPROPSTG elements[2] = {};
   ULONG fetched = 77;
@@ -377,10 +377,10 @@ TEST_F(PropertySet, ListsTheCommentAsAText) {
   EXPECT_EQ(elements[0].vt, VT_BSTR);
 }
 
-// What both enumerators have in common is tested with the one of properties, and once more with the one of
-// sets.
+// The enumerator of properties is tested in full, the one of sets in short: both have the same
+// implementation.
 
-TEST_F(PropertySet, NextGivesAsManyAsThereAre) {
+TEST_F(PropertySet, NextReturnsAsManyAsThereAre) {
   const Properties list = ListProperties(Open(MakeLoaded(), kImageSummary));
   STATPROPSTG elements[9] = {};
   ULONG fetched = 77;
@@ -402,7 +402,7 @@ TEST_F(PropertySet, NextGivesAsManyAsThereAre) {
   EXPECT_EQ(list->Next(0, elements, &fetched), S_OK);
 }
 
-TEST_F(PropertySet, NextNeedsNoPlaceAtTheEnd) {
+TEST_F(PropertySet, NextNeedsNoArrayAtTheEnd) {
   const Properties list = ListProperties(Open(MakeLoaded(), kSummary));
   ULONG fetched = 7;
   EXPECT_EQ(list->Skip(1), S_FALSE);
@@ -426,7 +426,7 @@ TEST_F(PropertySet, SkipGoesToTheEnd) {
   EXPECT_EQ(Ids(list), kImageIds);
 }
 
-TEST_F(PropertySet, CloneStandsAtTheBeginning) {
+TEST_F(PropertySet, CloneBeginsAtTheFirst) {
   const Properties list = ListProperties(Open(MakeLoaded(), kImageSummary));
   list->Skip(1);
   Properties clone;
@@ -435,7 +435,7 @@ TEST_F(PropertySet, CloneStandsAtTheBeginning) {
   EXPECT_TRUE(Ids(list).empty());
 }
 
-TEST_F(PropertySet, ListOfSetsSkipsResetsAndClonesAlike) {
+TEST_F(PropertySet, EnumeratorOfSetsSkipsResetsAndClonesInTheSameManner) {
   const SetList list = ListSets(MakeLoaded());
   STATPROPSETSTG elements[3] = {};
   ULONG fetched = 77;
@@ -452,7 +452,7 @@ TEST_F(PropertySet, ListOfSetsSkipsResetsAndClonesAlike) {
   EXPECT_TRUE(Ids(clone).empty());
 }
 
-TEST_F(PropertySet, ListsAreNotOneAnothersPositions) {
+TEST_F(PropertySet, EnumeratorsHaveIndependentPositions) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   const Properties first = ListProperties(storage);
   const Properties second = ListProperties(storage);
@@ -461,7 +461,7 @@ TEST_F(PropertySet, ListsAreNotOneAnothersPositions) {
   EXPECT_EQ(Ids(second), kImageIds);
 }
 
-TEST_F(PropertySet, ListsOutliveWhatTheyList) {
+TEST_F(PropertySet, EnumeratorsOutliveWhatTheyList) {
   Properties properties;
   SetList list;
   {
@@ -477,7 +477,7 @@ TEST_F(PropertySet, ListsOutliveWhatTheyList) {
   EXPECT_EQ(Ids(clone).size(), 2u);
 }
 
-TEST_F(PropertySet, ListsStayWholeWhenAnotherFileIsLoaded) {
+TEST_F(PropertySet, EnumeratorsStayCompleteWhenAnotherFileIsLoaded) {
   const Sets sets = MakeLoaded();
   const SetList list = ListSets(sets);
   STATPROPSETSTG element{};
@@ -490,7 +490,7 @@ TEST_F(PropertySet, ListsStayWholeWhenAnotherFileIsLoaded) {
   EXPECT_EQ(Ids(list).size(), 2u);
 }
 
-TEST_F(PropertySet, ListsAnswerTheirOwnInterfaceOnly) {
+TEST_F(PropertySet, EnumeratorsHaveTheirOwnInterfaceOnly) {
   const Sets sets = MakeLoaded();
   const SetList list = ListSets(sets);
   const Properties properties = ListProperties(Open(sets, kSummary));

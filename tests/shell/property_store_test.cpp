@@ -22,7 +22,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// A header with one label, and more pixels than any buffer takes with it.
+/// Returns a file with one label, and with pixels that a buffer for the header cannot hold.
 std::string MrcBytes(std::int32_t nx = 512, std::int32_t ny = 256, std::int32_t nz = 1,
                      std::int32_t mode = 0) {
   const MrcFile file{
@@ -59,14 +59,14 @@ class PropertyStore : public ServerTest {
     return handler;
   }
 
-  /// The value of `key`, which must be there.
+  /// Returns the value of `key`, which must exist.
   static Value Read(const Handler& handler, const PROPERTYKEY& key) {
     PROPVARIANT value{};
     EXPECT_EQ(handler->GetValue(key, &value), S_OK);
     return TakeValue(value);
   }
 
-  /// What GetValue answers where it fails. It must leave nothing that would have to be cleared.
+  /// Returns the failure of GetValue. The value must be empty, so that nothing has to be cleared.
   static HRESULT Refusal(const Handler& handler, const PROPERTYKEY& key) {
     PROPVARIANT value{};
     const HRESULT result = handler->GetValue(key, &value);
@@ -80,7 +80,7 @@ class PropertyStore : public ServerTest {
   }
 };
 
-TEST_F(PropertyStore, AnswersItsThreeInterfacesInOrderAndNoOther) {
+TEST_F(PropertyStore, HasItsThreeInterfacesInOrderAndNoOther) {
   const IID interfaces[] = {
       {0xB824B49D,
        0x22AC,
@@ -155,7 +155,7 @@ TEST_F(PropertyStore, WritesSizesWithoutGrouping) {
 }
 
 TEST_F(PropertyStore, GivesTheTypeDescriptionAndNotTheCommentAsComment) {
-  // Both files carry a comment of their own; the description of every kind is empty.
+  // Both files have a comment. The type description is empty for every kind.
   ScriptedStream mrc(MrcBytes());
   EXPECT_EQ(Read(Open(mrc), kCommentsKey), Text(VT_LPWSTR, L""));
   ScriptedStream ebn(EbnBytes());
@@ -189,7 +189,7 @@ TEST_F(PropertyStore, ListsSixKeysByIndex) {
   }
 }
 
-TEST_F(PropertyStore, ListsTheNullKeyBehindTheSix) {
+TEST_F(PropertyStore, ListsTheNullKeyAfterTheSix) {
   const Handler handler = Make();
   for (const DWORD index : {DWORD{6}, DWORD{7}, DWORD{0x80000000}, DWORD{0xFFFFFFFF}}) {
     PROPERTYKEY key{kOtherSet, 1};
@@ -209,12 +209,12 @@ TEST_F(PropertyStore, RefusesOtherKeys) {
   }
 }
 
-TEST_F(PropertyStore, EmptiesAllOfTheValueWithoutClearingIt) {
+TEST_F(PropertyStore, ZeroesTheWholeValueWithoutClearingIt) {
   ScriptedStream stream(MrcBytes());
   const Handler handler = Open(stream);
   const char zeros[sizeof(PROPVARIANT)] = {};
   PROPVARIANT value;
-  // Were this cleared as a value, the pointer in it would be freed.
+  // Clearing this as a value would free the invalid pointer in it.
   std::memset(&value, 0x5A, sizeof value);
   value.vt = VT_LPWSTR;
   EXPECT_EQ(handler->GetValue({kOtherSet, 3}, &value), E_UNEXPECTED);
@@ -236,7 +236,7 @@ TEST_F(PropertyStore, RefusesEveryValueBeforeItIsInitializedAndWritesNothing) {
   }
 }
 
-TEST_F(PropertyStore, RefusesEveryValueOfAFileThatIsNotAcceptable) {
+TEST_F(PropertyStore, RefusesEveryValueOfAnInvalidFile) {
   ScriptedStream wrong(MrcFile{.nx = 0}.Bytes());
   EXPECT_EQ(Refusal(Open(wrong), kWidthKey), E_FAIL);
   ScriptedStream shortHeader(MrcBytes().substr(0, 1023));
@@ -248,7 +248,7 @@ TEST_F(PropertyStore, RefusesEveryValueOfAFileThatIsNotAcceptable) {
   }
 }
 
-TEST_F(PropertyStore, TakesANullStreamForAnEmptyOne) {
+TEST_F(PropertyStore, TreatsANullStreamAsEmpty) {
   for (const CLSID& clsid : {kMrcHandlerClass, kEbnHandlerClass, kRawHandlerClass}) {
     const Handler handler = Make(clsid);
     Initialize(handler, nullptr);
@@ -257,7 +257,7 @@ TEST_F(PropertyStore, TakesANullStreamForAnEmptyOne) {
   }
 }
 
-TEST_F(PropertyStore, SurvivesNullPlacesForItsAnswers) {
+TEST_F(PropertyStore, RejectsNullOutputPointers) {
   ScriptedStream stream(MrcBytes());
   const Handler handler = Open(stream);
   EXPECT_EQ(handler->GetCount(nullptr), E_POINTER);
@@ -293,7 +293,7 @@ TEST_F(PropertyStore, HoldsOneReferenceOnItsStream) {
   EXPECT_EQ(stream.references, 1u);
 }
 
-TEST_F(PropertyStore, TurnsToAnotherStream) {
+TEST_F(PropertyStore, SwitchesToAnotherStream) {
   ScriptedStream first(MrcBytes(512, 256));
   ScriptedStream second(MrcBytes(64, 32));
   const Handler handler = Open(first);
@@ -303,8 +303,8 @@ TEST_F(PropertyStore, TurnsToAnotherStream) {
   EXPECT_EQ(Read(handler, kDimensionsKey), Text(VT_LPWSTR, L"(64 x 32) 8 bit unsigned"));
 }
 
-TEST_F(PropertyStore, ReadsTheSameStreamOnFromWhereItStands) {
-  // The header was read to its last byte and no further, so the second one is the next.
+TEST_F(PropertyStore, ContinuesAtThePositionOfTheSameStream) {
+  // The first header is read to its last byte and no further, so the second header follows.
   MrcFile first{.nx = 512, .ny = 256};
   MrcFile second{.nx = 64, .ny = 32};
   ScriptedStream stream(first.Bytes() + second.Bytes());
@@ -349,7 +349,7 @@ TEST_F(PropertyStore, ReadsTheHeaderAndNothingElse) {
   }
 }
 
-TEST_F(PropertyStore, ReadsAStreamThatGivesOneByteAtATime) {
+TEST_F(PropertyStore, ReadsAStreamThatReturnsOneByteAtATime) {
   ScriptedStream mrc(MrcBytes());
   mrc.maxPerRead = 1;
   EXPECT_EQ(Read(Open(mrc), kWidthKey), Number(VT_UI4, 512));
@@ -368,7 +368,7 @@ TEST_F(PropertyStore, NeedsEveryReadOfTheHeader) {
   const struct {
     CLSID clsid;
     std::string bytes;
-    int reads;  // of one byte each
+    int reads;  // one byte each
   } kinds[] = {{kMrcHandlerClass, MrcBytes(), 1024},
                {kEbnHandlerClass, EbnBytes(), 54},
                {kRawHandlerClass, RawBytes(), 49}};
@@ -383,20 +383,20 @@ TEST_F(PropertyStore, NeedsEveryReadOfTheHeader) {
   }
 }
 
-TEST_F(PropertyStore, TakesBytesThatComeWithFalse) {
+TEST_F(PropertyStore, AcceptsBytesThatComeWithFalse) {
   ScriptedStream stream(MrcBytes());
   stream.readResult = S_FALSE;
   stream.maxPerRead = 100;
   EXPECT_EQ(Read(Open(stream), kWidthKey), Number(VT_UI4, 512));
 }
 
-TEST_F(PropertyStore, EndsWhereAStreamSaysFalse) {
+TEST_F(PropertyStore, EndsWhenAStreamReturnsFalse) {
   ScriptedStream stream(MrcBytes().substr(0, 1000));
   stream.endResult = S_FALSE;
   EXPECT_EQ(ReadWidth(Open(stream)), E_FAIL);
 }
 
-TEST_F(PropertyStore, IsSafeFromAStreamThatClaimsMoreThanItWasAsked) {
+TEST_F(PropertyStore, IsSafeFromAStreamThatClaimsMoreThanItWasAskedFor) {
   ScriptedStream stream(MrcBytes());
   stream.overclaim = 1'000'000;
   EXPECT_EQ(Read(Open(stream), kWidthKey), Number(VT_UI4, 512));

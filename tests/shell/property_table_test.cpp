@@ -17,7 +17,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// A reader that answers whatever a test wants, also what no file kind does.
+/// A reader that returns any values, including some that no file kind has.
 class FakeReader final : public FileTypeInfo {
  public:
   Size2 size{512, 256};
@@ -33,7 +33,7 @@ class FakeReader final : public FileTypeInfo {
   HBITMAP CreateThumbnail(const SIZE&) const override { throw std::logic_error("no test asks for pixels"); }
 };
 
-TEST(PropertyTable, SaysTheSameInAllViewsButForDimensionsAndComment) {
+TEST(PropertyTable, GivesTheSameInAllViewsExceptDimensionsAndComment) {
   const FakeReader reader;
   const struct {
     PROPERTYKEY key;
@@ -66,7 +66,7 @@ TEST(PropertyTable, FindsAPropertyByItsSetAndItsId) {
   }
 }
 
-TEST(PropertyTable, NamesThePropertiesAsTheRegisteredListDoes) {
+TEST(PropertyTable, NamesThePropertiesOfTheRegisteredList) {
   std::string list = "prop:";
   for (const Property& property : kProperties) {
     if (&property != kProperties.data()) list += ';';
@@ -80,14 +80,14 @@ TEST(PropertyTable, NamesThePropertiesAsTheRegisteredListDoes) {
   }
 }
 
-TEST(PropertyTable, WritesNegativeNumbersAsTheyAre) {
+TEST(PropertyTable, WritesNegativeNumbersUnchanged) {
   FakeReader reader;
   reader.size = {-2, std::numeric_limits<std::int32_t>::min()};
   EXPECT_EQ(FindProperty(kWidthKey)->value(reader), Metadatum(-2));
   EXPECT_EQ(FindProperty(kDimensionsKey)->value(reader), Metadatum(L"-2 x -2147483648"));
 }
 
-/// The first line of the tip of a file that is not there.
+/// Returns the first line of the tip of a file that does not exist.
 std::wstring FirstLine(const FileTypeInfo& reader) {
   wchar_t* tip = nullptr;
   EXPECT_EQ(MakeInfoTip(reader, L"Z:\\no such file", &tip), S_OK);

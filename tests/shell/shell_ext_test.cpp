@@ -23,7 +23,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// The interfaces in the order of their places in the object.
+/// The interfaces in the order of their vtable pointers in the object.
 const IID kInterfaces[] = {
     {0xBB2E617C, 0x0920, 0x11D1, {0x9A, 0x0B, 0x00, 0xC0, 0x4F, 0xC2, 0xD6, 0xC1}},  // IExtractImage
     {0x0000010B, 0x0000, 0x0000, {0xC0, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x46}},  // IPersistFile
@@ -34,7 +34,7 @@ const IID kInterfaces[] = {
 
 const HBITMAP kUntouched = reinterpret_cast<HBITMAP>(0x1234);
 
-/// An object of the class as the shell holds it.
+/// An object of the class, with the interfaces that the tests use.
 struct ShellExt {
   explicit ShellExt(const ServerDll& dll)
       : image(dll.CreateInstance<IExtractImage>(kShellExtClass, IID_IExtractImage)),
@@ -51,7 +51,7 @@ struct ShellExt {
   ComPtr<IPersistFile> file;
 };
 
-/// A file of one section whose bytes are all the same.
+/// Returns a file of one section whose pixel bytes are all the same.
 std::string OneSectionMrc(std::int32_t width, std::int32_t height, std::int32_t mode = 0,
                           std::size_t bytesPerPixel = 1) {
   MrcFile file;
@@ -64,7 +64,8 @@ std::string OneSectionMrc(std::int32_t width, std::int32_t height, std::int32_t 
 
 class ShellExtObject : public ServerTest {
  protected:
-  /// The size of the thumbnail of an 8-bit frame of the given size.
+  /// Returns the size of the thumbnail that Extract makes of an 8-bit frame of this size. A null `request`
+  /// leaves out GetLocation.
   SIZE ThumbnailSize(std::int32_t width, std::int32_t height, const SIZE* request) {
     const ShellExt object(dll_);
     EXPECT_EQ(object.Load(folder_.Write("frame.mrc", OneSectionMrc(width, height))), S_OK);
@@ -77,7 +78,7 @@ class ShellExtObject : public ServerTest {
     return {pixels.width, pixels.height};
   }
 
-  /// What Extract makes of a file that has no thumbnail, without touching the caller's handle.
+  /// Returns the failure of Extract for a file without a thumbnail. It must not change the caller's handle.
   HRESULT RefusedExtract(const std::filesystem::path& path) {
     const ShellExt object(dll_);
     EXPECT_EQ(object.Load(path), S_OK);
@@ -90,7 +91,7 @@ class ShellExtObject : public ServerTest {
   TempFolder folder_;
 };
 
-TEST_F(ShellExtObject, AnswersItsFiveInterfacesWithOneIdentity) {
+TEST_F(ShellExtObject, HasItsFiveInterfacesWithOneIdentity) {
   for (const IID& from : kInterfaces) {
     const auto answer = dll_.CreateInstance<IUnknown>(kShellExtClass, from);
     const auto identity = As<IUnknown>(answer, IID_IUnknown);
@@ -168,8 +169,9 @@ TEST_F(ShellExtObject, GetLocationRequiresSizeAndFlags) {
   EXPECT_EQ(object.image->GetLocation(nullptr, 0, nullptr, &size, 24, nullptr), E_POINTER);
 }
 
-// A frame is reduced by the largest whole factor that leaves it no smaller than the request in one of its
-// dimensions: the factor becomes 2 exactly at twice the request.
+// A frame is reduced by the largest whole factor that does not make it smaller than the request in both
+// dimensions: the
+// factor becomes 2 exactly at twice the request.
 
 TEST_F(ShellExtObject, ExtractsAtTheSizeOfGetLocation) {
   const SIZE request{256, 96};
@@ -186,7 +188,7 @@ TEST_F(ShellExtObject, ExtractsAt128By128WithoutGetLocation) {
   EXPECT_EQ(ThumbnailSize(2, 256, nullptr).cy, 128);
 }
 
-TEST_F(ShellExtObject, ExtractsAtTheSizeOfTheLastGetLocationAsOftenAsAsked) {
+TEST_F(ShellExtObject, ExtractsAtTheSizeOfTheLastGetLocationEveryTime) {
   const ShellExt object(dll_);
   ASSERT_EQ(object.GetLocation({4, 4}), S_OK);
   ASSERT_EQ(object.Load(folder_.Write("grid.mrc", OneSectionMrc(32, 16))), S_OK);
@@ -200,7 +202,7 @@ TEST_F(ShellExtObject, ExtractsAtTheSizeOfTheLastGetLocationAsOftenAsAsked) {
   }
 }
 
-TEST_F(ShellExtObject, ExtractRequiresAPlaceForTheBitmap) {
+TEST_F(ShellExtObject, ExtractRequiresAnOutputPointer) {
   const ShellExt object(dll_);
   EXPECT_EQ(object.image->Extract(nullptr), E_POINTER);
   ASSERT_EQ(object.Load(folder_.Write("grid.mrc", OneSectionMrc(3, 2))), S_OK);
@@ -218,7 +220,7 @@ TEST_F(ShellExtObject, LoadsAMissingFileAndExtractFails) {
   EXPECT_EQ(RefusedExtract(folder_.path() / "missing.mrc"), E_FAIL);
 }
 
-TEST_F(ShellExtObject, LoadsAFileOfNoKnownKindAndExtractFails) {
+TEST_F(ShellExtObject, LoadsAFileOfAnUnknownKindAndExtractFails) {
   EXPECT_EQ(RefusedExtract(folder_.Write("grid.mrc2", OneSectionMrc(3, 2))), E_FAIL);
   EXPECT_EQ(RefusedExtract(folder_.Write("grid", OneSectionMrc(3, 2))), E_FAIL);
   EXPECT_EQ(RefusedExtract(folder_.Write("v1.2/noext", OneSectionMrc(3, 2))), E_FAIL);
@@ -247,7 +249,7 @@ TEST_F(ShellExtObject, ExtractWritesNullWhenThePixelsCannotBeRead) {
   EXPECT_EQ(bitmap, nullptr);
 }
 
-TEST_F(ShellExtObject, TakesTheExtensionInAnyCaseAndThePathInAnyLetters) {
+TEST_F(ShellExtObject, AcceptsExtensionsInAnyCaseAndPathsWithAnyCharacters) {
   const ShellExt object(dll_);
   ASSERT_EQ(object.Load(folder_.Write(L"Gitter \u00e4\u03a9\u4e2d.v2/grid.MRC", OneSectionMrc(3, 2))), S_OK);
   HBITMAP bitmap = nullptr;
@@ -284,7 +286,7 @@ TEST_F(ShellExtObject, ASecondLoadDestroysTheFirstReader) {
     const ProcessCensus census = ProcessCensus::Take();
     return std::pair(census.heapBlocks, census.heapBytes);
   };
-  heapUseAfter(2);  // what the system keeps, it takes now
+  heapUseAfter(2);  // the system makes its permanent allocations now
   const auto before = heapUseAfter(1);
   EXPECT_EQ(heapUseAfter(200), before);
 }
@@ -298,7 +300,7 @@ TEST_F(ShellExtObject, OpensAFileAfterOneThatIsMissing) {
   EXPECT_EQ(TakeBitmap(bitmap).width, 3);
 }
 
-TEST_F(ShellExtObject, KeepsTheFileOpenAndSharedUntilItGoes) {
+TEST_F(ShellExtObject, KeepsTheFileOpenAndSharedUntilItIsDestroyed) {
   const auto path = folder_.Write("grid.mrc", OneSectionMrc(3, 2));
   const auto open = [&path](DWORD access, DWORD share) {
     const HANDLE file = CreateFileW(path.c_str(), access, share, nullptr, OPEN_EXISTING, 0, nullptr);
@@ -316,7 +318,7 @@ TEST_F(ShellExtObject, KeepsTheFileOpenAndSharedUntilItGoes) {
   EXPECT_TRUE(IsUnused(path));
 }
 
-TEST_F(ShellExtObject, HasNothingElseOfIPersistFile) {
+TEST_F(ShellExtObject, ImplementsNothingElseOfIPersistFile) {
   const ShellExt object(dll_);
   ASSERT_EQ(object.Load(folder_.Write("grid.mrc", OneSectionMrc(3, 2))), S_OK);
   CLSID clsid = IID_IStream;

@@ -1,4 +1,5 @@
-// What the objects make of the system's answers, failures among them: the DLL's own calls are answered here.
+// How the objects handle the system's results, failures included. Replacements of the DLL's imports supply
+// the results.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -28,7 +29,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-constexpr HRESULT kFailure = STG_E_MEDIUMFULL;  // that nothing else here answers
+constexpr HRESULT kFailure = STG_E_MEDIUMFULL;  // a result of nothing else here
 
 class SystemAnswers : public ServerTest {
  protected:
@@ -41,7 +42,7 @@ class SystemAnswers : public ServerTest {
     return object;
   }
 
-  /// A file of 1024 bytes with a comment.
+  /// Loads a file of 1024 bytes with a comment.
   Object LoadImage() { return Load(L"image.mrc", MrcFile{.labels = {"label"}}.Bytes()); }
 
   static std::wstring TipOf(const Object& object) {
@@ -68,9 +69,9 @@ class SystemAnswers : public ServerTest {
   TempFolder folder_;
 };
 
-// Texts of the string table.
+// Strings of the string table.
 
-/// A table that describes the file kinds.
+/// A string table that also has the descriptions of the file kinds.
 int WINAPI DescribingTable(HINSTANCE module, UINT id, LPWSTR buffer, int room) {
   EXPECT_EQ(room, 256);
   if (id >= 200 && id <= 209) return LoadStringW(module, id, buffer, room);
@@ -81,7 +82,7 @@ int WINAPI EmptyTable(HINSTANCE, UINT, LPWSTR, int) {
   return 0;
 }
 
-TEST_F(SystemAnswers, DescriptionIsTheStringOfTheFilesKind) {
+TEST_F(SystemAnswers, DescriptionIsTheStringOfTheFileKind) {
   SerFile ser;
   ser.elements.resize(1);
   const struct {
@@ -126,7 +127,7 @@ TEST_F(SystemAnswers, CommentOfAPropertyStoreIsTheDescription) {
   }
 }
 
-TEST_F(SystemAnswers, TextsThatAreMissingAreEmpty) {
+TEST_F(SystemAnswers, MissingStringsAreEmpty) {
   const auto table = Answer("LoadStringW", &EmptyTable);
   const auto attributes = Answer(
       "GetFileAttributesExW", +[](LPCWSTR, GET_FILEEX_INFO_LEVELS, LPVOID) -> BOOL WINAPI { return FALSE; });
@@ -136,7 +137,7 @@ TEST_F(SystemAnswers, TextsThatAreMissingAreEmpty) {
   EXPECT_STREQ(info.wszTitle, L"");
 }
 
-/// Fills the buffer.
+/// Fills the buffer completely.
 int WINAPI LongTexts(HINSTANCE, UINT, LPWSTR buffer, int room) {
   std::wmemset(buffer, L'x', static_cast<std::size_t>(room) - 1);
   buffer[room - 1] = L'\0';
@@ -151,7 +152,7 @@ TEST_F(SystemAnswers, TitleOfAColumnIsCutAt80CharactersWithItsTerminator) {
   EXPECT_EQ(std::wstring(info.wszTitle), std::wstring(79, L'x'));
 }
 
-// The lines of a tip that come from the system.
+// The lines of a tip whose values come from the system.
 
 constexpr wchar_t kFirstLines[] = L"Dimensions: (1 \u00D7 1) 8 bit unsigned\r\nType: ";
 constexpr wchar_t kDateLine[] = L"\r\nDate Modified: date time";
@@ -234,7 +235,7 @@ TEST_F(SystemsLines, AreTheLocalTimeAndTheLowHalfOfTheSize) {
   EXPECT_EQ(g_size, 0xFFFFFFF0);
 }
 
-TEST_F(SystemsLines, ShowUtcWhereTheLocalTimeIsNotKnown) {
+TEST_F(SystemsLines, ShowUtcWhenTheLocalTimeIsUnknown) {
   const auto local = Answer(
       "SystemTimeToTzSpecificLocalTime",
       +[](const TIME_ZONE_INFORMATION*, LPSYSTEMTIME, LPSYSTEMTIME time) -> BOOL WINAPI {
@@ -246,7 +247,7 @@ TEST_F(SystemsLines, ShowUtcWhereTheLocalTimeIsNotKnown) {
   EXPECT_EQ(g_shownTime.wYear, 2021);
 }
 
-TEST_F(SystemsLines, LeaveTheDateOutWhereAnyStepToItFails) {
+TEST_F(SystemsLines, LeaveOutTheDateWhenAnyOfItsStepsFails) {
   const std::wstring expected = std::wstring(kFirstLines) + kSizeLine + kCommentLine;
   {
     const auto system =
@@ -260,27 +261,27 @@ TEST_F(SystemsLines, LeaveTheDateOutWhereAnyStepToItFails) {
   }
 }
 
-TEST_F(SystemsLines, SurviveADateThatFillsItsRoom) {
+TEST_F(SystemsLines, ShowADateThatFillsItsBuffer) {
   g_date = std::wstring(255, L'd');
   EXPECT_EQ(TipOf(object_),
             std::wstring(kFirstLines) + L"\r\nDate Modified: " + g_date + L" " + kSizeLine + kCommentLine);
 }
 
-TEST_F(SystemsLines, LeaveTheSizeOutWhereItCannotBeFormatted) {
+TEST_F(SystemsLines, LeaveOutTheSizeWhenItCannotBeFormatted) {
   const auto size =
       Answer("StrFormatByteSizeW", +[](LONGLONG, LPWSTR, UINT) -> LPWSTR WINAPI { return nullptr; });
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kDateLine + kCommentLine);
 }
 
-TEST_F(SystemsLines, AreLeftOutWhereTheFileCannotBeSeen) {
+TEST_F(SystemsLines, AreLeftOutWhenTheFileIsNotVisible) {
   const auto attributes = Answer(
       "GetFileAttributesExW", +[](LPCWSTR, GET_FILEEX_INFO_LEVELS, LPVOID) -> BOOL WINAPI { return FALSE; });
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kCommentLine);
 }
 
-// The memory of a tip.
+// The memory for a tip.
 
-/// The shell's allocator without any memory.
+/// The shell's allocator, without memory.
 class ExhaustedAllocator final : public IMalloc {
  public:
   ULONG references = 1;
@@ -312,7 +313,7 @@ TEST_F(SystemAnswers, TipNeedsAnAllocator) {
   EXPECT_EQ(RefusedTip(Load(L"invalid.mrc", MrcFile{.nx = 0}.Bytes())), E_FAIL);
 }
 
-TEST_F(SystemAnswers, TipNeedsMemoryForItsTextAndTheNullBehindIt) {
+TEST_F(SystemAnswers, TipNeedsMemoryForItsTextAndItsTerminator) {
   const Object object = LoadImage();
   const std::size_t length = TipOf(object).size();
   const auto exhausted = Answer(
@@ -326,13 +327,13 @@ TEST_F(SystemAnswers, TipNeedsMemoryForItsTextAndTheNullBehindIt) {
   EXPECT_EQ(g_allocator.references, 1u);
 }
 
-// The memory of values.
+// The memory for values.
 
 BSTR WINAPI NoText(const OLECHAR*) {
   return nullptr;
 }
 
-TEST_F(SystemAnswers, ColumnsNeedMemoryForTheirTexts) {
+TEST_F(SystemAnswers, ColumnsNeedMemoryForTheirStrings) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{}.Bytes());
   const auto columns = dll_.CreateInstance<IColumnProvider>(kShellExtClass, IID_IColumnProvider);
   SHCOLUMNDATA item{};
@@ -343,7 +344,7 @@ TEST_F(SystemAnswers, ColumnsNeedMemoryForTheirTexts) {
     value.vt = VT_I4;
     value.lVal = 7;
     EXPECT_EQ(columns->GetItemData(&key, &item, &value), E_OUTOFMEMORY);
-    EXPECT_EQ(TakeValue(value), Number(VT_I4, 7));  // as it was
+    EXPECT_EQ(TakeValue(value), Number(VT_I4, 7));  // unchanged
   }
 }
 
@@ -406,7 +407,7 @@ TEST_F(SystemAnswers, ReadingPropertiesStopsAtTheFirstCopyThatFails) {
   EXPECT_EQ(TakeValue(values[1]), Value());
 }
 
-TEST_F(SystemAnswers, EnumeratorThatCannotBeMadeIsNull) {
+TEST_F(SystemAnswers, EnumeratorIsNullWithoutMemory) {
   const auto sets = As<IPropertySetStorage>(LoadImage(), IID_IPropertySetStorage);
   ComPtr<IPropertyStorage> storage;
   ASSERT_EQ(sets->Open(kImageSummary, STGM_READ, storage.Put()), S_OK);
@@ -420,7 +421,7 @@ TEST_F(SystemAnswers, EnumeratorThatCannotBeMadeIsNull) {
   EXPECT_EQ(list, nullptr);
 }
 
-TEST_F(SystemAnswers, PropertyStoreIsEmptyHandedWithoutMemoryForAText) {
+TEST_F(SystemAnswers, PropertyStoreGivesAnEmptyValueWithoutMemoryForAString) {
   ScriptedStream stream(MrcFile{}.Bytes());
   const auto store = dll_.CreateInstance<IPropertyStore>(kMrcHandlerClass, IID_IPropertyStore);
   As<IInitializeWithStream>(store, IID_IInitializeWithStream)->Initialize(&stream, STGM_READ);
@@ -454,7 +455,7 @@ HBITMAP WINAPI NoBitmap(HDC dc, const BITMAPINFO* info, UINT usage, void** bits,
   return nullptr;
 }
 
-TEST_F(SystemAnswers, ThereIsNoThumbnailWithoutABitmap) {
+TEST_F(SystemAnswers, ThereIsNoThumbnailWhenTheBitmapCannotBeCreated) {
   const MrcFile grey{.nx = 5, .ny = 3, .pixels = std::string(15, 'p')};
   const MrcFile colour{.nx = 5, .ny = 3, .mode = 16, .pixels = std::string(45, 'p')};
   const auto none = Answer("CreateDIBSection", &NoBitmap);
