@@ -1,4 +1,4 @@
-// Programs that a test runs.
+// Runs programs for tests.
 #pragma once
 
 #include <cstdint>
@@ -8,9 +8,9 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Runs a program to its end and returns its exit status. Arguments may hold anything but double quotes and
-/// must not end in a backslash. Throws std::runtime_error if the program cannot be started or does not end
-/// within a minute.
+/// Runs a program and returns its exit status. The arguments must not contain double quotes or end in a
+/// backslash. Throws
+/// std::runtime_error if the program cannot be started or does not end within a minute.
 std::uint32_t RunProcess(const std::filesystem::path& program, const std::vector<std::wstring>& arguments);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

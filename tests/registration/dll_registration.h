@@ -1,4 +1,4 @@
-// The registration entry points of the built DLL, loaded from wherever a test has put it.
+// The registration entry points of the built DLL, loaded from any path.
 #pragma once
 
 #include <windows.h>

@@ -1,9 +1,10 @@
-// Registers or unregisters the built DLL in the private registry of another process, and dies without a word
-// before a given change.
+// Registers or unregisters the built DLL in the private registry of another process, and terminates itself
+// before a given
+// change.
 //
 //   dying_registration register|unregister REGISTRY CHANGES
 //
-// Exits with 0 if the change was never reached, with 1 if the DLL failed, and with 3 if it died.
+// Exits with 0 if it never reached the change, with 1 if the DLL failed, and with 3 if it terminated itself.
 #include <windows.h>
 
 #include <cstdlib>

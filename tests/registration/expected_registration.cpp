@@ -25,8 +25,9 @@ struct PropertyHandler {
   std::wstring wowApprovedName;
 };
 
-// HKCR\CLSID and HKLM\Software\Classes\CLSID are one place, and the second copy of a class key replaces the
-// first: so the title of the .mrc class is the one of the later copies.
+// HKCR\CLSID and HKLM\Software\Classes\CLSID are the same key. The scripts write each class key twice, and
+// the second
+// copy replaces the first, so the title of the .mrc class is that of the second copy.
 const PropertyHandler kPropertyHandlers[] = {
     {L".ebn", L"{E37DEDA9-F652-401B-B619-A1A88EADD003}", L"QEL .EBN Image Property Handler",
      L"QelShellExtVistaEbn", L"QelShellExtVistaEbn"},
@@ -92,7 +93,7 @@ RegistryContents ExpectedAfterUnregistering() {
   AddKey(all, kClasses + L"\\CLSID");
   AddKey(all, kWowClasses + L"\\CLSID");
 
-  // A key named CLSID is never deleted, so neither are the ProgIDs around one.
+  // A key named CLSID is never deleted, so the ProgID keys that contain one remain.
   AddKey(all, kClasses + L"\\QEL.ShellExt.1", {{L"", L"QelShellExt Class"}});
   AddKey(all, kClasses + L"\\QEL.ShellExt.1\\CLSID", {{L"", kShellExt}});
   AddKey(all, kClasses + L"\\QEL.ShellExt", {{L"", L"QelShellExt Class"}});

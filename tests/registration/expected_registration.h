@@ -1,4 +1,4 @@
-// What the machine's registry holds of the server, as tables.
+// The expected contents of the machine's registry.
 #pragma once
 
 #include <string>
@@ -7,11 +7,11 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Everything that registering the DLL at `path` makes of an empty registry whose HKCR is
-/// HKLM\Software\Classes.
+/// Returns what an empty registry, whose HKCR is HKLM\Software\Classes, contains after the DLL at `path` is
+/// registered.
 RegistryContents ExpectedAfterRegistering(const std::wstring& path);
 
-/// What is left of it after unregistering.
+/// Returns what it contains after the DLL has been unregistered again.
 RegistryContents ExpectedAfterUnregistering();
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

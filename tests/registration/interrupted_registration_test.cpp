@@ -1,5 +1,6 @@
-// A registration that fails or dies, at every single one of its changes of the registry, and what the next
-// one makes of it.
+// Makes a registration fail or die at each of its changes of the registry, and checks that the next
+// registration or
+// unregistration repairs the result.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -20,15 +21,16 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// How often the DLL told the shell of a change.
+/// How often the DLL has notified the shell.
 int g_notifications = 0;
 
 void WINAPI CountNotification(LONG, UINT, const void*, const void*) {
   ++g_notifications;
 }
 
-/// A call that can be abandoned, as every call is in a process that is killed: nothing more of it runs, no
-/// destructor either, and what it has open stays open. It has a stack of its own, which then goes.
+/// A call that can be abandoned, as if its process were killed: no more of its code runs, not even a
+/// destructor, and its
+/// handles stay open. It runs on a fiber of its own, whose stack is freed afterwards.
 class AbandonableCall {
  public:
   explicit AbandonableCall(std::function<void()> call)
@@ -44,15 +46,15 @@ class AbandonableCall {
   AbandonableCall(const AbandonableCall&) = delete;
   AbandonableCall& operator=(const AbandonableCall&) = delete;
 
-  /// Returns whether the call has come to its end.
+  /// Returns whether the call has returned.
   bool Run() {
     const LCID locale = GetThreadLocale();
     SwitchToFiber(fiber_);
-    SetThreadLocale(locale);  // which goes with a process
+    SetThreadLocale(locale);  // a killed process would lose the call's locale
     return isDone_;
   }
 
-  /// For the call itself. Does not return.
+  /// Ends the call from inside. Does not return.
   void Abandon() { SwitchToFiber(caller_); }
 
  private:
@@ -75,8 +77,8 @@ class InterruptedRegistration : public ::testing::Test {
 
   enum class End { kFailure, kDeath };
 
-  /// Interrupts a registration at every change, twice: to be cleaned up by unregistering, and to be repaired
-  /// by registering again.
+  /// Interrupts a registration at every change, twice: first unregistering must clean up after it, then
+  /// registering again must repair it.
   void InterruptEveryRegistration(End end) {
     const std::size_t changes = CountChanges(&DllRegistration::Register);
     ASSERT_GT(changes, 250u);
@@ -110,7 +112,7 @@ class InterruptedRegistration : public ::testing::Test {
     return writes.count();
   }
 
-  /// Calls `entryPoint`, whose change `number`, counted from 0, is its end: no further one comes after it.
+  /// Calls `entryPoint` and ends it at the change with index `number`. No further change may follow.
   void Interrupt(End end, EntryPoint entryPoint, std::size_t number) {
     AbandonableCall call([&] { EXPECT_EQ((server_.*entryPoint)(), E_ACCESSDENIED); });
     const RegistryWrites writes(server_.module(), [&](std::size_t change) -> LSTATUS {
@@ -136,19 +138,19 @@ class InterruptedRegistration : public ::testing::Test {
   const ImportPatch notify_{server_.module(), "SHChangeNotify", &CountNotification};
 };
 
-TEST_F(InterruptedRegistration, ThatFailedIsRepairedOrCleanedUp) {
+TEST_F(InterruptedRegistration, IsRepairedOrCleanedUpAfterAFailure) {
   InterruptEveryRegistration(End::kFailure);
 }
 
-TEST_F(InterruptedRegistration, ThatDiedIsRepairedOrCleanedUp) {
+TEST_F(InterruptedRegistration, IsRepairedOrCleanedUpAfterADeath) {
   InterruptEveryRegistration(End::kDeath);
 }
 
-TEST_F(InterruptedRegistration, UnregisteringCompletesOneThatFailed) {
+TEST_F(InterruptedRegistration, IsCompletedByUnregisteringAfterAFailure) {
   InterruptEveryUnregistration(End::kFailure);
 }
 
-TEST_F(InterruptedRegistration, UnregisteringCompletesOneThatDied) {
+TEST_F(InterruptedRegistration, IsCompletedByUnregisteringAfterADeath) {
   InterruptEveryUnregistration(End::kDeath);
 }
 

@@ -15,7 +15,7 @@ namespace {
 constexpr wchar_t kServerKey[] =
     L"Software\\Classes\\CLSID\\{79E696A1-2FA5-4B3E-9610-D5F760417E62}\\InprocServer32";
 
-/// The DLL that is registered, or an empty path.
+/// Returns the path of the registered DLL, or an empty path.
 std::filesystem::path RegisteredDll() {
   std::array<wchar_t, 1024> path{};
   DWORD size = sizeof path;
@@ -27,14 +27,14 @@ std::filesystem::path RegisteredDll() {
 }  // namespace
 
 std::string WhyNotToRegister() {
-  if (!IsUserAnAdmin()) return "Registering the extension takes an administrator.";
+  if (!IsUserAnAdmin()) return "Only an administrator can register the extension.";
   const std::filesystem::path registered = RegisteredDll();
   std::error_code ignored;
   if (!std::filesystem::exists(registered, ignored) ||
       std::filesystem::equivalent(registered, ServerDll::Path(), ignored)) {
     return {};
   }
-  return "The extension is installed on this computer, and would have to be removed first.";
+  return "The extension is installed on this computer. Uninstall it first.";
 }
 
 OthersRegistrations::OthersRegistrations() {

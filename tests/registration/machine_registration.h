@@ -1,4 +1,5 @@
-// What a test has to mind that registers the DLL on the machine it runs on, which may be somebody's.
+// Protects the machine's own registrations from a test that registers the DLL, as the machine may be a
+// user's.
 #pragma once
 
 #include <windows.h>
@@ -8,12 +9,14 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Says in a sentence why the DLL must not be registered on this machine, because that takes an administrator
-/// or another copy of it is registered. Empty if it may be.
+/// Returns a sentence that says why the DLL must not be registered on this machine: the user is not an
+/// administrator, or
+/// another copy of the DLL is registered. Returns an empty string if it may be registered.
 std::string WhyNotToRegister();
 
-/// Keeps what others have registered in the values that registering the DLL replaces, and puts it back when
-/// this goes. Made before the DLL is registered.
+/// Saves the values of other programs that registering the DLL replaces, and restores them when it is
+/// destroyed. Must be
+/// made before the DLL is registered.
 class OthersRegistrations {
  public:
   OthersRegistrations();

@@ -6,7 +6,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-// What is below a key sorts between the key's path with a backslash and with the character that follows it.
+// The keys below a key sort between its path followed by a backslash and its path followed by this character.
 constexpr wchar_t kAfterBackslash = L'\\' + 1;
 
 std::wstring Lower(std::wstring text) {

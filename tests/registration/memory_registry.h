@@ -1,5 +1,6 @@
-// A registry in memory, for tests of what scripts do: names compare without regard to case and keep the case
-// that they were made with, and any change can be made to fail.
+// A registry in memory, for tests of the registry scripts. It ignores the case of names but preserves it, and
+// can make any
+// change fail.
 #pragma once
 
 #include <cstddef>
@@ -16,7 +17,7 @@ namespace Qel::Lumetra::ShellExt::Testing {
 class MemoryRegistry final : public RegistryStore {
  public:
   enum class ClassesRoot {
-    kApart,         ///< HKCR is a place of its own, which shows what was written through it
+    kApart,         ///< HKCR is separate, so that tests see what was written through it
     kWithinMachine  ///< HKCR is HKLM\Software\Classes, as on a machine
   };
   explicit MemoryRegistry(ClassesRoot classesRoot = ClassesRoot::kApart) : classesRoot_(classesRoot) {}
@@ -30,7 +31,7 @@ class MemoryRegistry final : public RegistryStore {
 
   RegistryContents Contents() const;
 
-  /// After so many further changes every change fails with E_ACCESSDENIED and does nothing.
+  /// Makes every change after the next `changes` changes fail with E_ACCESSDENIED and do nothing.
   void FailAfter(std::size_t changes) { changesLeft_ = changes; }
   void NeverFail() { changesLeft_.reset(); }
 
@@ -41,9 +42,9 @@ class MemoryRegistry final : public RegistryStore {
   };
   struct Key {
     std::wstring path;
-    std::map<std::wstring, Value> values;  // by their name in lower case
+    std::map<std::wstring, Value> values;  // by name, in lower case
   };
-  using Keys = std::map<std::wstring, Key>;  // by their path in lower case
+  using Keys = std::map<std::wstring, Key>;  // by path, in lower case
 
   std::wstring FullPath(RegistryRoot root, const std::wstring& path) const;
   Keys::iterator Find(RegistryRoot root, const std::wstring& path);

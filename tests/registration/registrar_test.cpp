@@ -25,7 +25,7 @@ class Registrar : public ::testing::Test {
   HRESULT Register(std::string_view script) { return Run(script, ScriptDirection::kRegister); }
   HRESULT Unregister(std::string_view script) { return Run(script, ScriptDirection::kUnregister); }
 
-  /// A key in HKCR with its default value and those named.
+  /// Makes a key in HKCR with the values `values`, where L"" is the default value.
   void Have(const std::wstring& path, std::initializer_list<const wchar_t*> values = {}) {
     ASSERT_EQ(registry_.CreateKey(kClassesRoot, path), S_OK);
     for (const std::wstring name : values) {
@@ -33,7 +33,7 @@ class Registrar : public ::testing::Test {
     }
   }
 
-  /// The lines of what is in HKCR, without that.
+  /// Returns the lines of HKCR without the prefix HKCR\.
   RegistryContents Contents() const {
     RegistryContents below;
     for (const std::wstring& line : registry_.Contents()) {
@@ -70,7 +70,7 @@ TEST_F(Registrar, RegisteringKeepsWhatIsInAnUnmarkedOrNoRemoveKey) {
                                           L"B : x = s 'foreign'"}));
 }
 
-TEST_F(Registrar, RegisteringMakesAForceRemoveKeyAnew) {
+TEST_F(Registrar, RegisteringReplacesAForceRemoveKey) {
   Have(L"A\\Stale\\Deeper", {L"x"});
   Have(L"A", {L"", L"x"});
   Have(L"AB");
@@ -78,14 +78,14 @@ TEST_F(Registrar, RegisteringMakesAForceRemoveKeyAnew) {
   EXPECT_EQ(Contents(), (RegistryContents{L"a", L"a : B = d 1", L"AB"}));
 }
 
-TEST_F(Registrar, UnregisteringDeletesAForceRemoveKeyWithAllItHolds) {
+TEST_F(Registrar, UnregisteringDeletesAForceRemoveKeyWithItsContents) {
   Have(L"A\\Foreign", {L"x"});
   Have(L"B");
   ASSERT_EQ(Unregister("HKCR { ForceRemove A { C } }"), S_OK);
   EXPECT_EQ(Contents(), (RegistryContents{L"B"}));
 }
 
-TEST_F(Registrar, UnregisteringTakesOnlyWhatIsNamedFromANoRemoveKey) {
+TEST_F(Registrar, UnregisteringDeletesOnlyWhatTheScriptNamesInANoRemoveKey) {
   Have(L"A", {L"", L"ours", L"x"});
   Have(L"A\\Ours");
   Have(L"A\\Foreign");
@@ -94,13 +94,13 @@ TEST_F(Registrar, UnregisteringTakesOnlyWhatIsNamedFromANoRemoveKey) {
             (RegistryContents{L"A", L"A : @ = s 'foreign'", L"A : x = s 'foreign'", L"A\\Foreign"}));
 }
 
-TEST_F(Registrar, UnregisteringDeletesUnmarkedKeysFromTheInsideOut) {
+TEST_F(Registrar, UnregisteringDeletesUnmarkedKeysFromTheBottomUp) {
   Have(L"A\\B\\C", {L""});
   ASSERT_EQ(Unregister("HKCR { A { B { C = s 'text' } } }"), S_OK);
   EXPECT_EQ(Contents(), RegistryContents{});
 }
 
-TEST_F(Registrar, AnUnmarkedKeySurvivesUnregisteringWhileSomethingIsLeftInIt) {
+TEST_F(Registrar, UnregisteringKeepsAnUnmarkedKeyThatIsNotEmpty) {
   Have(L"HasSubkey\\Foreign");
   Have(L"HasValue", {L"x"});
   Have(L"HasDefault", {L""});
@@ -109,7 +109,7 @@ TEST_F(Registrar, AnUnmarkedKeySurvivesUnregisteringWhileSomethingIsLeftInIt) {
   EXPECT_EQ(Contents(), before);
 }
 
-TEST_F(Registrar, UnregisteringMakesNothing) {
+TEST_F(Registrar, UnregisteringCreatesNothing) {
   ASSERT_EQ(Unregister("HKCR { NoRemove A { val B = s 'text' ForceRemove C D { val E = d '1' } } }"), S_OK);
   EXPECT_EQ(registry_.Contents(), RegistryContents{});
 }
@@ -135,7 +135,7 @@ TEST_F(Registrar, NeverDeletesAKeyThatManyProgramsShare) {
   }
 }
 
-TEST_F(Registrar, RefusesATextThatIsNoScriptBeforeAnyChange) {
+TEST_F(Registrar, RefusesAnInvalidScriptBeforeAnyChange) {
   Have(L"A\\B");
   const RegistryContents before = Contents();
   for (const char* broken : {"HKCR { ForceRemove A C", "HKCR { ForceRemove A C = s '%UNKNOWN%' }"}) {
@@ -154,13 +154,13 @@ TEST_F(Registrar, StopsAtTheFirstFailureAndReturnsIt) {
   EXPECT_EQ(Contents(), (RegistryContents{L"A", L"A : @ = s 'text'"}));
 }
 
-/// The scripts that the module carries, on a registry in memory.
+/// Runs the module's own scripts on a registry in memory.
 class CarriedScripts : public ::testing::Test {
  protected:
-  /// In the order of registration.
+  /// The scripts in the order of registration.
   static inline const std::vector<std::string> kRunByRegistration = {"module", "shell_ext", "ebn", "raw",
                                                                      "mrc"};
-  /// In the order of unregistration.
+  /// The scripts in the order of unregistration.
   static inline const std::vector<std::string> kRunByUnregistration = {"shell_ext", "ebn", "raw", "mrc",
                                                                        "module"};
   static inline const std::wstring kPath = L"C:\\QelShellExt.DLL";
@@ -195,19 +195,19 @@ class CarriedScripts : public ::testing::Test {
   MemoryRegistry machine_{MemoryRegistry::ClassesRoot::kWithinMachine};
 };
 
-TEST_F(CarriedScripts, WriteWhatTheMachineIsToLookLike) {
+TEST_F(CarriedScripts, WriteTheExpectedRegistration) {
   ASSERT_EQ(Register(machine_), S_OK);
   EXPECT_TRUE(Testing::Same(machine_.Contents(), Testing::ExpectedAfterRegistering(kPath)));
 }
 
-TEST_F(CarriedScripts, LeaveOnlyWhatOthersMayShare) {
+TEST_F(CarriedScripts, LeaveOnlyTheKeysThatOthersMayShare) {
   ASSERT_EQ(Register(machine_), S_OK);
   ASSERT_EQ(Unregister(machine_), S_OK);
   EXPECT_TRUE(Testing::Same(machine_.Contents(), Testing::ExpectedAfterUnregistering()));
 }
 
-TEST_F(CarriedScripts, OneTitleIsOddInTheFirstCopyOfItsClass) {
-  MemoryRegistry registry;  // keeps what was written through HKCR apart
+TEST_F(CarriedScripts, OneTitleDiffersInTheFirstCopyOfItsClass) {
+  MemoryRegistry registry;  // keeps HKCR separate from HKLM
   ASSERT_EQ(Run({"mrc"}, ScriptDirection::kRegister, registry), S_OK);
   const RegistryContents contents = registry.Contents();
   const std::wstring key = L"\\CLSID\\{ADF28042-3A9F-4409-9C62-444B018A7810} : @ = s '";
@@ -271,7 +271,7 @@ const std::vector<PropertyHandler>& PropertyHandlers() {
   return handlers;
 }
 
-TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
+TEST_F(CarriedScripts, EveryPropertyHandlerScriptHasTheSameStructure) {
   const std::wstring properties =
       L"prop:System.Image.HorizontalSize;System.Image.VerticalSize;System.Image.BitDepth;"
       L"System.Media.FrameCount;System.Image.Dimensions;System.Comment";
@@ -305,7 +305,7 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptIsOfOneShape) {
   }
 }
 
-TEST_F(CarriedScripts, EveryPropertyHandlerScriptTakesAwayWhatIsItsOwnAndNothingElse) {
+TEST_F(CarriedScripts, EveryPropertyHandlerScriptRemovesItsOwnEntriesAndNothingElse) {
   for (const PropertyHandler& handler : PropertyHandlers()) {
     MemoryRegistry registry;
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
@@ -325,7 +325,7 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptTakesAwayWhatIsItsOwnAndNothing
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kUnregister, registry), S_OK);
     EXPECT_TRUE(Testing::Same(registry.Contents(), expected)) << handler.script;
 
-    // The key of the extension's handler stays when another program has a value in it.
+    // The extension's key remains when another program has a value in it.
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
     const std::wstring key =
         L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\" +
@@ -369,8 +369,9 @@ TEST_F(CarriedScripts, UnregisteringAgainCompletesAnUnregistrationThatFailedAtAn
     result = Unregister(registry);
     registry.NeverFail();
     ASSERT_EQ(Unregister(registry), S_OK);
-    // The first run stops at the keys of the approved list because other scripts have values there; once all
-    // of those are gone, a further run takes the keys along, as no mark keeps them.
+    // The first run stops at the keys of the approved list, because the values of later scripts are still
+    // there. Once all of these values are gone, another run deletes the keys, as they are not marked
+    // NoRemove.
     const RegistryContents atMost = Testing::ExpectedAfterUnregistering();
     RegistryContents atLeast = atMost;
     const std::wstring approved = L"HKLM\\Software\\Microsoft\\Windows\\CurrentVersion\\Shell Extensions";

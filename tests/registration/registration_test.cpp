@@ -1,4 +1,4 @@
-// Registration as the built DLL does it, in a registry of the test's own.
+// Tests how the built DLL registers itself, in a private registry.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -26,7 +26,7 @@ namespace {
 
 constexpr LCID kOtherLocale = MAKELCID(MAKELANGID(LANG_GERMAN, SUBLANG_GERMAN), SORT_DEFAULT);
 
-/// Notifications that the DLL sent to the shell.
+/// A notification that the DLL sent to the shell.
 struct Notification {
   LONG event;
   UINT flags;
@@ -39,7 +39,7 @@ void WINAPI RecordNotification(LONG event, UINT flags, const void* first, const 
   g_notifications.push_back({event, flags, first, second});
 }
 
-/// The locales that the DLL set for its thread.
+/// The locales that the DLL has set for its thread.
 std::vector<LCID> g_locales;
 
 BOOL WINAPI RecordLocale(LCID locale) {
@@ -47,7 +47,7 @@ BOOL WINAPI RecordLocale(LCID locale) {
   return SetThreadLocale(locale);
 }
 
-/// How often the DLL looked for a script.
+/// How often the DLL has looked for a script.
 int g_scriptSearches = 0;
 
 HRSRC WINAPI CountScriptSearch(HMODULE module, const wchar_t* name, const wchar_t* type) {
@@ -71,7 +71,7 @@ class Registration : public ::testing::Test {
     }
   }
 
-  /// Runs one of the entry points with every change, script search, locale and notification observed.
+  /// Calls an entry point and records its changes, script searches, locales and notifications.
   HRESULT Observe(HRESULT (DllRegistration::*entryPoint)() const, RegistryWrites::Decide decide) {
     const ImportPatch notify(server_.module(), "SHChangeNotify", &RecordNotification);
     const ImportPatch locale(server_.module(), "SetThreadLocale", &RecordLocale);
@@ -94,7 +94,7 @@ class Registration : public ::testing::Test {
   std::size_t writes_ = 0;
 };
 
-TEST_F(Registration, WritesExactlyWhatTheMachineIsToLookLike) {
+TEST_F(Registration, WritesExactlyTheExpectedContents) {
   ASSERT_EQ(server_.Register(), S_OK);
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
@@ -105,7 +105,7 @@ TEST_F(Registration, RegisteringTwiceIsTheSameAsOnce) {
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
 
-/// A key, with a default value and another one.
+/// Makes a key with a default value and another value.
 void Have(HKEY root, const std::wstring& path) {
   const wchar_t text[] = L"foreign";
   for (const wchar_t* value : {L"", L"Foreign"}) {
@@ -113,7 +113,7 @@ void Have(HKEY root, const std::wstring& path) {
   }
 }
 
-TEST_F(Registration, StaleSubkeysOfItsClassesAndHandlersVanish) {
+TEST_F(Registration, RegisteringRemovesStaleSubkeysOfItsClassesAndHandlers) {
   for (const wchar_t* key :
        {L"CLSID\\{79E696A1-2FA5-4B3E-9610-D5F760417E62}\\Stale\\Deeper",
         L"CLSID\\{79E696A1-2FA5-4B3E-9610-D5F760417E62}\\InprocServer32\\Stale",
@@ -130,7 +130,7 @@ TEST_F(Registration, StaleSubkeysOfItsClassesAndHandlersVanish) {
   }
 }
 
-TEST_F(Registration, UnregisteringLeavesOnlyWhatOthersMayShare) {
+TEST_F(Registration, UnregisteringLeavesOnlyTheKeysThatOthersMayShare) {
   ASSERT_EQ(server_.Register(), S_OK);
   ASSERT_EQ(server_.Unregister(), S_OK);
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterUnregistering()));
@@ -142,7 +142,7 @@ TEST_F(Registration, UnregisteringWhatWasNeverRegisteredChangesNothing) {
   EXPECT_TRUE(Same(registry_.Contents(), before));
 }
 
-TEST_F(Registration, WhatOthersHadSurvives) {
+TEST_F(Registration, KeepsTheEntriesOfOthers) {
   const std::wstring windows = L"Software\\Microsoft\\Windows\\CurrentVersion";
   const std::wstring wowWindows = L"Software\\Wow6432Node\\Microsoft\\Windows\\CurrentVersion";
   for (const std::wstring& each : {windows, wowWindows}) {
@@ -168,7 +168,7 @@ TEST_F(Registration, WhatOthersHadSurvives) {
   EXPECT_TRUE(Same(registry_.Contents(), expected));
 }
 
-TEST_F(Registration, OthersKeepAnUnmarkedKeyAlive) {
+TEST_F(Registration, KeepsAnUnmarkedKeyThatOthersUse) {
   Have(HKEY_LOCAL_MACHINE,
        L"Software\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\.ebn");
   Have(HKEY_CLASSES_ROOT, L"AppID\\Brisel.DLL");
@@ -176,12 +176,12 @@ TEST_F(Registration, OthersKeepAnUnmarkedKeyAlive) {
   ASSERT_EQ(server_.Register(), S_OK);
   ASSERT_EQ(server_.Unregister(), S_OK);
   const RegistryContents lost = Without(before, registry_.Contents());
-  // This one registration replaced.
+  // Registration has replaced this value.
   EXPECT_EQ(lost, (RegistryContents{L"HKLM\\Software\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\"
                                     L"PropertyHandlers\\.ebn : @ = s 'foreign'"}));
 }
 
-TEST_F(Registration, TellsTheShellOnceAndOnSuccessOnly) {
+TEST_F(Registration, NotifiesTheShellOnceAndOnSuccessOnly) {
   for (const auto entryPoint : {&DllRegistration::Register, &DllRegistration::Unregister}) {
     g_notifications.clear();
     ASSERT_EQ(Observe(entryPoint, Allow), S_OK);
@@ -199,7 +199,7 @@ TEST_F(Registration, TellsTheShellOnceAndOnSuccessOnly) {
   }
 }
 
-TEST_F(Registration, WorksInTheSystemsLocaleAndRestoresTheThreads) {
+TEST_F(Registration, RunsInTheSystemLocaleAndRestoresTheThreadLocale) {
   std::vector<LCID> seen;
   const auto look = [&](std::size_t) -> LSTATUS {
     seen.push_back(GetThreadLocale());
@@ -209,7 +209,7 @@ TEST_F(Registration, WorksInTheSystemsLocaleAndRestoresTheThreads) {
   ASSERT_EQ(Observe(&DllRegistration::Unregister, look), S_OK);
   ASSERT_FALSE(seen.empty());
   for (const LCID locale : seen) EXPECT_EQ(locale, GetSystemDefaultLCID());
-  // That it is restored, here and after every failure, is checked when the test ends.
+  // The destructor of the fixture checks that the locale is restored, here and after every failure.
 }
 
 TEST_F(Registration, LeavesNothingInTheProcess) {
@@ -222,7 +222,7 @@ TEST_F(Registration, LeavesNothingInTheProcess) {
     }
     return ProcessCensus::Take();
   };
-  // The system keeps something now and then, a leak leaves something in each of these rounds.
+  // The system keeps something now and then; a leak would add to every one of these rounds.
   bool isConstant = false;
   ProcessCensus before = takeAfter(2);
   for (int i = 0; i < 5 && !isConstant; ++i) {
@@ -233,7 +233,7 @@ TEST_F(Registration, LeavesNothingInTheProcess) {
   EXPECT_TRUE(isConstant);
 }
 
-TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIsSome) {
+TEST_F(Registration, ReportsALackOfMemoryAtAnyPointAndWorksOnceThereIsSome) {
   const ScarceSystem system(server_.module());
   const auto getsPast = [&](int place, ScarceSystem::Then then) {
     ScarceSystem::FailAt(place, then);
@@ -245,15 +245,16 @@ TEST_F(Registration, TellsThatMemoryRunsOutWhereverItDoesAndWorksAsSoonAsThereIs
   int places = 0;
   while (!getsPast(places, ScarceSystem::Then::kRecovers) && !HasFailure()) ++places;
   EXPECT_GT(places, 100);
-  // All that is different when no memory comes back is what happens on the way out.
+  // If memory stays exhausted, only the cleanup differs, so a sample of the places is enough.
   for (int place = 0; place < places; place += 10) getsPast(place, ScarceSystem::Then::kStaysEmpty);
   ASSERT_EQ(server_.Register(), S_OK);
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
 
-// Threads die at every change in interrupted_registration_test; that whole processes leave no more behind is
-// seen at a few.
-TEST_F(Registration, WhatAProcessLeftThatDiedIsRepairedOrCleanedUpLikewise) {
+// interrupted_registration_test ends a thread at every change. This test shows for a few changes that a
+// process that dies
+// leaves nothing more.
+TEST_F(Registration, IsRepairedOrCleanedUpAfterAProcessDied) {
   const std::filesystem::path program =
       ServerDll::Path().parent_path() / L"tests" / L"dying_registration.exe";
   const RegistryContents complete = ExpectedAfterRegistering(ServerDll::Path());
@@ -281,7 +282,7 @@ TEST_F(Registration, WhatAProcessLeftThatDiedIsRepairedOrCleanedUpLikewise) {
   EXPECT_TRUE(Same(registry_.Contents(), complete));
 }
 
-TEST_F(Registration, WritesThePathOfTheDllAsItIs) {
+TEST_F(Registration, WritesThePathOfTheDllUnchanged) {
   const TempFolder folder;
   for (const wchar_t* name :
        {L"with spaces", L"it's quoted", L"''", L"100% {braces} %MODULE%", L"\u00c4\u03a9\u0416\u4e2d"}) {
@@ -297,7 +298,7 @@ TEST_F(Registration, WritesThePathOfTheDllAsItIs) {
   }
 }
 
-/// Answers for a module whose path has `kLength` characters.
+/// Returns a module path of `kLength` characters.
 template <DWORD kLength>
 DWORD WINAPI LongModulePath(HMODULE, wchar_t* buffer, DWORD size) {
   const std::wstring path = L"C:\\" + std::wstring(kLength - 3, L'x');
@@ -324,7 +325,7 @@ TEST_F(Registration, RefusesAPathOf260CharactersBeforeItLooksForAScript) {
   EXPECT_TRUE(g_notifications.empty());
 }
 
-TEST_F(Registration, RefusesADllThatLiesTooDeep) {
+TEST_F(Registration, RefusesADllWithATooLongPath) {
   const TempFolder folder;
   std::filesystem::path deep = L"\\\\?\\" + folder.path().wstring();
   while (deep.wstring().size() < 280) deep /= std::wstring(50, L'x');
@@ -337,13 +338,13 @@ TEST_F(Registration, RefusesADllThatLiesTooDeep) {
     EXPECT_EQ(server.Unregister(), static_cast<HRESULT>(0x8007007A));
   }
   EXPECT_EQ(registry_.Contents().size(), 3u);
-  // The standard library does not delete paths of this form.
+  // std::filesystem does not delete paths with the prefix \\?\ here.
   DeleteFileW(dll.c_str());
   for (; deep.filename() != folder.path().filename(); deep = deep.parent_path())
     RemoveDirectoryW(deep.c_str());
 }
 
-TEST_F(Registration, TakesAPathOf259Characters) {
+TEST_F(Registration, AcceptsAPathOf259Characters) {
   const ImportPatch patch(server_.module(), "GetModuleFileNameW", &LongModulePath<259>);
   ASSERT_EQ(server_.Register(), S_OK);
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(L"C:\\" + std::wstring(256, L'x'))));
@@ -354,7 +355,7 @@ DWORD WINAPI NoModulePath(HMODULE, wchar_t*, DWORD) {
   return 0;
 }
 
-TEST_F(Registration, ReturnsTheFailureToFindItsOwnPath) {
+TEST_F(Registration, ReturnsAFailureToFindItsOwnPath) {
   const ImportPatch patch(server_.module(), "GetModuleFileNameW", &NoModulePath);
   for (const auto entryPoint : {&DllRegistration::Register, &DllRegistration::Unregister}) {
     EXPECT_EQ(Observe(entryPoint, Allow), HRESULT_FROM_WIN32(ERROR_INVALID_HANDLE));
@@ -362,12 +363,12 @@ TEST_F(Registration, ReturnsTheFailureToFindItsOwnPath) {
   }
 }
 
-/// Everything but script 107.
+/// Finds every script except 107.
 HRSRC WINAPI LackScript(HMODULE module, const wchar_t* name, const wchar_t* type) {
   return FindResourceW(module, name == MAKEINTRESOURCEW(107) ? MAKEINTRESOURCEW(999) : name, type);
 }
 
-TEST_F(Registration, StopsAtAScriptThatIsMissing) {
+TEST_F(Registration, StopsAtAMissingScript) {
   ASSERT_EQ(server_.Register(), S_OK);
   const RegistryContents complete = registry_.Contents();
   ASSERT_EQ(server_.Unregister(), S_OK);
@@ -376,7 +377,7 @@ TEST_F(Registration, StopsAtAScriptThatIsMissing) {
     const ImportPatch patch(server_.module(), "FindResourceW", &LackScript);
     EXPECT_EQ(server_.Register(), HRESULT_FROM_WIN32(ERROR_RESOURCE_NAME_NOT_FOUND));
   }
-  // The scripts before it stay written, those after it are not run.
+  // The entries of the earlier scripts remain. The later scripts are not run.
   RegistryContents contents = registry_.Contents();
   const std::wstring classes = L"HKLM\\Software\\Classes\\";
   EXPECT_TRUE(contents.contains(classes + L"AppID\\Brisel.DLL"));
@@ -395,11 +396,11 @@ TEST_F(Registration, StopsAtAScriptThatIsMissing) {
   EXPECT_FALSE(contents.contains(classes + L"CLSID\\{E37DEDA9-F652-401B-B619-A1A88EADD003}"));
   EXPECT_TRUE(contents.contains(classes + L"CLSID\\{E217E970-5E2E-11E1-B86C-0800200C9A66}"));
   EXPECT_TRUE(contents.contains(classes + L"CLSID\\{ADF28042-3A9F-4409-9C62-444B018A7810}"));
-  // The module's own script comes last.
+  // The module's own script runs last.
   EXPECT_TRUE(contents.contains(classes + L"AppID\\Brisel.DLL"));
 }
 
-/// A text of any length that is no script.
+/// Returns text that is not a valid script, long enough for the size of every script.
 void* WINAPI BrokenScript(HGLOBAL) {
   static std::string text(1 << 16, '{');
   return text.data();
@@ -414,7 +415,7 @@ TEST_F(Registration, RefusesAScriptThatCannotBeParsed) {
   EXPECT_TRUE(g_notifications.empty());
 }
 
-/// The script that every run finds instead of the one that it looks for.
+/// The script that every run finds instead of its own.
 std::string g_script;
 
 void* WINAPI ThatScript(HGLOBAL) {
@@ -427,7 +428,7 @@ DWORD WINAPI QuotedModulePath(HMODULE, wchar_t* buffer, DWORD) {
   return static_cast<DWORD>(std::wstring(L"C:\\it''s.dll").copy(buffer, 12));
 }
 
-TEST_F(Registration, ReplacesModuleByThePathWithEveryQuoteDoubledAndModuleRawByThePathAsItIs) {
+TEST_F(Registration, ReplacesModuleByThePathWithDoubledQuotesAndModuleRawByThePathItself) {
   g_script = "HKCR { A { val Module = s '%Module%' val Raw = s '%MODULE_RAW%' val AppId = s '%appid%' } }";
   const ImportPatch script(server_.module(), "LockResource", &ThatScript);
   const ImportPatch size(server_.module(), "SizeofResource", &SizeOfThatScript);
@@ -440,7 +441,7 @@ TEST_F(Registration, ReplacesModuleByThePathWithEveryQuoteDoubledAndModuleRawByT
   EXPECT_TRUE(contents.contains(key + L"AppId = s '{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}'"));
 }
 
-/// What the DLL asks of the registry functions, or a failure of theirs.
+/// Whether the DLL has created a volatile key or written a string without a terminator.
 bool g_createdVolatile = false;
 bool g_textWithoutNull = false;
 
@@ -457,7 +458,7 @@ LSTATUS WINAPI CheckData(HKEY key, LPCWSTR name, DWORD reserved, DWORD type, con
   return RegSetValueExW(key, name, reserved, type, data, size);
 }
 
-TEST_F(Registration, CreatesKeysThatStayAndTextsThatEndInANull) {
+TEST_F(Registration, CreatesPermanentKeysAndTerminatedStrings) {
   g_createdVolatile = g_textWithoutNull = false;
   const ImportPatch keys(server_.module(), "RegCreateKeyExW", &CheckOptions);
   const ImportPatch values(server_.module(), "RegSetValueExW", &CheckData);
@@ -466,7 +467,7 @@ TEST_F(Registration, CreatesKeysThatStayAndTextsThatEndInANull) {
   EXPECT_FALSE(g_textWithoutNull);
 }
 
-TEST_F(Registration, ReturnsTheFailureToLookIntoAKey) {
+TEST_F(Registration, ReturnsAFailureToQueryAKey) {
   ASSERT_EQ(server_.Register(), S_OK);
   const ImportPatch query(
       server_.module(), "RegQueryInfoKeyW",
@@ -475,14 +476,14 @@ TEST_F(Registration, ReturnsTheFailureToLookIntoAKey) {
   EXPECT_EQ(server_.Unregister(), E_ACCESSDENIED);
 }
 
-TEST_F(Registration, TakesAPathThatIsNotFoundForAKeyThatIsGone) {
+TEST_F(Registration, TreatsAPathThatIsNotFoundAsADeletedKey) {
   const ImportPatch tree(
       server_.module(), "RegDeleteTreeW",
       +[](HKEY, LPCWSTR) -> LSTATUS WINAPI { return ERROR_PATH_NOT_FOUND; });
   EXPECT_EQ(server_.Unregister(), S_OK);
 }
 
-TEST_F(Registration, CarriesNineScriptsInEnglish) {
+TEST_F(Registration, ContainsNineScriptsInEnglish) {
   for (int id = 101; id <= 109; ++id) {
     EXPECT_TRUE(FindResourceExW(server_.module(), L"REGISTRY", MAKEINTRESOURCEW(id), 1033)) << id;
   }

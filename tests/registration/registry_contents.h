@@ -16,14 +16,14 @@ namespace Qel::Lumetra::ShellExt::Testing {
 
 using RegistryContents = std::set<std::wstring>;
 
-/// An empty name is the default value.
+/// Returns the line of a value. An empty name means the default value.
 std::wstring ValueLine(const std::wstring& key, const std::wstring& name, const RegistryData& data);
 
-/// Adds the line of the key, of every key on the way to it, and of its values.
+/// Adds the lines of the key, of all its parent keys, and of its values.
 void AddKey(RegistryContents& contents, const std::wstring& key,
             std::initializer_list<std::pair<std::wstring, RegistryData>> values = {});
 
-/// Lines of `a` that are not in `b`.
+/// Returns the lines of `a` that are not in `b`.
 RegistryContents Without(const RegistryContents& a, const RegistryContents& b);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -47,7 +47,7 @@ void ReadValues(HKEY key, const std::wstring& path, RegistryContents& contents) 
   }
 }
 
-/// The view of 32-bit programs is made of links to keys that it shares.
+/// Returns whether a key is a link. The registry view of 32-bit programs links to the keys that it shares.
 bool IsLink(HKEY key) {
   DWORD type = REG_NONE;
   return RegQueryValueExW(key, L"SymbolicLinkValue", nullptr, &type, nullptr, nullptr) == ERROR_SUCCESS &&
@@ -78,7 +78,7 @@ RegistryContents ReadRegistry(HKEY key, const std::wstring& name) {
     const std::wstring full = path.empty() ? name : name + L'\\' + path;
     const LSTATUS status = RegOpenKeyExW(key, path.c_str(), REG_OPTION_OPEN_LINK, KEY_READ, &opened);
     if (status == ERROR_ACCESS_DENIED ||
-        status == ERROR_FILE_NOT_FOUND) {  // the system's own, or gone meanwhile
+        status == ERROR_FILE_NOT_FOUND) {  // accessible to the system only, or deleted meanwhile
       contents.insert(full);
       continue;
     }
@@ -90,7 +90,7 @@ RegistryContents ReadRegistry(HKEY key, const std::wstring& name) {
     contents.insert(full);
     ReadValues(opened, full, contents);
     for (const std::wstring& subkey : Subkeys(opened)) {
-      if (subkey == L"Perflib") continue;  // stands for performance counters, which cannot be listed
+      if (subkey == L"Perflib") continue;  // its performance counters cannot be listed
       pending.push_back(path.empty() ? subkey : path + L'\\' + subkey);
     }
     RegCloseKey(opened);

@@ -1,4 +1,4 @@
-// The registry of Windows for tests: what it holds, and one of the test's own.
+// Reads the registry of Windows, and gives a test a private one.
 #pragma once
 
 #include <windows.h>
@@ -9,18 +9,20 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Everything at and below `key`, which the lines call `name`; links to other keys are left out. Values other
-/// than strings and DWORDs are read as strings of their type and size.
+/// Returns everything in and below `key`, whose path is `name` in the lines. Links to other keys are left
+/// out. A value that
+/// is neither a string nor a DWORD is read as a string that names its type and size.
 RegistryContents ReadRegistry(HKEY key, const std::wstring& name);
 
-/// As long as this lives, the process has a HKEY_LOCAL_MACHINE of its own, whose Software\Classes is its
-/// HKEY_CLASSES_ROOT. The machine's registry is neither seen nor changed, but for a key of the user's.
+/// Gives the process a HKEY_LOCAL_MACHINE of its own while it exists. Its Software\Classes is the process's
+/// HKEY_CLASSES_ROOT. The machine's registry is neither visible nor changed, except for one key in
+/// HKEY_CURRENT_USER.
 class PrivateRegistry {
  public:
-  /// Empty at first but for Software\Classes, and deleted in the end.
+  /// Makes a registry that contains only Software\Classes. The destructor deletes it.
   PrivateRegistry();
 
-  /// The one that another process made, which is to outlive this.
+  /// Opens the registry of another process, which must outlive this object.
   explicit PrivateRegistry(std::wstring path);
 
   ~PrivateRegistry();
@@ -29,10 +31,10 @@ class PrivateRegistry {
 
   RegistryContents Contents() const { return ReadRegistry(machine_, L"HKLM"); }
 
-  /// Empty again but for Software\Classes.
+  /// Deletes everything except Software\Classes.
   void Clear();
 
-  /// Where it stands in HKEY_CURRENT_USER.
+  /// Returns its path in HKEY_CURRENT_USER.
   const std::wstring& path() const { return path_; }
 
  private:

@@ -11,11 +11,11 @@ std::optional<RegistryScript> Parse(std::string_view text, std::vector<Replaceme
   return ParseRegistryScript(text, replacements);
 }
 
-/// The only key of a script that has one.
+/// Returns the key of a script that has exactly one.
 ScriptKey ParseKey(std::string_view line, std::vector<Replacement> replacements = {}) {
   const auto script = Parse("HKCR { " + std::string(line) + " }", std::move(replacements));
   if (!script || script->size() != 1) {
-    ADD_FAILURE() << "not one key: " << line;
+    ADD_FAILURE() << "not exactly one key: " << line;
     return {};
   }
   return script->front();
@@ -25,7 +25,7 @@ bool Refuses(std::string_view text) {
   return !Parse(text).has_value();
 }
 
-/// Whether `line` is refused as a line of an otherwise sound block.
+/// Returns whether `line` is refused as a line of an otherwise valid block.
 bool RefusesLine(std::string_view line) {
   return Refuses("HKCR { Around { " + std::string(line) + " } }");
 }
@@ -45,7 +45,7 @@ TEST(RegistryScript, KeepsKeysInTheOrderOfTheTextWithTheirDepth) {
   }
 }
 
-TEST(RegistryScript, AnEmptyTextHasNoKeys) {
+TEST(RegistryScript, AnEmptyScriptHasNoKeys) {
   EXPECT_EQ(Parse("")->size(), 0u);
   EXPECT_EQ(Parse(" \t\r\n")->size(), 0u);
   EXPECT_EQ(Parse("HKLM {}")->size(), 0u);
@@ -114,7 +114,7 @@ TEST(RegistryScript, NeedsNoWhiteSpaceAroundPunctuation) {
   EXPECT_EQ(tight->front().values.at(0).data, RegistryData(1u));
 }
 
-TEST(RegistryScript, PutsReplacementsIntoNamesAndTexts) {
+TEST(RegistryScript, InsertsReplacementsIntoNamesAndStrings) {
   const std::vector<Replacement> replacements = {{L"APPID", L"{66A6}"}, {L"Module", L"C:\\it''s.dll"}};
   EXPECT_EQ(ParseKey("'%APPID%'", replacements).name, L"{66A6}");
   EXPECT_EQ(ParseKey("'x%APPID%%appid%y'", replacements).name, L"x{66A6}{66A6}y");
@@ -130,7 +130,7 @@ TEST(RegistryScript, DoesNotSearchAReplacementAgain) {
   EXPECT_EQ(ParseKey("A = s '%M%'", {{L"M", L"100%M%"}}).defaultValue, RegistryData(std::wstring(L"100%M%")));
 }
 
-TEST(RegistryScript, AReplacementMayHoldAnyLetter) {
+TEST(RegistryScript, AReplacementMayContainAnyCharacter) {
   EXPECT_EQ(ParseKey("A = s '%M%'", {{L"M", L"\u00e4\u03a9\u4e2d"}}).defaultValue,
             RegistryData(std::wstring(L"\u00e4\u03a9\u4e2d")));
 }
@@ -215,7 +215,7 @@ TEST(RegistryScript, RefusesKeysThatNestTooDeep) {
   EXPECT_TRUE(Refuses(nested(100'000)));
 }
 
-TEST(RegistryScript, EveryTruncationIsAnswered) {
+TEST(RegistryScript, HandlesEveryTruncation) {
   const std::string text = "HKCR { NoRemove A = s 'b''c' { val 'D' = d '1' E } }";
   for (std::size_t length = 1; length < text.size(); ++length) {
     EXPECT_TRUE(Refuses(text.substr(0, length))) << length;

@@ -7,7 +7,7 @@ namespace {
 
 RegistryWrites* g_current = nullptr;
 
-/// Asks, then calls the function itself.
+/// Asks the test, then calls the function unless the test makes it fail.
 template <auto kFunction, class... Arguments>
 LSTATUS WINAPI Asked(Arguments... arguments) {
   const LSTATUS answer = RegistryWrites::AskCurrent();

@@ -1,4 +1,4 @@
-// The calls by which a module changes the registry, seen and decided by a test.
+// Observes the calls by which a module changes the registry, and lets a test decide their results.
 #pragma once
 
 #include <windows.h>
@@ -11,11 +11,11 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// One at a time.
+/// Only one may exist at a time.
 class RegistryWrites {
  public:
-  /// Is asked before each change with the number of those before it; the change is made if the answer is
-  /// ERROR_SUCCESS, and fails with the answer otherwise.
+  /// Called before each change with the number of changes before it. If it returns ERROR_SUCCESS the change
+  /// is made, otherwise the change fails with that result.
   using Decide = std::function<LSTATUS(std::size_t)>;
 
   RegistryWrites(HMODULE module, Decide decide);
@@ -23,7 +23,7 @@ class RegistryWrites {
   RegistryWrites(const RegistryWrites&) = delete;
   RegistryWrites& operator=(const RegistryWrites&) = delete;
 
-  /// How many changes have been asked for.
+  /// Returns how many changes have been requested.
   std::size_t count() const { return count_; }
 
   /// Used by the replacements of the imports.

@@ -1,5 +1,6 @@
-// The built DLL through regsvr32 and COM on the machine's own registry, which under Wine is that of the
-// prefix. What others have there is left as it was.
+// Tests the built DLL through regsvr32 and COM in the machine's own registry, under Wine that of the prefix.
+// What other
+// programs have registered must not change.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -23,7 +24,7 @@ namespace {
 
 constexpr std::array kClasses = {kShellExtClass, kEbnHandlerClass, kRawHandlerClass, kMrcHandlerClass};
 
-/// The machine has its own ideas of the case of the keys that it had before.
+/// Converts to lower case, because the machine keeps the case of the keys that existed before.
 RegistryContents Folded(const RegistryContents& contents) {
   RegistryContents folded;
   for (std::wstring line : contents) {
@@ -40,7 +41,7 @@ class Regsvr32 : public ::testing::Test {
 
   void SetUp() override {
     if (const std::string reason = WhyNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
-    // Somebody may have looked at files with the registered DLL before.
+    // An earlier test may have left the DLL registered.
     ASSERT_EQ(Run({L"/s", L"/u", ServerDll::Path()}), 0u);
   }
 
@@ -50,7 +51,7 @@ class Regsvr32 : public ::testing::Test {
     return RunProcess(std::filesystem::path(system.data()) / L"regsvr32.exe", arguments);
   }
 
-  /// Of the keys below which the server has something, as Windows itself writes elsewhere at any time.
+  /// Returns the contents of the keys that the server writes to. Windows may change others at any time.
   static RegistryContents Contents() {
     std::vector<std::wstring> paths;
     for (const wchar_t* const software : {L"Software\\", L"Software\\Wow6432Node\\"}) {
@@ -90,7 +91,7 @@ class Regsvr32 : public ::testing::Test {
     return names;
   }
 
-  /// Lines of `before` that are not in `after`, but for the values that registering replaces.
+  /// Returns the lines of `before` that are not in `after`, except for the values that registering replaces.
   static RegistryContents Lost(const RegistryContents& before, const RegistryContents& after,
                                const RegistryContents& registered) {
     const auto value = [](const std::wstring& line) { return line.substr(0, line.find(L" = ") + 1); };
@@ -109,7 +110,7 @@ class Regsvr32 : public ::testing::Test {
                             reinterpret_cast<void**>(object.Put()));
   }
 
-  /// COM may remember a class for some time.
+  /// Creates objects until it fails, as COM may cache a class for some time. Returns the last result.
   static HRESULT CreateUntilRefused(const CLSID& clsid) {
     HRESULT result = Create(clsid);
     for (int i = 0; i < 100 && result == S_OK; ++i) {
@@ -119,7 +120,7 @@ class Regsvr32 : public ::testing::Test {
     return result;
   }
 
-  /// Registers and unregisters `dll`; in between and afterwards the machine differs only as it should.
+  /// Registers and unregisters `dll`. After each step the registry may differ only by the expected lines.
   static void RegisterAndUnregister(const std::filesystem::path& dll) {
     const RegistryContents registered = Folded(ExpectedAfterRegistering(dll));
     const RegistryContents leftOver = Folded(ExpectedAfterUnregistering());
@@ -147,7 +148,7 @@ TEST_F(Regsvr32, RegistersAndUnregistersTheDllWhereItWasBuilt) {
   RegisterAndUnregister(ServerDll::Path());
 }
 
-TEST_F(Regsvr32, GivesBackToOthersWhatTheyHadRegistered) {
+TEST_F(Regsvr32, RestoresWhatOthersHadRegistered) {
   const OthersRegistrations machine;
   constexpr wchar_t kKey[] = L"Software\\Classes\\.raw";
   constexpr wchar_t kTip[] = L"prop:System.Size";
@@ -158,7 +159,7 @@ TEST_F(Regsvr32, GivesBackToOthersWhatTheyHadRegistered) {
   RegDeleteKeyValueW(HKEY_LOCAL_MACHINE, kKey, L"InfoTip");
 }
 
-TEST_F(Regsvr32, WorksFromAPathWithSpacesQuotesAndOtherLetters) {
+TEST_F(Regsvr32, WorksFromAPathWithSpacesQuotesAndForeignLetters) {
   const TempFolder folder;
   const std::filesystem::path dll = folder.path() / L"it's \u00c4\u03a9\u0416 \u4e2d" / L"QelShellExt.dll";
   std::filesystem::create_directory(dll.parent_path());

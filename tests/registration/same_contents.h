@@ -1,4 +1,4 @@
-// The comparison of registry contents as an assertion.
+// Compares registry contents in an assertion.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -9,14 +9,14 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Equal, or else only the lines that are missing or too many.
+/// Returns success if both are equal. The failure lists only the lines that differ.
 inline ::testing::AssertionResult Same(const RegistryContents& actual, const RegistryContents& expected) {
   const RegistryContents missing = Without(expected, actual);
   const RegistryContents excess = Without(actual, expected);
   if (missing.empty() && excess.empty()) return ::testing::AssertionSuccess();
   auto failure = ::testing::AssertionFailure();
   for (const std::wstring& line : missing) failure << "\n  missing: " << line;
-  for (const std::wstring& line : excess) failure << "\n  too many: " << line;
+  for (const std::wstring& line : excess) failure << "\n  unexpected: " << line;
   return failure;
 }
 
