@@ -21,7 +21,7 @@ KeyMark EffectiveMark(const ScriptKey& key) {
   return isShared ? KeyMark::kNoRemove : key.mark;
 }
 
-/// The way from a root down to the key that the walk over a script has come to.
+/// The path from a root to the current key while a script is traversed.
 class KeyPath {
  public:
   std::size_t depth() const { return open_.size(); }
@@ -62,7 +62,7 @@ HRESULT WriteKey(const ScriptKey& key, const std::wstring& path, RegistryStore& 
   return result;
 }
 
-/// The keys inside it have been dealt with, or go with it.
+/// Removes a key as its mark requires. The keys inside it have already been handled, or are deleted with it.
 HRESULT RemoveKey(const ScriptKey& key, const std::wstring& path, RegistryStore& store) {
   const KeyMark mark = EffectiveMark(key);
   if (mark == KeyMark::kForceRemove) return store.DeleteTree(key.root, path);
@@ -88,7 +88,7 @@ HRESULT Register(const RegistryScript& script, RegistryStore& store) {
   return result;
 }
 
-/// From the inside to the outside: a key can only go after the keys in it have gone.
+/// Removes inner keys before outer ones, because a key can only be deleted once the keys in it are gone.
 HRESULT Unregister(const RegistryScript& script, RegistryStore& store) {
   KeyPath path;
   const auto removeDownTo = [&](std::size_t depth) {
@@ -99,7 +99,7 @@ HRESULT Unregister(const RegistryScript& script, RegistryStore& store) {
     }
     return result;
   };
-  const ScriptKey* whole = nullptr;  // goes with all the keys inside it
+  const ScriptKey* whole = nullptr;  // deleted together with all the keys inside it
   for (const ScriptKey& key : script) {
     if (whole && key.depth > whole->depth) continue;
     const HRESULT result = removeDownTo(key.depth);

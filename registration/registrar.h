@@ -1,17 +1,17 @@
-// Runs a registry script (registry_script.h) in either direction, through a RegistryStore. The caller finds
-// the script and its replacements.
+// Runs a registry script (registry_script.h) in either direction, through a RegistryStore. The caller
+// provides the script and its replacements.
 //
-// Registering makes every key of the script, a key marked ForceRemove anew and empty, and sets what the
-// script says. It can be repeated, and completes what an earlier attempt left half done.
+// Registering creates every key of the script and sets its values; a key marked ForceRemove is first deleted
+// with everything in it. It can be repeated, and completes an earlier attempt that failed halfway.
 //
-// Unregistering deletes the keys marked ForceRemove with all they hold and every value set by `val`. A key
-// without a mark goes when nothing is left in it but the default value that the script gave it: values
-// of others keep it alive. A key marked NoRemove stays. Keys whose names many programs share (CLSID and the
-// like, see kSharedKeys) are never deleted, whatever their mark and wherever they are: with a mark that
+// Unregistering deletes the keys marked ForceRemove with all their contents, and every value set by `val`. A
+// key without a mark is deleted if nothing is left in it but the default value that the script gave it;
+// values of other programs keep it. A key marked NoRemove stays. Keys whose names many programs share (CLSID
+// and others, see kSharedKeys) are never deleted, whatever their mark and wherever they are: with a mark that
 // would delete them, they count as NoRemove.
 //
-// A text that is no script is refused before anything is changed; otherwise the first change that fails ends
-// the run, and what was done before it stays.
+// A string that is not a valid script is rejected before anything changes. Otherwise the first change that
+// fails ends the run, and the changes before it remain.
 #pragma once
 
 #include <windows.h>
@@ -24,12 +24,12 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// What a text is refused with that is no script: HRESULT_FROM_WIN32(ERROR_INVALID_DATA).
+/// The result for a string that is not a valid script: HRESULT_FROM_WIN32(ERROR_INVALID_DATA).
 inline constexpr HRESULT kInvalidScript = static_cast<HRESULT>(0x8007000D);
 
 enum class ScriptDirection { kRegister, kUnregister };
 
-/// S_OK, kInvalidScript, or the first failure of `store`.
+/// Runs the script `text`. Returns S_OK, kInvalidScript, or the first failure of `store`.
 HRESULT RunRegistryScript(std::string_view text, std::span<const Replacement> replacements,
                           ScriptDirection direction, RegistryStore& store);
 

@@ -20,7 +20,8 @@ std::wstring Widen(std::string_view ascii) {
   return {ascii.begin(), ascii.end()};
 }
 
-/// Replaces every `%name%` once: what a replacement brings in is not searched again.
+/// Replaces every `%name%` once; the replacement itself is not searched again. Returns nothing for a byte
+/// that no script may contain, an unknown name or a `%` without its partner.
 std::optional<std::wstring> Expand(std::string_view text, std::span<const Replacement> replacements) {
   if (!std::all_of(text.begin(), text.end(), IsScriptByte)) return std::nullopt;
 
@@ -45,7 +46,7 @@ enum class TokenKind { kEnd, kOpen, kClose, kEquals, kWord, kQuoted, kUnfinished
 
 struct Token {
   TokenKind kind = TokenKind::kEnd;
-  std::wstring text;  // of a word or a quoted text, without its quotes
+  std::wstring text;  // of a word or a quoted string, without its quotes
 
   bool IsKeyword(std::wstring_view word) const {
     return kind == TokenKind::kWord && SameIgnoringCase(text, word);
@@ -80,7 +81,8 @@ class Tokenizer {
     return {kind, {}};
   }
 
-  /// A quote inside the text is written twice; the text ends on the line that it began on.
+  /// Reads a quoted string, in which a quote is written twice. The string must end on the line that it begins
+  /// on.
   Token Quoted() {
     Token token{TokenKind::kQuoted, {}};
     rest_.remove_prefix(1);
@@ -108,7 +110,8 @@ std::optional<std::uint32_t> ParseNumber(std::wstring_view digits) {
   return static_cast<std::uint32_t>(number);
 }
 
-/// Reads one token ahead. Every function that parses something answers false where the text is no script.
+/// Parses with one token of lookahead. Every parsing function returns false where the input is not a valid
+/// script.
 class Parser {
  public:
   explicit Parser(std::wstring_view text) : tokenizer_(text), token_(tokenizer_.Next()) {}
@@ -122,8 +125,8 @@ class Parser {
   }
 
  private:
-  /// Up to and including the brace that closes the root's block. Nested blocks are kept on a stack of
-  /// positions in `script`, so that their depth costs no depth of calls.
+  /// Parses up to and including the brace that closes the root's block. A stack of positions in `script`
+  /// keeps track of nested blocks, so that nesting needs no recursion.
   bool ParseBlock(RegistryRoot root, RegistryScript& script) {
     std::vector<std::size_t> open;
     for (;;) {
@@ -162,7 +165,7 @@ class Parser {
     } else if (AcceptKeyword(L"NoRemove")) {
       key.mark = KeyMark::kNoRemove;
     }
-    // An empty name would mean the key around it, a backslash a key further down.
+    // An empty name would mean the enclosing key, and a backslash a key further down.
     if (!ParseName(key.name) || key.name.empty() || key.name.find(L'\\') != std::wstring::npos) return false;
     return !Accept(TokenKind::kEquals) || ParseData(key.defaultValue.emplace());
   }
@@ -182,7 +185,8 @@ class Parser {
     return number.has_value();
   }
 
-  /// A keyword names a key or a value in quotes only, so two marks are not a mark and a name.
+  /// Parses the name of a key or a value. A keyword must be quoted to be a name, so two marks in a row are an
+  /// error and not a mark and a name.
   bool ParseName(std::wstring& name) {
     const bool isKeyword =
         token_.IsKeyword(L"val") || token_.IsKeyword(L"ForceRemove") || token_.IsKeyword(L"NoRemove");

@@ -1,5 +1,5 @@
-// The language of the registry scripts, in which the server says which keys and values it has, and the
-// parsed form of a script.
+// The language of the registry scripts, in which the server lists its keys and values, and the parsed form of
+// a script.
 //
 //   HKCR
 //   {
@@ -13,13 +13,13 @@
 //     }
 //   }
 //
-// Names and texts stand bare or in single quotes; quotes admit white space, braces, the equals sign and,
-// doubled, the quote itself. Keywords, roots and replacement names are recognised whatever their case; a
-// keyword that is meant as a name is quoted. Scripts are plain ASCII, only replacements bring in other
-// letters.
+// Names and strings are bare or in single quotes. A quoted string may contain white space, braces, the equals
+// sign and, doubled, the quote itself. Case does not matter in keywords, roots and replacement names. A
+// keyword used as a name must be quoted. Scripts are plain ASCII; only replacements may contain other
+// characters.
 //
-// registrar.h says what registering and unregistering do to the keys. Nothing
-// here calls Windows, so the parser is tested and fuzzed natively as well.
+// registrar.h describes how keys are registered and unregistered. Nothing here calls Windows, so the parser
+// is tested and fuzzed natively as well.
 #pragma once
 
 #include <cstddef>
@@ -39,9 +39,9 @@ enum class RegistryRoot { kClassesRoot, kLocalMachine };
 using RegistryData = std::variant<std::wstring, std::uint32_t>;
 
 enum class KeyMark {
-  kNone,         ///< made if missing; removed again once nothing is left in it
-  kForceRemove,  ///< made anew; removed with everything below it
-  kNoRemove,     ///< made if missing; never removed
+  kNone,         ///< created if missing; deleted once nothing is left in it
+  kForceRemove,  ///< recreated empty; deleted with everything below it
+  kNoRemove,     ///< created if missing; never deleted
 };
 
 struct ScriptValue {
@@ -58,23 +58,24 @@ struct ScriptKey {
   std::vector<ScriptValue> values;
 };
 
-/// The keys in the order of the text: a key stands directly before the keys inside it, which are those that
-/// follow with a greater depth.
+/// The keys in the order of the script. A key directly precedes the keys inside it, which are the following
+/// ones of greater depth.
 using RegistryScript = std::vector<ScriptKey>;
 
-/// No script nests deeper: the registry creates at most this many levels in one call.
+/// The maximum nesting of keys, which is the number of levels that the registry creates in one call.
 inline constexpr std::size_t kMaxKeyNesting = 32;
 
-/// `%name%` in a script stands for `value`. The script is read after its replacements have been made, so a
-/// value that is meant for quotes has its own quotes doubled.
+/// Replaces `%name%` in a script with `value`. The replacement happens before the script is parsed, so a
+/// value that is used inside quotes must double its own quotes.
 struct Replacement {
   std::wstring name;
   std::wstring value;
 };
 
-/// Nothing for a text that is not a script: broken syntax, an unknown root or replacement, a byte that is
-/// not printable ASCII or white space, a key name that is empty or holds a backslash, a number beyond
-/// 32 bits, or keys nested deeper than kMaxKeyNesting. Of two replacements of the same name the first counts.
+/// Parses a script. Returns nothing for a string that is not a valid script: a syntax error, an unknown root
+/// or replacement, a byte that is neither printable ASCII nor white space, a key name that is empty or
+/// contains a backslash, a number of more than 32 bits, or keys nested deeper than kMaxKeyNesting. The first
+/// of two replacements with the same name wins.
 std::optional<RegistryScript> ParseRegistryScript(std::string_view text,
                                                   std::span<const Replacement> replacements);
 

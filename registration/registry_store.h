@@ -1,5 +1,5 @@
-// The few changes that a registry script makes to the registry, as an interface: the registrar writes through
-// it, WindowsRegistry carries the changes out, and tests put a store of their own in its place.
+// The changes that a registry script makes to the registry, as an interface. The registrar writes through it,
+// WindowsRegistry carries the changes out, and tests provide a store of their own.
 #pragma once
 
 #include <windows.h>
@@ -10,23 +10,25 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Keys are named by their root and the path below it, separated by backslashes. Every change is complete
-/// in itself; nothing that is missing already is an error to a removal.
+/// A key is identified by its root and the path below it, separated by backslashes. Every change is complete
+/// in itself. Every function returns S_OK or the failure; deleting something that is already missing
+/// succeeds.
 class RegistryStore {
  public:
-  /// With all the keys on the way to it; a key that is there stays as it is.
+  /// Creates the key and all missing keys above it. An existing key keeps its contents.
   virtual HRESULT CreateKey(RegistryRoot root, const std::wstring& path) = 0;
 
-  /// In a key that exists; an empty name is the key's default value.
+  /// Sets a value of an existing key; an empty name is the key's default value.
   virtual HRESULT SetValue(RegistryRoot root, const std::wstring& path, const std::wstring& name,
                            const RegistryData& data) = 0;
 
-  /// The key and everything below it.
+  /// Deletes the key and everything below it.
   virtual HRESULT DeleteTree(RegistryRoot root, const std::wstring& path) = 0;
 
   virtual HRESULT DeleteValue(RegistryRoot root, const std::wstring& path, const std::wstring& name) = 0;
 
-  /// Leaves a key alone that has a subkey or a value; with `ignoreDefault` its default value does not count.
+  /// Deletes a key that has no subkey and no value. With `ignoreDefault` its default value does not count.
+  /// Any other key stays, which is a success.
   virtual HRESULT DeleteEmptyKey(RegistryRoot root, const std::wstring& path, bool ignoreDefault) = 0;
 
  protected:

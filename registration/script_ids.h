@@ -1,4 +1,5 @@
-// Resource ids of the registry scripts, for C++ and for the resource compiler, which knows macros only.
+// Resource identifiers of the registry scripts, for C++ and for the resource compiler, which understands only
+// macros.
 #pragma once
 
 // NOLINTBEGIN(modernize-macro-to-enum)

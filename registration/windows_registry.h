@@ -1,12 +1,12 @@
-// The registry of the machine as a RegistryStore.
+// The Windows registry as a RegistryStore.
 #pragma once
 
 #include "registry_store.h"
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Works on HKEY_CLASSES_ROOT and HKEY_LOCAL_MACHINE in the process's own view: a path names Wow6432Node
-/// where the 32-bit view is meant. Failures are the registry's own, as HRESULTs.
+/// Changes HKEY_CLASSES_ROOT and HKEY_LOCAL_MACHINE in the process's own view, so a path to the 32-bit view
+/// names Wow6432Node. Failures are the registry's errors as HRESULTs.
 class WindowsRegistry final : public RegistryStore {
  public:
   HRESULT CreateKey(RegistryRoot root, const std::wstring& path) override;

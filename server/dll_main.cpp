@@ -1,11 +1,11 @@
-// The functions through which Windows and COM talk to the DLL.
+// The functions that Windows and COM call in the DLL.
 #include <windows.h>
 
 #include "object_map.h"
 #include "qel_shell_ext_module.h"
 #include "registration.h"
 
-// Defined by the linker: its address is the module's instance handle.
+// The linker defines this symbol. Its address is the module's instance handle.
 extern "C" IMAGE_DOS_HEADER __ImageBase;
 
 using Qel::Lumetra::ShellExt::ObjectMap;
@@ -16,7 +16,7 @@ namespace {
 
 const auto g_instance = reinterpret_cast<HINSTANCE>(&__ImageBase);
 
-// Made before DllMain runs, destroyed when the DLL is unloaded.
+// Constructed before DllMain runs, destroyed when the DLL is unloaded.
 CQelShellExtModule g_module(ObjectMap());
 
 }  // namespace

@@ -1,6 +1,5 @@
-// The table of the creatable classes, which every walk over the classes follows: class objects and
-// registration. The classes have neither a description nor component categories, and nothing to do when the
-// module is loaded, so an entry has no place for that.
+// The table of the creatable classes, which both class objects and registration use. An entry has no fields
+// for a description, component categories or initialisation at load time, because no class needs them.
 #pragma once
 
 #include <windows.h>
@@ -13,17 +12,17 @@
 namespace Qel::Lumetra::ShellExt {
 
 struct ObjectMapEntry {
-  const CLSID* clsid = nullptr;  ///< null in an empty entry
-  UINT registryScript = 0;       ///< resource id of the script that registers the class (script_ids.h)
+  const CLSID* clsid = nullptr;  ///< null in an unused entry
+  UINT registryScript = 0;       ///< resource identifier (script_ids.h) of the class's registry script
   Com::ClassObjectMaker makeClassObject = nullptr;
   Com::InstanceMaker makeInstance = nullptr;
 
-  /// The class object once it has been asked for, as EncodePointer stores it, so that a stray write cannot
-  /// make it point to code of its choice. The module holds one reference on it.
+  /// The class object, null until it is first requested, with one reference that the module holds.
+  /// EncodePointer obfuscates it, so that a stray write cannot make it point to code of an attacker's choice.
   std::atomic<void*> classObject = nullptr;
 };
 
-/// The map of this server, in the order of registration.
+/// Returns the classes of this server in the order of registration.
 std::span<ObjectMapEntry> ObjectMap();
 
 }  // namespace Qel::Lumetra::ShellExt

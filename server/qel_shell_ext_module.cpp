@@ -57,7 +57,7 @@ HRESULT CQelShellExtModule::GetClassObject(REFCLSID clsid, REFIID iid, void** cl
   HRESULT result = S_OK;
   if (entry->classObject == nullptr) {
     const std::lock_guard guard(objectMapSection_);
-    // Another thread may have made it meanwhile.
+    // Another thread may have created it in the meantime.
     if (entry->classObject == nullptr) result = MakeClassObject(*entry);
   }
   void* const encoded = entry->classObject;

@@ -1,5 +1,5 @@
-// The one module object of the DLL: the lock count that says when it may be unloaded, and the class objects
-// of the object map, which are made when first asked for and kept until the module goes.
+// The module object of the DLL: the lock count that decides when the DLL may be unloaded, and the class
+// objects of the object map, which are created on first request and kept until the DLL is unloaded.
 #pragma once
 
 #include <windows.h>
@@ -22,7 +22,7 @@ class CQelShellExtModule : public Qel::Com::Module {
   static constexpr GUID kTypeLibraryId = {
       0x0506151B, 0x7799, 0x43EC, {0xB1, 0x47, 0x65, 0x85, 0x6D, 0xF0, 0x03, 0x0A}};
 
-  /// Makes this the current module. `objectMap` outlives it.
+  /// Makes this the current module. `objectMap` must outlive it.
   explicit CQelShellExtModule(std::span<ObjectMapEntry> objectMap);
 
   /// Releases the class objects.
@@ -33,15 +33,18 @@ class CQelShellExtModule : public Qel::Com::Module {
   LONG GetLockCount() const override { return lockCount_; }
   HRESULT GetGITPtr(IGlobalInterfaceTable** table) override;
 
-  /// Adds what the registry scripts of the module and of all its classes refer to.
+  /// Adds the replacements that the scripts of the module and of all its classes use. A failure ends the
+  /// registration.
   virtual HRESULT AddCommonRGSReplacements(
       std::vector<Qel::Lumetra::ShellExt::Replacement>& replacements) const;
 
-  /// A module without its critical sections must not be loaded.
+  /// Returns whether a critical section could not be created. The DLL must not be loaded then.
   bool initFailed() const { return initFailed_; }
 
-  /// What DllGetClassObject answers: the class object of `clsid`, the same one for every caller. Threads may
-  /// ask at the same time.
+  /// Implements DllGetClassObject: queries the class object of `clsid`, the same one for every caller, for
+  /// `iid`. Threads may call this at the same time. Returns E_POINTER for a null `classObject`, E_UNEXPECTED
+  /// if the lock of the object map could not be created, CLASS_E_CLASSNOTAVAILABLE for an unknown class, or
+  /// the failure of the class object.
   HRESULT GetClassObject(REFCLSID clsid, REFIID iid, void** classObject);
 
  private:
@@ -50,7 +53,7 @@ class CQelShellExtModule : public Qel::Com::Module {
   std::atomic<LONG> lockCount_ = 0;
   std::span<ObjectMapEntry> objectMap_;
   Qel::Com::CriticalSection objectMapSection_;  // guards the creation of class objects
-  bool isReady_;                                // to make class objects
+  bool isReady_;                                // whether class objects can be created
   Qel::Com::CriticalSection section_;           // guards the interface table
   bool initFailed_;
   Qel::Com::ComPtr<IGlobalInterfaceTable> interfaceTable_;

@@ -35,7 +35,7 @@ std::wstring DoubleQuotes(std::wstring_view text) {
   return doubled;
 }
 
-/// The text lives as long as the module is loaded.
+/// Finds the script with the resource identifier `id`. It stays in memory as long as the module is loaded.
 HRESULT FindScript(HINSTANCE module, UINT id, std::string_view& script) {
   const HRSRC resource = FindResourceW(module, MAKEINTRESOURCEW(id), L"REGISTRY");
   if (!resource) return LastError();
@@ -84,10 +84,10 @@ HRESULT UpdateRegistration(ScriptDirection direction, HINSTANCE instance, const 
     const SystemLocaleScope locale;
     result = RunScripts(direction, instance, module, objectMap);
   } catch (const std::bad_alloc&) {
-    return E_OUTOFMEMORY;  // the caller may be no C++ program
+    return E_OUTOFMEMORY;  // the caller need not be a C++ program
   }
-  // The shell caches the associations of file types; without this it would show the change at the next
-  // log-on.
+  // The shell caches the associations of file types. Without this notification it would show the change only
+  // after the next log-on.
   if (SUCCEEDED(result)) SHChangeNotify(SHCNE_ASSOCCHANGED, SHCNF_IDLIST, nullptr, nullptr);
   return result;
 }

@@ -1,6 +1,6 @@
-// What DllRegisterServer and DllUnregisterServer do: the registry scripts, which are resources of type
-// "REGISTRY", run in order and surrounded by what the shell and the thread need. Type libraries and component
-// categories are not registered: the classes have none.
+// Implements DllRegisterServer and DllUnregisterServer, which run the registry scripts (resources of type
+// "REGISTRY") in order. No type libraries or component categories are registered, because the classes have
+// none.
 #pragma once
 
 #include <windows.h>
@@ -13,16 +13,17 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Runs the module's own script and those of the classes in the order of `objectMap`, the module's own first
-/// to register and last to unregister, and then notifies the shell.
+/// Runs the scripts of the module and of the classes, the latter in the order of `objectMap`, and then
+/// notifies the shell. The module's script is the first to register and the last to unregister.
 ///
-/// The resources of `instance` hold the scripts. Its path replaces %MODULE% (with every quote doubled, as the
-/// scripts have it in quotes) and %MODULE_RAW% (as it is); `module` adds the other replacements.
+/// The scripts are resources of `instance`. Its path replaces %MODULE% (with every quote doubled, because the
+/// scripts put it into quotes) and %MODULE_RAW% (unchanged); `module` adds the other replacements.
 ///
-/// Returns the first failure, leaving what was written before it and without a notification: E_OUTOFMEMORY,
-/// that of a script that cannot be found, kInvalidScript, a registry error, or ERROR_INSUFFICIENT_BUFFER as
-/// an HRESULT for a path that does not fit into 260 characters with its terminator, in which case nothing is
-/// written. The thread's locale is LOCALE_SYSTEM_DEFAULT meanwhile, and restored on every path.
+/// Returns the first failure: E_OUTOFMEMORY, the error of a script that cannot be found, kInvalidScript, a
+/// registry error, or ERROR_INSUFFICIENT_BUFFER as an HRESULT if the path and its terminator do not fit into
+/// 260 characters, in which case nothing is written. After any other failure, the changes before it remain
+/// and the shell is not notified. During the call the thread's locale is LOCALE_SYSTEM_DEFAULT; it is
+/// restored in any case.
 HRESULT UpdateRegistration(ScriptDirection direction, HINSTANCE instance, const CQelShellExtModule& module,
                            std::span<const ObjectMapEntry> objectMap);
 

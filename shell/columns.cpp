@@ -15,8 +15,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Returns the key of the property that a column shows. The resolutions, which no column declares, are
-/// answered with the size in pixels: clients that ask for them expect a number.
+/// Returns the key of the property that a column shows. The two resolution keys, which no column declares,
+/// map to the size in pixels: clients that request them expect a number.
 PROPERTYKEY ShownKey(const SHCOLUMNID& column) {
   constexpr PROPID kHorizontalResolutionId = 5;
   constexpr PROPID kVerticalResolutionId = 6;
@@ -30,7 +30,8 @@ std::wstring PathOf(const SHCOLUMNDATA& item) {
   return {std::begin(item.wszFile), std::find(std::begin(item.wszFile), std::end(item.wszFile), L'\0')};
 }
 
-/// Returns nothing for a property that no column has, and for a file that has no valid reader.
+/// Reads the property of `column` from a file. Returns nothing for a key without a property, and for a file
+/// without a valid reader.
 std::optional<Metadatum> ReadFromFile(const std::wstring& path, const SHCOLUMNID& column) {
   std::ifstream stream;
   OpenPath(stream, path.c_str());
@@ -64,7 +65,7 @@ HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* 
   if (!found) return S_FALSE;
   if (value == nullptr) return E_POINTER;
   VARIANT made{};
-  // The number type that every automation client knows.
+  // VT_I4 is the number type that every automation client knows.
   HRESULT result = ToAutomationValue(*found, VT_I4, made);
   if (SUCCEEDED(result)) result = VariantClear(value);
   if (SUCCEEDED(result)) {

@@ -7,16 +7,18 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Describes the column `index`, counted from 0. S_FALSE, with nothing written, after the last one.
+/// Describes the column `index`, counted from 0. Returns S_FALSE, without writing `info`, after the last
+/// column, and E_POINTER for a null `info`.
 HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info);
 
-/// The value of a column for one file, in the place of what `value` held. The file is opened for this call
-/// only and by its path only; offline files are opened too.
+/// Reads the value of a column for one file and stores it in place of the previous contents of `value`. The
+/// file is opened for this call, by the path in `item` alone. Offline files are opened too.
 ///
-/// S_FALSE, with nothing written, for a property that no column has, a file that cannot be opened or is not
-/// valid, and one whose extension names no kind of image. E_POINTER for a null `item` where the file has to
-/// be looked at, and for a null `value` where there is an answer; the failure of VariantClear for a `value`
-/// that cannot be cleared; E_OUTOFMEMORY. After a failure `value` holds what it held.
+/// Returns S_FALSE, without writing `value`, for a key without a property, for a file that cannot be opened
+/// or is not valid, and for a file-name extension that is no file kind. Returns E_POINTER for a null `item`
+/// if the column belongs to one of the two property sets, and for a null `value` if there is a value to
+/// store. Returns the failure of VariantClear if `value` cannot be cleared, and E_OUTOFMEMORY. After a
+/// failure `value` keeps its previous contents.
 HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* value);
 
 }  // namespace Qel::Lumetra::ShellExt

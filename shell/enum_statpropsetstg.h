@@ -6,7 +6,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Format ids in ascending order (FormatIdLess); the sets know no class, flags or times.
+/// Enumerates format identifiers in ascending order (FormatIdLess). The sets have no class, flags or times.
 class CEnumSTATPROPSETSTG
     : public MapEnumerator<CEnumSTATPROPSETSTG, IEnumSTATPROPSETSTG, STATPROPSETSTG, PropertySets> {
  public:
@@ -19,7 +19,7 @@ class CEnumSTATPROPSETSTG
     element.mtime = {};
     element.ctime = {};
     element.atime = {};
-    // The system's version is the caller's to preset: it is not written.
+    // The caller presets dwOSVersion, so it is not written.
   }
 
  protected:

@@ -6,7 +6,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Ids and types in ascending order of the ids; properties have no names here.
+/// Enumerates property identifiers with their types, in ascending order. The properties have no names here.
 class CEnumSTATPROPSTG : public MapEnumerator<CEnumSTATPROPSTG, IEnumSTATPROPSTG, STATPROPSTG, PropertyMap> {
  public:
   using MapEnumerator::MapEnumerator;

@@ -14,20 +14,21 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-constexpr int kTextRoom = 256;  // wide characters of a date and time or of a size
+constexpr int kTextRoom = 256;  // in wide characters, of a date and time or of a size
 
 std::wstring Label(std::uint32_t id) {
   return LoadResourceString(id) + L": ";
 }
 
-/// Date and time of the day in the user's zone and format; empty when the platform cannot say them.
+/// Returns the date and time of day in the user's time zone and format; empty if the system cannot convert
+/// them.
 std::wstring LocalTime(const FILETIME& time) {
   SYSTEMTIME utc{};
   if (!FileTimeToSystemTime(&time, &utc)) return {};
   SYSTEMTIME local{};
   if (!SystemTimeToTzSpecificLocalTime(nullptr, &utc, &local)) local = utc;
 
-  std::array<wchar_t, kTextRoom + 1> text{};  // ends in a null even when the date fills its room
+  std::array<wchar_t, kTextRoom + 1> text{};  // keeps its terminator even if the date fills the rest
   const int dateEnd =
       GetDateFormatW(LOCALE_USER_DEFAULT, DATE_SHORTDATE, &local, nullptr, text.data(), kTextRoom);
   if (dateEnd == 0) return {};
@@ -38,8 +39,8 @@ std::wstring LocalTime(const FILETIME& time) {
   return timeLength > 0 ? text.data() : std::wstring();
 }
 
-/// The lines that come from the file system, each with the line break before it; none for a file that is
-/// gone.
+/// Returns the lines from the file system, each with a line break before it; empty if the file no longer
+/// exists.
 std::wstring FileLines(const std::wstring& path) {
   WIN32_FILE_ATTRIBUTE_DATA attributes{};
   if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &attributes)) return {};
@@ -47,7 +48,7 @@ std::wstring FileLines(const std::wstring& path) {
   if (const std::wstring time = LocalTime(attributes.ftLastWriteTime); !time.empty()) {
     lines += L"\r\n" + Label(IDS_DATE_MODIFIED) + time;
   }
-  // The size is shown modulo 4 GiB, intentionally: its high half is left out.
+  // Only the low half of the size is shown, so the size is modulo 4 GiB. Intentional.
   std::array<wchar_t, kTextRoom> size{};
   if (StrFormatByteSizeW(std::int64_t{attributes.nFileSizeLow}, size.data(), kTextRoom) != nullptr) {
     lines += L"\r\n" + Label(IDS_SIZE) + size.data();
@@ -55,8 +56,8 @@ std::wstring FileLines(const std::wstring& path) {
   return lines;
 }
 
-/// "61 images (4096 \u00D7 4096) 16 bit signed". People read it and no program, hence the multiplication sign
-/// and not the letter x of the properties.
+/// Returns, for instance, "61 images (4096 \u00D7 4096) 16 bit signed". Only people read this line, hence the
+/// multiplication sign instead of the letter x of the properties.
 std::wstring Dimensions(const FileTypeInfo& reader) {
   const std::int32_t frames = reader.GetFrameCount();
   const Size2 size = reader.GetDimensions();

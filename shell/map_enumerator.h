@@ -1,4 +1,4 @@
-// The common body of the enumerators of property sets and of properties.
+// The implementation that the enumerators of property sets and of properties share.
 #pragma once
 
 #include <windows.h>
@@ -11,15 +11,16 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Walks an ordered map that is shared with the object that made the enumerator, so that it stays whole when
-/// that object goes or turns to another file. `Class` is the COM class that derives from this; its static
-/// function Describe fills an `Element` from an entry of the map.
+/// Enumerates an ordered map. The enumerator shares the map with the object that created it, so the map stays
+/// complete if that object is destroyed or loads another file. `Class` is the COM class that derives from
+/// this; its static function Describe fills an `Element` from an entry of the map.
 template <class Class, class Interface, class Element, class Map>
 class MapEnumerator : public Com::CComRoot<Com::SingleThreaded, Interface> {
  public:
   explicit MapEnumerator(std::shared_ptr<const Map> map) : map_(std::move(map)), current_(map_->begin()) {}
 
-  /// A new enumerator at the beginning of `map`.
+  /// Makes an enumerator that starts at the beginning of `map`. Returns E_POINTER for a null `enumerator`, or
+  /// the failure of MakeObject.
   static HRESULT Make(std::shared_ptr<const Map> map, Interface** enumerator) {
     if (enumerator == nullptr) return E_POINTER;
     *enumerator = nullptr;
@@ -29,7 +30,8 @@ class MapEnumerator : public Com::CComRoot<Com::SingleThreaded, Interface> {
     return result;
   }
 
-  /// `fetched` must not be null, however few elements are asked for: the count is always written.
+  /// Writes up to `count` elements and their number; returns S_FALSE for fewer than `count`. `fetched` must
+  /// not be null, whatever `count` is.
   HRESULT STDMETHODCALLTYPE Next(ULONG count, Element* elements, ULONG* fetched) override {
     *fetched = 0;
     if (elements == nullptr && count > 0 && current_ != map_->end()) return E_POINTER;
@@ -40,7 +42,8 @@ class MapEnumerator : public Com::CComRoot<Com::SingleThreaded, Interface> {
     return *fetched == count ? S_OK : S_FALSE;
   }
 
-  /// Goes to the end, however few elements are to be skipped. Clients count on it.
+  /// Moves to the end and returns S_FALSE, even for a `count` smaller than the number of elements left.
+  /// Intentional: clients rely on it. A `count` of 0 changes nothing.
   HRESULT STDMETHODCALLTYPE Skip(ULONG count) override {
     if (count == 0) return S_OK;
     current_ = map_->end();
@@ -52,7 +55,7 @@ class MapEnumerator : public Com::CComRoot<Com::SingleThreaded, Interface> {
     return S_OK;
   }
 
-  /// The clone stands at the beginning, not where this enumerator stands.
+  /// Makes an enumerator that starts at the beginning, not at this enumerator's position.
   HRESULT STDMETHODCALLTYPE Clone(Interface** enumerator) override { return Make(map_, enumerator); }
 
  protected:

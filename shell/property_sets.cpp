@@ -18,7 +18,7 @@ HRESULT AddPropertySet(const FileTypeInfo& reader, const FMTID& set, PropertySet
   for (const Property& property : kProperties) {
     if (property.key.fmtid != set) continue;
     PropertyValue value;
-    // The machine integer is the type of number that these sets have always announced in their enumerators.
+    // Enumerators of these sets have always reported VT_INT as the type of numbers.
     result = ToAutomationValue(property.value(reader), VT_INT, value.Put());
     if (SUCCEEDED(result)) result = storage->Add(property.key.pid, value.Get());
     if (FAILED(result)) return result;

@@ -1,4 +1,4 @@
-// The property sets of a file, the older way in which the shell asks for its properties.
+// The property sets of a file, through which older clients of the shell read its properties.
 #pragma once
 
 #include <windows.h>
@@ -13,16 +13,16 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Orders format ids by their fields, the bytes of the last one in turn.
+/// Orders format identifiers by Data1, Data2, Data3 and then the bytes of Data4.
 struct FormatIdLess {
   bool operator()(const FMTID& a, const FMTID& b) const;
 };
 
 using PropertySets = std::map<FMTID, Com::ComPtr<IPropertyStorage>, FormatIdLess>;
 
-/// Makes the sets of the valid file that `reader` reads: the summary, which holds the comment, and the image
-/// summary, which holds everything else. Fails with what a part of them fails with; `sets` is written on
-/// success only.
+/// Makes the sets of the valid file that `reader` reads: the summary, which has the comment, and the image
+/// summary, which has everything else. Returns the failure to create a set or to add a value; `sets` is
+/// written on success only.
 HRESULT BuildPropertySets(const FileTypeInfo& reader, std::shared_ptr<const PropertySets>& sets);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -1,5 +1,5 @@
-// One property set of a file, read-only and in memory. BuildPropertySets (property_sets.h) fills it once;
-// from then on its values never change.
+// A read-only property set of a file, in memory. BuildPropertySets (property_sets.h) fills it once; after
+// that its values never change.
 #pragma once
 
 #include <windows.h>
@@ -14,7 +14,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Owns one value.
+/// Owns one PROPVARIANT.
 class PropertyValue {
  public:
   PropertyValue() = default;
@@ -24,7 +24,7 @@ class PropertyValue {
 
   const PROPVARIANT& Get() const { return value_; }
 
-  /// The place for a value; there must be none in it yet.
+  /// Returns the place to store a value. It must not hold one yet.
   PROPVARIANT& Put() { return value_; }
 
  private:
@@ -33,15 +33,16 @@ class PropertyValue {
 
 using PropertyMap = std::map<PROPID, PropertyValue>;
 
-/// Refuses every change, and every question about names and statistics, with STG_E_ACCESSDENIED.
+/// Returns STG_E_ACCESSDENIED for every change and for queries of names and statistics.
 class CPropertyStorage : public Com::CComRoot<Com::SingleThreaded, IPropertyStorage> {
  public:
-  /// Stores a copy of `value` as the property `id`, which must not be there yet.
+  /// Stores a copy of `value` as the property `id`, which must not exist yet. Returns the result of
+  /// PropVariantCopy.
   HRESULT Add(PROPID id, const PROPVARIANT& value);
 
-  /// Copies one value for each specifier, which must be by id (STG_E_INVALIDPARAMETER); stops at the first
-  /// property that is not there, with ERROR_NOT_SUPPORTED as an HRESULT and the values before it filled in.
-  /// S_FALSE without specifiers.
+  /// Copies one value for each specifier. Returns STG_E_INVALIDPARAMETER for a specifier that is not an
+  /// identifier, and ERROR_NOT_SUPPORTED as an HRESULT for a property that does not exist; the values before
+  /// it are filled in. Returns S_FALSE without specifiers.
   HRESULT STDMETHODCALLTYPE ReadMultiple(ULONG count, const PROPSPEC specifiers[],
                                          PROPVARIANT values[]) override;
 
@@ -70,7 +71,7 @@ class CPropertyStorage : public Com::CComRoot<Com::SingleThreaded, IPropertyStor
   ~CPropertyStorage() = default;
 
  private:
-  std::shared_ptr<PropertyMap> properties_ = std::make_shared<PropertyMap>();  // with the enumerators
+  std::shared_ptr<PropertyMap> properties_ = std::make_shared<PropertyMap>();  // shared with the enumerators
 };
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -12,14 +12,14 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-// The put-back reserve and the largest of the headers: one Read brings any of them, and of an MRC file not a
-// byte more.
+// The put-back reserve and the largest header. One Read gets a whole header, and for an MRC file not a byte
+// more.
 constexpr std::size_t kBufferBytes = 4 + 1024;
 
 constexpr HRESULT kNoCount = 6;
 
-/// Makes a value of the types by which the property system declares the properties: unsigned numbers, and
-/// strings of the task allocator. `value` is written on success only.
+/// Makes a value of the type that the property system declares for the property: VT_UI4, or VT_LPWSTR from
+/// the task allocator. Returns the failure of SHStrDupW; `value` is written on success only.
 HRESULT ToStoreValue(const Metadatum& metadatum, PROPVARIANT& value) {
   PROPVARIANT made{};
   if (const auto* const text = std::get_if<std::wstring>(&metadatum)) {

@@ -1,7 +1,6 @@
-// The property stores: what the shell's property system reads from a file that it hands over as a stream.
+// The property stores, through which the shell's property system reads a file that it hands over as a stream.
 //
-// The handlers differ only in the reader that they build. They read the header and nothing else, and refuse
-// every change.
+// The handlers differ only in the reader that they create. They read only the header and reject every change.
 #pragma once
 
 #include <windows.h>
@@ -16,32 +15,34 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Any thread may call: the object's own lock keeps its stream and reader to one at a time.
+/// Any thread may call the methods. The object's lock lets only one thread at a time use the stream and the
+/// reader.
 class CShellExtVista : public Com::CComRoot<Com::FreeThreaded, IInitializeWithStream, IPropertyStore,
                                             IPropertyStoreCapabilities> {
  public:
-  /// Builds the reader on `stream`, which may be null, from where it stands. Always S_OK: a file that is not
-  /// acceptable, or one for which there is no buffer, shows in GetValue. Nothing resets a stream object that
-  /// an earlier file has left failed.
+  /// Creates the reader on `stream`, which may be null, at its current position. Always returns S_OK: if the
+  /// file is not acceptable or there is no memory for the buffer, GetValue fails. Intentional: a failed
+  /// stream state from an earlier file is not cleared.
   HRESULT STDMETHODCALLTYPE Initialize(IStream* stream, DWORD mode) override;
 
-  /// The reader of the class's file kind, which parses the header from `stream`; none is allowed.
+  /// Creates the reader of the class's file kind, which parses the header from `stream`. May return null.
   virtual std::unique_ptr<FileTypeInfo> CreateFileInfo(basic_comstream<char>& stream) = 0;
 
-  /// Says that there are no properties, with the success code 6 and not S_OK: a caller that enumerates is to
-  /// find none, and a caller that asks by key gets values.
+  /// Reports 0 properties and returns the success code 6 instead of S_OK: a caller that enumerates finds
+  /// none, and a caller that requests a value by key gets it.
   HRESULT STDMETHODCALLTYPE GetCount(DWORD* count) override;
 
-  /// Answers the six keys all the same; E_UNEXPECTED and the null key after them.
+  /// Returns the six keys nevertheless; E_UNEXPECTED and the null key after them.
   HRESULT STDMETHODCALLTYPE GetAt(DWORD index, PROPERTYKEY* key) override;
 
-  /// `value` need not be initialised, and is empty after every failure but that of a file that is not valid
-  /// (E_FAIL, nothing written). E_UNEXPECTED for a key without a property.
+  /// Reads the value of `key`. Returns E_UNEXPECTED for a key without a property, and E_FAIL without a valid
+  /// file. `value` need not be initialised. After a failure it is empty, except without a valid file, where
+  /// it is not written.
   HRESULT STDMETHODCALLTYPE GetValue(REFPROPERTYKEY key, PROPVARIANT* value) override;
 
   HRESULT STDMETHODCALLTYPE SetValue(REFPROPERTYKEY, REFPROPVARIANT) override { return E_FAIL; }
 
-  /// Writes nothing and fails, but lets go of the stream. The values stay.
+  /// Writes nothing and returns E_FAIL, but releases the stream. The values remain available.
   HRESULT STDMETHODCALLTYPE Commit() override;
 
   HRESULT STDMETHODCALLTYPE IsPropertyWritable(REFPROPERTYKEY) override { return S_FALSE; }
@@ -55,7 +56,7 @@ class CShellExtVista : public Com::CComRoot<Com::FreeThreaded, IInitializeWithSt
   std::unique_ptr<FileTypeInfo> reader_;
 };
 
-/// Files of the MRC family. A stream has no name, so all of them are described as .mrc.
+/// Handles the MRC family. A stream has no name, so every file is described as .mrc.
 class CShellExtVistaMrc : public CShellExtVista {
  public:
   std::unique_ptr<FileTypeInfo> CreateFileInfo(basic_comstream<char>& stream) override;

@@ -30,12 +30,14 @@ std::wstring DimensionsText(const FileTypeInfo& reader) {
   return std::to_wstring(size.width) + L" x " + std::to_wstring(size.height);
 }
 
-/// "4096 x 4096", as the shell itself writes dimensions, so that the column sorts and reads like its own.
+/// Returns, for instance, "4096 x 4096", in the shell's own form of dimensions, so that the column sorts and
+/// reads the same.
 Metadatum Dimensions(const FileTypeInfo& reader) {
   return DimensionsText(reader);
 }
 
-/// "(4096 x 4096) 16 bit signed". A property store has no property of its own for the pixel type.
+/// Returns, for instance, "(4096 x 4096) 16 bit signed", because a property store has no separate property
+/// for the pixel type.
 Metadatum TypedDimensions(const FileTypeInfo& reader) {
   return L"(" + DimensionsText(reader) + L") " + reader.GetDataTypeName();
 }
@@ -44,7 +46,7 @@ Metadatum Comment(const FileTypeInfo& reader) {
   return reader.GetComment();
 }
 
-/// In a property store it stands in for the comment: there is no property of its own for the kind of file.
+/// Replaces the comment in a property store, which has no separate property for the file kind.
 Metadatum TypeDescription(const FileTypeInfo& reader) {
   return reader.GetTypeDescription();
 }

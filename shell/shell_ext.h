@@ -1,9 +1,9 @@
-// The object that the shell makes for a file: it is given the path (IPersistFile::Load) and is then asked
-// for a thumbnail, an info tip, Details columns and property sets. What a file holds is the reader's
-// business (file_type_info.h); this class looks at no byte of it.
+// The object that the shell creates for a file. It loads the path (IPersistFile::Load) and then provides a
+// thumbnail, an info tip, Details columns and property sets. Only the reader (file_type_info.h) looks at the
+// bytes of the file.
 //
-// One thread at a time; objects share nothing. Exceptions that a reader lets out leave the methods as they
-// are.
+// One thread at a time uses an object, and objects share nothing. The methods do not catch exceptions of the
+// reader.
 #pragma once
 
 #include <windows.h>
@@ -22,21 +22,22 @@ namespace Qel::Lumetra::ShellExt {
 class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPersistFile, IQueryInfo,
                                        IColumnProvider, IPropertySetStorage> {
  public:
-  // IExtractImage. Every extraction is synchronous: GetLocation keeps the size, requests a cached thumbnail
-  // and ignores everything else.
+  // IExtractImage. Every extraction is synchronous: GetLocation stores the size, requests that the shell
+  // caches the thumbnail, and ignores everything else.
   HRESULT STDMETHODCALLTYPE GetLocation(LPWSTR pathBuffer, DWORD length, DWORD* priority, const SIZE* size,
                                         DWORD colourDepth, DWORD* flags) override;
 
-  /// The bitmap is the caller's. E_FAIL without a file that has a picture.
+  /// Makes the thumbnail, a bitmap that the caller owns. Returns E_FAIL for a file without a thumbnail, and
+  /// E_POINTER for a null `thumbnail`.
   HRESULT STDMETHODCALLTYPE Extract(HBITMAP* thumbnail) override;
 
-  // IPersistFile, of which the shell needs Load only.
+  // IPersistFile. The shell needs only Load.
   HRESULT STDMETHODCALLTYPE GetClassID(CLSID*) override { return E_NOTIMPL; }
   HRESULT STDMETHODCALLTYPE IsDirty() override { return E_NOTIMPL; }
 
-  /// Always S_OK: a file that cannot be opened, is of no known kind or is not valid makes the requests that
-  /// follow fail. Meant to be called once: the stream stays open until the object goes, so the reader of a
-  /// second call finds a failed stream.
+  /// Opens the file at `path`. Always returns S_OK: for a file that cannot be opened, is of an unknown kind
+  /// or is not valid, the later requests fail. Call it only once: the stream stays open until the object is
+  /// destroyed, so the reader of a second call gets a failed stream.
   HRESULT STDMETHODCALLTYPE Load(LPCOLESTR path, DWORD mode) override;
 
   HRESULT STDMETHODCALLTYPE Save(LPCOLESTR, BOOL) override { return E_NOTIMPL; }
@@ -44,19 +45,20 @@ class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPers
   HRESULT STDMETHODCALLTYPE GetCurFile(LPOLESTR*) override { return E_NOTIMPL; }
 
   // IQueryInfo
-  /// The tip (info_tip.h) is the caller's, to be freed with the task allocator. E_FAIL without a valid file.
+  /// Makes the tip (info_tip.h), which the caller frees with the task allocator. Returns E_FAIL without a
+  /// valid file.
   HRESULT STDMETHODCALLTYPE GetInfoTip(DWORD flags, WCHAR** tip) override;
 
-  /// Always 0.
+  /// Sets `flags` to 0.
   HRESULT STDMETHODCALLTYPE GetInfoFlags(DWORD* flags) override;
 
-  // IColumnProvider, which does without the file that was loaded: columns.h.
+  // IColumnProvider (columns.h). It does not use the loaded file.
   HRESULT STDMETHODCALLTYPE Initialize(LPCSHCOLUMNINIT) override { return S_OK; }
   HRESULT STDMETHODCALLTYPE GetColumnInfo(DWORD index, SHCOLUMNINFO* info) override;
   HRESULT STDMETHODCALLTYPE GetItemData(LPCSHCOLUMNID column, LPCSHCOLUMNDATA item, VARIANT* value) override;
 
-  // IPropertySetStorage, read-only. The sets are built at the first call after Load, and every Open of a set
-  // gives the same storage. E_FAIL without a valid file.
+  // IPropertySetStorage, read-only. The sets are created by the first call after Load, and every Open of a
+  // set returns the same storage. Returns E_FAIL without a valid file.
   HRESULT STDMETHODCALLTYPE Open(REFFMTID set, DWORD mode, IPropertyStorage** storage) override;
   HRESULT STDMETHODCALLTYPE Enum(IEnumSTATPROPSETSTG** enumerator) override;
   HRESULT STDMETHODCALLTYPE Create(REFFMTID, const CLSID*, DWORD, DWORD, IPropertyStorage**) override {
@@ -73,10 +75,10 @@ class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPers
   HRESULT BuildPropertySetsOnce();
 
   std::ifstream stream_;
-  std::unique_ptr<FileTypeInfo> reader_;  // reads from stream_, and goes before it
+  std::unique_ptr<FileTypeInfo> reader_;  // reads from stream_, so it is destroyed first
   std::wstring path_;
   SIZE thumbnailSize_{128, 128};
-  std::shared_ptr<const PropertySets> propertySets_;  // null until asked for; shared with the enumerators
+  std::shared_ptr<const PropertySets> propertySets_;  // created on first use; shared with the enumerators
 };
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -1,5 +1,5 @@
-// The shell's interfaces that this layer implements, with the identifiers of those to which mingw-w64's
-// headers attach none.
+// The shell's interfaces that this layer implements, with the identifiers that mingw-w64's headers do not
+// attach to them.
 #pragma once
 
 #include <windows.h>
