@@ -19,13 +19,17 @@ std::string NumberText(std::int64_t value, std::string_view rule) {
   return text.str();
 }
 
-std::string Sentence(const Fault& fault, bool isSwapped) {
-  if (fault.field == nullptr) return fault.rule;
+constexpr const char* kIncomplete = "Copy it again, or wait until it is completely written.";
+constexpr const char* kWrongKind =
+    "Check that the file is of the kind that its extension says. If it is, it is damaged: copy it again.";
+
+FaultText HeaderText(const Fault& fault, bool isSwapped) {
+  if (fault.field == nullptr) return {fault.rule, "The file is intact, but it has no image to show."};
   std::string text =
       isSwapped ? "The header, read as big-endian, is not acceptable: " : "The header is not acceptable: ";
   text += fault.field;
   if (fault.value) text += " is " + NumberText(*fault.value, fault.rule) + " and";
-  return text + " must be " + fault.rule + ".";
+  return {text + " must be " + fault.rule + ".", kWrongKind};
 }
 
 std::string Bytes(std::int64_t count) {
@@ -33,46 +37,50 @@ std::string Bytes(std::int64_t count) {
 }
 
 /// Whether the file, whose size is `end`, holds the frame.
-std::string FrameText(const FrameLayout& frame, std::int64_t end) {
+FaultText FrameText(const FrameLayout& frame, std::int64_t end) {
   if (frame.size.width < 1 || frame.size.height < 1) {
-    return "The picture has no pixels: it is " + std::to_string(frame.size.width) + " x " +
-           std::to_string(frame.size.height) + ".";
+    return {"The picture has no pixels: it is " + std::to_string(frame.size.width) + " x " +
+                std::to_string(frame.size.height) + ".",
+            kWrongKind};
   }
   if (frame.blockPosition < 0 || frame.blockBytes < 0) {
-    return "The picture lies beyond the first 2 GiB of the file, where this format is not read.";
+    return {"The picture lies beyond the first 2 GiB of the file, where this format is not read.",
+            "Save the frames in several smaller files."};
   }
   const std::int64_t frameEnd = frame.blockPosition + frame.blockBytes;
   if (frameEnd > end) {
-    return "The file is cut short: the picture takes the bytes up to " + std::to_string(frameEnd) +
-           ", and the file has " + Bytes(end) + ".";
+    return {"The file is cut short: the picture takes the bytes up to " + std::to_string(frameEnd) +
+                ", and the file has " + Bytes(end) + ".",
+            kIncomplete};
   }
   return {};
 }
 
 template <Parser KindParser>
-std::string TextOf(const KindParser& parser, std::int64_t end) {
-  if (end == 0) return "The file is empty.";
+FaultText TextOf(const KindParser& parser, std::int64_t end) {
+  if (end == 0) return {"The file is empty.", kIncomplete};
   if (parser.stream().eof()) {
-    return "The file ends before its header and index do: it has only " + Bytes(end) + ".";
+    return {"The file ends before its header and index do: it has only " + Bytes(end) + ".", kIncomplete};
   }
-  if (parser.fault()) return Sentence(*parser.fault(), parser.isSwapped());
+  if (parser.fault()) return HeaderText(*parser.fault(), parser.isSwapped());
   return FrameText(parser.frame(), end);
 }
 
 }  // namespace
 
-std::optional<std::string> FaultText(std::istream& stream, const std::wstring& extension) {
+std::optional<FaultText> ExplainFault(std::istream& stream, const std::wstring& extension) {
   stream.seekg(0, std::ios_base::end);
   const std::int64_t end = stream.tellg();
   stream.seekg(0);
-  std::optional<std::string> text;
+  std::optional<FaultText> text;
   WithKindOf(extension, [&]<class KindParser>(const FileKind<KindParser>&) {
     try {
       text = TextOf(KindParser(stream), end);
     } catch (const std::exception& e) {
       stream.clear();
-      text = "The contents cannot be followed beyond byte " + std::to_string(stream.tellg()) + ": " +
-             e.what() + ".";
+      text = {"The contents cannot be followed beyond byte " + std::to_string(stream.tellg()) + ": " +
+                  e.what() + ".",
+              "The file is damaged: copy it again."};
     }
   });
   return text;

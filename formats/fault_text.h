@@ -7,9 +7,15 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Parses the whole stream as a file with `extension` (without the dot) and returns a sentence in English
-/// about what is wrong, as far as the parser can tell; an empty text if nothing is, and none for an unknown
-/// extension.
-std::optional<std::string> FaultText(std::istream& stream, const std::wstring& extension);
+/// Two sentences in English: what is wrong with a file, and what its user can do. Both are empty if nothing
+/// is wrong.
+struct FaultText {
+  std::string fault;
+  std::string advice;
+};
+
+/// Parses the whole stream as a file with `extension` (without the dot) and returns what is wrong, as far as
+/// the parser can tell; nothing for an unknown extension.
+std::optional<FaultText> ExplainFault(std::istream& stream, const std::wstring& extension);
 
 }  // namespace Qel::Lumetra::ShellExt

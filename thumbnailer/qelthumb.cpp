@@ -74,9 +74,9 @@ Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   if (!stream) throw Failure("The file cannot be opened" + Reason());
   // The letters of a known extension are the same in every character set.
   const std::wstring extension = GetExtension({path.native().begin(), path.native().end()});
-  const auto fault = FaultText(stream, extension);
-  if (!fault) throw Failure("Files with this extension have no thumbnail.");
-  if (!fault->empty()) throw Failure(*fault);
+  const auto text = ExplainFault(stream, extension);
+  if (!text) throw Failure("Files with this extension have no thumbnail.");
+  if (!text->fault.empty()) throw Failure(text->fault);
 
   stream.clear();
   stream.seekg(0);

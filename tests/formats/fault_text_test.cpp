@@ -19,7 +19,10 @@ using namespace Testing;
 /// "none" for an extension that has no parser.
 std::string TextOf(const std::string& bytes, const std::wstring& extension) {
   std::istringstream stream(bytes);
-  return FaultText(stream, extension).value_or("none");
+  const auto text = ExplainFault(stream, extension);
+  if (!text) return "none";
+  EXPECT_EQ(text->fault.empty(), text->advice.empty()) << text->fault;
+  return text->fault;
 }
 
 SerFile OneImageSeries() {
@@ -90,6 +93,27 @@ TEST(FaultText, TellsOfAFileWithoutAPicture) {
 TEST(FaultText, TellsOfAPictureThatIsTooFarAway) {
   EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"),
             "The picture lies beyond the first 2 GiB of the file, where this format is not read.");
+}
+
+std::string AdviceFor(const std::string& bytes, const std::wstring& extension) {
+  std::istringstream stream(bytes);
+  return ExplainFault(stream, extension)->advice;
+}
+
+TEST(FaultText, AdvisesWhatToDo) {
+  const std::string incomplete = "Copy it again, or wait until it is completely written.";
+  EXPECT_EQ(AdviceFor("", L"mrc"), incomplete);
+  EXPECT_EQ(AdviceFor("J", L"emi"), incomplete);
+  EXPECT_EQ(AdviceFor(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"), incomplete);
+  const std::string wrongKind =
+      "Check that the file is of the kind that its extension says. If it is, it is damaged: copy it again.";
+  EXPECT_EQ(AdviceFor(MrcFile{.nx = 0}.Bytes(), L"mrc"), wrongKind);
+  EXPECT_EQ(AdviceFor(EmiFile{.items = EmiImageObject("")}.Bytes(), L"emi"), wrongKind);
+  EXPECT_EQ(AdviceFor(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),
+            "The file is damaged: copy it again.");
+  EXPECT_EQ(AdviceFor(EmiFile{}.Bytes(), L"emi"), "The file is intact, but it has no image to show.");
+  EXPECT_EQ(AdviceFor(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"),
+            "Save the frames in several smaller files.");
 }
 
 TEST(FaultText, TellsOfContentsThatCannotBeFollowed) {

@@ -149,7 +149,7 @@ class CommandLine(Test):
     def test_a_pattern_without_a_match_says_so(self):
         result = run("info", "*.mrc", folder=self.folder)
         self.assertEqual((result.returncode, result.stdout, result.stderr),
-                         (FAILED, "", "*.mrc: No file matches.\n"))
+                         (FAILED, "", "*.mrc: No file matches. Check the pattern and its folder.\n"))
         result = run("page", "*.mrc", folder=self.folder)
         self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
         self.assertOneSentence(result.stderr, 'No file matches "*.mrc".')
@@ -461,11 +461,20 @@ class Faults(Test):
         small = self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3)))
         good = self.write("good.mrc", mrc())
         files = self.info(small, good)
-        self.assertIn("0xC0000094", files[0]["remark"])
-        self.assertIn("division by zero", files[0]["remark"])
-        self.assertEqual((files[0]["verdict"], files[0]["thumbnail"]["request"]), ("good", 8))
-        self.assertEqual((files[0]["thumbnail"]["width"], files[0]["thumbnail"]["height"]), (8, 6))
-        self.assertEqual((files[1]["verdict"], files[1]["remark"]), ("good", None))
+        self.assertOneSentence(files[0]["problem"], "in colour and smaller", "256 x 256", "0xC0000094",
+                               "division by zero")
+        self.assertIn("smaller icons", files[0]["advice"])
+        self.assertEqual((files[0]["verdict"], files[0]["thumbnail"]["width"]), ("damaged", 0))
+        self.assertEqual((files[1]["verdict"], files[1]["problem"], files[1]["advice"]), ("good", None, None))
+
+    def test_a_colour_picture_has_a_thumbnail_unless_both_sides_are_smaller_than_the_request(self):
+        small = self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3)))
+        out = self.folder / "out.png"
+        result = run("thumbnail", small, "-o", out, "--size", 9)
+        self.assertEqual((result.returncode, out.exists()), (DAMAGED, False))
+        self.assertOneSentence(result.stderr, small, "in colour and smaller")
+        result = run("thumbnail", small, "-o", out, "--size", 8)
+        self.assertEqual((result.returncode, result.stderr, out.exists()), (DONE, "", True))
 
     def test_in_any_question_are_reported_for_their_file(self):
         names = ("fault in load.mrc", "fault in tip.mrc", "quiet.mrc")
@@ -604,6 +613,8 @@ class Answers(Test):
         longest, too_long = self.info(*(self.write(f"{folder}/{name[:-4]}.mrc", mrc()) for name in names))
         self.assertEqual([len(file["columns"]["items"]) for file in (longest, too_long)], [6, 0])
         self.assertIn("260 characters or more", too_long["columns"]["problem"])
+        self.assertIsNone(longest["remark"])
+        self.assertOneSentence(too_long["remark"], "260 characters", "no columns")
 
     def test_of_a_damaged_file_say_why_they_are_missing(self):
         file, = self.info(self.write("a.mrc", mrc(mode=17)))
@@ -641,15 +652,20 @@ class Page(Test):
             if file["name"] == "broken.ser":
                 self.assertIsNone(picture)
                 self.assertEqual(file["problem"], "The file is empty.")
+                self.assertIn("Copy it again", file["advice"])
+            elif file["name"] == "small.raw":
+                self.assertIsNone(picture)
+                self.assertIn("in colour and smaller", file["problem"])
             else:
                 width, height, _, _ = png_facts((out / picture).read_bytes())
                 self.assertEqual((width, height), (file["thumbnail"]["width"], file["thumbnail"]["height"]))
-        self.assertEqual(len({file["thumbnail"]["picture"] for file in files}), 5)
+        self.assertEqual(len({file["thumbnail"]["picture"] for file in files}), 4)
         self.assertEqual(sorted(path.name for path in out.iterdir()), ["index.html", "pictures"])
 
         lines = result.stdout.splitlines()
         self.assertEqual(len(lines), 1 + len(names) + 2)
-        self.assertIn("4 thumbnails of 5 files", lines[-1])
+        self.assertIn("3 thumbnails of 5 files", lines[-1])
+        self.assertRegex(result.stdout, r"(?m)^small.raw .* none: The picture is in colour and smaller")
         self.assertRegex(result.stdout, r"(?m)^big.MRC .* 4 x 3$")
         self.assertRegex(result.stdout, r"(?m)^broken.ser .* none: The file is empty\.$")
 
@@ -808,12 +824,13 @@ class Doctor(Test):
         cls.wine("regsvr32", "/s", *options, f"Z:{dll}")
 
     def set_registry(self, values):
-        """Sets values to texts and numbers: by their key, and after an "@" their name. None deletes the key."""
+        """Sets values to texts and numbers: by their key, and after an "@" their name. None deletes the value, or
+        without a name the key."""
         lines = ["Windows Registry Editor Version 5.00"]
         for place, text in values.items():
             key, _, name = place.partition("@")
             if text is None:
-                lines += [f"[-{key}]"]
+                lines += [f"[{key}]", f'"{name}"=-'] if name else [f"[-{key}]"]
             elif isinstance(text, int):
                 lines += [f"[{key}]", f'"{name}"=dword:{text:08x}']
             else:
@@ -889,7 +906,7 @@ class Doctor(Test):
                     lines = [line for line in result.stdout.splitlines() if str(path) in line]
                     self.assertEqual(len(lines), int(path in files))
                     for line in lines:
-                        self.assertOneSentence(line, path, "is not read", part)
+                        self.assertOneSentence(line, path, "has no thumbnail", part)
         result, document = self.doctor(good)
         self.assertEqual(result.returncode, DONE)
         self.assertEqual([(each["verdict"], each["frames"], each["shell"]) for each in document["files"]],
@@ -903,6 +920,11 @@ class Doctor(Test):
         document = self.assertProblem("not registered", files=(self.write("a.mrc", mrc()),))
         self.assertEqual(document["files"][0]["verdict"], "failed")
         self.assertOneSentence(document["files"][0]["problem"], "not registered")
+        for text in (document["files"][0]["problem"], document["files"][0]["advice"]):
+            self.assertNotRegex(text, "qelshow doctor|--server")  # that would lead in a circle
+        result = run("info", self.write("a.mrc", mrc()), server=None)
+        self.assertEqual(result.returncode, FAILED)
+        self.assertOneSentence(result.stderr, "not registered", "qelshow doctor", "--server")
         alone = self.write("alone/qelshow.exe", pathlib.Path(QELSHOW).read_bytes())
         result = run("doctor", server=None, program=alone)
         self.assertEqual(result.returncode, FAILED)
@@ -1063,6 +1085,46 @@ class Doctor(Test):
         self.assertEqual({each["dll"] for each in document["classes"]}, {f"Z:{dll}".replace("/", "\\")})
         self.assertEqual({handler["class"] for kind in document["kinds"] for handler in kind["handlers"]},
                          {self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE})
+
+    def test_names_the_settings_of_windows_that_hide_thumbnails(self):
+        windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
+        policies = [root + windows + "Policies\\Explorer" for root in ("HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER")]
+        names = ("IconsOnly", "DisableThumbnails", "DisableThumbnailsOnNetworkFolders")
+        values = {"HKEY_CURRENT_USER" + windows + "Explorer\\Advanced@" + names[0]: 1, f"{policies[0]}@{names[1]}": 1,
+                  f"{policies[1]}@{names[1]}": 1, f"{policies[0]}@{names[2]}": 1, f"{policies[1]}@{names[2]}": 1}
+        self.addCleanup(self.set_registry, dict.fromkeys(values))
+        self.register()
+        self.set_registry(values)
+        self.assertProblems((names[1], policies[0]), (names[1], policies[1]),
+                            (names[2], "in network folders", policies[0]), (names[2], policies[1]),
+                            (names[0], "Folder Options"))
+        self.set_registry(dict.fromkeys(values, 0))
+        self.assertEqual(self.doctor()[0].returncode, DONE)
+
+    def test_sees_that_a_class_is_not_in_the_list_that_a_policy_demands(self):
+        windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
+        enforced = "HKEY_CURRENT_USER" + windows + "Policies\\Explorer@EnforceShellExtensionSecurity"
+        approved = "HKEY_LOCAL_MACHINE" + windows + "Shell Extensions\\Approved"
+        self.addCleanup(self.set_registry, {enforced: None})
+        self.register()
+        self.set_registry({enforced: 1})
+        self.assertEqual(self.doctor()[0].returncode, DONE)  # registering puts the classes into the list
+        classes = (self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE)
+        self.set_registry({f"{approved}@{clsid}": None for clsid in classes})
+        _, document = self.doctor()
+        self.assertEqual({each["condition"] for each in document["classes"]}, {"not approved"})
+        self.assertEqual(len(document["problems"]), 4)
+        self.assertOneSentence(document["problems"][0], self.EXTENSION, "approved", "policy", "run regsvr32")
+        self.set_registry({enforced: 0})
+        self.assertEqual(self.doctor()[0].returncode, DONE)
+
+    def test_sees_that_a_class_has_the_wrong_threads(self):
+        self.register()
+        self.set_registry({f"{self.CLASSES}CLSID\\{self.EXTENSION}\\InProcServer32@ThreadingModel": "Free"})
+        _, document = self.doctor()
+        self.assertEqual(len(document["problems"]), 1)
+        self.assertOneSentence(document["problems"][0], "shell extension", '"Free"', "Apartment", "run regsvr32")
+        self.assertEqual([each["condition"] for each in document["classes"]], ["wrong threads"] + ["works"] * 3)
 
     def test_names_the_program_that_has_taken_a_handler(self):
         foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"

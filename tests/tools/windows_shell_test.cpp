@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "dll_registration.h"
-#include "file_inspection.h"
+#include "file_facts.h"
 #include "machine_registration.h"
 #include "samples.h"
 #include "shell_view.h"
@@ -47,16 +47,15 @@ class WindowsShell : public testing::Test {
     if (const std::string reason = Testing::WhyNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
   }
 
-  /// What the shell shows of every sample, but for those of which no thumbnail can be asked: they end the
-  /// process.
+  /// Returns what the shell shows of every sample, except those whose thumbnail request ends the process.
   std::vector<SampleView> AskForSamples() {
     const RegisteredDll registered;
     Worker worker{std::wstring()};
     std::vector<SampleView> views;
     for (const Samples::Sample& sample : Samples::AllSamples()) {
       const std::wstring path = folder_.Write(sample.name, sample.make()).wstring();
-      const FileFacts facts = InspectFile(worker, path, path, kRequest);
-      if (!facts.remark.empty()) continue;
+      ThumbnailAnswer answer;
+      if (worker.Ask({Subject::kThumbnail, path, kRequest}, answer)) continue;
       SampleView asked{path, {}};
       const auto end = worker.Ask({Subject::kShellView, path, kRequest}, asked.view);
       EXPECT_FALSE(end) << sample.name << ": the process of the shell ends with "

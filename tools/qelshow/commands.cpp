@@ -32,14 +32,25 @@ std::wstring Counted(std::size_t count, const wchar_t* what) {
 
 /// Names a file with what is wrong with it.
 void PrintProblem(const FileFacts& facts) {
-  if (!facts.problem.empty()) PrintError(facts.named + L": " + facts.problem);
+  if (!facts.problem.empty()) PrintError(facts.named + L": " + facts.problem + L" " + facts.advice);
   if (!facts.remark.empty()) PrintError(facts.named + L": " + facts.remark);
+}
+
+/// Loads the extension that the line names.
+Worker StartWorker(const CommandLine& line) {
+  try {
+    return Worker(line.server);
+  } catch (const Failure& failure) {
+    if (!line.server.empty()) throw;
+    throw Failure(failure.sentence +
+                  L" \"qelshow doctor\" says what to do; --server names a DLL that is not registered.");
+  }
 }
 
 }  // namespace
 
 int RunInfo(const CommandLine& line) {
-  Worker worker(line.server);
+  Worker worker = StartWorker(line);
   ProgressBar progress(line.files.size());
   int status = kExitDone;
   std::size_t count = 0;
@@ -66,7 +77,7 @@ int RunThumbnail(const CommandLine& line) {
   const std::wstring& path = line.files.front();
   const bool isToFile = line.out != L"-";
   if (isToFile) CheckPictureOutput(line.out, path);
-  Worker worker(line.server);
+  Worker worker = StartWorker(line);
   const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
   PrintProblem(facts);
   const auto& png = facts.png;
@@ -82,7 +93,7 @@ int RunThumbnail(const CommandLine& line) {
 int RunPage(const CommandLine& line) {
   const std::vector<ListedFile> files = ListFiles(line.files);
   CheckPageOutput(line.out, files.size());
-  Worker worker(line.server);
+  Worker worker = StartWorker(line);
   PageWriter page(line.out);
   constexpr std::size_t kMaxNameWidth = 40;
   std::size_t nameWidth = 4;

@@ -12,30 +12,42 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
+namespace {
+
+Diagnosis Unreachable(const std::wstring& path, DWORD error) {
+  if (IsUnmatchedPattern(path))
+    return {Verdict::kFailed, L"No file matches.", L"Check the pattern and its folder."};
+  const std::wstring problem = L"The file cannot be opened: ";
+  switch (error) {
+    case ERROR_INVALID_NAME:
+      return {Verdict::kFailed, problem + L"Windows cannot represent its name.", L"Rename it."};
+    case ERROR_FILE_NOT_FOUND:
+    case ERROR_PATH_NOT_FOUND:
+      return {Verdict::kFailed, problem + SystemErrorText(error) + L".", L"Check its name and its folder."};
+    default:
+      return {Verdict::kFailed, problem + SystemErrorText(error) + L".",
+              L"Check that you may read it, and that no other program keeps it for itself."};
+  }
+}
+
+}  // namespace
+
 Diagnosis Diagnose(const std::wstring& path) {
   const DWORD attributes = GetFileAttributesW(path.c_str());
-  if (attributes == INVALID_FILE_ATTRIBUTES) {
-    const DWORD error = GetLastError();
-    if (IsUnmatchedPattern(path)) return {Verdict::kFailed, L"No file matches."};
-    if (error == ERROR_INVALID_NAME) {
-      return {Verdict::kFailed, L"The file cannot be opened: Windows cannot represent its name."};
-    }
-    return {Verdict::kFailed, L"The file cannot be opened: " + SystemErrorText(error) + L"."};
-  }
+  if (attributes == INVALID_FILE_ATTRIBUTES) return Unreachable(path, GetLastError());
   if ((attributes & FILE_ATTRIBUTE_DIRECTORY) != 0)
-    return {Verdict::kFailed, L"This is a folder; \"qelshow page\" shows the files in it."};
+    return {Verdict::kFailed, L"This is a folder.", L"\"qelshow page\" shows the files in it."};
 
   std::ifstream stream;
   OpenPath(stream, path.c_str());
-  if (!stream.is_open()) {
-    return {Verdict::kFailed, L"The file cannot be opened: " + SystemErrorText(GetLastError()) + L"."};
+  if (!stream.is_open()) return Unreachable(path, GetLastError());
+  const auto text = ExplainFault(stream, GetExtension(path));
+  if (!text) {
+    return {Verdict::kUnsupported, L"The extension shows " + SupportedExtensions(L"and") + L" files only.",
+            L"If it is one of these, rename it."};
   }
-  const auto fault = FaultText(stream, GetExtension(path));
-  if (!fault) {
-    return {Verdict::kUnsupported, L"The extension shows " + SupportedExtensions(L"and") + L" files only."};
-  }
-  if (!fault->empty()) return {Verdict::kDamaged, Wide(*fault)};
-  return {};
+  if (text->fault.empty()) return {};
+  return {Verdict::kDamaged, Wide(text->fault), Wide(text->advice)};
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

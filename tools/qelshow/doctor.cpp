@@ -60,6 +60,7 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
       facts.name = name;
       facts.verdict = Verdict::kFailed;
       facts.problem = obstacle;
+      facts.advice = L"First solve what is listed under Problems.";
       files.push_back(std::move(facts));
     }
   }
@@ -137,7 +138,8 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
 
 std::wstring FileText(const FileFacts& facts) {
   std::wstring text = L"    " + facts.named + L": ";
-  if (facts.verdict != Verdict::kGood) return text + L"is not read. " + facts.problem + L"\n";
+  if (facts.verdict != Verdict::kGood)
+    return text + L"has no thumbnail. " + facts.problem + L"\n      " + facts.advice + L"\n";
   text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
           L" pixels, frames: " + std::to_wstring(facts.frames) + L", " + facts.type + L"\n";
   for (const auto& sentence : {facts.remark, facts.shell}) {

@@ -48,11 +48,9 @@ std::wstring ExtensionClient::Open(const std::wstring& path) {
                                             IID_IClassFactory, reinterpret_cast<void**>(factory.Put()));
     if (SUCCEEDED(result)) return {};
     if (result == REGDB_E_CLASSNOTREG) {
-      return L"The extension is not registered on this computer: \"qelshow doctor\" says more, "
-             L"and --server names a DLL that is not registered.";
+      return L"The extension is not registered on this computer.";
     }
-    return L"The registered extension cannot be loaded: " + ResultText(result) +
-           L"; \"qelshow doctor\" says more.";
+    return L"The registered extension cannot be loaded: " + ResultText(result) + L".";
   }
   const HMODULE module = LoadLibraryExW(path.c_str(), nullptr, LOAD_WITH_ALTERED_SEARCH_PATH);
   if (module == nullptr) {

@@ -29,7 +29,8 @@ enum class Verdict : std::int32_t {
 /// What the project's own readers find wrong with a file.
 struct Diagnosis {
   Verdict verdict = Verdict::kGood;
-  std::wstring sentence;  // empty for a good file
+  OptionalText problem;
+  OptionalText advice;
 };
 
 /// An answer that is a list. The `problem` of this and of other answers is a sentence that says why there is
@@ -94,6 +95,7 @@ struct FileFacts {
   std::uint64_t bytes = 0;
   Verdict verdict = Verdict::kGood;
   OptionalText problem;  // one sentence for everything but a good file
+  OptionalText advice;   // what to do about the problem, in one sentence
   OptionalText remark;   // one sentence worth knowing about a file, good or not
   OptionalText shell;    // one sentence on what Windows itself shows, where that was asked
 

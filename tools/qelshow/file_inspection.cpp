@@ -45,8 +45,13 @@ std::wstring PixelType(const std::wstring& tip) {
   return end == std::wstring::npos ? std::wstring() : line.substr(end + 2);
 }
 
-/// Requests the thumbnail. A colour picture smaller than the request ends the process; then a thumbnail of
-/// the frame's own size is requested, with a remark.
+constexpr const wchar_t* kReport = L"Please report this, if you can with the file.";
+
+/// Whether the picture is one that ends the process which requests it.
+bool IsSmallColourPicture(const FileFacts& facts, std::int32_t size) {
+  return facts.type.starts_with(L"24 bit") && facts.width < size && facts.height < size;
+}
+
 void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
   ThumbnailAnswer answer;
   const auto end = worker.Ask({Subject::kThumbnail, path, size}, answer);
@@ -54,16 +59,15 @@ void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, 
   facts.thumbnail.request = size;
   facts.png = std::move(answer.png);
   if (!end) return;
-  const std::wstring fault = L"Asked for a thumbnail of " + Square(size) +
-                             L" pixels, the extension ends its process with " + ProcessEndText(*end);
-  const std::int32_t ownSize = std::max(facts.width, facts.height);
-  facts.thumbnail.problem = fault + L".";
-  if (ownSize < 1 || ownSize >= size) return;
-  if (worker.Ask({Subject::kThumbnail, path, ownSize}, answer) || answer.png.empty()) return;
-  facts.thumbnail = std::move(answer.thumbnail);
-  facts.png = std::move(answer.png);
-  facts.remark =
-      fault + L"; the picture shown was asked for at " + Square(ownSize) + L", the frame's own size.";
+  if (IsSmallColourPicture(facts, size)) {
+    facts.thumbnail.problem =
+        L"The picture is in colour and smaller than the thumbnail requested, " + Square(size) +
+        L" pixels: it has none, and the process that requests it ends with " + ProcessEndText(*end) + L".";
+    facts.advice = L"View it with smaller icons, or save it in a larger size.";
+  } else {
+    facts.thumbnail.problem = L"Asked for a thumbnail of " + Square(size) +
+                              L" pixels, the extension ends its process with " + ProcessEndText(*end) + L".";
+  }
 }
 
 }  // namespace
@@ -81,13 +85,15 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
 
   Diagnosis diagnosis;
   if (const auto end = worker.Ask({Subject::kDiagnosis, absolute}, diagnosis)) {
-    diagnosis = {Verdict::kDamaged, L"Reading the file ends the process with " + ProcessEndText(*end) + L"."};
+    diagnosis = {Verdict::kDamaged, L"Reading the file ends the process with " + ProcessEndText(*end) + L".",
+                 kReport};
   }
   facts.verdict = diagnosis.verdict;
-  facts.problem = diagnosis.sentence;
+  facts.problem = diagnosis.problem;
+  facts.advice = diagnosis.advice;
   if (diagnosis.verdict == Verdict::kFailed || diagnosis.verdict == Verdict::kUnsupported) {
     facts.thumbnail.problem = facts.tip.problem = facts.columns.problem = facts.propertySets.problem =
-        facts.propertyStore.problem = diagnosis.sentence;
+        facts.propertyStore.problem = diagnosis.problem;
     return facts;
   }
   Fill(worker, Subject::kTip, absolute, L"the tip", facts.tip);
@@ -105,9 +111,15 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   if (!facts.png.empty()) {
     facts.verdict = Verdict::kGood;
     facts.problem.clear();
+    facts.advice.clear();
   } else if (facts.verdict == Verdict::kGood) {
     facts.verdict = Verdict::kDamaged;
     facts.problem = facts.thumbnail.problem;
+    if (facts.advice.empty()) facts.advice = kReport;
+  }
+  if (absolute.size() >= MAX_PATH) {
+    facts.remark = L"Its path has " + std::to_wstring(absolute.size()) +
+                   L" characters, and from 260 on Windows shows no columns: move it or shorten a name.";
   }
   return facts;
 }

@@ -2,11 +2,13 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <iterator>
 #include <map>
 
 #include "class_ids.h"
 #include "failure.h"
 #include "same_text.h"
+#include "shell_obstacles.h"
 #include "text_tools.h"
 #include "worker.h"
 
@@ -63,6 +65,27 @@ void ExamineObject(ExaminedClass& examined, Workers& workers) {
   }
 }
 
+/// Finds what keeps the shell from using a class that works in another program.
+void ExamineUse(ExaminedClass& examined, const std::wstring& id) {
+  const RegisteredClass& registered = examined.registered;
+  const std::wstring subject = L"The class of the " + examined.name;
+  if (!registered.blocked.empty()) {
+    examined.condition = Condition::kBlocked;
+    examined.problem = subject + L" is disabled in the shell: remove the value " + id + L" from " +
+                       registered.blocked + L".";
+  } else if (registered.isUnapproved) {
+    examined.condition = Condition::kUnapproved;
+    examined.problem = subject + L", " + id +
+                       L", is not in the list of approved extensions, which a policy demands: " +
+                       RegisterAdvice(registered.dll) + L".";
+  } else if (!SameIgnoringCase(registered.threadingModel, L"Apartment") &&
+             !SameIgnoringCase(registered.threadingModel, L"Both")) {
+    examined.condition = Condition::kThreading;
+    examined.problem = subject + L" is registered with the ThreadingModel \"" + registered.threadingModel +
+                       L"\" instead of \"Apartment\" or \"Both\": " + RegisterAdvice(registered.dll) + L".";
+  }
+}
+
 ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& workers) {
   const std::wstring id = GuidText(clsid);
   ExaminedClass examined;
@@ -85,12 +108,7 @@ ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& wor
     examined.version = FileVersion(dll);
     ExamineObject(examined, workers);
   }
-  const std::wstring& blocked = examined.registered.blocked;
-  if (examined.condition == Condition::kWorks && !blocked.empty()) {
-    examined.condition = Condition::kBlocked;
-    examined.problem = L"The class of the " + examined.name +
-                       L" is disabled in the shell: remove the value " + id + L" from " + blocked + L".";
-  }
+  if (examined.condition == Condition::kWorks) ExamineUse(examined, id);
   return examined;
 }
 
@@ -207,6 +225,8 @@ std::wstring ConditionText(Condition condition) {
     case Condition::kDllNotLoaded: return L"DLL not loaded";
     case Condition::kNoObject: return L"no object";
     case Condition::kBlocked: return L"disabled";
+    case Condition::kUnapproved: return L"not approved";
+    case Condition::kThreading: return L"wrong threads";
   }
   return {};
 }
@@ -227,6 +247,7 @@ Installation ExamineInstallation() {
   }
   FindLeftOut(installation);
   installation.problems = FindProblems(installation);
+  std::ranges::move(FindSettingsThatHideThumbnails(), std::back_inserter(installation.problems));
   return installation;
 }
 

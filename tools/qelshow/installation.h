@@ -14,7 +14,17 @@
 namespace Qel::Lumetra::ShellExt::Show {
 
 /// How far the way goes.
-enum class Condition { kWorks, kNotRegistered, kForeign, kDllNotFound, kDllNotLoaded, kNoObject, kBlocked };
+enum class Condition {
+  kWorks,
+  kNotRegistered,
+  kForeign,
+  kDllNotFound,
+  kDllNotLoaded,
+  kNoObject,
+  kBlocked,
+  kUnapproved,
+  kThreading
+};
 
 /// A few words, for tables and JSON.
 std::wstring ConditionText(Condition condition);

@@ -1,12 +1,12 @@
 #include "registered_handlers.h"
 
 #include <cstddef>
-#include <cwchar>
 #include <iterator>
 
 #include "class_ids.h"
 #include "file_kinds.h"
 #include "handle_owner.h"
+#include "registry_values.h"
 #include "shell_requests.h"
 #include "text_tools.h"
 
@@ -30,19 +30,6 @@ constexpr std::size_t kMaxKeyCharacters = 255;  // of the name of a key, which i
 constexpr const wchar_t* kPropertyHandlers =
     LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
 
-/// A text in the registry, with environment variables replaced; empty without one. Without `name` it is the
-/// default value.
-std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name = nullptr) {
-  DWORD bytes = 0;
-  if (RegGetValueW(root, key.c_str(), name, RRF_RT_REG_SZ, nullptr, nullptr, &bytes) != ERROR_SUCCESS)
-    return {};
-  std::wstring text(bytes / sizeof(wchar_t), L'\0');
-  if (RegGetValueW(root, key.c_str(), name, RRF_RT_REG_SZ, nullptr, text.data(), &bytes) != ERROR_SUCCESS)
-    return {};
-  text.resize(std::wcslen(text.c_str()));
-  return text;
-}
-
 /// A path without detours; a bare file name, which the system looks for in its folders, and no text stay.
 std::wstring FullPath(const std::wstring& path) {
   return path.find(L'\\') == std::wstring::npos ? path : AbsolutePath(path);
@@ -52,13 +39,21 @@ std::wstring FullPath(const std::wstring& path) {
 std::wstring BlockingKey(const std::wstring& clsid) {
   constexpr const wchar_t* kBlocked =
       LR"(Software\Microsoft\Windows\CurrentVersion\Shell Extensions\Blocked)";
-  const auto holds = [&](HKEY root) {
-    return RegGetValueW(root, kBlocked, clsid.c_str(), RRF_RT_ANY, nullptr, nullptr, nullptr) ==
-           ERROR_SUCCESS;
-  };
-  if (holds(HKEY_LOCAL_MACHINE)) return std::wstring(L"HKEY_LOCAL_MACHINE\\") + kBlocked;
-  if (holds(HKEY_CURRENT_USER)) return std::wstring(L"HKEY_CURRENT_USER\\") + kBlocked;
+  if (HasValue(HKEY_LOCAL_MACHINE, kBlocked, clsid)) return std::wstring(L"HKEY_LOCAL_MACHINE\\") + kBlocked;
+  if (HasValue(HKEY_CURRENT_USER, kBlocked, clsid)) return std::wstring(L"HKEY_CURRENT_USER\\") + kBlocked;
   return {};
+}
+
+/// Whether a policy keeps the shell from using the class because it is not in a list of approved ones.
+bool IsUnapproved(const std::wstring& clsid) {
+  constexpr const wchar_t* kPolicies = LR"(Software\Microsoft\Windows\CurrentVersion\Policies\Explorer)";
+  constexpr const wchar_t* kEnforced = L"EnforceShellExtensionSecurity";
+  constexpr const wchar_t* kApproved =
+      LR"(Software\Microsoft\Windows\CurrentVersion\Shell Extensions\Approved)";
+  const bool isEnforced = NumberValue(HKEY_LOCAL_MACHINE, kPolicies, kEnforced) != 0 ||
+                          NumberValue(HKEY_CURRENT_USER, kPolicies, kEnforced) != 0;
+  return isEnforced && !HasValue(HKEY_LOCAL_MACHINE, kApproved, clsid) &&
+         !HasValue(HKEY_CURRENT_USER, kApproved, clsid);
 }
 
 /// The keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, the one that counts most first:
@@ -112,8 +107,13 @@ RegisteredClass ReadClass(const std::wstring& clsid) {
   const std::wstring path = L"CLSID\\" + clsid;
   Com::OwnedKey key;
   if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, key.Put()) != ERROR_SUCCESS) return {};
-  return {true, TextValue(HKEY_CLASSES_ROOT, path),
-          FullPath(TextValue(HKEY_CLASSES_ROOT, path + L"\\InprocServer32")), BlockingKey(clsid)};
+  const std::wstring server = path + L"\\InprocServer32";
+  return {true,
+          TextValue(HKEY_CLASSES_ROOT, path),
+          FullPath(TextValue(HKEY_CLASSES_ROOT, server)),
+          TextValue(HKEY_CLASSES_ROOT, server, L"ThreadingModel"),
+          BlockingKey(clsid),
+          IsUnapproved(clsid)};
 }
 
 std::wstring InstalledProduct() {
@@ -124,12 +124,8 @@ std::wstring InstalledProduct() {
   wchar_t name[kMaxKeyCharacters + 1];
   for (DWORD i = 0; RegEnumKeyW(key.Get(), i, name, std::size(name)) == ERROR_SUCCESS; ++i) {
     const std::wstring entry = uninstall + L"\\" + name;
-    DWORD byInstaller = 0;
-    DWORD bytes = sizeof(byInstaller);
     if (TextValue(HKEY_LOCAL_MACHINE, entry, L"DisplayName") == L"QelShellExt" &&
-        RegGetValueW(HKEY_LOCAL_MACHINE, entry.c_str(), L"WindowsInstaller", RRF_RT_REG_DWORD, nullptr,
-                     &byInstaller, &bytes) == ERROR_SUCCESS &&
-        byInstaller != 0) {
+        NumberValue(HKEY_LOCAL_MACHINE, entry, L"WindowsInstaller") != 0) {
       return name;
     }
   }

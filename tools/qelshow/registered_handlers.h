@@ -32,8 +32,10 @@ std::vector<KindOfFile> ReadHandlers();
 struct RegisteredClass {
   bool exists = false;
   std::wstring title;
-  OptionalText dll;      // path
-  std::wstring blocked;  // the key, if any, that keeps the shell from using the class
+  OptionalText dll;  // path
+  std::wstring threadingModel;
+  std::wstring blocked;       // the key, if any, that keeps the shell from using the class
+  bool isUnapproved = false;  // a policy demands that it is in a list, and it is not
 };
 
 RegisteredClass ReadClass(const std::wstring& clsid);

@@ -5,6 +5,7 @@
 #include <shlwapi.h>
 
 #include "class_ids.h"
+#include "registry_values.h"
 #include "text_tools.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
@@ -13,17 +14,33 @@ namespace {
 constexpr const wchar_t* kPolicies = LR"(Software\Microsoft\Windows\CurrentVersion\Policies\Explorer)";
 constexpr const wchar_t* kFolderOptions = LR"(Software\Microsoft\Windows\CurrentVersion\Explorer\Advanced)";
 
-/// Whether a number in the registry is there and not zero.
-bool IsSet(HKEY root, const std::wstring& key, const wchar_t* name) {
-  DWORD number = 0;
-  DWORD size = sizeof number;
-  return RegGetValueW(root, key.c_str(), name, RRF_RT_REG_DWORD, nullptr, &number, &size) == ERROR_SUCCESS &&
-         number != 0;
+/// A number in the registry that hides thumbnails unless it is 0.
+struct HidingSetting {
+  const wchar_t* name;  // as Windows calls it
+  const wchar_t* value;
+  bool isPolicy;
+  bool isForNetworkFolders;
+};
+
+constexpr HidingSetting kHidingSettings[] = {
+    {L"\"Turn off the display of thumbnails and only display icons\"", L"DisableThumbnails", true, false},
+    {L"\"Turn off the display of thumbnails and only display icons on network folders\"",
+     L"DisableThumbnailsOnNetworkFolders", true, true},
+    {L"\"Always show icons, never thumbnails\"", L"IconsOnly", false, false},
+};
+
+std::wstring NameOf(const HidingSetting& setting) {
+  return std::wstring(L"the ") + (setting.isPolicy ? L"policy " : L"setting ") + setting.name;
 }
 
-/// Whether the policy is set, for the user or for the computer.
-bool IsPolicy(const wchar_t* name) {
-  return IsSet(HKEY_CURRENT_USER, kPolicies, name) || IsSet(HKEY_LOCAL_MACHINE, kPolicies, name);
+/// Returns the keys in which it is on. A policy can be for the computer or for the user.
+std::vector<std::wstring> KeysThatTurnOn(const HidingSetting& setting) {
+  const std::wstring key = setting.isPolicy ? kPolicies : kFolderOptions;
+  std::vector<std::wstring> keys;
+  if (setting.isPolicy && NumberValue(HKEY_LOCAL_MACHINE, key, setting.value) != 0)
+    keys.push_back(L"HKEY_LOCAL_MACHINE\\" + key);
+  if (NumberValue(HKEY_CURRENT_USER, key, setting.value) != 0) keys.push_back(L"HKEY_CURRENT_USER\\" + key);
+  return keys;
 }
 
 /// Whether the contents of the file are somewhere else, as with cloud storage.
@@ -36,21 +53,31 @@ bool IsPlaceholder(const std::wstring& path) {
 
 }  // namespace
 
+std::vector<std::wstring> FindSettingsThatHideThumbnails() {
+  std::vector<std::wstring> sentences;
+  for (const HidingSetting& setting : kHidingSettings) {
+    for (const std::wstring& key : KeysThatTurnOn(setting)) {
+      sentences.push_back(std::wstring(L"Windows shows no thumbnails ") +
+                          (setting.isForNetworkFolders ? L"in network folders " : L"") + L"because of " +
+                          NameOf(setting) + L" (" + setting.value + L" in " + key + L"): " +
+                          (setting.isPolicy ? L"ask an administrator to remove it"
+                                            : L"clear it in Folder Options, on the View tab") +
+                          L".");
+    }
+  }
+  return sentences;
+}
+
 std::wstring CauseOfNoThumbnail(const std::wstring& path) {
-  if (IsPolicy(L"DisableThumbnails")) {
-    return L"the policy \"Turn off the display of thumbnails and only display icons\"";
-  }
-  if (PathIsNetworkPathW(path.c_str()) && IsPolicy(L"DisableThumbnailsOnNetworkFolders")) {
-    return L"the policy \"Turn off the display of thumbnails and only display icons on network folders\"";
-  }
-  if (IsSet(HKEY_CURRENT_USER, kFolderOptions, L"IconsOnly")) {
-    return L"the setting \"Always show icons, never thumbnails\" in Folder Options";
+  for (const HidingSetting& setting : kHidingSettings) {
+    if (setting.isForNetworkFolders && !PathIsNetworkPathW(path.c_str())) continue;
+    if (!KeysThatTurnOn(setting).empty()) return NameOf(setting);
   }
   if (IsPlaceholder(path)) return L"that the file is a placeholder of cloud storage, not on this computer";
-  if (!IsSet(HKEY_CLASSES_ROOT, L"CLSID\\" + GuidText(CLSID_QelShellExt), L"DisableProcessIsolation")) {
+  if (NumberValue(HKEY_CLASSES_ROOT, L"CLSID\\" + GuidText(CLSID_QelShellExt), L"DisableProcessIsolation") ==
+      0) {
     return L"the isolated process in which Windows runs thumbnail handlers: see \"Before you deploy\" in the "
-           L"user "
-           L"guide about the feature inprocess";
+           L"user guide about the feature inprocess";
   }
   return L"not known: log on again, and see \"Why a thumbnail may be missing\" in the user guide";
 }

@@ -1,11 +1,16 @@
-// The settings and policies of Windows that keep its shell from showing what the extension answers.
+// What keeps the Windows shell from showing what the extension returns: settings, policies, and the state of
+// a file. The doctor names each setting; a comparison with the shell (shell_view.h) names the likely cause.
 #pragma once
 
 #include <string>
+#include <vector>
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Each names the most likely cause, to follow "the likely cause is".
+/// Returns a sentence for each setting and policy that hides thumbnails, with what to do about it.
+std::vector<std::wstring> FindSettingsThatHideThumbnails();
+
+/// Each returns the most likely cause, to follow "the likely cause is".
 std::wstring CauseOfNoThumbnail(const std::wstring& path);
 std::wstring CauseOfAnotherThumbnail();
 std::wstring CauseOfOtherProperties();
