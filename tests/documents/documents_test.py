@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Checks that the documents lead to places that exist, and name the version that is built and all file kinds.
+"""Checks that the links of the documents work, and that the documents name the current version and all file kinds.
 
 usage: documents_test.py PROJECT_FOLDER VERSION
 """
@@ -16,7 +16,7 @@ from file_kinds import EXTENSIONS, KINDS  # noqa: E402
 
 
 def anchors(text):
-    """The places in a document that a link can name: its headings in small letters, blanks as hyphens."""
+    """Returns the anchors that a link to a document can name: its headings in lower case, with hyphens for spaces."""
     return {re.sub(r"[^\w\- ]", "", heading.lower()).replace(" ", "-")
             for heading in re.findall(r"(?m)^#+ +(.+)$", text)}
 
@@ -24,7 +24,7 @@ def anchors(text):
 class Documents(unittest.TestCase):
     documents = [*PROJECT.glob("*.md"), *PROJECT.glob("docs/*.md")]
 
-    def test_link_to_files_and_headings_that_are_there(self):
+    def test_link_to_files_and_headings_that_exist(self):
         links = [(document, link) for document in self.documents
                  for link in re.findall(r"\]\(([^)\s]+)\)", document.read_text("utf-8"))]
         self.assertGreater(len(links), 10)
@@ -38,7 +38,7 @@ class Documents(unittest.TestCase):
                 if anchor:
                     self.assertIn(anchor, anchors(target.read_text("utf-8")))
 
-    def test_name_scripts_that_are_there(self):
+    def test_name_scripts_that_exist(self):
         for document in self.documents:
             for script in re.findall(r"(?<![\w/])scripts/([a-z-]+)", document.read_text("utf-8")):
                 with self.subTest(document=document.name, script=script):
@@ -48,7 +48,7 @@ class Documents(unittest.TestCase):
         reached = set(re.findall(r"\]\(([^)\s#]+\.md)", (PROJECT / "README.md").read_text("utf-8"))) | {"README.md"}
         self.assertEqual(reached, {str(document.relative_to(PROJECT)) for document in self.documents})
 
-    def test_tell_of_the_version_that_is_built(self):
+    def test_name_the_current_version(self):
         versions = re.findall(r"(?m)^## \[([\d.]+)\]", (PROJECT / "CHANGELOG.md").read_text("utf-8"))
         self.assertEqual(versions[0], VERSION)
         packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / "README.md").read_text("utf-8"))
@@ -56,17 +56,17 @@ class Documents(unittest.TestCase):
 
 
 class FileKinds(unittest.TestCase):
-    """What cannot be derived from the list of file kinds (formats/file_kinds.h)."""
+    """Checks the places that name every file kind and are not derived from the list (formats/file_kinds.h)."""
 
     def assertSame(self, found, expected):
         self.assertEqual(sorted(found), sorted(expected))
 
-    def test_are_read_as_they_are_written(self):
+    def test_are_all_read_from_the_list(self):
         rows = (PROJECT / "formats" / "file_kinds.h").read_text("utf-8").count("    FileKind<")
         self.assertGreater(rows, 0)
         self.assertEqual(len(EXTENSIONS), rows)
 
-    def test_are_all_named_where_the_program_is_introduced(self):
+    def test_are_all_named_in_the_introduction_of_the_readme(self):
         first_sentences = " ".join((PROJECT / "README.md").read_text("utf-8")[:800].split())
         self.assertSame(re.findall(r"\.([a-z]+)`?(?:, | and | files)", first_sentences), EXTENSIONS)
 
@@ -80,7 +80,7 @@ class FileKinds(unittest.TestCase):
             with self.subTest(document=name):
                 self.assertSame(extensions, EXTENSIONS)
 
-    def test_have_a_section_that_tells_their_format(self):
+    def test_have_a_section_that_describes_their_format(self):
         text = (PROJECT / "docs" / "formats.md").read_text("utf-8")
         self.assertSame(re.findall(r"(?m)^## (\w+)$", text), [kind.upper() for kind in KINDS])
 

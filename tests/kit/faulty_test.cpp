@@ -1,5 +1,6 @@
-// A test program of which one test passes, one is skipped, one fails and one ends the program: for the test
-// of run_tests, which must count all of them.
+// A test program in which one test passes, one is skipped, one fails and one ends the program. The test of
+// run_tests
+// checks that all four are counted.
 #include <gtest/gtest.h>
 
 #include <cstdlib>

@@ -18,7 +18,7 @@ import zipfile
 
 SOURCES, BUILD, FAULTY_TEST = map(pathlib.Path, sys.argv[1:4])
 
-CMD = r"C:\windows\system32\cmd.exe"  # in full: else Wine starts one more program, which looks for it
+CMD = r"C:\windows\system32\cmd.exe"  # the full path: otherwise Wine starts another program to find it
 
 
 class Test(unittest.TestCase):
@@ -30,9 +30,9 @@ class Test(unittest.TestCase):
         self.folder.mkdir()
 
     def run_kit(self, kit):
-        """The exit status of run-tests.cmd, and the lines of what it prints and of its log."""
+        """Returns the exit status of run-tests.cmd, the lines that it prints, and the lines of its log."""
         out = self.folder / "out"
-        with out.open("wb") as file:  # a pipe would be kept open by the desktop that Wine starts
+        with out.open("wb") as file:  # Wine's desktop process would keep a pipe open
             status = subprocess.run(["wine", CMD, "/c", "run-tests.cmd"], cwd=kit, stdin=subprocess.DEVNULL,
                                     stdout=file, stderr=subprocess.DEVNULL).returncode  # Wine's own messages
         log = kit / "test-log.txt"
@@ -51,21 +51,21 @@ class Runner(Test):
     def add(self, program):
         shutil.copyfile(program, self.kit / "tests" / program.name)
 
-    def test_counts_every_test_also_of_a_program_that_ends_early(self):
+    def test_counts_every_test_even_of_a_program_that_ends_early(self):
         self.add(BUILD / "tests" / "render_test.exe")
         self.add(FAULTY_TEST)
         (self.kit / "tests" / "other_test.exe").write_text("no program")
         status, out, log = self.run_kit(self.kit)
         self.assertEqual(status, 1)
         passed = int(re.fullmatch(r"render_test: (\d+) passed, 0 failed, 0 skipped", out[-2])[1])
-        self.assertEqual(out[1:-2], ["  It ends with status 7.", "faulty_test: 1 passed, 2 failed, 1 skipped",
-                                     "  Skipped: for a reason", "  It does not start: error 193.",
+        self.assertEqual(out[1:-2], ["  Exited with status 7.", "faulty_test: 1 passed, 2 failed, 1 skipped",
+                                     "  Skipped: for a reason", "  Could not be started: error 193.",
                                      "other_test: 0 passed, 1 failed, 0 skipped"])
         self.assertEqual(out[-1], f"{passed + 1} passed, 3 failed, 1 skipped")
         self.assertEqual([line for line in out if line not in log], [])
         self.assertIn("[ RUN      ] Faulty.EndsTheProgram", log)
 
-    def test_succeeds_only_where_tests_have_passed(self):
+    def test_succeeds_only_when_tests_have_passed(self):
         status, out, _ = self.run_kit(self.kit)
         self.assertEqual((status, out[1:]), (1, ["0 passed, 0 failed, 0 skipped"]))
         self.add(BUILD / "tests" / "render_test.exe")

@@ -1,8 +1,11 @@
-// run_tests: runs every test program beside it, one after the other, and counts their tests. The test
-// programs are those of GoogleTest whose names end in _test.exe; their current folder is data. What they
-// print goes into test-log.txt in the folder above.
+// run_tests: runs every test program in its folder, one after the other, and counts their tests. A test
+// program is a
+// program of GoogleTest whose name ends in _test.exe. Its current folder is the subfolder data. Its output
+// goes to
+// test-log.txt in the parent folder.
 //
-// Exits with 0 if no test failed, with 1 if one did, and with 2 if there is no log to write.
+// Exits with 0 if tests have passed and none has failed, with 2 if the log cannot be written, and with 1
+// otherwise.
 #include <windows.h>
 
 #include <algorithm>
@@ -17,14 +20,14 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// After so long a program is taken to hang.
+/// A program that takes longer, in milliseconds, is ended and counts as failed.
 constexpr DWORD kLongestRun = 30 * 60 * 1000;
 
 struct Results {
   int passed = 0;
   int failed = 0;
   int skipped = 0;
-  std::set<std::string> reasons;  // why tests were skipped
+  std::set<std::string> reasons;  // why tests have been skipped
 
   void Add(const Results& other) {
     passed += other.passed;
@@ -39,8 +42,9 @@ std::string Text(const Results& results) {
          std::to_string(results.skipped) + " skipped";
 }
 
-/// Counts the tests in what a program printed. A test that has begun and neither passed nor was skipped has
-/// failed, whether it says so or the program ended within it.
+/// Counts the tests in the output of a program. A test that has begun but has neither passed nor been skipped
+/// counts as
+/// failed: it may have ended the program.
 Results Count(std::string_view output) {
   Results results;
   bool isInTest = false;
@@ -69,10 +73,10 @@ Results Count(std::string_view output) {
   return results;
 }
 
-/// The file that the tests and this program write.
+/// The log, to which both this program and the tests write.
 class Log {
  public:
-  /// Empty at first. What has been opened can be inherited by child processes.
+  /// Creates an empty file. Child processes inherit its handle.
   explicit Log(const fs::path& path) {
     SECURITY_ATTRIBUTES inheritable = {sizeof inheritable, nullptr, TRUE};
     file_ = CreateFileW(path.c_str(), GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
@@ -90,7 +94,7 @@ class Log {
     WriteFile(file_, text.data(), static_cast<DWORD>(text.size()), &written, nullptr);
   }
 
-  /// Prints a line, too.
+  /// Writes a line to the log and to standard output.
   void Say(const std::string& line) const {
     std::puts(line.c_str());
     std::fflush(stdout);
@@ -103,7 +107,7 @@ class Log {
     return size.QuadPart;
   }
 
-  /// What has been written since the log had `size` bytes.
+  /// Returns what has been written since the log had `size` bytes.
   std::string Since(LONGLONG size) const {
     std::string text(static_cast<std::size_t>(Size() - size), '\0');
     Seek(size, FILE_BEGIN);
@@ -124,8 +128,9 @@ class Log {
   HANDLE file_;
 };
 
-/// Runs a program to its end, which it writes to the log unless the program exits with 0. Returns whether it
-/// did.
+/// Runs a program to its end. Returns whether it exits with 0. Otherwise it logs how the program ended,
+/// unless the status
+/// is 1, the status of failed tests.
 bool Run(const fs::path& program, const Log& log) {
   std::wstring command = L"\"" + program.wstring() + L"\" --gtest_color=no";
   STARTUPINFOW startup{};
@@ -135,7 +140,7 @@ bool Run(const fs::path& program, const Log& log) {
   PROCESS_INFORMATION process{};
   if (!CreateProcessW(program.c_str(), command.data(), nullptr, nullptr, TRUE, 0, nullptr,
                       (program.parent_path() / L"data").c_str(), &startup, &process)) {
-    log.Say("  It does not start: error " + std::to_string(GetLastError()) + ".");
+    log.Say("  Could not be started: error " + std::to_string(GetLastError()) + ".");
     return false;
   }
   const bool hasEnded = WaitForSingleObject(process.hProcess, kLongestRun) == WAIT_OBJECT_0;
@@ -144,8 +149,8 @@ bool Run(const fs::path& program, const Log& log) {
   GetExitCodeProcess(process.hProcess, &status);
   CloseHandle(process.hThread);
   CloseHandle(process.hProcess);
-  if (!hasEnded) log.Say("  It does not end.");
-  if (hasEnded && status > 1) log.Say("  It ends with status " + std::to_string(status) + ".");
+  if (!hasEnded) log.Say("  Did not end within 30 minutes.");
+  if (hasEnded && status > 1) log.Say("  Exited with status " + std::to_string(status) + ".");
   return hasEnded && status == 0;
 }
 
@@ -168,7 +173,7 @@ std::vector<fs::path> TestPrograms(const fs::path& folder) {
   return programs;
 }
 
-/// GetVersion would tell the version that this program says it was made for.
+/// Returns the version of Windows. GetVersion would return the version that the program's manifest names.
 std::string WindowsVersion() {
   using GetTrueVersion = LONG WINAPI(OSVERSIONINFOW*);
   const auto getVersion = reinterpret_cast<GetTrueVersion*>(
@@ -183,14 +188,14 @@ std::string WindowsVersion() {
 }  // namespace
 
 int main() {
-  // Some tests end processes on purpose. Their children inherit that there is no dialog.
+  // Some tests end processes on purpose. Child processes inherit this mode, so no dialog appears.
   SetErrorMode(SEM_FAILCRITICALERRORS | SEM_NOGPFAULTERRORBOX | SEM_NOOPENFILEERRORBOX);
   std::wstring path(32768, L'\0');
   path.resize(GetModuleFileNameW(nullptr, path.data(), static_cast<DWORD>(path.size())));
   const fs::path folder = fs::path(path).parent_path();
   const Log log(folder.parent_path() / L"test-log.txt");
   if (!log.isOpen()) {
-    std::puts("test-log.txt cannot be written: unpack the tests into a folder of your own.");
+    std::puts("test-log.txt cannot be written. Unpack the tests into a folder in which you may write.");
     return 2;
   }
   log.Say(WindowsVersion());

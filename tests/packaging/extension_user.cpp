@@ -1,7 +1,8 @@
-// A program that uses the registered extension while it is replaced: makes an object, says so, waits for a
-// line or the end of its input, and makes another one while the first is still there.
+// A program that uses the registered extension while it is replaced. It makes an object, prints "using",
+// waits for a line
+// or the end of its input, and makes a second object while the first still exists.
 //
-// exit status: 0 both objects could be made
+// Exits with 0 if it could make both objects.
 #include <windows.h>
 
 #include <objbase.h>

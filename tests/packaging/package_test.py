@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Makes the packages and uses them as an administrator does, in a Wine prefix of their own.
+"""Makes the packages and uses them as an administrator does, in a separate Wine prefix.
 
 usage: package_test.py SOURCES BUILD EXTENSION_USER [TEST_CLASS ...]
 
@@ -25,10 +25,10 @@ FILES = ("NOTICES.txt", "QelShellExt.dll", "README.txt", "qelshow.exe")
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 EPOCH = "1700000000"
 
-# In full: else Wine starts one more program, which looks for them.
+# The full paths: otherwise Wine starts another program to find them.
 SYSTEM, REGEDIT = "C:\\windows\\system32\\", r"C:\windows\regedit.exe"
 
-# What msiexec answers, as far as Linux sees it.
+# The exit statuses of msiexec. Linux sees only the low 8 bits.
 DONE, FAILED, RESTART_NEEDED = 0, 1603 & 0xFF, 3010 & 0xFF
 
 
@@ -39,13 +39,13 @@ def make_packages(out, build=BUILD, epoch=EPOCH, **options):
 
 
 def package(out, ending=".msi"):
-    """The one package in a folder."""
+    """Returns the path of the only package of this kind in a folder."""
     [path] = out.glob("*-x64" + ending)
     return path
 
 
 def copy_build(folder):
-    """What packages are made of, and no more."""
+    """Copies the files that packages are made of, and nothing else."""
     folder.mkdir()
     tests = pathlib.Path("tests", "kit_programs.txt")
     for name in ("CMakeCache.txt", *PROGRAMS, *(f"{program}.debug" for program in PROGRAMS), tests,
@@ -58,7 +58,7 @@ def copy_build(folder):
 
 
 def next_version(build):
-    """Makes the build one of a version that is higher by one, with a DLL that says so."""
+    """Raises the version of a build by one patch level, also in the DLL's version resource."""
     cache = build / "CMakeCache.txt"
     text = cache.read_text()
     version = re.search(r"^CMAKE_PROJECT_VERSION:STATIC=(.*)$", text, re.MULTILINE)[1]
@@ -92,7 +92,7 @@ class Contents(Test):
         cls.out = pathlib.Path(folder.name)
         cls.told = make_packages(cls.out).stderr
 
-    def test_are_the_same_whoever_makes_them_wherever_and_whenever(self):
+    def test_are_identical_whoever_makes_them_wherever_and_whenever(self):
         first, second = self.out, self.folder / "second"
         make_packages(second.relative_to("/"), copy_build(self.folder / "another folder"), umask=0o077, cwd="/",
                       environment={"TZ": "Asia/Tokyo", "LC_ALL": "C"})
@@ -101,7 +101,7 @@ class Contents(Test):
         for path in first.iterdir():
             self.assertEqual(digest(path), digest(second / path.name), path.name)
 
-    def test_hold_what_was_built_and_its_sums(self):
+    def test_contain_the_built_programs_and_their_checksums(self):
         sums = dict(reversed(line.split()) for line in (self.out / "SHA256SUMS").read_text().splitlines())
         self.assertEqual(sums, {path.name: digest(path) for path in self.out.iterdir() if path.name != "SHA256SUMS"})
         self.assertEqual(len(sums), 4)
@@ -111,7 +111,7 @@ class Contents(Test):
             for program in PROGRAMS:
                 self.assertEqual(files.read(f"{archive.stem}/{program}"), (BUILD / program).read_bytes())
 
-    def test_hold_tests_of_the_same_programs_that_know_no_folder_of_this_machine(self):
+    def test_contain_tests_of_the_same_programs_without_paths_of_this_machine(self):
         archive = package(self.out, "-tests.zip")
         with zipfile.ZipFile(archive) as files:
             self.assertGreater(len(files.namelist()), 60)
@@ -133,7 +133,7 @@ class Contents(Test):
                                  input="#include <_mingw_mac.h>\n__MINGW64_VERSION_MAJOR", capture_output=True).stdout
         self.assertEqual(runtime, headers.split()[-1])
 
-    def test_that_cannot_be_made_are_told_in_one_sentence(self):
+    def test_that_cannot_be_made_are_reported_in_one_sentence(self):
         file = self.folder / "file"
         file.touch()
         for build, out, name in ((BUILD, file, file), (BUILD, file / "below", file), (file, self.folder / "out", file)):
@@ -142,7 +142,7 @@ class Contents(Test):
             told = caught.exception.stderr.replace(self.told, "")
             self.assertRegex(told, rf"\Apackage: {re.escape(str(name))}.*: .+\n\Z")
 
-    def test_hold_resources_that_are_made_again_when_anything_in_them_changes(self):
+    def test_contain_resources_that_are_rebuilt_when_anything_in_them_changes(self):
         def ninja(*arguments):
             return subprocess.run(["ninja", "-C", BUILD, "-t", *arguments], check=True, capture_output=True,
                                   text=True).stdout
@@ -156,7 +156,7 @@ class Contents(Test):
                 with self.subTest(target=target, name=name):
                     self.assertRegex(inputs, rf"(?m)(^ *|/){re.escape(name)}$")
 
-    def test_symbols_tell_the_line_of_an_address_in_the_released_dll(self):
+    def test_symbols_give_the_line_of_an_address_in_the_released_dll(self):
         symbols = package(self.out, "-symbols.zip")
         with zipfile.ZipFile(symbols) as files:
             files.extractall(self.folder)
@@ -165,13 +165,13 @@ class Contents(Test):
         address = re.search(r"^([0-9a-f]+) T DllRegisterServer$", names, re.MULTILINE)[1]
         dll = self.folder / "QelShellExt.dll"
         shutil.copyfile(BUILD / dll.name, dll)
-        shutil.move(debug, self.folder)  # where the reference in the DLL finds it
+        shutil.move(debug, self.folder)  # the folder in which addr2line looks for it
         line = subprocess.run(["x86_64-w64-mingw32-addr2line", "-e", dll, address], check=True, capture_output=True,
                               text=True).stdout
         self.assertRegex(line, r"/server/\w+\.(cpp|h):\d+$")
         self.assertNotIn(str(SOURCES), line)
 
-    def test_are_signed_where_there_is_a_certificate(self):
+    def test_are_signed_when_there_is_a_certificate(self):
         self.assertIn("Not signing", self.told)
         key, certificate, both, password = (self.folder / name for name in ("key", "certificate", "both", "password"))
         password.write_text("open sesame")
@@ -182,7 +182,7 @@ class Contents(Test):
         ):
             subprocess.run(["openssl", *command], check=True, capture_output=True)
         out = self.folder / "signed"
-        # A time at which the certificate is good.
+        # A time at which the certificate is valid.
         result = make_packages(out, epoch=str(int(certificate.stat().st_mtime) + 60),
                                environment={"QEL_SIGN_PKCS12": str(both), "QEL_SIGN_PASSWORD_FILE": str(password)})
         self.assertEqual(result.stderr, "")
@@ -198,7 +198,7 @@ class Contents(Test):
 
 
 class Prefix:
-    """A machine with Wine for Windows, which can be as it was before."""
+    """A Wine prefix that stands for a machine, and whose state can be saved and restored."""
 
     def __init__(self):
         self.path = pathlib.Path(os.environ["WINEPREFIX"])
@@ -209,7 +209,7 @@ class Prefix:
             self.save("new")
 
     def save(self, state):
-        """Keeps the registry of the machine, which is shut down."""
+        """Saves the machine's registry. The machine must be shut down."""
         (self.path / state).mkdir(exist_ok=True)
         for hive in self.path.glob("*.reg"):
             shutil.copyfile(hive, self.path / state / hive.name)
@@ -224,10 +224,10 @@ class Prefix:
 
     def start(self):
         for command in (("wineserver", "-p"), ("wine", "wineboot")):
-            # Wine's services inherit pipes and would keep whoever reads them waiting.
+            # Wine's services would inherit a pipe and keep its reader waiting.
             subprocess.run(command, check=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
                            stderr=subprocess.DEVNULL)
-        # Rarely, on a busy machine, Wine cannot start the first program yet.
+        # On a busy machine the first program sometimes fails to start.
         for _ in range(5):
             if self.run(SYSTEM + "cmd.exe", "/c", "exit 0").returncode == 0:
                 break
@@ -242,7 +242,7 @@ class Prefix:
 
     @staticmethod
     def run(*arguments):
-        # A file, as a pipe would be kept open by a desktop that Wine starts and that lives a second longer.
+        # Files, because Wine's desktop process would keep a pipe open for a second after the program has ended.
         with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
             result = subprocess.run(["wine", *map(str, arguments)], stdin=subprocess.DEVNULL, stdout=out,
                                     stderr=errors)
@@ -258,7 +258,7 @@ class Prefix:
         return self.run(self.installed / "qelshow.exe", *arguments)
 
     def registry(self):
-        """The lines of HKEY_LOCAL_MACHINE\\Software, each with its key."""
+        """Returns the lines of HKEY_LOCAL_MACHINE\\Software, each with its key."""
         with tempfile.TemporaryDirectory() as folder:
             out = pathlib.Path(folder) / "out.reg"
             self.run(REGEDIT, "/E", out, r"HKEY_LOCAL_MACHINE\Software").check_returncode()
@@ -274,7 +274,7 @@ class Prefix:
 
     @contextlib.contextmanager
     def program_that_uses_the_extension(self):
-        """Answers a function that ends the program and answers its exit status."""
+        """Yields a function that ends the program and returns its exit status."""
         process = subprocess.Popen(["wine", EXTENSION_USER], stdin=subprocess.PIPE, stdout=subprocess.PIPE,
                                    stderr=subprocess.DEVNULL)
         try:
@@ -285,11 +285,11 @@ class Prefix:
             process.communicate()
 
 
-# Where Windows Installer keeps what it has installed. Some of its keys stay, empty.
+# The keys in which Windows Installer records what it has installed. Some of them remain, empty.
 BOOKKEEPING = (r"\Classes\Installer", r"\Microsoft\Windows\CurrentVersion\Installer")
 UNINSTALL = r"\Microsoft\Windows\CurrentVersion\Uninstall"
 
-# Of other programs, in the same keys: an empty key goes with what is removed from it.
+# Entries of other programs in the same keys: Windows Installer deletes keys that have become empty.
 OTHERS = r"""REGEDIT4
 
 [HKEY_LOCAL_MACHINE\Software\Classes\.raw]
@@ -346,7 +346,7 @@ class Installation(Test):
         self.assertEqual(result.returncode, DONE, result)
 
     def ours(self):
-        """What has come into the registry, but for what the installer has for itself."""
+        """Returns what has been added to the registry, without Windows Installer's own records."""
         after = self.prefix.registry()
         self.assertEqual(self.before - after, set())
         return without(after - self.before, *BOOKKEEPING, UNINSTALL)
@@ -379,18 +379,18 @@ class Installation(Test):
         self.assertEqual(installed ^ self.ours(), set())
 
     def advice(self, status):
-        """What the doctor says to run with msiexec, each the arguments behind the product."""
+        """Returns the arguments of the msiexec commands that the doctor advises: the product, then the rest."""
         doctor = self.prefix.qelshow("doctor")
         text = doctor.stdout.decode()
         self.assertEqual(doctor.returncode, status, text)
-        self.assertNotIn("regsvr32", text)  # it would register what was left out
+        self.assertNotIn("regsvr32", text)  # it would register the omitted extension too
         return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
 
     def test_an_extension_can_be_left_to_others(self):
         self.install(self.msi, "ADDLOCAL=QelShellExt,mrc,ali,rec,ser,emi,ebn")
         fewer = self.ours()
         self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())
-        # What the doctor says puts right what is missing and no more, and adds what was left out.
+        # The doctor's commands repair exactly what is missing, and add the omitted feature.
         key = r"HKLM\Software\Classes\.ser\ShellEx\PropertyHandler"
         self.prefix.run(SYSTEM + "reg.exe", "delete", key, "/f").check_returncode()
         (product, add), (_, repair) = self.advice(status=1)
@@ -401,7 +401,7 @@ class Installation(Test):
         self.install(product, add)
         self.assertEqual(self.advice(status=0), [])
         everything = self.ours()
-        # All that has come is of .raw: below its keys, or of its class.
+        # Everything that was added belongs to .raw: it is in one of its keys, or of its class.
         self.assertEqual(fewer - everything, set())
         self.assertGreater(len(everything - fewer), 20)
         for line in everything - fewer:
@@ -411,7 +411,7 @@ class Installation(Test):
         self.remove(self.msi)
         self.assertRemoved()
 
-    def test_thumbnails_leave_the_isolated_process_only_where_that_is_asked_for(self):
+    def test_thumbnails_leave_the_isolated_process_only_on_request(self):
         value = (r"\Classes\CLSID\{79E696A1-2FA5-4b3e-9610-D5F760417E62} : "
                  '"DisableProcessIsolation"=dword:00000001')
         self.install(self.msi)
@@ -425,7 +425,7 @@ class Installation(Test):
         self.remove(self.msi)
         self.assertRemoved()
 
-    def test_the_readme_s_commands_install_them_find_what_is_wrong_with_a_file_and_remove_them(self):
+    def test_the_commands_of_the_readme_install_the_package_diagnose_a_file_and_remove_the_package(self):
         text = (SOURCES / "README.md").read_text("utf-8")
         commands = re.findall(r"(?m)^    (scripts/wine .*)$", text)
         self.assertEqual(len(commands), 3)
@@ -460,7 +460,7 @@ class Installation(Test):
         self.assertEqual(installed ^ self.ours(), set())
         self.assertWorks()
 
-        self.install(self.msi, status=FAILED)  # an older version
+        self.install(self.msi, status=FAILED)  # refuses an older version
         self.assertEqual(digest(self.prefix.installed / "QelShellExt.dll"),
                          digest(self.next_build / "QelShellExt.dll"))
         self.remove(self.next_msi)

@@ -1,5 +1,6 @@
-# Makes the packages from a copy of the sources in another folder, one with a name that is hard on tools, compiled anew,
-# and compares them byte by byte with those made of this build.
+# Copies the sources to another folder whose name is difficult for tools, makes the packages there from
+# scratch, and
+# compares them byte by byte with the packages of this build.
 #
 # cmake -D SOURCE=FOLDER -D BUILD=FOLDER -D WORK=FOLDER -P reproducible_test.cmake
 set(copy "${WORK}/a/copy's folder & (ä Ω 樹)")
@@ -25,7 +26,7 @@ foreach(package ${packages})
   file(SHA256 ${WORK}/first/${package} first)
   file(SHA256 ${WORK}/second/${package} second)
   if(NOT first STREQUAL second)
-    message(FATAL_ERROR "${WORK}/second/${package} differs from that in ${WORK}/first.")
+    message(FATAL_ERROR "${WORK}/second/${package} differs from the package in ${WORK}/first.")
   endif()
 endforeach()
 file(REMOVE_RECURSE ${WORK})

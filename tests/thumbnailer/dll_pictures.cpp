@@ -1,6 +1,8 @@
-// Writes the bitmaps that the built DLL makes. Each line of standard input is a request: the edge, the file
-// and where to write the bitmap to, separated by tabs. A bitmap is written as its width, height and bits of a
-// pixel in one line, and its rows without padding.
+// Writes the bitmaps that the built DLL makes. Each line of standard input is a request: the edge, the file,
+// and the path
+// of the output, separated by tabs. The output is one line with the width, the height and the bits per pixel,
+// then the
+// rows without padding.
 #include <windows.h>
 
 #include <objidl.h>

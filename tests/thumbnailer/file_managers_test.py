@@ -1,6 +1,5 @@
 #!/usr/bin/python3
-"""Lets the programs that file managers have for it make the thumbnails of all samples, as the user of a fresh
-installation would see them.
+"""Has the thumbnailers of file managers make the thumbnails of all samples, as in a fresh installation.
 
 usage: file_managers_test.py BUILD [TEST ...]
 """
@@ -18,7 +17,7 @@ from PIL import Image, ImageChops
 from stage import Stage, run
 
 BUILD = sys.argv.pop(1) if len(sys.argv)>1 else None
-SECONDS = 240  # how long is waited for what does not come
+SECONDS = 240  # the limit for each wait
 
 QUEUE = """
 import sys
@@ -55,7 +54,7 @@ class Test(unittest.TestCase):
             file.unlink()
 
     def types(self):
-        """The samples' types, by a program of its own that sees what all others see."""
+        """Returns the types of the samples. Asks a separate program, which sees the same environment as the others."""
         lines = run("gio", "info", "--attributes", "standard::content-type", *self.files,
                     env=self.stage.environment()).splitlines()
         types = [line.split()[-1] for line in lines if "standard::content-type" in line]
@@ -63,7 +62,7 @@ class Test(unittest.TestCase):
         return types
 
     def ask(self, script, *session, **environment):
-        """Runs a script that asks for the thumbnails of all samples."""
+        """Runs a script that requests the thumbnails of all samples."""
         log = subprocess.run([*session, "/usr/bin/python3", "-c", script, "\n".join(map(self.uri, self.files)),
                               "\n".join(self.types())], env=self.stage.environment() | environment, timeout=SECONDS,
                              stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True)
@@ -74,12 +73,12 @@ class Test(unittest.TestCase):
         return file.as_uri()
 
     def cached(self, file):
-        """Where the thumbnail of a file is kept, for all file managers."""
+        """Returns the path of a file's thumbnail in the cache that all file managers share."""
         name = hashlib.md5(self.uri(file).encode()).hexdigest()
         return self.stage.cache / "thumbnails" / "normal" / f"{name}.png"
 
     def assertThumbnails(self):
-        """Every sample has the one that qelthumb makes, pixel by pixel."""
+        """Checks that every sample's thumbnail equals the one that qelthumb makes, pixel by pixel."""
         for file in self.files:
             with self.subTest(file=file.name):
                 expected = self.stage.home / "expected.png"
@@ -90,7 +89,7 @@ class Test(unittest.TestCase):
 
 
 class Tumbler(Test):
-    """Serves Thunar and others."""
+    """Makes thumbnails for Thunar and other file managers."""
 
     def test(self):
         self.ask(QUEUE, "dbus-run-session", "--")
@@ -98,7 +97,7 @@ class Tumbler(Test):
 
 
 class Gnome(Test):
-    """The part of GNOME that makes thumbnails for Nautilus. Its sandbox has only programs in /usr, so it is off."""
+    """The part of GNOME that makes thumbnails for Nautilus. Its sandbox is off because it has only programs in /usr."""
 
     def test(self):
         self.ask(FACTORY, "dbus-run-session", "--", SNAP_NAME="qelthumb")
@@ -106,7 +105,7 @@ class Gnome(Test):
 
 
 class PcManFm(Test):
-    """Makes its thumbnails itself, when it shows a folder."""
+    """Makes its thumbnails itself when it shows a folder."""
 
     def test(self):
         with tempfile.TemporaryFile("w+") as log:

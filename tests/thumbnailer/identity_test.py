@@ -3,7 +3,7 @@
 
 usage: identity_test.py BUILD EMULATOR DLL_PICTURES
 
-DLL_PICTURES is the Windows program that writes the bitmaps that the DLL makes (dll_pictures.cpp).
+DLL_PICTURES is the Windows program that writes the DLL's bitmaps (dll_pictures.cpp).
 """
 
 import pathlib
@@ -20,14 +20,14 @@ SIZES = (64, 128, 256, 512, 1024)
 
 
 def size_of(file, stage, out):
-    """The longest side of a picture that is not reduced."""
+    """Returns the longest side of the picture, made without reduction."""
     run(stage.program, 4096, file, out)
     with Image.open(out) as picture:
         return max(picture.size)
 
 
 def native_bytes(path):
-    """Width, height and bits of a pixel, then the pixels as they are in a bitmap: blue first."""
+    """Returns the width, the height and the bits per pixel, then the pixels as in a bitmap: blue first."""
     with Image.open(path) as picture:
         pixels = numpy.asarray(picture)
     bits = 8 if pixels.ndim == 2 else 24
@@ -47,13 +47,13 @@ def main(build, emulator, dll_pictures):
                 edge = longest // -(-longest // size)
                 requests.append((file, size, edge, folder / f"{len(requests)}.bitmap"))
         lines = "".join(f"{edge}\t{file.name}\tZ:{out}\n" for file, size, edge, out in requests)
-        # A file, as a pipe would be kept open by a desktop that Wine starts.
+        # A file, because Wine's desktop process would keep a pipe open.
         with tempfile.TemporaryFile("w+") as log:
             result = subprocess.run([emulator, dll_pictures], input=lines, stdout=log, stderr=log, text=True,
                                     cwd=stage.samples)
             log.seek(0)
             if result.returncode != 0:
-                sys.exit(f"The DLL's pictures cannot be had: {log.read()}")
+                sys.exit(f"dll_pictures failed: {log.read()}")
         different = []
         for file, size, edge, out in requests:
             run(stage.program, size, file, folder / "native.png")
@@ -61,8 +61,8 @@ def main(build, emulator, dll_pictures):
                 different.append(f"{file.name} at {size}, edge {edge}")
     stage.close()
     if different or len(requests) < 100:
-        sys.exit(f"Different, of {len(requests)}: {different}")
-    print(f"{len(requests)} pictures are the same.")
+        sys.exit(f"{len(different)} of {len(requests)} pictures differ (at least 100 must be compared): {different}")
+    print(f"{len(requests)} pictures are identical.")
 
 
 if __name__ == "__main__":

@@ -48,14 +48,14 @@ class Test(unittest.TestCase):
         return path
 
     def thumbnail(self, size, file):
-        """The picture that is made of a file."""
+        """Makes the thumbnail of a file and returns it."""
         self.assertEqual(self.stage.thumbnail(size, file, self.out), (DONE, ""))
         with Image.open(self.out) as picture:
             picture.load()
         return picture
 
     def assertFails(self, status, *arguments, says):
-        """Nothing is left in the folder of the output but what was there before."""
+        """Runs qelthumb, which must fail with this status and message, and leave the output folder unchanged."""
         before = self.outputs()
         result = subprocess.run([self.stage.program, *map(str, arguments)], stdin=subprocess.DEVNULL,
                                 stdout=subprocess.PIPE, stderr=subprocess.PIPE)
@@ -70,7 +70,7 @@ class Test(unittest.TestCase):
 
 
 class Usage(Test):
-    def test_what_cannot_be_understood_is_told_how_it_is_meant(self):
+    def test_invalid_arguments_are_answered_by_the_usage(self):
         file = self.stage.samples / "atlas.mrc"
         for arguments in ((), ("128",), ("128", file), ("128", file, self.out, "more"), ("0", file, self.out),
                           ("-1", file, self.out), ("4097", file, self.out), ("12x", file, self.out),
@@ -79,7 +79,7 @@ class Usage(Test):
             with self.subTest(arguments=arguments):
                 self.assertFails(USAGE, *arguments, says="usage: qelthumb SIZE INPUT OUTPUT.png")
 
-    def test_the_file_itself_is_no_place_for_its_thumbnail(self):
+    def test_the_thumbnail_cannot_replace_its_own_file(self):
         contents = (self.stage.samples / "atlas.mrc").read_bytes()
         file = self.write("out/a.mrc", contents)
         symbolic, hard = self.out.parent / "symbolic.png", self.out.parent / "hard.png"
@@ -99,8 +99,8 @@ class Thumbnail(Test):
                     picture = self.thumbnail(size, file)
                     self.assertLessEqual(max(picture.size), size)
 
-    def test_is_as_large_as_a_whole_number_allows(self):
-        # 640 pixels become 128 by the factor 5, 213 by 3, 640 by 1; the same of 300 by 3, 2 and 1.
+    def test_is_as_large_as_a_whole_factor_allows(self):
+        # 640 pixels become 128 with the factor 5, 213 with 3, 640 with 1. 300 pixels use the factors 3, 2 and 1.
         file = self.stage.samples / "micrograph.mrc"
         for size, expected in ((127, 106), (128, 128), (256, 213), (639, 320), (640, 640), (1024, 640)):
             with self.subTest(size=size):
@@ -110,7 +110,7 @@ class Thumbnail(Test):
             with self.subTest(size=size):
                 self.assertEqual(self.thumbnail(size, file).size, expected)
 
-    def test_of_a_small_coloured_picture_does_not_end_the_process(self):
+    def test_of_a_small_colour_frame_does_not_end_the_process(self):
         file = self.write("small.mrc", mrc(3, 2, bytes(range(18)), mode=16))
         picture = self.thumbnail(256, file)
         self.assertEqual((picture.mode, picture.size), ("RGB", (3, 2)))
@@ -123,7 +123,7 @@ class Thumbnail(Test):
         picture = self.thumbnail(128, file)
         self.assertEqual((picture.mode, list(picture.getdata())), ("L", [100, 255, 0, 50]))
 
-    def test_is_made_of_files_with_any_name(self):
+    def test_is_made_for_files_with_any_name(self):
         contents = (self.stage.samples / "atlas.mrc").read_bytes()
         for name in (b"\xff\xfe not UTF-8.mrc", "Größe 樹.MRC".encode(), b"-1.mrc", b"two\nlines.mrc", b"%s %i.mrc"):
             with self.subTest(name=name):
@@ -137,7 +137,7 @@ class Thumbnail(Test):
 
 
 class Fault(Test):
-    def test_of_a_damaged_file_is_told_in_the_words_of_qelshow(self):
+    def test_of_a_damaged_file_is_reported_in_the_words_of_qelshow(self):
         for name, sentence in (
             ("damaged.mrc", "The header is not acceptable: mode is 99 and must be from 0 to 16."),
             ("damaged.ser", "The header is not acceptable: series id is 0x0198 and must be 0x0197."),
@@ -149,11 +149,11 @@ class Fault(Test):
                 file = self.stage.samples / name
                 self.assertEqual(self.assertFails(FAILED, 128, file, self.out, says=sentence), f"{file}: {sentence}\n")
 
-    def test_of_a_picture_that_is_too_narrow_is_told(self):
+    def test_of_a_frame_that_is_too_narrow_is_reported(self):
         file = self.write("line.mrc", mrc(1000, 1, bytes(1000)))
         self.assertFails(FAILED, 128, file, self.out, says="cannot be reduced to 125 pixels")
 
-    def test_of_what_is_no_picture_file_is_told(self):
+    def test_of_a_path_without_a_picture_is_reported(self):
         pipe = self.folder / "pipe.mrc"
         os.mkfifo(pipe)
         for file, says in (
@@ -167,7 +167,7 @@ class Fault(Test):
             with self.subTest(file=file):
                 self.assertFails(FAILED, 128, file, self.out, says=says)
 
-    def test_of_the_output_leaves_what_was_there(self):
+    def test_of_the_output_keeps_the_previous_thumbnail(self):
         file = self.stage.samples / "atlas.mrc"
         self.out.write_bytes(b"the thumbnail of before")
         (self.out.parent / "folder").mkdir()
@@ -178,16 +178,16 @@ class Fault(Test):
 
 
 class Output(Test):
-    """What others have open, or see while it is written."""
+    """What happens to an output file that exists, or that others have open."""
 
-    def test_replaces_what_was_there_at_once(self):
+    def test_replaces_the_previous_thumbnail_at_once(self):
         self.out.write_bytes(b"the thumbnail of before")
         with open(self.out, "rb") as before:
             self.thumbnail(128, self.stage.samples / "atlas.mrc")
             self.assertEqual(before.read(), b"the thumbnail of before")
         self.assertEqual(list(self.out.parent.iterdir()), [self.out])
 
-    def test_is_the_file_that_the_caller_has_made_for_it(self):
+    def test_is_written_to_the_file_that_the_caller_has_made(self):
         with open(self.out, "x+b") as made:
             self.thumbnail(128, self.stage.samples / "atlas.mrc")
             self.assertEqual(made.read(), self.out.read_bytes())
@@ -196,7 +196,7 @@ class Output(Test):
 
 class Limits(Test):
     def test_are_those_of_memory_and_processor_time(self):
-        # While it cannot say what is wrong with the file, it can be looked at.
+        # While qelthumb waits to write its message to a full pipe, its limits can be read.
         reader, writer = os.pipe()
         self.addCleanup(os.close, reader)
         os.set_blocking(writer, False)
@@ -220,7 +220,7 @@ class Limits(Test):
                       if line.startswith(name)}
             time.sleep(0.01)
 
-    def test_that_are_lower_already_stay(self):
+    def test_that_are_lower_already_are_kept(self):
         file = self.write("large.mrc", mrc(4000, 4000, bytes(4 * 4000 * 4000), mode=2))
         limit = 48 << 20
         result = subprocess.run([self.stage.program, "4096", file, self.out], stdin=subprocess.DEVNULL,
@@ -229,8 +229,8 @@ class Limits(Test):
         self.assertEqual((result.returncode, result.stderr), (FAILED, f"{file}: There is not enough memory.\n"))
         self.assertEqual(list(self.out.parent.iterdir()), [])
 
-    def test_hold_for_a_file_that_claims_more_than_it_has(self):
-        # A file with a hole for nearly all of its 256 MB is no reason to take more memory.
+    def test_are_kept_for_a_large_sparse_file(self):
+        # Nearly all of the file's 256 MB are a hole. The frame's size must not increase the memory that is used.
         file = self.folder / "huge.mrc"
         with open(file, "wb") as out:
             out.write(mrc(16000, 16000, b""))

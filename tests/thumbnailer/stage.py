@@ -1,4 +1,4 @@
-"""qelthumb as its package installs it, but in a folder, with samples of every kind beside it."""
+"""qelthumb, installed into a temporary folder as its package does it, with samples of every kind."""
 
 import os
 import pathlib
@@ -9,16 +9,16 @@ SYSTEM_TYPES = pathlib.Path("/usr/share/mime/packages/freedesktop.org.xml")
 
 
 def run(*command, **options):
-    """Runs a program that has to succeed; returns what it prints."""
+    """Runs a program that must succeed. Returns its standard output."""
     result = subprocess.run([*map(str, command)], stdin=subprocess.DEVNULL, stdout=subprocess.PIPE,
                             stderr=subprocess.PIPE, text=True, **options)
     if result.returncode != 0:
-        raise AssertionError(f"{command[0]} ends with {result.returncode}: {result.stdout}{result.stderr}")
+        raise AssertionError(f"{command[0]} exited with {result.returncode}: {result.stdout}{result.stderr}")
     return result.stdout
 
 
 def make_types(folder, *definitions):
-    """A database of the types that these files define, for XDG_DATA_DIRS."""
+    """Makes a database of the MIME types that these files define. Returns its folder, for XDG_DATA_DIRS."""
     packages = folder / "mime" / "packages"
     packages.mkdir(parents=True, exist_ok=True)
     for definition in definitions:
@@ -28,7 +28,7 @@ def make_types(folder, *definitions):
 
 
 def types_of(files, types):
-    """What GLib takes the files to be, with the database in a folder."""
+    """Returns the types that GLib finds for files, with the database in the folder `types`."""
     environment = os.environ | {"XDG_DATA_DIRS": str(types), "XDG_DATA_HOME": "/nonexistent", "LC_ALL": "C.UTF-8"}
     attribute = "standard::content-type"
     lines = run("gio", "info", "--attributes", attribute, *files, env=environment).splitlines()
@@ -36,7 +36,7 @@ def types_of(files, types):
 
 
 class Stage:
-    """Deleted with everything in it by close()."""
+    """An installation in a temporary folder, which close() deletes."""
 
     def __init__(self, build):
         self.folder = tempfile.TemporaryDirectory()
@@ -61,17 +61,17 @@ class Stage:
         return sorted(self.samples.iterdir())
 
     def pictures(self):
-        """The samples that have a thumbnail."""
+        """Returns the samples that have a thumbnail."""
         return [file for file in self.files() if not file.name.startswith(("damaged", "truncated"))]
 
     def thumbnail(self, size, file, output):
-        """Runs qelthumb; returns its exit status and what it says."""
+        """Runs qelthumb. Returns its exit status and its message."""
         result = subprocess.run([self.program, str(size), file, output], stdin=subprocess.DEVNULL,
                                 capture_output=True, env=os.environ | {"LC_ALL": "C.UTF-8"})
         return result.returncode, os.fsdecode(result.stderr)
 
     def environment(self):
-        """That of a desktop session with nothing in it but what is staged and what the system has."""
+        """Returns the environment of a desktop session that sees only this installation and the system's own."""
         return {
             "PATH": f"{self.program.parent}:/usr/bin:/bin",
             "HOME": str(self.home),

@@ -1,5 +1,5 @@
 #!/usr/bin/python3
-"""The types that qelthumb gives to files, beside all that the system knows.
+"""Tests the types that files have once qelthumb's types are added to the system's.
 
 usage: types_test.py BUILD
 """
@@ -26,7 +26,7 @@ BUILD = sys.argv.pop(1)
 
 NAMESPACE = "{http://www.freedesktop.org/standards/shared-mime-info}"
 TYPES = {extension: f"application/x-{kind}" for extension, kind in KIND_OF.items()}
-TYPES["raw"] = "application/x-qel-raw"  # photographs have the shorter name
+TYPES["raw"] = "application/x-qel-raw"  # application/x-raw is the type of photographs
 
 
 def mrc_header(width, order="<"):
@@ -70,7 +70,7 @@ OLE = b"\xd0\xcf\x11\xe0\xa1\xb1\x1a\xe1" + bytes(1000)
 FITS = b"SIMPLE  =                    T / a frame of a telescope".ljust(80) + bytes(2800)
 VIDEO = b"LUCAM-RECORDER" + bytes(1000)
 
-# Files of others: some with names of their own, some with an extension that is also one of ours.
+# Files of other programs. Some have one of our extensions.
 FOREIGN = {
     "font.ttf": FONT, "font.otf": b"OTTO" + bytes(500), "font.woff": b"wOFF" + bytes(500), "font.rec": FONT,
     "archive.zip": zipped(("a.txt", TEXT)), "archive.tar": tarred(), "archive.gz": gzip.compress(TEXT, mtime=0),
@@ -118,7 +118,7 @@ class Test(unittest.TestCase):
                      if found != "application/x-mrc"]
             self.assertEqual(wrong, [])
 
-    def test_an_mrc_file_of_an_older_kind_has_its_type_by_its_name_alone(self):
+    def test_an_mrc_file_without_its_mark_is_recognised_by_its_name_alone(self):
         files = self.write({"old.mrc": bytes(1024), "old.MRC": bytes(1024), "old.rec": bytes(1024)})
         types = self.types_of(files)
         self.assertEqual(types[:2], ["application/x-mrc"] * 2)
