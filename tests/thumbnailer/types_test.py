@@ -26,7 +26,7 @@ BUILD = sys.argv.pop(1)
 
 NAMESPACE = "{http://www.freedesktop.org/standards/shared-mime-info}"
 TYPES = {extension: f"application/x-{kind}" for extension, kind in KIND_OF.items()}
-TYPES["raw"] = "application/x-qel-raw"  # application/x-raw is the type of photographs
+TYPES["raw"] = "application/x-qel-raw"  # "raw" alone stands for photographs
 
 
 def mrc_header(width, order="<"):
