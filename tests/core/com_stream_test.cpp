@@ -122,7 +122,7 @@ TEST(ComBufferReading, KeepsTheBytesBeforeAReadThatFails) {
   }
 }
 
-TEST(ComBufferReading, GoesOnAfterAFailureThatPasses) {
+TEST(ComBufferReading, ContinuesAfterATemporaryFailure) {
   ScriptedStream source(Bytes(8));
   source.maxPerRead = 4;
   source.failingRead = 2;
@@ -466,7 +466,7 @@ TEST(ComStream, FailsToSeekAndContinuesReadingAfterwards) {
   EXPECT_EQ(source.otherCalls, 0);
 }
 
-TEST(ComStream, EndsShortWhereTheStreamFails) {
+TEST(ComStream, EndsWhereTheStreamFails) {
   ScriptedStream source(Bytes(100));
   source.maxPerRead = 10;
   source.failingRead = 3;

@@ -23,7 +23,7 @@ void Append(const std::filesystem::path& path, const std::string& bytes) {
   file << bytes;
 }
 
-TEST(PathStream, ReadsEveryByteAsItIs) {
+TEST(PathStream, ReadsEveryByteUnchanged) {
   std::string bytes;
   for (int i = 0; i < 3 * 256; ++i) bytes += static_cast<char>(i);
   bytes += "\r\n\n\x1A\r";  // a stream in text mode changes these or ends at them

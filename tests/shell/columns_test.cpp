@@ -118,7 +118,7 @@ TEST_F(Columns, OfRaw) {
   EXPECT_EQ(Read(file, kCommentsKey), Text(VT_BSTR, L""));
 }
 
-TEST_F(Columns, GiveANegativeNumberAsItIs) {
+TEST_F(Columns, GiveNegativeNumbersUnchanged) {
   const auto file = folder_.Write(L"negative.raw", RawFile{.width = -2}.Bytes());
   EXPECT_EQ(Read(file, kWidthKey), Number(VT_I4, -2));
 }

@@ -151,12 +151,12 @@ TEST_F(InfoTip, ShowsTheContentsOfEveryKind) {
             L"Dimensions: (2 \u00D7 2) 16 bit signed\r\nType: \r\nVRA EMI File");
 }
 
-TEST_F(InfoTip, ShowsACommentAsItIs) {
+TEST_F(InfoTip, ShowsACommentUnchanged) {
   EXPECT_EQ(TipOfContents(L"image.mrc", MrcFile{.labels = {"  a\tb\xE9", "%s {0}"}}.Bytes()),
             L"Dimensions: (1 \u00D7 1) 8 bit unsigned\r\nType: \r\n  a\tb\xFFE9\r\n%s {0}");
 }
 
-TEST_F(InfoTip, LeavesOutTheFileSystemsLinesForAFileThatIsGone) {
+TEST_F(InfoTip, LeavesOutTheFileSystemsLinesForADeletedFile) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{.labels = {"label"}}.Bytes());
   const Object object = Load(file);
   ASSERT_TRUE(DeleteFileW(file.c_str()));

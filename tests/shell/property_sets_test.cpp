@@ -103,7 +103,7 @@ TEST_F(PropertySet, OfImageSummaryHasFiveProperties) {
   EXPECT_EQ(Read(storage, 13), Text(VT_BSTR, L"512 x 256"));
 }
 
-TEST_F(PropertySet, GivesANegativeNumberAsItIs) {
+TEST_F(PropertySet, GivesNegativeNumbersUnchanged) {
   const Sets sets = Make();
   Load(sets, folder_.Write(L"negative.raw", RawFile{.width = -2}.Bytes()));
   EXPECT_EQ(Read(Open(sets, kImageSummary), 3), Number(VT_INT, -2));
