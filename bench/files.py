@@ -1,4 +1,4 @@
-"""The image files that are measured."""
+"""The image files for the measurements."""
 
 import contextlib
 import dataclasses
@@ -7,7 +7,7 @@ import struct
 
 import numpy
 
-RAW_CLASSES = {  # pixel format: value class of a .raw file
+RAW_CLASSES = {  # value class in the header of a .raw file, by pixel type
     "uint8": 0, "uint16": 0, "uint32": 0, "int8": 1, "int16": 1, "int32": 1, "float32": 2, "float64": 2,
     "rgb": 3, "bgr": 5, "complex64": 10, "complex128": 10,
 }
@@ -22,7 +22,7 @@ def pixel_bytes(pixel_format):
 
 
 def random_rows(pixel_format, width, rows, generator):
-    """Rows of values as a detector gives them: spread around a mean, nothing special."""
+    """Returns random rows with values like a detector's, spread around a mean."""
     if pixel_format in ("rgb", "bgr", "uint8", "int8"):
         channels = 3 if pixel_format in ("rgb", "bgr") else 1
         dtype = "int8" if pixel_format == "int8" else "uint8"
@@ -36,7 +36,7 @@ def random_rows(pixel_format, width, rows, generator):
 
 
 class Written:
-    """Something on disk that is written into a folder and gone afterwards."""
+    """A file or folder for one measurement: in_folder writes it and deletes it afterwards."""
 
     @contextlib.contextmanager
     def in_folder(self, folder):
@@ -50,15 +50,15 @@ class Written:
 
 @dataclasses.dataclass
 class Frame(Written):
-    """A file of one frame. Sizes and positions are in bytes."""
+    """A file of one frame. Width and height are in pixels, other sizes and positions in bytes."""
 
     name: str
     pixel_format: str
     width: int
     height: int
-    kind: str = "mrc"  # the extension
-    padding: int = 0  # after each row of a .raw file
-    spread: int = 1  # pixels of the same size that are interleaved in a .raw file; the first is the frame's
+    kind: str = "mrc"  # the file-name extension
+    padding: int = 0  # in bytes, after each row of a .raw file
+    spread: int = 1  # number of interleaved images in a .raw file; the frame is the first
     bottom_up: bool = False  # rows of a .raw file
 
     @property
@@ -106,7 +106,7 @@ class Frame(Written):
 
 @dataclasses.dataclass
 class Series(Written):
-    """A .ser file of many small images, with their offsets at its end."""
+    """A .ser file of many small images, whose offsets are at its end."""
 
     count: int
     edge: int = 32  # of an image of 16-bit pixels
@@ -146,7 +146,7 @@ class Series(Written):
 
 @dataclasses.dataclass
 class Folder(Written):
-    """A folder of small .mrc files. Their pixels are a hole in each file, as nobody reads them."""
+    """A folder of small .mrc files. No measurement reads their pixels, which are a hole in each sparse file."""
 
     count: int
 

@@ -1,6 +1,6 @@
-// The reduction alone: bands of a frame that stay in the processor's cache are added to a renderer again and
-// again, in the shapes in which the frame reader hands them over. And by itself the costliest part of it, the
-// logarithms of complex frames.
+// Benchmarks of the reduction alone. Bands of a frame that stay in the processor's cache are added to a
+// renderer repeatedly, in the shapes that the frame reader produces. The logarithms of complex frames, the
+// costliest part, have a benchmark of their own.
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
@@ -36,7 +36,7 @@ void FillBand(DataType type, std::vector<std::byte>& band) {
     case DataType::kComplexFloat32: Fill<float>(band); break;
     case DataType::kFloat64:
     case DataType::kComplexFloat64: Fill<double>(band); break;
-    default: Fill<std::uint8_t>(band);  // every pattern of bytes is as good as any other for integers
+    default: Fill<std::uint8_t>(band);  // any bytes are as good as any others for integers
   }
 }
 
@@ -47,7 +47,7 @@ void Kernel(benchmark::State& state, DataType type, Size2 frame) {
   const std::int32_t width = renderer->reduction().size.width * factor;
   const std::int32_t height = renderer->reduction().size.height * factor;
   const std::int64_t rowBytes = std::int64_t{frame.width} * PixelTypeOf(type).bytes();
-  // Whole rows of blocks where they fit, else the rows of one row of blocks in parts.
+  // Adds whole rows of blocks if they fit into the band; otherwise the rows of one row of blocks in parts.
   const auto fitting = static_cast<std::int32_t>(kBandBytes / rowBytes);
   const std::int32_t bandRows = std::max(fitting / factor, 1) * factor;
   std::vector<std::byte> band(static_cast<std::size_t>(fitting * rowBytes));

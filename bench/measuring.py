@@ -1,4 +1,4 @@
-"""Processes that measure on command, rounds that take turns, and memory."""
+"""Worker processes that measure on command, alternating rounds, and peak memory."""
 
 import pathlib
 import statistics
@@ -6,11 +6,11 @@ import subprocess
 
 
 class Failure(Exception):
-    """A measurement that could not be made."""
+    """A measurement that failed."""
 
 
 class Worker:
-    """A program that answers each line of its input, words separated by tabs, with one line of output."""
+    """A program that replies to each line of its input, with words separated by tabs, with one line of output."""
 
     def __init__(self, command, folder):
         self._process = subprocess.Popen(command, cwd=folder, text=True, stdin=subprocess.PIPE,
@@ -32,11 +32,11 @@ class Worker:
         return int(answer)
 
     def peak_memory(self, small, large):
-        """Bytes in use at the peak of the request `large`, above those in use after the request `small`, which
-        loads what is loaded only once. For a process that has done nothing else."""
+        """Returns the peak of the bytes in use during the request `large`, above those in use after the request
+        `small`, which loads everything that is loaded only once. Must be the first use of the process."""
         self.nanoseconds(*small)
         process = pathlib.Path("/proc") / str(self._process.pid)
-        (process / "clear_refs").write_text("5")  # starts the peak anew
+        (process / "clear_refs").write_text("5")  # resets the peak
         before = _kibibytes(process, "VmRSS")
         self.nanoseconds(*large)
         return (_kibibytes(process, "VmHWM") - before) * 1024
@@ -47,12 +47,12 @@ def _kibibytes(process, field):
         name, value = line.split(":", 1)
         if name == field:
             return int(value.split()[0])
-    raise Failure(f"there is no {field} in {process}/status")
+    raise Failure(f"{process}/status has no field {field}")
 
 
 def interleaved(contenders, rounds):
-    """Calls every contender once a round, in an order that rotates, after one round that does not count.
-    Returns the times of each, by name."""
+    """Calls every contender once per round, in an order that rotates, after one round for warming up. Returns
+    the times of each contender by its name."""
     times = {name: [] for name in contenders}
     names = list(contenders)
     for number in range(-1, rounds):
@@ -65,5 +65,5 @@ def interleaved(contenders, rounds):
 
 
 def ratio(times, bases):
-    """The median of the ratios of each round, which a slow round does not change."""
+    """Returns the median of the ratios of all rounds, which a slow round does not change."""
     return statistics.median(time / base for time, base in zip(times, bases))

@@ -1,11 +1,13 @@
-"""Makes thumbnails with other software, each time in its fastest form, and measures that on command.
+"""Measures on command how other software makes thumbnails, each in its fastest way.
 
-Usage: peers.py PEER. Speaks the protocol of measuring.Worker:
+Usage: peers.py PEER
+
+Implements the protocol of measuring.Worker. The reply to
 
   thumbnail FACTOR FORMAT WIDTH HEIGHT POSITION FILE
 
-answers the nanoseconds from the file to the bytes of a picture that is reduced by FACTOR. Like this project, each
-peer averages blocks, takes the logarithm of the power of complex pixels and stretches grey levels to 0..255.
+is the nanoseconds from the file to the bytes of a picture that is reduced by FACTOR. Like this project, each peer
+averages blocks, takes the logarithm of the power of complex pixels and stretches grey levels to 0..255.
 """
 
 import ctypes
@@ -23,7 +25,7 @@ def reduced(frame, factor):
     rows, columns = (size // factor for size in frame.shape[:2])
     whole = frame[: rows * factor, : columns * factor]
     channels = frame.shape[2:]
-    # One axis after the other is up to three times as fast as both at once.
+    # Averaging one axis after the other is up to three times as fast as both at once.
     by_rows = whole.reshape(rows, factor, columns * factor, *channels).mean(axis=1)
     means = by_rows.reshape(rows, columns, factor, *channels).mean(axis=2)
     if channels:
@@ -53,8 +55,8 @@ class Mrcfile:
 
 
 class Libvips:
-    """libvips through its C interface: no Python in its loops, as many threads as it takes by itself, and read
-    from top to bottom, which is the fastest way."""
+    """libvips through its C interface: without Python in its loops, with its default number of threads, and reading
+    from top to bottom, which is its fastest mode."""
 
     FORMATS = {"uint8": 0, "rgb": 0, "int8": 1, "uint16": 2, "int16": 3, "uint32": 4, "int32": 5, "float32": 6,
                "complex64": 7, "float64": 8, "complex128": 9}  # VipsBandFormat
@@ -72,7 +74,7 @@ class Libvips:
         self._glib = ctypes.CDLL(find_library("glib-2.0"))
         self._gobject = ctypes.CDLL(find_library("gobject-2.0"))
         self._check(self._vips.vips_init(b"bench"))
-        self._vips.vips_cache_set_max(0)  # a result must not be taken from the round before
+        self._vips.vips_cache_set_max(0)  # never reuse the result of the previous round
 
     def _check(self, status):
         if status != 0:
@@ -108,7 +110,7 @@ class Libvips:
 
 
 class ImageMagick:
-    """ImageMagick through its C interface. Its pixels have 16 bits, into which 32-bit integers do not fit."""
+    """ImageMagick through its C interface. Its pixels have 16 bits, too few for 32-bit integers."""
 
     CHAR_PIXEL = 1  # StorageType
 
@@ -131,7 +133,7 @@ class ImageMagick:
         call.MagickSetOption(wand, b"endian", b"LSB")
         if pixel_format.startswith("float"):
             call.MagickSetOption(wand, b"quantum:format", b"floating-point")
-            call.MagickSetOption(wand, b"quantum:minimum", b"0")  # values are clipped to a range
+            call.MagickSetOption(wand, b"quantum:minimum", b"0")  # float values are clipped to this range
             call.MagickSetOption(wand, b"quantum:maximum", b"200")
         if not call.MagickReadImage(wand, (b"rgb:" if rgb else b"gray:") + file.encode()):
             raise RuntimeError(f"ImageMagick cannot read {file}")
@@ -157,7 +159,7 @@ def main():
         begin = time.perf_counter_ns()
         picture = thumbnail(int(factor), pixel_format, int(width), int(height), int(position), file)
         end = time.perf_counter_ns()
-        levels = 1 if pixel_format == "rgb" else 250  # averages of random colours are all about the same
+        levels = 1 if pixel_format == "rgb" else 250  # averages of random colours are nearly equal
         print(end - begin if numpy.ptp(picture) > levels else "error\tno picture", flush=True)
 
 

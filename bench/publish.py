@@ -13,7 +13,7 @@ import matplotlib.pyplot
 from run import COMMANDS, FOLDER, PEER_EDGE, SYSTEMS
 
 DOCS = pathlib.Path(__file__).resolve().parent.parent / "docs"
-ALL_EDGES = ("uint16", "float32")  # workloads that the page shows at every size
+ALL_EDGES = ("uint16", "float32")  # the page shows these workloads at every size
 COLOURS = dict(zip(COMMANDS, ("#0b5fa5", "#6baed6", "#e6550d", "#fdae6b", "#31a354", "#756bb1")))
 
 
@@ -52,7 +52,7 @@ def table(rows):
 def main():
     results = json.loads((FOLDER / "results.json").read_text())
     rows = [row for row in results["rows"] if row["request"] in (None, PEER_EDGE) or row["workload"] in ALL_EDGES]
-    # A pixel type's own row is named after it alone.
+    # Only the main workload of a pixel type has a name without a space.
     chart([row for row in rows if row["request"] == PEER_EDGE and " " not in row["workload"]], DOCS / "performance.svg")
     page = DOCS / "performance.md"
     parts = re.split("(<!-- (?:table|end of table) -->\n)", page.read_text())

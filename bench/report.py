@@ -1,4 +1,4 @@
-"""The table that is printed, which is Markdown, and the facts about the machine."""
+"""The table of results, in Markdown, and facts about the machine."""
 
 import os
 import platform
@@ -7,7 +7,7 @@ import subprocess
 
 
 class Table:
-    """Prints each row at once. Columns are given as title and width."""
+    """A table that prints each row immediately. `columns` maps titles to widths."""
 
     def __init__(self, columns):
         self._widths = columns.values()
@@ -40,7 +40,7 @@ def _package(name):
 
 
 def machine():
-    """What the numbers depend on."""
+    """Returns the facts about the machine that influence the results."""
     flags = _field("/proc/cpuinfo", "flags").split()
     return {
         "processor": _field("/proc/cpuinfo", "model name"),

@@ -1,4 +1,4 @@
-"""The main program of scripts/bench, which builds what is measured and passes its arguments on."""
+"""The main program of scripts/bench, which builds the measured programs and passes its arguments on."""
 
 import argparse
 import contextlib
@@ -15,7 +15,7 @@ from report import Table, machine
 BUILD = pathlib.Path(__file__).resolve().parent.parent / "build"
 FOLDER = BUILD / "bench"
 
-EDGES = (96, 256, 1024)  # of the squares for which thumbnails are requested
+EDGES = (96, 256, 1024)  # in pixels, of the requested squares
 PEER_EDGE = 256
 FRAMES = [
     Frame("uint8", "uint8", 8192, 8192),
@@ -42,11 +42,11 @@ COMMANDS = {
     "DLL": [BUILD.parent / "scripts/wine", BUILD / "windows/bench/bench_worker.exe"],
     **{peer: [sys.executable, pathlib.Path(__file__).with_name("peers.py"), peer] for peer in PEERS},
 }
-SYSTEMS = ("native", "DLL")  # of which each has its own bare read; peers are compared with the native one
+SYSTEMS = ("native", "DLL")  # each has its own bare read; peers are compared with the native one
 
 
 def request_for(way, frame, edge):
-    """What is sent to a worker for a thumbnail."""
+    """Returns the words of a worker's request for a thumbnail."""
     if way in SYSTEMS:
         return ("thumbnail", edge, frame.file)
     return ("thumbnail", frame.factor(edge), frame.pixel_format, frame.width, frame.height, frame.position,
@@ -59,7 +59,7 @@ def ways_to(frame, edge):
 
 
 class Bench:
-    """Measures rows, prints them and collects them as data."""
+    """Measures workloads, prints a row for each, and collects the rows as data."""
 
     def __init__(self, rounds):
         self.rows = []
@@ -70,13 +70,13 @@ class Bench:
 
     @contextlib.contextmanager
     def new_workers(self):
-        """Starts processes for the rows that follow. What was measured before has no effect on them."""
+        """Starts new processes for the next rows, so that earlier measurements do not influence them."""
         with contextlib.ExitStack() as stack:
             self._workers = {way: stack.enter_context(Worker(command, FOLDER)) for way, command in COMMANDS.items()}
             yield
 
     def measure(self, workload, edge, read, requests):
-        """Compares each way's time for its request with that of the bare `read` on its system."""
+        """Compares the time of each request with that of the bare `read` on the same system."""
         bases = {way: "DLL" if way == "DLL" else "native" for way in requests}
         systems = [system for system in SYSTEMS if system in bases.values()]
         contenders = {("read", system): self._requesting(system, read) for system in systems}
@@ -100,21 +100,22 @@ def measure_frame(bench, frame):
 
 
 def measure_series(bench, series):
-    """Opening a series, which reads the header of each element, beside reading just these headers."""
+    """Compares opening a series, which reads the header of each element, with reading only these headers."""
     read = ("blocks", series.first_element, series.element_bytes, series.count, SER_ELEMENT_HEADER_BYTES, series.file)
     bench.measure(f"series of {series.count}", None, read,
                   {"native": ("metadata", "reader", series.file), "DLL": ("metadata", "tip", series.file)})
 
 
 def measure_folder(bench, folder):
-    """What is shown of every file of a folder except the picture, beside reading just the headers."""
+    """Compares reading everything but the picture that is shown for each file of a folder with reading only the
+    headers."""
     read = ("starts", MRC_HEADER_BYTES, *folder.files)
     for way, view in (("native", "reader"), ("DLL", "tip"), ("DLL", "columns"), ("DLL", "sets"), ("DLL", "store")):
         bench.measure(f"folder: {view}", None, read, {way: ("metadata", view, *folder.files)})
 
 
 def measure_memory():
-    """Returns by way the bytes that a thumbnail takes in a new process."""
+    """Returns the bytes that a thumbnail takes in a new process of each contender, by its name."""
     print(f"\nPeak memory for a thumbnail of {MEMORY_FRAME.pixel_format}, {MEMORY_FRAME.width} x"
           f" {MEMORY_FRAME.height}, at {PEER_EDGE}:")
     peaks = {}
@@ -129,8 +130,9 @@ def measure_memory():
 
 def main():
     parser = argparse.ArgumentParser(prog="scripts/bench")
-    parser.add_argument("--quick", action="store_true", help="few rounds, for a first look")
-    parser.add_argument("workloads", nargs="*", metavar="WORKLOAD", help="a part of a name; all without one")
+    parser.add_argument("--quick", action="store_true", help="run fewer rounds, for a first impression")
+    parser.add_argument("workloads", nargs="*", metavar="WORKLOAD",
+                        help="measure only workloads whose names contain this (default: all)")
     options = parser.parse_args()
     tasks = [(measure_frame, frame.name, frame) for frame in FRAMES]
     tasks += [(measure_series, "series", series) for series in SERIES]
@@ -139,7 +141,7 @@ def main():
     chosen = [name for name in known
               if not options.workloads or any(word in name for word in options.workloads)]
     if not chosen:
-        parser.error(f"no workload is called that, only: {', '.join(known)}")
+        parser.error(f"no workload has such a name; the workloads are {', '.join(known)}")
     rounds = 5 if options.quick else 15
 
     FOLDER.mkdir(parents=True, exist_ok=True)

@@ -1,5 +1,6 @@
-// What is measured: how the shell uses an image file. Natively these are the readers, on Windows the objects
-// of the built DLL. And the one baseline that differs between the systems.
+// The operations to measure, which use an image file as the shell does: through the readers natively, and
+// through the objects of the built DLL on Windows. ReadBlocks is the only baseline that differs between the
+// systems.
 #pragma once
 
 #include <windows.h>
@@ -13,11 +14,11 @@ namespace Qel::Lumetra::ShellExt::Bench {
 /// Opens the file, makes its thumbnail and closes it. The caller owns the bitmap, which is null on failure.
 HBITMAP MakeThumbnail(const std::wstring& path, const SIZE& request);
 
-/// Requests everything that the shell shows of a file except the picture: as "reader" (natively), or as
-/// "tip", "columns", "sets" or "store" (on Windows). Returns whether there were answers.
+/// Reads everything but the picture that the shell shows for a file. `view` is "reader" (natively), or "tip",
+/// "columns", "sets" or "store" (on Windows). Returns whether all values could be read.
 bool ReadMetadata(const std::string& view, const std::wstring& path);
 
-/// Blocks of one size at equal distances in a file. Offsets in bytes.
+/// Blocks of the same size at equal distances in a file. Positions and sizes are in bytes.
 struct Blocks {
   std::int64_t first = 0;
   std::int64_t distance = 0;
@@ -25,7 +26,8 @@ struct Blocks {
   std::size_t bytes = 0;
 };
 
-/// Reads the blocks with the fewest system calls; returns false when the file does not have them all.
+/// Reads the blocks with as few system calls as possible. Returns false if the file does not contain all of
+/// them.
 bool ReadBlocks(const std::wstring& path, const Blocks& blocks);
 
 }  // namespace Qel::Lumetra::ShellExt::Bench

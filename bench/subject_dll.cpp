@@ -1,4 +1,4 @@
-// Uses the built DLL as the shell does.
+// Implements subject.h with the built DLL, used as the shell uses it.
 #include <windows.h>
 
 #include <propsys.h>
@@ -30,7 +30,7 @@ ComPtr<Interface> Create(const CLSID& clsid, const IID& iid) {
   return server.CreateInstance<Interface>(clsid, iid);
 }
 
-/// A new object that has loaded the file.
+/// Returns a new object that has loaded the file.
 template <class Interface>
 ComPtr<Interface> Load(const std::wstring& path, const IID& iid) {
   const auto file = Create<IPersistFile>(kShellExtClass, IID_IPersistFile);
@@ -47,7 +47,7 @@ bool ReadTip(const std::wstring& path) {
   return true;
 }
 
-/// All columns of the Details view.
+/// Reads all columns of the Details view.
 bool ReadColumns(const std::wstring& path) {
   const auto provider = Create<IColumnProvider>(kShellExtClass, IID_IColumnProvider);
   SHCOLUMNDATA file{};
@@ -61,7 +61,7 @@ bool ReadColumns(const std::wstring& path) {
   });
 }
 
-/// All properties of both legacy property sets.
+/// Reads all properties of both property sets.
 bool ReadPropertySets(const std::wstring& path) {
   const auto sets = Load<IPropertySetStorage>(path, IID_IPropertySetStorage);
   return std::ranges::all_of(kProperties, [&](const Property& property) {
@@ -78,7 +78,7 @@ bool ReadPropertySets(const std::wstring& path) {
   });
 }
 
-/// All properties of the property system's handler, which reads from a stream.
+/// Reads all properties of the property store, from a stream.
 bool ReadPropertyStore(const std::wstring& path) {
   const bool isRaw = std::filesystem::path(path).extension() == L".raw";
   const auto handler =
@@ -126,7 +126,8 @@ bool ReadBlocks(const std::wstring& path, const Blocks& blocks) {
   std::vector<char> bytes(blocks.bytes);
   bool done = true;
   for (std::int64_t i = 0; i < blocks.count && done; ++i) {
-    // Two calls: Wine sends a read with a position to its server, which takes twenty times as long.
+    // Seeks and reads in two calls, because Wine passes a read with a position to its server, which takes
+    // twenty times as long.
     LARGE_INTEGER position{};
     position.QuadPart = blocks.first + i * blocks.distance;
     DWORD read = 0;

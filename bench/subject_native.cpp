@@ -13,7 +13,7 @@
 namespace Qel::Lumetra::ShellExt::Bench {
 namespace {
 
-/// A file and its reader, as the shell objects hold them.
+/// An open file and its reader, as the shell objects own them.
 struct OpenedFile {
   explicit OpenedFile(const std::wstring& path) {
     OpenPath(stream, path.c_str());

@@ -1,8 +1,8 @@
-// A process that measures on command, so that the program that drives it can take its rounds in turn with
-// those of other processes.
+// A process that measures on command, so that the driving program can alternate its rounds with those of
+// other processes.
 //
-// A command is one line on standard input, its words separated by tabs. The answer is one line on standard
-// output: a time in nanoseconds, or "error" and the reason. Files are named relative to the working
+// A command is one line on standard input, with words separated by tabs. The reply is one line on standard
+// output: a time in nanoseconds, or "error", a tab and the reason. Files are named relative to the working
 // directory.
 //
 //   thumbnail EDGE FILE             opens FILE and makes its thumbnail
@@ -35,7 +35,7 @@ std::wstring Path(const std::string& name) {
   return std::filesystem::path(name).wstring();
 }
 
-/// Nanoseconds that `work` takes. Throws std::runtime_error if it returns false.
+/// Returns the nanoseconds that `work` takes. Throws std::runtime_error if it returns false.
 template <class Work>
 std::string TimeOf(const Work& work) {
   using Clock = std::chrono::steady_clock;
@@ -46,7 +46,7 @@ std::string TimeOf(const Work& work) {
   return std::to_string(std::chrono::duration_cast<std::chrono::nanoseconds>(time).count());
 }
 
-/// The time that `work` takes for each of the files from the third word on.
+/// Returns the nanoseconds that `work` takes for the files from the third word on.
 template <class Work>
 std::string TimeOfFiles(const Words& words, const Work& work) {
   std::vector<std::wstring> paths;
@@ -72,7 +72,8 @@ std::string TimeThumbnail(const Words& words) {
 
 std::string TimeRead(const Words& words) {
   static constexpr std::streamsize kBufferBytes = 256LL * 1024;
-  // The place of the buffer within a page changes the time by up to a sixth. This is where malloc puts it.
+  // The address of the buffer within a page changes the time by up to a sixth. This is where malloc places
+  // it.
   alignas(4096) static char pages[16 + kBufferBytes];
   char* const buffer = pages + 16;
   const std::int64_t position = std::stoll(words.at(1));

@@ -1,4 +1,4 @@
-# Cross-compiles to Linux on arm64 on Debian. Programs run under QEMU.
+# Cross-compiles to Linux on arm64 on Debian; programs run under QEMU.
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_SYSTEM_PROCESSOR aarch64)
 

@@ -1,8 +1,8 @@
 # The list of file kinds, read from formats/file_kinds.h.
 #
-# QEL_FILE_EXTENSIONS has every extension, in the order of registration, without the dot. QEL_FILE_KINDS has the
-# first extension of every parser: the name that the parser's files begin with. QEL_EXTENSIONS_IN_WORDS is for
-# sentences, for instance ".mrc, .ser and .raw".
+# QEL_FILE_EXTENSIONS lists every file-name extension without its dot, in the order of registration. QEL_FILE_KINDS
+# lists the prefix of each parser's source files. QEL_EXTENSIONS_IN_WORDS is for sentences, for instance ".mrc, .ser and
+# .raw".
 set(file_kinds_header ${PROJECT_SOURCE_DIR}/formats/file_kinds.h)
 set_property(DIRECTORY ${PROJECT_SOURCE_DIR} APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${file_kinds_header})
 file(STRINGS ${file_kinds_header} rows REGEX "^ *FileKind<[A-Za-z0-9]+Parser>{L\"[a-z0-9]+\"")
@@ -16,5 +16,5 @@ list(REMOVE_DUPLICATES QEL_FILE_KINDS)
 list(JOIN QEL_FILE_EXTENSIONS ", ." QEL_EXTENSIONS_IN_WORDS)
 string(REGEX REPLACE "(.*), " ".\\1 and " QEL_EXTENSIONS_IN_WORDS "${QEL_EXTENSIONS_IN_WORDS}")
 if(NOT QEL_FILE_KINDS)
-  message(FATAL_ERROR "${file_kinds_header} has no rows that can be read here")
+  message(FATAL_ERROR "${file_kinds_header} has no row in the form that cmake/file_kinds.cmake reads")
 endif()

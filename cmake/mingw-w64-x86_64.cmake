@@ -1,5 +1,5 @@
-# Cross-compiles to 64-bit Windows on Debian. The -posix compilers are named in full, because the
-# unsuffixed alternative may be the win32 thread model; programs run under Wine.
+# Cross-compiles to 64-bit Windows on Debian; programs run under Wine. The compilers have the suffix -posix, because the
+# unsuffixed names may be the variants with the win32 thread model.
 set(CMAKE_SYSTEM_NAME Windows)
 set(CMAKE_SYSTEM_PROCESSOR x86_64)
 

@@ -1,5 +1,6 @@
-// The fuzzer of basic_combuf: the input says how large the buffer is, what the COM stream brings and where it
-// fails, and then what is done with the buffer. What is read is compared with what the stream has.
+// The fuzzer of basic_combuf. The input determines the size of the buffer, the bytes and failures of the COM
+// stream, and the operations on the buffer. The fuzzer compares the bytes that it reads with those of the
+// stream.
 #include <fuzzer/FuzzedDataProvider.h>
 
 #include <cstdint>
@@ -24,7 +25,7 @@ void Require(bool condition, const char* what) {
   std::abort();
 }
 
-/// Reads from a buffer and knows what has to come.
+/// Reads from a buffer and aborts if the bytes are not the next ones of the stream.
 class Reader {
  public:
   Reader(basic_combuf<char>& buffer, ScriptedStream& stream) : buffer_(buffer), stream_(stream) {}
@@ -39,18 +40,20 @@ class Reader {
   void Read(std::size_t count) {
     std::string bytes(count, '\0');
     bytes.resize(static_cast<std::size_t>(buffer_.sgetn(bytes.data(), static_cast<std::streamsize>(count))));
-    Require(bytes == stream_.content.substr(position_, bytes.size()), "other bytes are read than there are");
+    Require(bytes == stream_.content.substr(position_, bytes.size()),
+            "the bytes read differ from the stream's");
     position_ += bytes.size();
   }
 
-  /// What was read ahead is dropped.
+  /// Expects the stream's position next, because the buffer has dropped what it had read ahead.
   void Restart() { position_ = stream_.position; }
 
  private:
   void Expect(Traits::int_type got, std::size_t step) {
     if (Traits::eq_int_type(got, Traits::eof())) return;
-    Require(position_ < stream_.content.size(), "more is read than there is");
-    Require(Traits::to_char_type(got) == stream_.content[position_], "another byte is read than there is");
+    Require(position_ < stream_.content.size(), "a byte after the end of the stream was read");
+    Require(Traits::to_char_type(got) == stream_.content[position_],
+            "the byte read differs from the stream's");
     position_ += step;
   }
 
@@ -69,7 +72,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   stream.failingRead = input.ConsumeIntegralInRange<int>(0, 20);
   stream.endResult = input.PickValueInArray(kResults);
   stream.writeResult = input.PickValueInArray(kResults);
-  // A stream that claims more than it brings has no bytes to compare with.
+  // A stream that reports more bytes than it delivers gives nothing to compare with.
   const bool honest = input.ConsumeBool();
   if (!honest) stream.overclaim = input.ConsumeIntegral<ULONG>();
   {
@@ -77,7 +80,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     buffer.Allocate(input.ConsumeIntegralInRange<std::size_t>(0, kMaxBytes));
     buffer.Attach(&stream);
     Reader reader(buffer, stream);
-    // Reading and writing share the buffer's memory and are not mixed by those who care for the bytes.
+    // Reading and writing share the buffer's memory, so the bytes are only compared if nothing is written.
     const bool writes = input.ConsumeBool();
     while (input.remaining_bytes() > 0) {
       const bool compares = honest && !writes;
@@ -94,7 +97,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         case 4:
           Require(buffer.pubseekoff(input.ConsumeIntegral<int>(), std::ios_base::cur) ==
                       std::streampos(std::streamoff(-1)),
-                  "a COM stream is repositioned");
+                  "a COM stream was repositioned");
           break;
         case 5:
           buffer.Attach(&stream);
@@ -116,6 +119,6 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
       }
     }
   }
-  Require(stream.references == 1, "a reference on the COM stream is left or was given back too often");
+  Require(stream.references == 1, "a reference to the COM stream was leaked or released too often");
   return 0;
 }

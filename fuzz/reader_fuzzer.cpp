@@ -1,5 +1,5 @@
-// The fuzzer of a file kind, built once for each: the input is the file. Its last bytes also choose the
-// request, so that each input costs one thumbnail and repeats what it found.
+// The fuzzer of a file kind, built once for each kind. The input is the file. Its last bytes also determine
+// the request, so that each input makes only one thumbnail and its findings can be reproduced.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -13,10 +13,10 @@ namespace {
 
 using namespace Qel::Lumetra::ShellExt::Testing;
 
-/// What an input chooses.
+/// The request and the failures that an input determines.
 struct Choice {
   SIZE request{1, 1};
-  std::int64_t failingRead = -1;  // of the file, counted from 0; -1 for none
+  std::int64_t failingRead = -1;  // number of the read that fails, from 0; -1 for none
   MemoryBuffer::Failure failure = MemoryBuffer::Failure::kBringsNothing;
   bool seekable = true;
 };
@@ -24,7 +24,8 @@ struct Choice {
 Choice ChoiceOf(std::string_view bytes) {
   if (bytes.size() < 4) return {};
   const auto byte = [end = bytes.rbegin()](int i) { return static_cast<unsigned char>(end[i]); };
-  // From -16, which is no size, to more than the edge of most frames. A read fails for half of the inputs.
+  // The edges range from -16, which is invalid, to more than the edge of most frames. A read fails for half
+  // of the inputs.
   return {{byte(0) - 16, byte(1) - 16},
           byte(2) % 2 == 1 ? byte(2) / 2 : -1,
           static_cast<MemoryBuffer::Failure>(byte(3) % 3),

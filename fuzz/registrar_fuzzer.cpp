@@ -1,4 +1,4 @@
-// The fuzzer of the registrar: the input is a registry script, which is parsed, registered in a registry in
+// The fuzzer of the registrar. The input is a registry script, which is parsed, registered in a registry in
 // memory and unregistered again.
 #include <cstdint>
 #include <cstdio>
@@ -22,9 +22,9 @@ void Require(bool condition, const char* what) {
 void CheckKeys(const RegistryScript& script) {
   std::size_t maxDepth = 0;  // of the next key
   for (const ScriptKey& key : script) {
-    Require(key.depth <= maxDepth, "a key stands in no other key");
+    Require(key.depth <= maxDepth, "a key has no parent");
     Require(key.depth < kMaxKeyNesting, "a key is nested too deeply");
-    Require(!key.name.empty() && key.name.find(L'\\') == std::wstring::npos, "a key's name is no name");
+    Require(!key.name.empty() && key.name.find(L'\\') == std::wstring::npos, "a key has an invalid name");
     maxDepth = key.depth + 1;
   }
 }
@@ -46,9 +46,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
       return RunRegistryScript(text, kReplacements, direction, registry);
     };
     const HRESULT expected = script ? S_OK : kInvalidScript;
-    Require(run(ScriptDirection::kRegister) == expected, "registering gives another result than parsing");
+    Require(run(ScriptDirection::kRegister) == expected, "the results of registering and parsing differ");
     const auto once = registry.Contents();
-    Require(script || once.empty(), "a text that is no script changes the registry");
+    Require(script || once.empty(), "an invalid script changes the registry");
     run(ScriptDirection::kRegister);
     Require(registry.Contents() == once, "registering again changes the registry");
     Require(run(ScriptDirection::kUnregister) == expected, "unregistering fails");

@@ -1,4 +1,4 @@
-// Writes the seeds of the fuzzers, a folder for each kind, below the folder that its argument names.
+// Writes the seeds of the fuzzers into the folder that its argument names, with a subfolder for each kind.
 #include <cstdio>
 #include <exception>
 #include <filesystem>
@@ -38,14 +38,14 @@ void Write(const std::filesystem::path& folder, const std::string& name, const s
 }  // namespace
 
 int main(int argc, char** argv) try {
-  if (argc != 2) throw std::invalid_argument("name the folder to write to");
+  if (argc != 2) throw std::invalid_argument("name the output folder as the only argument");
   const std::filesystem::path seeds = argv[1];
   for (const char* kind : kSampleKinds) {
     for (const SampleFile& sample : SampleFiles(kind)) Write(seeds / kind, sample.name, sample.bytes);
   }
   int number = 0;
   for (const char* script : kScripts) Write(seeds / "registrar", std::to_string(++number), script);
-  // What the bytes mean to the target of basic_combuf is of no matter, as long as there are enough of them.
+  // The meaning of these bytes to the target of basic_combuf does not matter, only their number.
   std::mt19937 random;
   for (std::size_t size = 20; size <= 400; size += 20) {
     std::string bytes(size, '\0');

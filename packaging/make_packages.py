@@ -3,11 +3,12 @@
 
 usage: make_packages.py BUILD OUT
 
-BUILD is the folder of the preset windows, OUT that of the packages, whose paths are printed. scripts/package, which
-runs this, tells what the packages are and how they are signed. The same programs give the same packages, byte by byte,
-when SOURCE_DATE_EPOCH is the same: the time, in seconds since 1970, that everything in them carries.
+BUILD is the build folder of the preset windows, and OUT is the folder for the packages, whose paths are printed.
+scripts/package runs this program; its help describes the packages and how to sign them. The same programs and the
+same SOURCE_DATE_EPOCH give the same packages, byte by byte. SOURCE_DATE_EPOCH is the time, in seconds since 1970, of
+everything in the packages.
 
-Debian's Python, as libmsi is one of its packages.
+It needs Debian's Python, because Debian packages the bindings of libmsi for that one only.
 """
 
 import hashlib
@@ -38,15 +39,15 @@ from file_kinds import EXTENSIONS, EXTENSIONS_IN_WORDS  # noqa: E402
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 TEXTS = ("README.txt", "NOTICES.txt")
 
-# The compiler of the programs, and a file of each library that NOTICES.txt names; gdtoa is in libmingwex.
+# The compiler of the programs, and one file of each library that NOTICES.txt names. gdtoa is part of libmingwex.
 COMPILER = "x86_64-w64-mingw32-g++-posix"
 LIBRARIES = ("libgcc.a", "libstdc++.a", "libssp.a", "libmingw32.a", "libmingwex.a", "libwinpthread.a",
              "/usr/include/nlohmann/json.hpp")
 
-# What makes a product of Windows Installer another version of this one. Never to be changed.
+# Identifies all versions of the product to Windows Installer. Must never change.
 UPGRADE_CODE = uuid.UUID("{D5320353-60A9-41CE-A794-4CBF1BCBA0D4}")
 
-# The codes of the components that were made before codes were derived from extensions. Never to be changed.
+# The codes of the components that are older than the rule that derives codes from extensions. Must never change.
 COMPONENT_CODES = {
     "mrc": "{391B1E31-23C5-483B-BA33-E4239E5B6DF0}",
     "ali": "{9BADCDF1-0601-41C7-987D-74C1A271EB24}",
@@ -59,18 +60,18 @@ COMPONENT_CODES = {
 
 APP_ID = "{66A6E9D4-0F73-4d4a-A7EE-F53AE6C5F868}"
 
-# Has Windows run the thumbnail handler in the process that asks, where it need not be initialised with a stream. Only
-# the feature of this name, which is off by default, writes it; DllRegisterServer does not.
+# Makes Windows run the thumbnail handler in the requesting process, where it need not be initialised with a stream.
+# Only the feature of this name writes this value. It is off by default, and DllRegisterServer does not write it.
 IN_PROCESS = ("inprocess", Entry(r"SOFTWARE\Classes\CLSID\{79E696A1-2FA5-4b3e-9610-D5F760417E62}",
                                  "DisableProcessIsolation", 1))
 
-# Windows Installer's numbers, from its tables Component, Feature and Registry.
+# Numbers that Windows Installer defines for its tables Component, Feature and Registry.
 COMPONENT_64_BIT, COMPONENT_KEY_PATH_IS_REGISTRY = 256, 4
 FEATURE_NOT_ADVERTISED, FEATURE_ALWAYS = 8, 16
 ROOT_LOCAL_MACHINE = 2
 SUMMARY_PROPERTIES = 20
 
-LANGUAGE_US_ENGLISH = "1033"  # that of the DLL's version
+LANGUAGE_US_ENGLISH = "1033"  # the language of the DLL's version resource
 
 
 def fail(sentence):
@@ -86,7 +87,7 @@ def run(*command, **options):
 
 
 class Project:
-    """What CMake knows of the project, so that there is one place for it."""
+    """The version and the description of the project, which are set in CMakeLists.txt only."""
 
     def __init__(self, build):
         cache = (build / "CMakeCache.txt").read_text()
@@ -96,7 +97,7 @@ class Project:
 
 
 def library_packages():
-    """The Debian packages that contain the libraries, with their versions, one a line."""
+    """Returns the Debian packages that contain the libraries, with their versions, one per line."""
     lines = set()
     for library in LIBRARIES:
         path = os.path.realpath(run(COMPILER, f"-print-file-name={library}").strip())
@@ -107,12 +108,12 @@ def library_packages():
 
 
 class Signing:
-    """Puts signatures on programs and packages, if there is a certificate."""
+    """Signs programs and packages if there is a certificate."""
 
     def __init__(self, environment, epoch):
         self.certificate = environment.get("QEL_SIGN_PKCS12")
         if not self.certificate:
-            print("== Not signing: QEL_SIGN_PKCS12 names no certificate", file=sys.stderr)
+            print("== Not signing: QEL_SIGN_PKCS12 is not set; see scripts/package --help", file=sys.stderr)
             return
         self.options = ["-pkcs12", self.certificate, "-h", "sha256", "-n", "QelShellExt"]
         if "QEL_SIGN_PASSWORD_FILE" in environment:
@@ -131,7 +132,7 @@ class Signing:
 
 
 class Database:
-    """An installer package, changed by its own kind of SQL."""
+    """The database of an installer package, which is changed with libmsi's SQL."""
 
     def __init__(self, path):
         self.database = Libmsi.Database.new(str(path), Libmsi.DbFlags.TRANSACT, None)
@@ -149,7 +150,7 @@ class Database:
 
     def set_summary(self, package_code, epoch):
         summary = Libmsi.SummaryInfo.new(self.database, SUMMARY_PROPERTIES)
-        file_time = (epoch + 11644473600) * 10**7  # since 1601, in units of 100 ns
+        file_time = (epoch + 11644473600) * 10**7  # in units of 100 ns since 1601
         summary.set_string(Libmsi.Property.UUID, braced(package_code))
         summary.set_filetime(Libmsi.Property.CREATED_TM, file_time)
         summary.set_filetime(Libmsi.Property.LASTSAVED_TM, file_time)
@@ -164,14 +165,14 @@ def braced(code):
 
 
 def add_registry(database, scripts):
-    """What DllRegisterServer writes, each entry in the component of its extension or in that of the DLL, and the entry
-    of the feature inprocess in its own.
+    """Adds the registry entries of DllRegisterServer, each to the component of its file-name extension or else to the
+    component of the DLL, and the entry of the feature inprocess to the component of that name.
     """
     replacements = {"MODULE": "[InstallFolder]QelShellExt.dll", "APPID": APP_ID}
     key_paths = {}
     for number, (feature, entry) in enumerate([*registered_entries(scripts, replacements), IN_PROCESS]):
         row, component = f"registry{number}", feature or "Server"
-        # An asterisk makes the key, and removes it with everything in it.
+        # An asterisk creates the key on installation, and deletes it with everything in it on removal.
         name, data = ("*", None) if entry.owned else (entry.name or None, entry.data)
         data = f"#{data}" if isinstance(data, int) else data
         database.execute("INSERT INTO `Registry` (`Registry`, `Root`, `Key`, `Name`, `Value`, `Component_`) "
@@ -192,7 +193,7 @@ def component_code(extension):
 
 
 def write_wxs(template, path):
-    """Writes what is to be installed, with every line of an extension once for each."""
+    """Writes the description of the package, and repeats every line that has @EXTENSION@ for each extension."""
     lines = []
     for line in template.read_text("utf-8").splitlines(keepends=True):
         lines += [line.replace("@EXTENSION@", extension).replace("@CODE@", component_code(extension))
@@ -201,7 +202,7 @@ def write_wxs(template, path):
 
 
 def make_msi(content, scripts, project, epoch, msi):
-    """wixl does the most, and what it cannot do follows."""
+    """Makes the installer package with wixl, and then changes in its database what wixl cannot express."""
     for name in (*PROGRAMS, *TEXTS):
         os.utime(content / name, (epoch, epoch))
     product_code = uuid.uuid5(UPGRADE_CODE, f"product {project.version}")
@@ -209,7 +210,7 @@ def make_msi(content, scripts, project, epoch, msi):
                  "UpgradeCode": braced(UPGRADE_CODE)}
     wxs = content / "QelShellExt.wxs"
     write_wxs(HERE / wxs.name, wxs)
-    # The cabinet inside has local times.
+    # The cabinet contains local times, so the time zone must be fixed.
     run("wixl", "--arch", "x64", "--output", msi, *(f"--define={name}={value}" for name, value in variables.items()),
         wxs, cwd=content, env=os.environ | {"TZ": "UTC"})
 
@@ -217,14 +218,14 @@ def make_msi(content, scripts, project, epoch, msi):
     add_registry(database, scripts)
     database.execute("UPDATE `Feature` SET `Attributes` = ? WHERE `Feature` = 'QelShellExt'",
                      FEATURE_NOT_ADVERTISED | FEATURE_ALWAYS)
-    # A file without a version in this table never replaces one that has a version in itself. One with a version is
-    # compared by it, not by its hash.
+    # Windows Installer never replaces a file that has a version with one that has none in this table. A file with a
+    # version is compared by its version and must not have a hash.
     database.execute("UPDATE `File` SET `Version` = ?, `Language` = ? WHERE `File` = 'QelShellExt.dll'",
                      f"{project.version}.0", LANGUAGE_US_ENGLISH)
     database.execute("DELETE FROM `MsiFileHash` WHERE `File_` = 'QelShellExt.dll'")
-    # An older version goes within the transaction of the new one, so that it comes back if that fails.
+    # Removes the older version inside the transaction of the new one, so that it is restored if the installation fails.
     database.execute("UPDATE `InstallExecuteSequence` SET `Sequence` = ? WHERE `Action` = 'RemoveExistingProducts'", 1501)
-    # Windows takes packages of the same code to be the same, so the code follows from the contents.
+    # Windows considers packages with the same code to be identical, so the code is derived from the contents.
     database.set_summary(UPGRADE_CODE, epoch)
     database.commit()
     contents = hashlib.sha256(msi.read_bytes()).hexdigest()
@@ -234,7 +235,7 @@ def make_msi(content, scripts, project, epoch, msi):
 
 
 def make_zip(path, files, epoch):
-    """The files, bytes by path, in a folder that has the name of the archive."""
+    """Writes an archive of `files`, which maps paths to bytes, in a folder with the name of the archive."""
     date = time.gmtime(epoch)[:6]
     with zipfile.ZipFile(path, "w", zipfile.ZIP_DEFLATED) as archive:
         for name, content in sorted(files.items()):
@@ -266,7 +267,7 @@ def make_packages(build, out, epoch):
         released = {name: (content / name).read_bytes() for name in (*PROGRAMS, *TEXTS)}
         symbols = {f"{program}.debug": (build / f"{program}.debug").read_bytes() for program in PROGRAMS}
         tests = test_kit_files(build, registry_scripts)
-        # The tests test the released programs, signed if they are.
+        # The kit tests the released programs, signed if the release is.
         tests |= {name: content for name, content in released.items() if name != "README.txt"}
         for path, files in zip(packages[1:], (released, symbols, tests)):
             make_zip(path, files, epoch)

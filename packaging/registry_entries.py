@@ -1,37 +1,39 @@
-"""What DllRegisterServer writes, read from the same scripts (registration/scripts), for the installer package.
+"""The registry entries that DllRegisterServer writes, for the installer package.
 
-registration/registry_script.h describes the language of the scripts. Only the project's own scripts are read, and tests
-parse them, so invalid text is not explained here: it only fails.
+They are read from the same scripts (registration/scripts). registration/registry_script.h describes the language of the
+scripts. This module reads only the project's own scripts, which tests parse, so it fails without explanation for an
+invalid script.
 """
 
 import re
 
-# The scripts that DllRegisterServer runs, in its order: the module's own, then those of the object map.
+# The scripts that DllRegisterServer runs, in that order: the module's own, then those of the object map.
 REGISTERED_SCRIPTS = ("module", "shell_ext", "ebn", "raw", "mrc")
 
-# HKEY_CLASSES_ROOT of a whole machine: with one name for each key, what two scripts say of the same key meets.
+# Where the roots are for all users of a machine, below HKEY_LOCAL_MACHINE. Each key has only one name this way, so
+# entries of two scripts for the same key coincide.
 _ROOTS = {"HKCR": r"SOFTWARE\Classes", "HKLM": ""}
 
 _TOKEN = re.compile(r"'(?:[^']|'')*'|[{}=]|[^\s{}=']+")
 
 
 class Entry:
-    """A value, or a key that is to be there (name and data are None), below HKEY_LOCAL_MACHINE.
+    """A value below HKEY_LOCAL_MACHINE, or a key that must exist (`name` and `data` are None).
 
-    `name` is "" for the default value; `data` is text or a number. `owned` says of a key that everything in it, whoever
-    wrote it, goes when the server goes.
+    `name` is "" for the default value; `data` is a string or a number. If `owned`, removing the server deletes the key
+    with everything in it, including entries of other programs.
     """
 
     def __init__(self, key, name=None, data=None, owned=False):
         self.key, self.name, self.data, self.owned = key, name, data, owned
 
     def place(self):
-        """The same for entries of which the later replaces the earlier."""
+        """Returns a value that is equal for two entries if the later one replaces the earlier one."""
         return self.key.lower(), None if self.name is None else self.name.lower()
 
 
 def read_script(text, replacements):
-    """The entries of one script, in its order."""
+    """Returns the entries of one script, in its order."""
     for name, value in replacements.items():
         text = text.replace(f"%{name}%", value.replace("'", "''"))
     tokens = _TOKEN.findall(text)[::-1]
@@ -42,7 +44,7 @@ def read_script(text, replacements):
 
 
 def _read_block(key, tokens, entries):
-    """The values and keys between two braces, which are those of `key`."""
+    """Appends the values and keys in the braces after `key` to `entries`."""
     assert tokens.pop() == "{"
     while tokens[-1] != "}":
         word = tokens.pop()
@@ -71,10 +73,11 @@ def _bare(token):
 
 
 def registered_entries(folder, replacements):
-    """Pairs of an extension ("" for what all of them share) and an entry, for all that registering writes.
+    """Returns a pair for each entry that registering writes: its file-name extension, or "" if all share it, and the
+    entry.
 
-    Of entries for the same place only the last stands, as it does in the registry. A key without a mark and without
-    values of its own is not listed: it comes and goes with what is in it.
+    The last of several entries for the same place wins, as in the registry. A key without a mark and without values of
+    its own is not listed, because it is created and deleted with its contents.
     """
     placed = {}
     for script in REGISTERED_SCRIPTS:

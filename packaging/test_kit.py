@@ -1,4 +1,4 @@
-"""What the test kit holds: the Windows test programs, what they test, and the data that they read."""
+"""The contents of the test kit: the Windows test programs, the programs that they test, and the data that they read."""
 
 import pathlib
 import subprocess
@@ -7,24 +7,24 @@ import tempfile
 
 SOURCES = pathlib.Path(__file__).resolve().parent.parent
 
-# The licence of the test library that is in every test program asks to come along with them.
+# Every test program contains the test library, whose licence must accompany it.
 TEST_LIBRARY_NOTICE = pathlib.Path("/usr/share/doc/googletest/copyright")
 
 
 def with_windows_line_ends(text):
-    """The bytes of a text, for editors and interpreters that know no other line ends."""
+    """Returns the bytes of a text with CR LF, for editors and interpreters that need it."""
     return text.replace("\n", "\r\n").encode()
 
 
 def written_mrc_files():
-    """Files by another writer of the format, and what the tests expect of them, by their names."""
+    """Returns MRC files of another program and the tests' expectations of them: their bytes by name."""
     with tempfile.TemporaryDirectory() as folder:
         subprocess.run([sys.executable, SOURCES / "tests" / "formats" / "write_mrc_files.py", folder], check=True)
         return {path.name: path.read_bytes() for path in pathlib.Path(folder).iterdir()}
 
 
 def test_kit_files(build, registry_scripts):
-    """The bytes of each file by its path in the kit, without the release's own programs."""
+    """Returns the bytes of each file by its path in the kit, without the programs of the release."""
     programs = [build / name for name in (build / "tests" / "kit_programs.txt").read_text().split()]
     data = [SOURCES / "docs" / "formats.md", *registry_scripts.glob("*.rgs")]
     files = {"run-tests.cmd": with_windows_line_ends((SOURCES / "tests" / "kit" / "run-tests.cmd").read_text("utf-8")),

@@ -1,5 +1,5 @@
-// qelthumb, the front end for the file managers of Linux: they run it as qelthumb.thumbnailer says, once for
-// each picture, and read the PNG file that it writes.
+// qelthumb, the front end for the file managers of Linux. They run it for each picture, as
+// qelthumb.thumbnailer tells them to, and read the PNG file that it writes.
 #include <png.h>
 #include <sys/resource.h>
 #include <unistd.h>
@@ -31,20 +31,20 @@ namespace fs = std::filesystem;
 constexpr int kWrongUsage = 2;
 
 constexpr std::int32_t kMaxSize = 4096;
-constexpr rlim_t kMaxMemory = rlim_t{512} << 20;  // four times what a picture of that size takes
+constexpr rlim_t kMaxMemory = rlim_t{512} << 20;  // four times the memory for a picture of kMaxSize
 constexpr rlim_t kMaxSeconds = 30;
 
-/// With a sentence for the user.
+/// A failure whose text is a sentence for the user.
 using Failure = std::runtime_error;
 
 using Bitmap = std::unique_ptr<HBITMAP__, decltype([](HBITMAP bitmap) { DeleteObject(bitmap); })>;
 
-/// Why the last call of the system failed, as the end of a sentence.
+/// Returns the reason why the last system call failed, as the end of a sentence.
 std::string Reason() {
   return ": " + std::generic_category().message(errno) + ".";
 }
 
-/// Lowers a limit of this process, which may have a lower one already.
+/// Lowers a limit of this process to `value`, unless it is lower already.
 void Limit(int resource, rlim_t value) {
   rlimit limit{};
   getrlimit(resource, &limit);
@@ -52,15 +52,15 @@ void Limit(int resource, rlim_t value) {
   setrlimit(resource, &limit);
 }
 
-/// Returns 0 for what is no size.
+/// Returns the size in pixels, or 0 if `text` is not a number from 1 to kMaxSize.
 std::int32_t ParseSize(std::string_view text) {
   std::int32_t size = 0;
   const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), size);
   return error == std::errc() && end == text.data() + text.size() && size <= kMaxSize ? std::max(size, 0) : 0;
 }
 
-/// Returns the edge to request for a thumbnail that is not larger than `size`. It is never larger than the
-/// frame, for which a colour frame would end the process.
+/// Returns the edge in pixels to request for a thumbnail no larger than `size`. It is never larger than the
+/// frame, because such a request would end the process for a colour frame.
 std::int32_t EdgeFor(Size2 frame, std::int32_t size) {
   const std::int64_t longest = std::max({frame.width, frame.height, 1});
   return static_cast<std::int32_t>(longest / ((longest + size - 1) / size));
@@ -68,14 +68,14 @@ std::int32_t EdgeFor(Size2 frame, std::int32_t size) {
 
 Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   std::error_code error;
-  // To open a pipe would be to wait for its writer.
-  if (!fs::is_regular_file(path, error) && !error) throw Failure("This is not a file.");
+  // Opening a pipe would wait for its writer.
+  if (!fs::is_regular_file(path, error) && !error) throw Failure("This is not a regular file.");
   std::ifstream stream(path, std::ios_base::binary);
   if (!stream) throw Failure("The file cannot be opened" + Reason());
-  // The letters of a known extension are the same in every character set.
+  // The known extensions are ASCII, which is the same in every character set.
   const std::wstring extension = GetExtension({path.native().begin(), path.native().end()});
   const auto text = ExplainFault(stream, extension);
-  if (!text) throw Failure("Files with this extension have no thumbnail.");
+  if (!text) throw Failure("Files with this extension are not supported.");
   if (!text->fault.empty()) throw Failure(text->fault);
 
   stream.clear();
@@ -87,8 +87,9 @@ Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   return bitmap;
 }
 
-/// Writes beside `path` and renames, so that nobody sees half a picture. An empty file is written to in its
-/// place: whoever made it may have it open, as tumblerd has, and would go on to read the old one.
+/// Writes a temporary file in the folder of `path` and renames it, so that no program sees an incomplete
+/// picture. An existing empty file is overwritten instead: its creator, such as tumblerd, may have it open
+/// and would otherwise keep reading the old one.
 void WritePng(const Bitmap& bitmap, const std::string& path) {
   BITMAP pixels{};
   GetObjectW(bitmap.get(), sizeof pixels, &pixels);
@@ -132,10 +133,10 @@ int main(int count, char** arguments) {
   const char* const input = arguments[2];
   const char* const output = arguments[3];
   if (std::error_code error; fs::equivalent(input, output, error)) {
-    std::fprintf(stderr, "%s: The thumbnail cannot replace the file.\n", input);
+    std::fprintf(stderr, "%s: The thumbnail must not overwrite this file.\n", input);
     return kWrongUsage;
   }
-  // Some file managers set no limits themselves.
+  // Some file managers do not limit the memory and time of thumbnailers.
   Limit(RLIMIT_AS, kMaxMemory);
   Limit(RLIMIT_CPU, kMaxSeconds);
   try {

@@ -87,7 +87,7 @@ class Usage(Test):
         os.link(file, hard)
         for output in (file, symbolic, hard, f"{self.out.parent}/../out/a.mrc"):
             with self.subTest(output=output):
-                self.assertFails(USAGE, 128, file, output, says="a.mrc: The thumbnail cannot replace the file.\n")
+                self.assertFails(USAGE, 128, file, output, says="a.mrc: The thumbnail must not overwrite this file.\n")
         self.assertEqual(file.read_bytes(), contents)
 
 
@@ -158,11 +158,11 @@ class Fault(Test):
         os.mkfifo(pipe)
         for file, says in (
             (self.write("empty.mrc", b""), "The file is empty."),
-            (self.write("picture.png", b"\x89PNG"), "Files with this extension have no thumbnail."),
-            (self.write("none", b""), "Files with this extension have no thumbnail."),
+            (self.write("picture.png", b"\x89PNG"), "Files with this extension are not supported."),
+            (self.write("none", b""), "Files with this extension are not supported."),
             (self.folder / "missing.mrc", "The file cannot be opened: No such file or directory."),
-            (self.folder, "This is not a file."),
-            (pipe, "This is not a file."),
+            (self.folder, "This is not a regular file."),
+            (pipe, "This is not a regular file."),
         ):
             with self.subTest(file=file):
                 self.assertFails(FAILED, 128, file, self.out, says=says)
