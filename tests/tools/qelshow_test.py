@@ -545,6 +545,14 @@ class Json(Test):
         file, = self.info(self.write("UPPER.MRC", mrc()))
         self.assertEqual((file["bytes"], file["kind"]), (1024 + 12, "mrc"))
 
+    def test_has_the_time_at_which_the_file_was_last_written(self):
+        path = self.write("a.mrc", mrc())
+        os.utime(path, (0, 1614834367))
+        file, = self.info(path)
+        self.assertEqual(file["modified"], "2021-03-04T05:06:07Z")
+        file, = self.info(self.folder / "gone.mrc")
+        self.assertIsNone(file["modified"])
+
     def test_has_the_size_of_a_file_beyond_4_GiB(self):
         path = self.write("large.mrc", mrc())
         os.truncate(path, (5 << 32) + 7)
@@ -626,13 +634,16 @@ class Answers(Test):
 
 
 class Page(Test):
-    def files_of(self, page):
+    def document_of(self, page):
         """The facts in a page."""
         text = page.read_text("utf-8")
         data = re.search(r'<script id="files" type="application/json">(.*?)</script>', text, re.DOTALL)
         document = json.loads(data[1])
         self.assertEqual(document["schema"], 2)
-        return document["files"]
+        return document
+
+    def files_of(self, page):
+        return self.document_of(page)["files"]
 
     def test_has_every_file_of_a_folder_with_its_picture(self):
         names = ["a & b's (ü é 樹) #100%.mrc", "big.MRC", "deep/below/three.ali", "broken.ser", "small.raw"]
@@ -683,7 +694,31 @@ class Page(Test):
         out = self.folder / "page"
         run("page", self.folder / "2", self.folder / "1", "--out", out)
         self.assertEqual([file["name"] for file in self.files_of(out / "index.html")],
-                         ["d 9.mrc", "d 10.mrc", "a.mrc", "b.mrc"])
+                         [r"2\d 9.mrc", r"2\d 10.mrc", r"1\a.mrc", r"1\b.mrc"])
+
+    def test_names_the_files_relative_to_the_folder_that_holds_them_all(self):
+        for name in ("in/one/a.mrc", "in/ONE more/a.mrc"):
+            self.write(name, mrc())
+        out = self.folder / "page"
+        one, more = (["in/one"], r"in\one", ["a.mrc"]), (["in/ONE more"], r"in\ONE more", ["a.mrc"])
+        for paths, folder, names in (
+            one, more,
+            (["in/ONE/../one/"], *one[1:]),
+            (["in"], "in", [r"one\a.mrc", r"ONE more\a.mrc"]),
+            (["in/one", "in/ONE more/a.mrc"], "in", [r"one\a.mrc", r"ONE more\a.mrc"]),
+            (["IN/one/a.mrc", "in/ONE more"], "in", [r"one\a.mrc", r"ONE more\a.mrc"]),
+            (["in", r"C:\gone.mrc"], None, [rf"{self.windows_path('in/one')}\a.mrc",
+                                            rf"{self.windows_path('in/ONE more')}\a.mrc", r"C:\gone.mrc"]),
+        ):
+            with self.subTest(paths=paths):
+                self.assertEqual(run("page", *paths, "--out", out, folder=self.folder).returncode, DONE)
+                document = self.document_of(out / "index.html")
+                self.assertEqual(document["folder"].lower(), self.windows_path(folder).lower() if folder else "")
+                self.assertEqual(sorted(file["name"].lower() for file in document["files"]),
+                                 sorted(name.lower() for name in names))
+
+    def windows_path(self, name):
+        return f"Z:{self.folder / pathlib.PureWindowsPath(name).as_posix()}".replace("/", "\\")
 
     def test_has_the_files_whose_names_windows_cannot_represent(self):
         for name in ("in/a.mrc", "in/b?.mrc"):

@@ -91,10 +91,10 @@ int RunThumbnail(const CommandLine& line) {
 }
 
 int RunPage(const CommandLine& line) {
-  const std::vector<ListedFile> files = ListFiles(line.files);
+  const auto [folder, files] = ListFiles(line.files);
   CheckPageOutput(line.out, files.size());
   Worker worker = StartWorker(line);
-  PageWriter page(line.out);
+  PageWriter page(line.out, folder);
   constexpr std::size_t kMaxNameWidth = 40;
   std::size_t nameWidth = 4;
   for (const ListedFile& file : files) nameWidth = std::max(nameWidth, file.name.size());

@@ -93,6 +93,7 @@ struct FileFacts {
   std::wstring name;
   std::wstring kind;  // the extension in small letters
   std::uint64_t bytes = 0;
+  OptionalText modified;  // when it was last written, in UTC: 2026-11-21T15:22:03Z
   Verdict verdict = Verdict::kGood;
   OptionalText problem;  // one sentence for everything but a good file
   OptionalText advice;   // what to do about the problem, in one sentence

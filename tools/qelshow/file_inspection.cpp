@@ -3,6 +3,8 @@
 #include <windows.h>
 
 #include <algorithm>
+#include <cwchar>
+#include <iterator>
 
 #include "file_type_factory.h"
 #include "text_tools.h"
@@ -10,10 +12,17 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-std::uint64_t FileBytes(const std::wstring& path) {
+/// Fills the size and the date of the file, if it can be found.
+void FillSizeAndDate(const std::wstring& path, FileFacts& facts) {
   WIN32_FILE_ATTRIBUTE_DATA data{};
-  if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &data)) return 0;
-  return (std::uint64_t{data.nFileSizeHigh} << 32) | data.nFileSizeLow;
+  SYSTEMTIME time{};
+  if (!GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &data)) return;
+  facts.bytes = (std::uint64_t{data.nFileSizeHigh} << 32) | data.nFileSizeLow;
+  if (!FileTimeToSystemTime(&data.ftLastWriteTime, &time)) return;
+  wchar_t text[32];
+  const int length = std::swprintf(text, std::size(text), L"%04d-%02d-%02dT%02d:%02d:%02dZ", time.wYear,
+                                   time.wMonth, time.wDay, time.wHour, time.wMinute, time.wSecond);
+  facts.modified = std::wstring(text, text + length);
 }
 
 std::wstring Square(std::int32_t size) {
@@ -81,7 +90,7 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   facts.name = name;
   facts.kind = Lowered(GetExtension(path));
   facts.thumbnail.request = size;
-  facts.bytes = FileBytes(absolute);
+  FillSizeAndDate(absolute, facts);
 
   Diagnosis diagnosis;
   if (const auto end = worker.Ask({Subject::kDiagnosis, absolute}, diagnosis)) {

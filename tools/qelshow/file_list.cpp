@@ -6,7 +6,9 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <optional>
 #include <system_error>
+#include <utility>
 
 #include "failure.h"
 #include "file_facts.h"
@@ -31,7 +33,7 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
     // What cannot be looked at, as its name cannot be represented, is reported.
     std::error_code unknown;
     if (!entry->is_regular_file(unknown) && !unknown) continue;
-    files.push_back({entry->path().wstring(), entry->path().lexically_relative(folder).wstring()});
+    files.push_back({entry->path().wstring(), {}});
   }
   if (error) {
     throw Failure(L"The folder \"" + folder.wstring() + L"\" cannot be listed: " + SystemErrorText(error) +
@@ -39,9 +41,33 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   }
   std::sort(files.begin() + static_cast<std::ptrdiff_t>(first), files.end(),
             [](const ListedFile& a, const ListedFile& b) {
-              const int order = StrCmpLogicalW(a.name.c_str(), b.name.c_str());
-              return order != 0 ? order < 0 : a.name < b.name;
+              const int order = StrCmpLogicalW(a.path.c_str(), b.path.c_str());
+              return order != 0 ? order < 0 : a.path < b.path;
             });
+}
+
+/// Returns what both folders begin with, up to a backslash. Letters in small and capitals are the same.
+std::wstring SharedFolder(const std::wstring& a, const std::wstring& b) {
+  std::size_t length = 0;
+  for (std::size_t i = 0; i < std::min(a.size(), b.size()); ++i) {
+    if (CompareStringOrdinal(&a[i], 1, &b[i], 1, TRUE) != CSTR_EQUAL) break;
+    if (a[i] == L'\\') length = i + 1;
+  }
+  return a.substr(0, length);
+}
+
+/// Returns the full path of the folder that holds all of these files and folders, with a backslash at its
+/// end.
+std::wstring FolderOfAll(const std::vector<std::wstring>& paths) {
+  std::optional<std::wstring> shared;
+  for (const std::wstring& path : paths) {
+    std::error_code ignored;
+    std::wstring folder = AbsolutePath(path);
+    if (!fs::is_directory(path, ignored)) folder.resize(folder.rfind(L'\\') + 1);
+    if (!folder.ends_with(L'\\')) folder += L'\\';
+    shared = shared ? SharedFolder(*shared, folder) : folder;
+  }
+  return shared.value_or(L"");
 }
 
 /// Of these paths none is, or holds, a file that can be shown.
@@ -85,14 +111,14 @@ bool IsUnmatchedPattern(const std::wstring& path) {
   return false;
 }
 
-std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {
+FileList ListFiles(const std::vector<std::wstring>& paths) {
   std::vector<ListedFile> files;
   for (const std::wstring& path : paths) {
     std::error_code error;
     if (fs::is_directory(path, error)) {
       AddFolder(path, files);
     } else {
-      files.push_back({path, fs::path(path).filename().wstring()});
+      files.push_back({path, {}});
     }
   }
   const auto canBeShown = [](const ListedFile& file) {
@@ -100,7 +126,10 @@ std::vector<ListedFile> ListFiles(const std::vector<std::wstring>& paths) {
     return IsSupported(file.path) && fs::exists(file.path, ignored);
   };
   if (std::ranges::none_of(files, canBeShown)) NothingToShow(paths);
-  return files;
+  std::wstring folder = FolderOfAll(paths);
+  for (ListedFile& file : files) file.name = AbsolutePath(file.path).substr(folder.size());
+  if (folder.size() > 3) folder.pop_back();  // not of C:\, which names another folder without
+  return {std::move(folder), std::move(files)};
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -72,9 +72,9 @@ NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, st
                                    value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Property, name, set, id, type, value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, picture, problem)
-NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, verdict, problem, advice, remark,
-                                   shell, width, height, frames, bitDepth, type, thumbnail, tip, columns,
-                                   propertySets, propertyStore)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, modified, verdict, problem, advice,
+                                   remark, shell, width, height, frames, bitDepth, type, thumbnail, tip,
+                                   columns, propertySets, propertyStore)
 
 inline void to_json(Json& json, const ThumbnailAnswer& answer) {
   json = {{"thumbnail", answer.thumbnail}, {"png", Json::binary(answer.png)}};

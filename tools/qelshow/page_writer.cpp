@@ -64,7 +64,7 @@ std::wstring PicturePath(const std::wstring& folder, std::size_t number) {
   return folder + L"\\" + kPicturesFolder + L"\\" + PictureName(number);
 }
 
-PageWriter::PageWriter(const std::wstring& folder)
+PageWriter::PageWriter(const std::wstring& folder, const std::wstring& shownFolder)
     : folder_(fs::path(folder).make_preferred().wstring()), unfinished_(UnusedFolder(folder_)) {
   MakeFolder(folder_ + L"\\" + kPicturesFolder);
   MakeFolder(unfinished_);
@@ -74,7 +74,8 @@ PageWriter::PageWriter(const std::wstring& folder)
   templateEnd_ = page.substr(place + kPlaceOfFiles.size());
   Write(page.substr(0, place));
   const std::vector<std::wstring> kinds(kExtensions.begin(), kExtensions.end());
-  Write("{\"schema\":" + std::to_string(kJsonSchema) + ",\"kinds\":" + Json(kinds).dump() + ",\"files\":[");
+  Write("{\"schema\":" + std::to_string(kJsonSchema) + ",\"folder\":" + InScript(Json(shownFolder).dump()) +
+        ",\"kinds\":" + Json(kinds).dump() + ",\"files\":[");
 }
 
 PageWriter::~PageWriter() {

@@ -28,8 +28,9 @@ inline constexpr std::size_t kMarkedPageBytes = 1024;
 
 class PageWriter {
  public:
-  /// Makes the folder if it is missing. Throws Failure for whatever cannot be written, here and below.
-  explicit PageWriter(const std::wstring& folder);
+  /// Makes the folder if it is missing. `shownFolder` is what the page is about. Throws Failure for whatever
+  /// cannot be written, here and below.
+  PageWriter(const std::wstring& folder, const std::wstring& shownFolder);
   ~PageWriter();
   PageWriter(const PageWriter&) = delete;
   PageWriter& operator=(const PageWriter&) = delete;
