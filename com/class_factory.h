@@ -71,7 +71,7 @@ class CComObjectCached final : public Class {
 /// reference.
 using ClassObjectMaker = HRESULT (*)(InstanceMaker makeInstance, REFIID iid, void** classObject);
 
-/// Makes a CComObjectCached<CComClassFactory>.
+/// Makes a CComObjectCached<CComClassFactory> and queries it for `iid`. Returns the failure of either step.
 HRESULT MakeClassFactory(InstanceMaker makeInstance, REFIID iid, void** classObject);
 
 }  // namespace Qel::Com

@@ -63,7 +63,8 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
  protected:
   int_type overflow(int_type c = Traits::eof()) override {
     if (!Traits::eq_int_type(c, Traits::eof())) {
-      // The last character is free, unless an earlier overflow stored its character and could not write.
+      // The last character of the array is free, unless an earlier overflow stored a character and could not
+      // write it.
       if (!HasRoom() && !(Flush() && HasRoom())) return Traits::eof();
       *this->pptr() = Traits::to_char_type(c);
       MovePutPosition(this->pptr() + 1);

@@ -208,7 +208,7 @@ class OrderedBlockSums {
   OrderedBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(factor), sums_(static_cast<std::size_t>(blocks)) {}
 
-  /// Whether rows with this distance between pixels can be added directly.
+  /// Returns whether Add takes rows with this distance in bytes between pixels.
   static bool Takes(std::int64_t pixelStride) {
     return pixelStride == static_cast<std::int64_t>(sizeof(Sample));
   }
