@@ -2,11 +2,42 @@
 # speaks. Progress and errors go to standard error, so that standard output stays what a script delivers.
 # shellcheck shell=bash
 set -euo pipefail
+trap 'exit 130' INT # Ctrl-C ends the script, even if the program that it interrupts ends as if all were well
 
 root=$(CDPATH='' cd -- "$(dirname -- "${BASH_SOURCE[0]}")/../.." && pwd)
 
 # progress TEXT: one line for a stage that takes time.
-progress() { printf '== %s\n' "$*" >&2; }
+progress() {
+  stage=$*
+  printf '== %s\n' "$stage" >&2
+}
+
+# patiently COMMAND...: runs a command that may take minutes. Until it ends, prints a line every `seconds_between_lines`
+# seconds, so that nobody takes the stage for hung.
+seconds_between_lines=20
+patiently() {
+  local ticker status=0
+  exec {ticker}> >(tick)
+  "$@" {ticker}>&- || status=$?
+  exec {ticker}>&-
+  return "$status"
+}
+
+# logged FILE COMMAND...: runs a command and adds what it prints to a file. A redirection of `patiently` itself would take
+# its lines too.
+logged() { "${@:2}" >>"$1" 2>&1; }
+
+# tick: prints the lines of `patiently` until its standard input closes, which also happens when the script dies.
+tick() {
+  local start=$SECONDS status
+  while
+    status=0
+    read -rt "$seconds_between_lines" || status=$?
+    [[ $status -gt 128 ]] # timeout
+  do
+    printf '   %s: %s s so far\n' "$stage" $((SECONDS - start)) >&2
+  done
+}
 
 # fail TEXT: one clear sentence, and the end of the script.
 fail() {

@@ -14,8 +14,8 @@ export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe,winewayl
 # Pipes are closed, as Wine's services inherit them and would keep whoever reads them waiting.
 wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }
 
-# wine_alone "$@": starts the calling script again as the only one that uses the prefix, since the script that
-# ends first ends the server. What a script leaves behind does not keep the lock.
+# wine_alone "$@": starts the calling script again as the only one that changes the prefix, since several register the
+# extension in it. What a script leaves behind does not keep the lock.
 wine_alone() {
   [[ ${QEL_ALONE_IN-} != "$WINEPREFIX" ]] || return 0
   mkdir -p "$root/build"
@@ -31,20 +31,19 @@ wine_make_prefix() {
   progress "Making a Wine prefix"
   mkdir -p "$WINEPREFIX"
   # Rarely the first boot of a new prefix fails; the second one then completes it.
-  wine_boot --init || wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
+  patiently wine_boot --init || patiently wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
   touch "$WINEPREFIX/.complete"
 }
 
-# Boots the prefix and keeps its server until the script ends, so that programs start at once.
+# Boots the prefix and keeps its server until the script ends, so that programs start at once. A server that already
+# runs serves as well. It runs as long as a program does: here one that waits for the end of its standard input, which
+# comes with the end of the script.
 wine_start() {
   "$root/scripts/setup" wine
   wine_make_prefix
-  trap wine_stop EXIT
-  wineserver -p >/dev/null 2>&1 </dev/null || fail "Wine's server cannot be started"
+  coproc wine_client { exec wine cmd >/dev/null 2>&1; }
   wine wineboot >/dev/null 2>&1 </dev/null || fail "Wine cannot boot its prefix in $WINEPREFIX"
 }
-
-wine_stop() { wineserver -k >/dev/null 2>&1 || true; }
 
 # windows_path PATH: the path under which Windows programs find it, whether it exists or not.
 windows_path() {
