@@ -1,8 +1,10 @@
 #include "frame_reader.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <cstdlib>
+#include <cstring>
 #include <memory>
 #include <utility>
 
@@ -15,28 +17,26 @@ namespace {
 // the band is reduced.
 constexpr std::int64_t kBandBytes = 256LL * 1024;
 
-// Strides can make pixels share their bytes, so that a small file claims a picture of any size. Such a
-// picture is refused when it has more pixels than bytes and more than this, which bounds the memory that a
-// file of a few bytes can take to 512 KiB (a double for each pixel).
-constexpr std::int64_t kMaxSharedPixels = 64LL * 1024;
+// Strides can make pixels share their bytes, so that a small file claims a picture of any size. A picture may
+// have this many more pixels than bytes, which bounds the time that a file of a few bytes can take.
+constexpr std::int64_t kMaxSharedPixels = 1LL << 26;
 
-// Bands are given up for single columns if they would read the block more often than this, and single columns
-// for the whole block at once.
+// Bands are given up for tiles if they would read the block more often than this.
 constexpr std::int64_t kMaxPasses = 8;
 
 // A shorter read takes as long as one of this many bytes.
-constexpr std::int64_t kMinReadBytes = 1024;
+constexpr std::int64_t kMinReadBytes = 4096;
 
-// Strides can interleave rows and columns so that no part of the picture is contiguous in the file. No
-// program writes such a picture, but a few bytes of header can claim one. It is read as a whole, and refused
-// if its block is larger than this.
-constexpr std::int64_t kMaxInterleavedBytes = 16LL * 1024 * 1024;
+// Strides can scatter a picture so widely that each read brings only a few of its pixels. No program writes
+// such a picture, but a few bytes of header can claim one. It is refused if it takes more bytes of reads than
+// this, which bounds its time to a few seconds.
+constexpr std::int64_t kMaxTileReadBytes = 1LL << 34;
 
 /// Whether the layout has pixels, all inside its block, and not too many for its bytes.
 bool IsReadable(const FrameLayout& layout) {
   if (layout.size.width < 1 || layout.size.height < 1) return false;
   const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
-  if (pixels > std::max(layout.blockBytes, kMaxSharedPixels)) return false;
+  if (pixels - layout.blockBytes > kMaxSharedPixels) return false;
   const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
   const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
   const std::int64_t first =
@@ -74,40 +74,29 @@ class BandReader {
         pixelBytes_(layout.type.bytes()),
         pixelStep_(std::abs(layout.pixelStride)),
         rowStep_(std::abs(layout.rowStride)) {
-    Allocate(std::min(kBandBytes, layout.blockBytes));
+    bufferBytes_ = std::min(kBandBytes, layout.blockBytes);
+    buffer_ = std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bufferBytes_));
   }
 
   bool ReadFrame() {
     const std::int32_t rows = RowsThatFit(width_);
     const std::int64_t bands = Pieces(height_, std::max(rows, 1));
-    if (IsEconomical(bands, Span(width_, std::max(rows, 1)))) return ReadBands(rows);
-
-    const ColumnPieces pieces = SizeOfColumnPieces();
-    const std::int64_t columns = width_ * Pieces(height_, pieces.rows);
-    if (IsEconomical(columns, std::max(Span(1, pieces.rows), kMinReadBytes))) return ReadBlockColumns(pieces);
-
-    if (layout_.blockBytes > kMaxInterleavedBytes) return false;
-    Allocate(layout_.blockBytes);
-    return ReadBands(height_);
+    const bool isEconomical = bands * Span(width_, std::max(rows, 1)) / kMaxPasses <= layout_.blockBytes;
+    return isEconomical ? ReadBands(rows) : ReadTiles();
   }
 
  private:
-  /// Parts of columns that are read one by one and passed on side by side.
-  struct ColumnPieces {
+  /// A rectangle of the frame's pixels.
+  struct Rectangle {
+    std::int32_t x;
+    std::int32_t y;
     std::int32_t columns;
     std::int32_t rows;
+
+    std::int64_t Pixels() const { return std::int64_t{columns} * rows; }
   };
 
-  void Allocate(std::int64_t bytes) {
-    bufferBytes_ = bytes;
-    buffer_ = std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(bytes));
-  }
-
   static std::int64_t Pieces(std::int64_t count, std::int64_t max) { return (count + max - 1) / max; }
-
-  bool IsEconomical(std::int64_t reads, std::int64_t bytesOfEach) const {
-    return reads * bytesOfEach / kMaxPasses <= layout_.blockBytes;
-  }
 
   /// Bytes from the first to the last byte of a rectangle of pixels.
   std::int64_t Span(std::int64_t columns, std::int64_t rows) const {
@@ -134,7 +123,7 @@ class BandReader {
       const std::int32_t end = std::min(bandRows, height_ - top) + top;
       for (std::int32_t y = top; y < end;) {
         const std::int32_t rows = std::min(std::max(rowsThatFit, 1), end - y);
-        if (!(rowsThatFit > 0 ? ReadPiece(0, y, width_, rows) : ReadRowInParts(y))) return false;
+        if (!(rowsThatFit > 0 ? ReadPiece({0, y, width_, rows}) : ReadRowInParts(y))) return false;
         y += rows;
       }
     }
@@ -145,72 +134,138 @@ class BandReader {
   bool ReadRowInParts(std::int32_t y) {
     const std::int32_t columns = StepsThatFit(bufferBytes_ - pixelBytes_, pixelStep_, width_);
     for (std::int32_t x = 0; x < width_; x += columns) {
-      if (!ReadPiece(x, y, std::min(columns, width_ - x), 1)) return false;
+      if (!ReadPiece({x, y, std::min(columns, width_ - x), 1})) return false;
     }
     return true;
   }
 
-  /// Reads a frame whose columns are contiguous in the file: one column of blocks after the other, each pixel
-  /// column by itself.
-  bool ReadBlockColumns(const ColumnPieces& pieces) {
-    const auto [columns, rows] = pieces;
-    for (std::int32_t left = 0; left < width_; left += factor_) {
-      for (std::int32_t y = 0; y < height_; y += rows) {
-        for (std::int32_t x = left; x < left + factor_; x += columns) {
-          if (!ReadColumnsPiece(x, y, std::min(columns, left + factor_ - x), std::min(rows, height_ - y))) {
-            return false;
-          }
-        }
+  /// Reads a frame of which no whole rows lie together, in tiles whose pixels are collected from as many
+  /// reads as it takes. A tile is as wide as whole blocks, and those that lie below each other come one after
+  /// the other, so that every block gets its rows from the top.
+  bool ReadTiles() {
+    const std::int64_t maxPixels = kBandBytes / pixelBytes_;
+    if (factor_ > maxPixels) return false;
+    const Rectangle tile = FirstTile(maxPixels);
+    std::int64_t bytes = 0;
+    SplitIntoReads(tile, [&](const Rectangle& part) {
+      bytes += std::max(Span(part.columns, part.rows), kMinReadBytes);
+      return true;
+    });
+    const std::int64_t tiles = Pieces(width_, tile.columns) * Pieces(height_, tile.rows);
+    if (tiles > kMaxTileReadBytes / bytes) return false;
+
+    tile_ =
+        std::make_unique_for_overwrite<std::byte[]>(static_cast<std::size_t>(tile.Pixels() * pixelBytes_));
+    for (std::int32_t x = 0; x < width_; x += tile.columns) {
+      for (std::int32_t y = 0; y < height_; y += tile.rows) {
+        if (!ReadTile({x, y, std::min(tile.columns, width_ - x), std::min(tile.rows, height_ - y)}))
+          return false;
       }
     }
     return true;
   }
 
-  ColumnPieces SizeOfColumnPieces() const {
-    const auto maxColumns = static_cast<std::int32_t>(bufferBytes_ / pixelBytes_);
-    const std::int32_t columns = std::min(factor_, maxColumns);
-    const std::int32_t maxRows = StepsThatFit(bufferBytes_ / columns - pixelBytes_, rowStep_, height_);
-    // Blocks wider than the buffer are read a row at a time, to keep the order of their sums.
-    return {columns, columns < factor_ ? 1 : maxRows};
+  /// Returns the size of a tile that takes few reads: one that spans about as many bytes from left to right
+  /// as from top to bottom.
+  Rectangle FirstTile(std::int64_t maxPixels) const {
+    const double ratio =
+        static_cast<double>(rowStep_) / static_cast<double>(std::max<std::int64_t>(pixelStep_, 1));
+    const double square =
+        std::min(std::sqrt(static_cast<double>(maxPixels) * ratio), static_cast<double>(maxPixels));
+    const auto minColumns = std::max(static_cast<std::int32_t>(square), factor_) / factor_ * factor_;
+    const auto rows = static_cast<std::int32_t>(std::min<std::int64_t>(maxPixels / minColumns, height_));
+    const auto columns = static_cast<std::int32_t>(std::min<std::int64_t>(maxPixels / rows, width_));
+    return {0, 0, columns / factor_ * factor_, rows};
   }
 
-  /// Reads a rectangle of pixels with all bytes between its first and its last pixel.
-  bool ReadPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
-    const std::int64_t right = (columns - std::int64_t{1}) * layout_.pixelStride;
-    const std::int64_t down = (rows - std::int64_t{1}) * layout_.rowStride;
-    const std::int64_t before = -(std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0));
-    if (!ReadBytes(PixelPosition(x, y) - before, 0, Span(columns, rows))) return false;
-    renderer_.Add({x,
-                   y,
-                   {columns, rows, &buffer_[static_cast<std::size_t>(before)], layout_.pixelStride,
-                    layout_.rowStride}});
-    return true;
-  }
-
-  /// Reads a rectangle of pixels column by column, without the bytes between the columns.
-  bool ReadColumnsPiece(std::int32_t x, std::int32_t y, std::int32_t columns, std::int32_t rows) {
-    const std::int64_t columnBytes = Span(1, rows);
-    const std::int64_t before = layout_.rowStride < 0 ? columnBytes - pixelBytes_ : 0;
-    for (std::int32_t column = 0; column < columns; ++column) {
-      if (!ReadBytes(PixelPosition(x + column, y) - before, column * columnBytes, columnBytes)) return false;
+  /// Calls `read` with rectangles that together are `whole`, each small enough for the buffer and dense
+  /// enough to be one read, until it returns false. Returns whether all calls returned true.
+  template <class Read>
+  bool SplitIntoReads(const Rectangle& whole, const Read& read) const {
+    const std::int64_t span = Span(whole.columns, whole.rows);
+    if (span <= std::min(bufferBytes_, whole.Pixels() * kMinReadBytes)) return read(whole);
+    Rectangle first = whole;
+    Rectangle second = whole;
+    if ((whole.columns - 1) * pixelStep_ >= (whole.rows - 1) * rowStep_) {
+      first.columns /= 2;
+      second.x += first.columns;
+      second.columns -= first.columns;
+    } else {
+      first.rows /= 2;
+      second.y += first.rows;
+      second.rows -= first.rows;
     }
+    return SplitIntoReads(first, read) && SplitIntoReads(second, read);
+  }
+
+  bool ReadTile(const Rectangle& tile) {
+    const auto read = [&](const Rectangle& part) {
+      const std::byte* const first = ReadSpan(part);
+      if (first == nullptr) return false;
+      const std::int64_t place = std::int64_t{part.y - tile.y} * tile.columns + part.x - tile.x;
+      std::byte* target = &tile_[static_cast<std::size_t>(place * pixelBytes_)];
+      for (std::int32_t row = 0; row < part.rows; ++row, target += tile.columns * pixelBytes_) {
+        CopyPixels(first + row * layout_.rowStride, part.columns, target);
+      }
+      return true;
+    };
+    if (!SplitIntoReads(tile, read)) return false;
     renderer_.Add(
-        {x, y, {columns, rows, &buffer_[static_cast<std::size_t>(before)], columnBytes, layout_.rowStride}});
+        {tile.x, tile.y, {tile.columns, tile.rows, tile_.get(), pixelBytes_, tile.columns * pixelBytes_}});
     return true;
+  }
+
+  /// Copies pixels of a row to where they have no gaps.
+  void CopyPixels(const std::byte* source, std::int32_t count, std::byte* target) const {
+    switch (pixelBytes_) {
+      case 1: return CopyPixelsOf<1>(source, count, target);
+      case 2: return CopyPixelsOf<2>(source, count, target);
+      case 3: return CopyPixelsOf<3>(source, count, target);
+      case 4: return CopyPixelsOf<4>(source, count, target);
+      case 8: return CopyPixelsOf<8>(source, count, target);
+      case 16: return CopyPixelsOf<16>(source, count, target);
+    }
+  }
+
+  template <std::int32_t kBytes>
+  void CopyPixelsOf(const std::byte* source, std::int32_t count, std::byte* target) const {
+    for (std::int32_t i = 0; i < count; ++i) {
+      std::memcpy(target + i * kBytes, source + i * layout_.pixelStride, kBytes);
+    }
+  }
+
+  /// Reads a rectangle of pixels at once and passes it on.
+  bool ReadPiece(const Rectangle& piece) {
+    const std::byte* const first = ReadSpan(piece);
+    if (first == nullptr) return false;
+    renderer_.Add(
+        {piece.x, piece.y, {piece.columns, piece.rows, first, layout_.pixelStride, layout_.rowStride}});
+    return true;
+  }
+
+  /// Reads all bytes between the first and the last pixel of a rectangle into the buffer. Returns the top
+  /// left pixel, or null if the read fails.
+  const std::byte* ReadSpan(const Rectangle& pixels) {
+    const std::int64_t right = (pixels.columns - std::int64_t{1}) * layout_.pixelStride;
+    const std::int64_t down = (pixels.rows - std::int64_t{1}) * layout_.rowStride;
+    const std::int64_t before = -(std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0));
+    if (!ReadBytes(PixelPosition(pixels.x, pixels.y) - before, Span(pixels.columns, pixels.rows)))
+      return nullptr;
+    return &buffer_[static_cast<std::size_t>(before)];
   }
 
   std::int64_t PixelPosition(std::int32_t x, std::int32_t y) const {
     return layout_.blockPosition + layout_.firstPixel + x * layout_.pixelStride + y * layout_.rowStride;
   }
 
-  /// Reads `count` bytes from file offset `position` to byte `offset` of the buffer.
-  bool ReadBytes(std::int64_t position, std::int64_t offset, std::int64_t count) {
+  /// Reads `count` bytes from file offset `position` into the buffer.
+  bool ReadBytes(std::int64_t position, std::int64_t count) {
     if (position != position_) stream_.seekg(position);
-    std::byte* const bytes = &buffer_[static_cast<std::size_t>(offset)];
-    stream_.read(reinterpret_cast<char*>(bytes), count);
+    stream_.read(reinterpret_cast<char*>(buffer_.get()), count);
     position_ = position + count;
     if (layout_.swapBytes) {
-      for (std::int64_t i = 0; i + 1 < count; i += 2) std::swap(bytes[i], bytes[i + 1]);
+      for (std::size_t i = 0; i + 1 < static_cast<std::size_t>(count); i += 2)
+        std::swap(buffer_[i], buffer_[i + 1]);
     }
     return stream_.good();
   }
@@ -226,7 +281,8 @@ class BandReader {
   std::int64_t rowStep_;
   std::int64_t bufferBytes_ = 0;
   std::unique_ptr<std::byte[]> buffer_;
-  std::int64_t position_ = -1;  // of the stream; -1 if unknown
+  std::unique_ptr<std::byte[]> tile_;  // its pixels without gaps
+  std::int64_t position_ = -1;         // of the stream; -1 if unknown
 };
 
 }  // namespace

@@ -102,7 +102,7 @@ struct NaivePictureOf {
 };
 
 /// A layout whose pixels need not touch: columns right of each other or, if `byColumn`, below each other.
-/// Those of a small frame may share their bytes.
+/// Some share their bytes.
 FrameLayout RandomLayout(Random& random, const PixelType& type, Size2 size, bool byColumn) {
   FrameLayout layout;
   layout.type = type;
@@ -112,9 +112,8 @@ FrameLayout RandomLayout(Random& random, const PixelType& type, Size2 size, bool
   std::int64_t& outer = byColumn ? layout.pixelStride : layout.rowStride;
   inner = pixelBytes + (random.OneIn(3) ? random.Between(0, 9) : 0);
   outer = inner * (byColumn ? size.height : size.width) + (random.OneIn(3) ? random.Between(0, 99) : 0);
-  const bool mayShare = size.width * size.height <= 0x10000;
-  if (mayShare && random.OneIn(8)) inner = random.Between(0, static_cast<int>(pixelBytes));
-  if (mayShare && random.OneIn(8)) outer = random.Between(0, 9);
+  if (random.OneIn(8)) inner = random.Between(0, static_cast<int>(pixelBytes));
+  if (random.OneIn(8)) outer = random.Between(0, 9);
   if (random.OneIn(3)) inner = -inner;
   if (random.OneIn(2)) outer = -outer;
   const std::int64_t right = (size.width - 1) * layout.pixelStride;
@@ -207,34 +206,101 @@ FrameLayout InterleavedLayout(const PixelType& type, std::int32_t edge, std::int
           .rowStride = stride};
 }
 
-TEST(FrameReader, ReadsInterleavedRowsAndColumnsAtOnce) {
+TEST(FrameReader, InterleavedRowsAndColumnsAreReadInTiles) {
   Random random(4);
-  for (const PixelType& type : {kUInt8, kFloat32, kRgb24}) {
-    FrameLayout layout = InterleavedLayout(type, 300, 2000);
-    CompareWithTheNaivePicture(random, layout, 30, 30);
-    layout.firstPixel = (300 - 1) * layout.rowStride;
+  for (const PixelType& type : kTypes) {
+    FrameLayout layout = InterleavedLayout(type, 100, random.Between(2000, 4000));
+    CompareWithTheNaivePicture(random, layout, 100, 100);
+    layout.firstPixel = (100 - 1) * layout.rowStride;
     layout.rowStride = -layout.rowStride;
     CompareWithTheNaivePicture(random, layout, 30, 30);
+    layout.firstPixel *= 2;
+    layout.pixelStride = -layout.pixelStride;
+    CompareWithTheNaivePicture(random, layout, 2, 2);
     if (HasFatalFailure()) return;
-
-    const std::string file(static_cast<std::size_t>(layout.blockPosition + layout.blockBytes), '\1');
-    MemoryBuffer buffer(file);
-    std::istream stream(&buffer);
-    EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {30, 30})).width, 30);
-    EXPECT_EQ(buffer.bytesRead, layout.blockBytes);
-    EXPECT_EQ(buffer.reads, 1);
   }
 }
 
-TEST(FrameReader, RefusesInterleavedRowsAndColumnsOfALargeBlock) {
-  const FrameLayout layout = InterleavedLayout(kUInt8, 3000, 3000);
-  ASSERT_GT(layout.blockBytes, 16 * 1024 * 1024);
-  const std::string file(static_cast<std::size_t>(layout.blockPosition + layout.blockBytes), '\1');
-  MemoryBuffer buffer(file);
+/// Returns a layout of pixels and rows that are this many bytes apart in one or the other direction of the
+/// file.
+FrameLayout LayoutOfSteps(const PixelType& type, Size2 size, std::int64_t pixelStride,
+                          std::int64_t rowStride) {
+  const std::int64_t right = (size.width - 1) * pixelStride;
+  const std::int64_t down = (size.height - 1) * rowStride;
+  return {.type = type,
+          .size = size,
+          .blockPosition = 10,
+          .blockBytes = std::abs(right) + std::abs(down) + type.bytes(),
+          .firstPixel = -std::min<std::int64_t>(right, 0) - std::min<std::int64_t>(down, 0),
+          .pixelStride = pixelStride,
+          .rowStride = rowStride};
+}
+
+TEST(FrameReader, TilesOfEveryShapeGiveTheSamePicture) {
+  struct Shape {
+    Size2 size;
+    std::int64_t pixelStride, rowStride;
+    SIZE request;
+  };
+  constexpr Shape kShapes[] = {
+      {{40, 30}, 20'000, 20'000, {40, 30}},  // every pixel is a read of its own
+      {{40, 30}, 20'000, -20'000, {8, 8}},   //
+      {{30, 40}, -10'000, 30'000, {1, 1}},   //
+      {{30'000, 2}, 30, 20, {15'000, 1}},    // a frame of a few rows
+      {{2, 30'000}, 20, 30, {1, 15'000}},    // and of a few columns
+      {{400'000, 3}, 1, 0, {133'000, 1}},    // the same row several times, longer than the buffer
+      {{3, 400'000}, 0, 1, {1, 133'000}},    // and the same column
+      {{3000, 100}, 100, 1, {96, 96}},       // rows that overlap and lie across the file
+      {{300, 1000}, 3000, 3, {33, 33}},      // columns that lie together
+      {{300, 1000}, 3000, -3, {300, 1000}},  //
+  };
+  Random random(5);
+  for (const Shape& shape : kShapes) {
+    for (const PixelType& type : {kUInt8, kFloat32, kComplexFloat32}) {
+      const FrameLayout layout = LayoutOfSteps(type, shape.size, shape.pixelStride, shape.rowStride);
+      CompareWithTheNaivePicture(random, layout, shape.request.cx, shape.request.cy);
+      if (HasFatalFailure()) return;
+    }
+  }
+}
+
+/// What a thumbnail of a file of the same bytes takes.
+struct Cost {
+  bool shown;
+  std::int64_t reads;
+  std::int64_t bytesRead;
+  std::int64_t largestRead;
+};
+
+Cost CostOf(const FrameLayout& layout, const SIZE& request) {
+  MemoryBuffer buffer("");
+  buffer.zerosBehind = layout.blockPosition + layout.blockBytes;
   std::istream stream(&buffer);
-  EXPECT_EQ(ReadThumbnail(stream, layout, {256, 256}), nullptr);
-  EXPECT_EQ(buffer.bytesRead, 0);
+  const bool shown = TakeBitmap(ReadThumbnail(stream, layout, request)).width > 0;
   EXPECT_TRUE(stream.good());
+  return {shown, buffer.reads, buffer.bytesRead, buffer.largestRead};
+}
+
+TEST(FrameReader, ALargeInterleavedBlockIsReadSeveralTimesInBands) {
+  const FrameLayout layout = InterleavedLayout(kUInt8, 1500, 6000);
+  ASSERT_GT(layout.blockBytes, 16 * 1024 * 1024);
+  const Cost cost = CostOf(layout, {100, 100});
+  EXPECT_TRUE(cost.shown);
+  EXPECT_LE(cost.largestRead, 256 * 1024);
+  // A read has at least a square of 16 by 16 pixels.
+  EXPECT_LE(cost.reads, 100 * 100);
+}
+
+TEST(FrameReader, RefusesAScatteredFrameBeforeAnyRead) {
+  // 64 pixels to a read.
+  const FrameLayout few = InterleavedLayout(kUInt8, 40'000, 20'001);
+  // Blocks of 16,400 pixels a row, which are larger than the buffer.
+  const FrameLayout wide =
+      LayoutOfSteps(PixelTypeOf(DataType::kComplexFloat64), {16'400, 16'400}, 16, 12'600);
+  for (const Cost& cost : {CostOf(few, {256, 256}), CostOf(wide, {1, 1})}) {
+    EXPECT_FALSE(cost.shown);
+    EXPECT_EQ(cost.reads, 0);
+  }
 }
 
 TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
@@ -319,12 +385,21 @@ TEST(FrameReader, ANegativePositionFailsTheStream) {
   EXPECT_TRUE(stream.fail());
 }
 
-TEST(FrameReader, PixelsThatShareTheirBytesAreReadUpToALimit) {
-  std::istringstream stream(std::string(16, '\3'));
-  FrameLayout layout{.type = kUInt16, .size = {256, 256}, .blockPosition = 0, .blockBytes = 2};
-  EXPECT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {128, 128})).width, 128);
-  layout.size.width = 257;
-  EXPECT_EQ(ReadThumbnail(stream, layout, {128, 128}), nullptr);
+TEST(FrameReader, PixelsThatShareTheirBytesAreShown) {
+  Random random(6);
+  CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {512, 512}, 1, 511), 256, 256);
+  CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {1024, 1024}, 1, 0), 96, 96);
+  CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt16, {2048, 1500}, 0, 0), 256, 256);
+  CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {4000, 3000}, 1, 1), 256, 256);
+}
+
+TEST(FrameReader, APictureMayHaveSixtyFourMebipixelsMoreThanBytes) {
+  FrameLayout layout{.type = kUInt8, .size = {8192, 8193}, .blockPosition = 0, .blockBytes = 8192};
+  EXPECT_TRUE(CostOf(layout, {96, 96}).shown);
+  --layout.blockBytes;
+  const Cost cost = CostOf(layout, {96, 96});
+  EXPECT_FALSE(cost.shown);
+  EXPECT_EQ(cost.reads, 0);
 }
 
 TEST(FrameReader, AFailedStreamGivesNoBitmap) {

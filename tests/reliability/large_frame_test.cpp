@@ -47,21 +47,39 @@ struct Case {
 
 class ThumbnailMemory : public testing::TestWithParam<Case> {};
 
-TEST_P(ThumbnailMemory, IsTheReducedImageAndTheLargerOfBandAndBitmap) {
-  constexpr std::int64_t kBandBytes = 256 * 1024;
-  constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and of complex pixels in batches
-  constexpr std::int32_t kSide = 600;
-  const FrameLayout layout = PackedLayout(GetParam().type, {2 * kSide, 2 * kSide}, 0);
-  const std::string file(static_cast<std::size_t>(layout.blockBytes), '\1');
-  Testing::MemoryBuffer buffer(file);
+constexpr std::int64_t kBandBytes = 256 * 1024;
+constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and of complex pixels in batches
+
+/// The most memory in use while a frame is reduced to `side` by `side` pixels, without the reduced image.
+std::int64_t PeakBesideTheReducedImage(const FrameLayout& layout, LONG side, std::int64_t averageBytes) {
+  Testing::MemoryBuffer buffer("");
+  buffer.zerosBehind = layout.blockBytes;
   std::istream stream(&buffer);
   const Testing::HeapMeter meter;
-  const HBITMAP bitmap = ReadThumbnail(stream, layout, {kSide, kSide});
+  const HBITMAP bitmap = ReadThumbnail(stream, layout, {side, side});
   const std::int64_t peak = meter.Peak();
-  EXPECT_EQ(Testing::TakeBitmap(bitmap).width, kSide);
+  EXPECT_EQ(Testing::TakeBitmap(bitmap).width, side);
+  return peak - side * side * averageBytes;
+}
+
+TEST_P(ThumbnailMemory, IsTheReducedImageAndTheLargerOfBandAndBitmap) {
+  constexpr LONG kSide = 600;
   constexpr std::int64_t kBitmapBytes = std::int64_t{kSide} * kSide;
-  EXPECT_LE(peak,
-            kSide * kSide * GetParam().averageBytes + std::max(kBandBytes, kBitmapBytes) + kSumsAndObjects);
+  const FrameLayout layout = PackedLayout(GetParam().type, {2 * kSide, 2 * kSide}, 0);
+  EXPECT_LE(PeakBesideTheReducedImage(layout, kSide, GetParam().averageBytes),
+            std::max(kBandBytes, kBitmapBytes) + kSumsAndObjects);
+}
+
+TEST_P(ThumbnailMemory, OfInterleavedRowsAndColumnsIsTheReducedImageAndTwoBands) {
+  constexpr LONG kSide = 96;
+  constexpr std::int64_t kStride = 16'000;
+  const FrameLayout layout{.type = GetParam().type,
+                           .size = {2 * kSide, 2 * kSide},
+                           .blockBytes = 2 * (2 * kSide - 1) * kStride + GetParam().type.bytes(),
+                           .pixelStride = kStride,
+                           .rowStride = kStride};
+  EXPECT_LE(PeakBesideTheReducedImage(layout, kSide, GetParam().averageBytes),
+            2 * kBandBytes + kSumsAndObjects);
 }
 
 INSTANTIATE_TEST_SUITE_P(

@@ -62,6 +62,11 @@ void Take(HBITMAP bitmap, Size2 frame, bool colour, const SIZE& request, Answers
 
 }  // namespace
 
+bool TakesLong(Size2 frame) {
+  const std::int64_t pixels = std::int64_t{frame.width} * frame.height;
+  return pixels > 1 << 16 && pixels < 1 << 27;
+}
+
 bool IsRequiredFault(Size2 frame, bool colour, const SIZE& request) {
   return request.cx == 0 || request.cy == 0 || Factor(frame, colour, request) == 0;
 }
@@ -77,7 +82,7 @@ Answers AskEverything(std::istream& stream, const std::wstring& extension, std::
   const Size2 frame = reader->GetDimensions();
   const bool colour = reader->GetBitDepth() == 24;
   for (const SIZE& request : requests) {
-    if (IsRequiredFault(frame, colour, request)) continue;
+    if (IsRequiredFault(frame, colour, request) || TakesLong(frame)) continue;
     const HBITMAP bitmap = reader->CreateThumbnail(request);
     if (bitmap != nullptr) Take(bitmap, frame, colour, request, answers);
   }

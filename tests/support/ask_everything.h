@@ -35,9 +35,12 @@ inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
 Answers AskEverything(std::istream& stream, const std::wstring& extension,
                       std::span<const SIZE> requests = kAllRequests);
 
+/// Returns whether a thumbnail of the frame can take seconds although the file is small, because its pixels
+/// share their bytes. AskEverything leaves out such frames, but not those that are refused for their size.
+bool TakesLong(Size2 frame);
+
 /// Returns whether a request for a thumbnail ends the process by design: a request of 0 does, and so does one
-/// that
-/// exceeds a colour frame in both dimensions. AskEverything leaves out such requests.
+/// that exceeds a colour frame in both dimensions. AskEverything leaves out such requests.
 bool IsRequiredFault(Size2 frame, bool colour, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing
