@@ -67,8 +67,7 @@ class CComObjectCached final : public Class {
   }
 };
 
-/// The signature of a function that makes the class object of the objects of `makeInstance`, with one
-/// reference.
+/// The signature of a function that makes the class object for `makeInstance`, with one reference.
 using ClassObjectMaker = HRESULT (*)(InstanceMaker makeInstance, REFIID iid, void** classObject);
 
 /// Makes a CComObjectCached<CComClassFactory> and queries it for `iid`. Returns the failure of either step.

@@ -19,9 +19,9 @@ namespace Qel::Com {
 template <class Interface>
 inline constexpr IID kInterfaceId = __uuidof(Interface);
 
-/// QueryInterface finds IUnknown, which is the first interface, every interface in the list, and no other: a
-/// base of a listed interface, such as IPersist of IPersistFile, must itself be listed. The interfaces are
-/// laid out in the object in the order of the list, before every other member.
+/// QueryInterface finds IUnknown, for which it returns the first interface, and every interface in the list.
+/// It finds no other: a base of a listed interface, such as IPersist of IPersistFile, must itself be listed.
+/// The interfaces are laid out in the object in the order of the list, before every other member.
 template <class Threading, class Primary, class... Others>
 class CComRoot : public Primary, public Others... {
  public:

@@ -1,4 +1,4 @@
-// A lock between the threads of the process that reports when its creation fails.
+// A lock for the threads of the process. Its creation can fail, and reports that.
 #pragma once
 
 #include <windows.h>

@@ -2,7 +2,8 @@
 //
 // A reader is created on an open stream (CreateFileTypeInfo), parses the header in its constructor and is
 // read-only afterwards. The caller owns the stream, which must outlive the reader; the reader never closes
-// it. An unacceptable file leaves the stream failed; bad contents never throw.
+// it. An unacceptable file leaves the stream failed. For some contents the constructor throws instead
+// (emi_parser.h, ser_parser.h).
 #pragma once
 
 #include <windows.h>

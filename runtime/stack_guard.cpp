@@ -25,7 +25,7 @@ std::uintptr_t __stack_chk_guard = 0xBB40E64EDA205900;
 
 namespace {
 
-/// Returns a number of which every bit depends on all bits of both arguments.
+/// Returns a number in which every bit depends on all bits of both arguments.
 std::uint64_t Mix(std::uint64_t a, std::uint64_t b) {
   std::uint64_t mixed = a * 0x9E3779B97F4A7C15 + b;
   mixed = (mixed ^ (mixed >> 30)) * 0xBF58476D1CE4E5B9;

@@ -14,7 +14,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-constexpr int kTextRoom = 256;  // in wide characters, of a date and time or of a size
+constexpr int kTextRoom = 256;  // wide characters for a date and time, or for a size
 
 std::wstring Label(std::uint32_t id) {
   return LoadResourceString(id) + L": ";

@@ -33,7 +33,8 @@ class PropertyValue {
 
 using PropertyMap = std::map<PROPID, PropertyValue>;
 
-/// Returns STG_E_ACCESSDENIED for every change and for queries of names and statistics.
+/// A read-only property set. Every change, and every query of names or statistics, returns
+/// STG_E_ACCESSDENIED.
 class CPropertyStorage : public Com::CComRoot<Com::SingleThreaded, IPropertyStorage> {
  public:
   /// Stores a copy of `value` as the property `id`, which must not exist yet. Returns the result of

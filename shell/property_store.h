@@ -32,7 +32,8 @@ class CShellExtVista : public Com::CComRoot<Com::FreeThreaded, IInitializeWithSt
   /// none, and a caller that requests a value by key gets it.
   HRESULT STDMETHODCALLTYPE GetCount(DWORD* count) override;
 
-  /// Returns the six keys nevertheless; E_UNEXPECTED and the null key after them.
+  /// Returns one of the six keys, although GetCount reports none. For a larger index returns E_UNEXPECTED and
+  /// the null key.
   HRESULT STDMETHODCALLTYPE GetAt(DWORD index, PROPERTYKEY* key) override;
 
   /// Reads the value of `key`. Returns E_UNEXPECTED for a key without a property, and E_FAIL without a valid
