@@ -15,15 +15,6 @@ namespace {
 constexpr std::int32_t kHeaderBytes = 54;
 constexpr std::int32_t kMaxTypeCode = 8;  // the format has no complex types
 
-/// What the header says of the microscope, in the order of the file. All but the voltage are codes.
-struct Instrument {
-  double model;
-  double source;
-  double lens;
-  double dNumber;
-  double kilovolts;
-};
-
 /// A code is stored as a double; half is added, the rest of the fraction cut off. On purpose that is not the
 /// nearest integer below 0: a stored -2.0 is the code -1. What no int can hold is no code, like 0.
 std::int32_t CodeOf(double stored) {
@@ -73,7 +64,7 @@ std::string OneDecimal(double number) {
   return {text.data(), end.ptr};
 }
 
-std::string Describe(const Instrument& instrument) {
+std::string Describe(const EbnInstrument& instrument) {
   std::string text(ModelText(CodeOf(instrument.model)));
   text += SourceText(CodeOf(instrument.source));
   text += LensText(CodeOf(instrument.lens));
@@ -88,7 +79,7 @@ EbnParser::EbnParser(std::istream& stream) : FileParser(stream) {
   const auto width = ReadLittleEndian<std::int32_t>(stream);
   const auto height = ReadLittleEndian<std::int32_t>(stream);
   const auto dataOffset = ReadLittleEndian<std::int32_t>(stream);
-  const Instrument instrument = {
+  const EbnInstrument instrument = {
       .model = ReadLittleEndian<double>(stream),
       .source = ReadLittleEndian<double>(stream),
       .lens = ReadLittleEndian<double>(stream),
@@ -105,6 +96,7 @@ EbnParser::EbnParser(std::istream& stream) : FileParser(stream) {
     return;
   }
   frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, dataOffset);
+  instrument_ = instrument;
   comment_ = Describe(instrument);
 }
 

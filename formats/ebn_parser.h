@@ -8,14 +8,26 @@
 
 namespace Qel::Lumetra::ShellExt {
 
+/// What the header says of the microscope, in the order of the file. All but the voltage are codes.
+struct EbnInstrument {
+  double model = 0;
+  double source = 0;
+  double lens = 0;
+  double dNumber = 0;
+  double kilovolts = 0;
+};
+
 class EbnParser final : public FileParser {
  public:
   explicit EbnParser(std::istream& stream);
+
+  const EbnInstrument& instrument() const { return instrument_; }
 
   /// The microscope in one line, for instance "Halden 20 FEG 200.0 kV".
   const std::string& comment() const { return comment_; }
 
  private:
+  EbnInstrument instrument_;
   std::string comment_;
 };
 

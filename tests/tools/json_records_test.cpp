@@ -3,7 +3,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <string>
+
+#include "value_text.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
@@ -38,6 +41,13 @@ TEST(JsonRecords, WriteAnEmptyTextAsNullWhereItMayBeMissing) {
   EXPECT_EQ(Json(property).at("problem"), "none");
   EXPECT_EQ(Json(property).get<Property>().problem, L"none");
   EXPECT_EQ(Json(Property()).get<Property>().problem, L"");
+}
+
+TEST(JsonRecords, KeepWholeNumbersApartFromOthers) {
+  for (const Value& value : {Value(), Value(std::int64_t{2}), Value(2.0), Value(1.2e-9), Value(L"2")}) {
+    EXPECT_EQ(Json::from_cbor(Json::to_cbor(Json(value))).get<Value>(), value) << Written(ValueText(value));
+  }
+  EXPECT_EQ(Json(Value(1.2e-9)).dump(), "1.2e-09");
 }
 
 TEST(JsonRecords, KeepEveryPathInAQuestion) {

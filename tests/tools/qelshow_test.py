@@ -79,6 +79,10 @@ def raw(width, height, value_class, bits, pixels):
             + pixels)
 
 
+def ebn(*instrument):
+    return struct.pack("<Hiii5d", 1, 2, 2, 54, *instrument) + bytes(4)
+
+
 def png_facts(png):
     """Width, height, bits of a sample and colour type of a PNG file."""
     assert png[:8] == b"\x89PNG\r\n\x1a\n" and png[12:16] == b"IHDR"
@@ -608,6 +612,33 @@ class Answers(Test):
         for part in ("40 x 30", "Frames      7", "16 bit signed", "Thumbnail   40 x 30, 8 bits per pixel",
                      "    Line one\n", "VT_UI4     VT_I4      16", "System.Media.FrameCount"):
             self.assertIn(part, text)
+
+    def test_have_what_the_header_says(self):
+        path = self.write("a.raw", raw(4, 3, 0, 8, bytes(12)))
+        file, = self.info(path)
+        facts = [("Offset of the first pixel", 0, "B"), ("Pixel stride", 1, "B"), ("Row stride", 4, "B")]
+        self.assertEqual([(fact["name"], fact["value"], fact["unit"]) for fact in file["header"]], facts)
+        text = run("info", path).stdout
+        self.assertIn("  Header\n"
+                      "    Offset of the first pixel  0 B\n"
+                      "    Pixel stride               1 B\n"
+                      "    Row stride                 4 B\n"
+                      "  Tip\n", text)
+
+        path = self.write("a.ebn", ebn(2.0, float("nan"), -1.6, 1.2e-9, 300.0))
+        file, = self.info(path)
+        self.assertEqual([(fact["name"], fact["value"], fact["unit"]) for fact in file["header"]],
+                         [("Microscope model code", 2, None), ("Electron source code", "nan", None),
+                          ("Objective lens code", -1.6, None), ("D number", 1.2e-9, None),
+                          ("Accelerating voltage", 300, "kV")])
+        text = run("info", path).stdout
+        for line in ("Microscope model code  2\n", "Electron source code   nan\n", "Objective lens code    -1.6\n",
+                     "D number               1.2e-09\n", "Accelerating voltage   300 kV\n"):
+            self.assertIn(line, text)
+
+        path = self.write("a.mrc", mrc())
+        self.assertEqual(self.info(path)[0]["header"], [])
+        self.assertNotIn("Header", run("info", path).stdout)
 
     def test_a_kind_without_a_property_store_says_so(self):
         files = self.info(*(self.write("a." + kind, b"") for kind in ("ali", "rec", "ser", "emi")))

@@ -2,17 +2,41 @@
 
 #include <windows.h>
 
+#include <cmath>
 #include <fstream>
+#include <string>
+#include <utility>
+#include <variant>
 
 #include "fault_text.h"
 #include "file_list.h"
 #include "file_type_factory.h"
+#include "header_facts.h"
 #include "path_stream.h"
 #include "text_tools.h"
+#include "value_text.h"
 
 namespace Qel::Lumetra::ShellExt::Show {
-
 namespace {
+
+/// A number that JSON does not have is a text.
+Value RecordValue(double number) {
+  if (std::isfinite(number)) return number;
+  return ValueText(number);
+}
+
+Value RecordValue(std::int64_t number) {
+  return number;
+}
+
+Value RecordValue(const std::string& text) {
+  return TextOfFile(text);
+}
+
+HeaderFact RecordOf(const ShellExt::HeaderFact& fact) {
+  return {Wide(fact.name), std::visit([](const auto& value) { return RecordValue(value); }, fact.value),
+          TextOfFile(fact.unit)};
+}
 
 Diagnosis Unreachable(const std::wstring& path, DWORD error) {
   if (IsUnmatchedPattern(path))
@@ -46,8 +70,12 @@ Diagnosis Diagnose(const std::wstring& path) {
     return {Verdict::kUnsupported, L"The extension shows " + SupportedExtensions(L"and") + L" files only.",
             L"If it is one of these, rename it."};
   }
-  if (text->fault.empty()) return {};
-  return {Verdict::kDamaged, Wide(text->fault), Wide(text->advice)};
+  Diagnosis diagnosis;
+  if (!text->fault.empty()) diagnosis = {Verdict::kDamaged, Wide(text->fault), Wide(text->advice)};
+  for (const ShellExt::HeaderFact& fact : HeaderFacts(stream, GetExtension(path))) {
+    diagnosis.header.push_back(RecordOf(fact));
+  }
+  return diagnosis;
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -26,11 +26,22 @@ enum class Verdict : std::int32_t {
   kDamaged = 4,
 };
 
-/// What the project's own readers find wrong with a file.
+/// A number, a text, or nothing.
+using Value = std::variant<std::monostate, std::int64_t, double, std::wstring>;
+
+/// One of the values that a file's header has beyond the picture (header_facts.h).
+struct HeaderFact {
+  std::wstring name;
+  Value value;  // a number is finite
+  OptionalText unit;
+};
+
+/// What the project's own readers find wrong with a file, and in its header.
 struct Diagnosis {
   Verdict verdict = Verdict::kGood;
   OptionalText problem;
   OptionalText advice;
+  std::vector<HeaderFact> header{};
 };
 
 /// An answer that is a list. The `problem` of this and of other answers is a sentence that says why there is
@@ -46,9 +57,6 @@ struct TipAnswer {
   OptionalText text;
   OptionalText problem;
 };
-
-/// A number, a text, or nothing.
-using Value = std::variant<std::monostate, std::int64_t, std::wstring>;
 
 /// A column of the Details view. Types are names such as "VT_I4".
 struct Column {
@@ -107,6 +115,7 @@ struct FileFacts {
   std::int32_t bitDepth = 0;
   OptionalText type;
 
+  std::vector<HeaderFact> header;
   Thumbnail thumbnail;
   std::vector<std::uint8_t> png;  // of the thumbnail; not in the document
   TipAnswer tip;

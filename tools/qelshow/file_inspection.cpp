@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cwchar>
 #include <iterator>
+#include <utility>
 
 #include "file_type_factory.h"
 #include "text_tools.h"
@@ -100,6 +101,7 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   facts.verdict = diagnosis.verdict;
   facts.problem = diagnosis.problem;
   facts.advice = diagnosis.advice;
+  facts.header = std::move(diagnosis.header);
   if (diagnosis.verdict == Verdict::kFailed || diagnosis.verdict == Verdict::kUnsupported) {
     facts.thumbnail.problem = facts.tip.problem = facts.columns.problem = facts.propertySets.problem =
         facts.propertyStore.problem = diagnosis.problem;

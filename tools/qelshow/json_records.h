@@ -26,10 +26,12 @@ template <>
 struct nlohmann::adl_serializer<Qel::Lumetra::ShellExt::Show::Value> {
   static void to_json(nlohmann::json& json, const Qel::Lumetra::ShellExt::Show::Value& value) {
     if (const auto* const number = std::get_if<std::int64_t>(&value)) json = *number;
+    if (const auto* const number = std::get_if<double>(&value)) json = *number;
     if (const auto* const text = std::get_if<std::wstring>(&value)) json = *text;
   }
   static void from_json(const nlohmann::json& json, Qel::Lumetra::ShellExt::Show::Value& value) {
-    if (json.is_number()) value = json.get<std::int64_t>();
+    if (json.is_number_integer()) value = json.get<std::int64_t>();
+    if (json.is_number_float()) value = json.get<double>();
     if (json.is_string()) value = json.get<std::wstring>();
   }
 };
@@ -66,15 +68,16 @@ void from_json(const Json& json, ListAnswer<Item>& answer) {
   json.at("problem").get_to(answer.problem);
 }
 
-NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Diagnosis, verdict, problem, advice)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(HeaderFact, name, value, unit)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Diagnosis, verdict, problem, advice, header)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(TipAnswer, text, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, state, declared, delivered,
                                    value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Property, name, set, id, type, value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, picture, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, modified, verdict, problem, advice,
-                                   remark, shell, width, height, frames, bitDepth, type, thumbnail, tip,
-                                   columns, propertySets, propertyStore)
+                                   remark, shell, width, height, frames, bitDepth, type, header, thumbnail,
+                                   tip, columns, propertySets, propertyStore)
 
 inline void to_json(Json& json, const ThumbnailAnswer& answer) {
   json = {{"thumbnail", answer.thumbnail}, {"png", Json::binary(answer.png)}};

@@ -60,6 +60,16 @@ std::wstring PropertiesText(const ListAnswer<Property>& properties) {
   return Grid(rows);
 }
 
+std::wstring HeaderText(const std::vector<HeaderFact>& header) {
+  if (header.empty()) return {};
+  std::vector<std::vector<std::wstring>> rows;
+  for (const HeaderFact& fact : header) {
+    const std::wstring unit = fact.unit.empty() ? L"" : L" " + fact.unit;
+    rows.push_back({fact.name, OneLine(ValueText(fact.value) + unit)});
+  }
+  return L"  Header\n" + Grid(rows);
+}
+
 template <class Answer>
 std::wstring Section(const wchar_t* title, const Answer& answer, const std::wstring& text) {
   return std::wstring(L"  ") + title + L"\n" +
@@ -83,6 +93,7 @@ std::wstring TextReport(const FileFacts& facts) {
   }
   if (!facts.type.empty()) text += L"  Type        " + facts.type + L"\n";
   text += L"  Thumbnail   " + ThumbnailText(facts.thumbnail) + L"\n";
+  text += HeaderText(facts.header);
   text += Section(L"Tip", facts.tip, L"    " + Indented(facts.tip.text, 4) + L"\n");
   text += Section(L"Columns", facts.columns, ColumnsText(facts.columns));
   text += Section(L"Property sets", facts.propertySets, PropertiesText(facts.propertySets));

@@ -20,12 +20,29 @@ std::string Utf8(std::wstring_view text) {
   return utf8;
 }
 
-std::wstring Wide(std::string_view utf8) {
-  const int length = static_cast<int>(utf8.size());
+namespace {
+
+std::wstring Decoded(std::string_view bytes, UINT codePage, DWORD flags) {
+  const int length = static_cast<int>(bytes.size());
   std::wstring text(
-      static_cast<std::size_t>(MultiByteToWideChar(CP_UTF8, 0, utf8.data(), length, nullptr, 0)), L'\0');
-  MultiByteToWideChar(CP_UTF8, 0, utf8.data(), length, text.data(), static_cast<int>(text.size()));
+      static_cast<std::size_t>(MultiByteToWideChar(codePage, flags, bytes.data(), length, nullptr, 0)),
+      L'\0');
+  MultiByteToWideChar(codePage, flags, bytes.data(), length, text.data(), static_cast<int>(text.size()));
   return text;
+}
+
+}  // namespace
+
+std::wstring Wide(std::string_view utf8) {
+  return Decoded(utf8, CP_UTF8, 0);
+}
+
+std::wstring TextOfFile(std::string_view bytes) {
+  constexpr UINT kWestern = 1252;
+  const std::string_view text = bytes.substr(0, bytes.find('\0'));
+  std::wstring decoded = Decoded(text, CP_UTF8, MB_ERR_INVALID_CHARS);
+  if (decoded.empty()) decoded = Decoded(text, kWestern, 0);
+  return decoded;
 }
 
 std::wstring Lowered(std::wstring_view text) {

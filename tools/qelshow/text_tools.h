@@ -16,6 +16,9 @@ std::string Utf8(std::wstring_view text);
 /// Bytes that are not UTF-8 become U+FFFD.
 std::wstring Wide(std::string_view utf8);
 
+/// A text of a file, as far as its first zero byte: UTF-8, or else the code page of western Windows.
+std::wstring TextOfFile(std::string_view bytes);
+
 std::wstring Lowered(std::wstring_view text);
 
 /// For instance 0x80004005.

@@ -1,10 +1,21 @@
 #include "value_text.h"
 
+#include <array>
+#include <charconv>
+#include <string_view>
+
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
 std::wstring TextOrEmpty(const wchar_t* text) {
   return text == nullptr ? std::wstring() : std::wstring(text);
+}
+
+/// The shortest text that is read as the same number.
+std::wstring ShortestText(double number) {
+  std::array<char, 32> text;
+  const auto end = std::to_chars(text.data(), text.data() + text.size(), number);
+  return {text.data(), end.ptr};
 }
 
 }  // namespace
@@ -44,6 +55,7 @@ Value ValueOf(const VARIANT& value) {
 
 std::wstring ValueText(const Value& value) {
   if (const auto* const number = std::get_if<std::int64_t>(&value)) return std::to_wstring(*number);
+  if (const auto* const number = std::get_if<double>(&value)) return ShortestText(*number);
   if (const auto* const text = std::get_if<std::wstring>(&value)) return *text;
   return {};
 }

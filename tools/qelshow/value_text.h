@@ -20,7 +20,7 @@ std::wstring TypeName(VARTYPE type);
 Value ValueOf(const PROPVARIANT& value);
 Value ValueOf(const VARIANT& value);
 
-/// The number in plain decimal, the text, or an empty text.
+/// The number in decimal, with an exponent only if that is shorter, the text, or an empty text.
 std::wstring ValueText(const Value& value);
 
 }  // namespace Qel::Lumetra::ShellExt::Show
