@@ -1,6 +1,5 @@
 // A test program in which one test passes, one is skipped, one fails and one ends the program. The test of
-// run_tests
-// checks that all four are counted.
+// run_tests checks that all four are counted.
 #include <gtest/gtest.h>
 
 #include <cstdlib>

@@ -1,8 +1,6 @@
 // run_tests: runs every test program in its folder, one after the other, and counts their tests. A test
-// program is a
-// program of GoogleTest whose name ends in _test.exe. Its current folder is the subfolder data. Its output
-// goes to
-// test-log.txt in the parent folder.
+// program is a program of GoogleTest whose name ends in _test.exe. Its current folder is the subfolder data.
+// Its output goes to test-log.txt in the parent folder.
 //
 // Exits with 0 if tests have passed and none has failed, with 2 if the log cannot be written, and with 1
 // otherwise.
@@ -43,8 +41,7 @@ std::string Text(const Results& results) {
 }
 
 /// Counts the tests in the output of a program. A test that has begun but has neither passed nor been skipped
-/// counts as
-/// failed: it may have ended the program.
+/// counts as failed: it may have ended the program.
 Results Count(std::string_view output) {
   Results results;
   bool isInTest = false;
@@ -129,8 +126,7 @@ class Log {
 };
 
 /// Runs a program to its end. Returns whether it exits with 0. Otherwise it logs how the program ended,
-/// unless the status
-/// is 1, the status of failed tests.
+/// unless the status is 1, the status of failed tests.
 bool Run(const fs::path& program, const Log& log) {
   std::wstring command = L"\"" + program.wstring() + L"\" --gtest_color=no";
   STARTUPINFOW startup{};

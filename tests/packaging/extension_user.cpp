@@ -1,6 +1,5 @@
 // A program that uses the registered extension while it is replaced. It makes an object, prints "using",
-// waits for a line
-// or the end of its input, and makes a second object while the first still exists.
+// waits for a line or the end of its input, and makes a second object while the first still exists.
 //
 // Exits with 0 if it could make both objects.
 #include <windows.h>

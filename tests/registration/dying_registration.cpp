@@ -1,6 +1,5 @@
 // Registers or unregisters the built DLL in the private registry of another process, and terminates itself
-// before a given
-// change.
+// before a given change.
 //
 //   dying_registration register|unregister REGISTRY CHANGES
 //

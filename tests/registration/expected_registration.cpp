@@ -26,8 +26,7 @@ struct PropertyHandler {
 };
 
 // HKCR\CLSID and HKLM\Software\Classes\CLSID are the same key. The scripts write each class key twice, and
-// the second
-// copy replaces the first, so the title of the .mrc class is that of the second copy.
+// the second copy replaces the first, so the title of the .mrc class is that of the second copy.
 const PropertyHandler kPropertyHandlers[] = {
     {L".ebn", L"{E37DEDA9-F652-401B-B619-A1A88EADD003}", L"QEL .EBN Image Property Handler",
      L"QelShellExtVistaEbn", L"QelShellExtVistaEbn"},

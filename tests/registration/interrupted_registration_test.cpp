@@ -1,6 +1,5 @@
 // Makes a registration fail or die at each of its changes of the registry, and checks that the next
-// registration or
-// unregistration repairs the result.
+// registration or unregistration repairs the result.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -29,8 +28,7 @@ void WINAPI CountNotification(LONG, UINT, const void*, const void*) {
 }
 
 /// A call that can be abandoned, as if its process were killed: no more of its code runs, not even a
-/// destructor, and its
-/// handles stay open. It runs on a fiber of its own, whose stack is freed afterwards.
+/// destructor, and its handles stay open. It runs on a fiber of its own, whose stack is freed afterwards.
 class AbandonableCall {
  public:
   explicit AbandonableCall(std::function<void()> call)

@@ -10,13 +10,11 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Returns a sentence that says why the DLL must not be registered on this machine: the user is not an
-/// administrator, or
-/// another copy of the DLL is registered. Returns an empty string if it may be registered.
+/// administrator, or another copy of the DLL is registered. Returns an empty string if it may be registered.
 std::string WhyNotToRegister();
 
 /// Saves the values of other programs that registering the DLL replaces, and restores them when it is
-/// destroyed. Must be
-/// made before the DLL is registered.
+/// destroyed. Must be made before the DLL is registered.
 class OthersRegistrations {
  public:
   OthersRegistrations();

@@ -1,6 +1,5 @@
 // A registry in memory, for tests of the registry scripts. It ignores the case of names but preserves it, and
-// can make any
-// change fail.
+// can make any change fail.
 #pragma once
 
 #include <cstddef>

@@ -252,8 +252,7 @@ TEST_F(Registration, ReportsALackOfMemoryAtAnyPointAndWorksOnceThereIsSome) {
 }
 
 // interrupted_registration_test ends a thread at every change. This test shows for a few changes that a
-// process that dies
-// leaves nothing more.
+// process that dies leaves nothing more.
 TEST_F(Registration, IsRepairedOrCleanedUpAfterAProcessDied) {
   const std::filesystem::path program =
       ServerDll::Path().parent_path() / L"tests" / L"dying_registration.exe";

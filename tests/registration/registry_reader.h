@@ -10,8 +10,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Returns everything in and below `key`, whose path is `name` in the lines. Links to other keys are left
-/// out. A value that
-/// is neither a string nor a DWORD is read as a string that names its type and size.
+/// out. A value that is neither a string nor a DWORD is read as a string that names its type and size.
 RegistryContents ReadRegistry(HKEY key, const std::wstring& name);
 
 /// Gives the process a HKEY_LOCAL_MACHINE of its own while it exists. Its Software\Classes is the process's

@@ -259,8 +259,7 @@ TEST(GreyThumbnail, InfinityMakesTheRestBlack) {
 
 TEST(GreyThumbnail, FloatDifferencesAreFormedInSinglePrecision) {
   // Rounded to float, the range is 255 and the difference of the middle value is 100. In double precision
-  // they would be
-  // 255.000007 and 99.999999, and the middle level would be 99.
+  // they would be 255.000007 and 99.999999, and the middle level would be 99.
   const NaiveFrame<float> frame{3, 1, {-0.000007f, std::nextafter(100.0f, 0.0f), 255.0f}};
   EXPECT_EQ(Grey(frame, {10, 10}).bytes, (std::vector<std::uint8_t>{0, 100, 255}));
 }

@@ -1,6 +1,5 @@
 // The DLL's own functions of POSIX threads. They have other names here (tests/CMakeLists.txt), because this
-// program links
-// a library with the same names.
+// program links a library with the same names.
 #include <gtest/gtest.h>
 #include <pthread.h>
 #include <windows.h>

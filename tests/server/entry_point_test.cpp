@@ -1,6 +1,5 @@
 // What the DLL calls when the system loads and unloads it, and when a thread starts or ends. It must be next
-// to nothing,
-// because the system holds the loader lock meanwhile.
+// to nothing, because the system holds the loader lock meanwhile.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -16,10 +15,8 @@ namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
 /// What the C++ runtime calls when it starts and ends: memory, and the environment variable that sets its
-/// pool of
-/// memory; its own locks, the character classification, the console streams, a slot for exceptions, and a
-/// random
-/// number for the stack guard.
+/// pool of memory; its own locks, the character classification, the console streams, a slot for exceptions,
+/// and a random number for the stack guard.
 const std::set<std::string> kRuntime = {
     "AcquireSRWLockExclusive",
     "GetCurrentProcessId",

@@ -1,6 +1,5 @@
 // The release DLL as a guest in another program's process: what it requests of the process, and that it
-// releases all of
-// it.
+// releases all of it.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -244,12 +243,9 @@ TEST(ProcessCensus, CountsEveryResource) {
 }
 
 /// Runs up to eight batches of cycles until one of them leaves nothing. Each batch runs the cycle over all
-/// files, `times`
-/// times. Some batches leave something that is not the DLL's: the system's heap grows for a while, and this
-/// program's own
-/// thread library makes a permanent event for each of its locks that two threads happen to request at once.
-/// What the DLL
-/// leaves appears in every batch.
+/// files, `times` times. Some batches leave something that is not the DLL's: the system's heap grows for a
+/// while, and this program's own thread library makes a permanent event for each of its locks that two
+/// threads happen to request at once. What the DLL leaves appears in every batch.
 template <class Cycle>
 AssertionResult EndsUpLeavingNothing(const std::vector<std::filesystem::path>& files, int times,
                                      const Cycle& cycle) {

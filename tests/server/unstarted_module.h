@@ -1,6 +1,5 @@
 // Maps a DLL into the process without starting it. A test can then call its entry point and see every call
-// that the
-// entry point makes.
+// that the entry point makes.
 #pragma once
 
 #include <windows.h>
@@ -14,8 +13,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Binds the imports to stubs that count each call and pass it on. The process must not load the DLL in the
-/// ordinary way
-/// while this exists.
+/// ordinary way while this exists.
 class UnstartedModule {
  public:
   /// Throws std::runtime_error if the DLL cannot be mapped, or if one of its imports does not exist.

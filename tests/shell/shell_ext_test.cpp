@@ -170,8 +170,7 @@ TEST_F(ShellExtObject, GetLocationRequiresSizeAndFlags) {
 }
 
 // A frame is reduced by the largest whole factor that does not make it smaller than the request in both
-// dimensions: the
-// factor becomes 2 exactly at twice the request.
+// dimensions: the factor becomes 2 exactly at twice the request.
 
 TEST_F(ShellExtObject, ExtractsAtTheSizeOfGetLocation) {
   const SIZE request{256, 96};

@@ -1,6 +1,5 @@
 // Measures what a test program allocates on the heap, and makes allocations fail. A program that links this
-// gets its own
-// operator new and delete. Memory from elsewhere, such as the system's bitmaps, does not count.
+// gets its own operator new and delete. Memory from elsewhere, such as the system's bitmaps, does not count.
 #pragma once
 
 #include <cstdint>

@@ -31,8 +31,8 @@ std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream, const std::wstrin
 }
 
 /// Returns the edge, in pixels of the frame, of the blocks that are averaged to one pixel of the thumbnail.
-/// This repeats
-/// the rule of render/reduction.cpp on purpose: the check must not share code with what it checks.
+/// This repeats the rule of render/reduction.cpp on purpose: the check must not share code with what it
+/// checks.
 std::int64_t Factor(Size2 frame, bool colour, const SIZE& request) {
   const std::int64_t factor =
       std::max(std::int64_t{frame.width} / request.cx, std::int64_t{frame.height} / request.cy);

@@ -1,6 +1,5 @@
 // Asks a reader everything that the shell asks of a file. The fuzzers do so with every input, the reliability
-// tests with
-// every damaged file.
+// tests with every damaged file.
 #pragma once
 
 #include <windows.h>
@@ -30,8 +29,7 @@ inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
                                         {1, 256}, {-5, 40}, {-3, -2}, {kMaxRequest, kMaxRequest}};
 
 /// Makes the reader of `extension` on `stream`. If the file is valid, asks for its metadata, then for
-/// thumbnails of the
-/// sizes `requests`, then for its metadata again.
+/// thumbnails of the sizes `requests`, then for its metadata again.
 Answers AskEverything(std::istream& stream, const std::wstring& extension,
                       std::span<const SIZE> requests = kAllRequests);
 

@@ -10,8 +10,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Reads without buffering: every read of the stream is one read of the file. Like a file, it can be
-/// positioned after
-/// its end.
+/// positioned after its end.
 class MemoryBuffer : public std::streambuf {
  public:
   /// What the failing read does. Later reads succeed again.

@@ -1,6 +1,5 @@
 // Computes the expected picture of a frame in the simplest way: the whole frame is a vector of values, top
-// row first, and
-// each step is a plain loop. It shares no code with what it checks.
+// row first, and each step is a plain loop. It shares no code with what it checks.
 #pragma once
 
 #include <array>

@@ -23,8 +23,7 @@ void CountHeaps(ProcessCensus& census) {
 }
 
 /// Counts by trying every value that a handle can have, as they are small multiples of 4.
-/// GetProcessHandleCount returns
-/// 0 under some versions of Wine.
+/// GetProcessHandleCount returns 0 under some versions of Wine.
 std::size_t CountHandles() {
   constexpr ULONG_PTR kEnd = 4 * 4096;
   std::size_t count = 0;
@@ -51,8 +50,7 @@ std::size_t CountSlots(Allocate allocate, Free free) {
 static_assert(TLS_OUT_OF_INDEXES == FLS_OUT_OF_INDEXES);  // NOLINT(misc-redundant-expression): it is not
 
 // An entry of the table of GDI handles that the process block points to. Under Wine the table lists the
-// handles of this
-// process only. Needed because GetGuiResources returns 0 under some versions of Wine.
+// handles of this process only. Needed because GetGuiResources returns 0 under some versions of Wine.
 struct GdiHandleEntry {
   void* object;
   WORD owner;  // process id; 0 for the system, or if Wine does not record it

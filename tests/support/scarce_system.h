@@ -1,6 +1,5 @@
 // Makes calls of one loaded module fail at a chosen moment: its allocations, and the strings, locks and
-// bitmaps that it
-// requests from Windows.
+// bitmaps that it requests from Windows.
 #pragma once
 
 #include <windows.h>

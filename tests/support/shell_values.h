@@ -48,8 +48,7 @@ inline Value Text(VARTYPE type, std::wstring text) {
 }
 
 /// Reads a VARIANT or PROPVARIANT. Returns the string "<unexpected>" for a null string, and for a type that
-/// the extension
-/// does not use.
+/// the extension does not use.
 template <class Variant>
 Value ReadValue(const Variant& variant) {
   switch (variant.vt) {

@@ -8,8 +8,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Returns the slot, counted from 0. In the Itanium ABI a pointer to a virtual member function holds the byte
-/// offset in
-/// the table plus 1, where the 1 distinguishes it from an address.
+/// offset in the table plus 1, where the 1 distinguishes it from an address.
 template <class Function>
 std::size_t VirtualSlot(Function function) {
   return (std::bit_cast<std::array<std::size_t, 2>>(function)[0] - 1) / sizeof(void*);

@@ -1,8 +1,6 @@
 // Writes the bitmaps that the built DLL makes. Each line of standard input is a request: the edge, the file,
-// and the path
-// of the output, separated by tabs. The output is one line with the width, the height and the bits per pixel,
-// then the
-// rows without padding.
+// and the path of the output, separated by tabs. The output is one line with the width, the height and the
+// bits per pixel, then the rows without padding.
 #include <windows.h>
 
 #include <objidl.h>
