@@ -1,4 +1,4 @@
-// Opening a file whose handle the C runtime refuses.
+// Tests the opening of a file whose handle the C runtime refuses.
 #include <gtest/gtest.h>
 #include <windows.h>
 

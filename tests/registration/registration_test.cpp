@@ -222,7 +222,7 @@ TEST_F(Registration, LeavesNothingInTheProcess) {
     }
     return ProcessCensus::Take();
   };
-  // The system keeps something now and then; a leak would add to every one of these rounds.
+  // The system makes a permanent allocation now and then. A leak would grow in every one of these rounds.
   bool isConstant = false;
   ProcessCensus before = takeAfter(2);
   for (int i = 0; i < 5 && !isConstant; ++i) {

@@ -13,7 +13,7 @@ namespace Qel::Lumetra::ShellExt::Testing {
 /// out. A value that is neither a string nor a DWORD is read as a string that names its type and size.
 RegistryContents ReadRegistry(HKEY key, const std::wstring& name);
 
-/// Gives the process a HKEY_LOCAL_MACHINE of its own while it exists. Its Software\Classes is the process's
+/// Gives the process its own HKEY_LOCAL_MACHINE while it exists. Its Software\Classes is the process's
 /// HKEY_CLASSES_ROOT. The machine's registry is neither visible nor changed, except for one key in
 /// HKEY_CURRENT_USER.
 class PrivateRegistry {

@@ -1,4 +1,4 @@
-// Sums at the limits of the lanes and folds. A type one size too narrow would overflow here.
+// Tests sums at the limits of the lanes and folds, where a type one size too narrow would overflow.
 #include "block_sums.h"
 
 #include <gtest/gtest.h>

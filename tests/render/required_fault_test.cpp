@@ -1,4 +1,4 @@
-// Divisions by zero that end the process by design. Each is tested in a child process.
+// Tests the divisions by zero that end the process by design, each in a child process.
 #include <gtest/gtest.h>
 #include <windows.h>
 

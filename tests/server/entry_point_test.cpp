@@ -1,5 +1,5 @@
-// What the DLL calls when the system loads and unloads it, and when a thread starts or ends. It must be next
-// to nothing, because the system holds the loader lock meanwhile.
+// Tests what the DLL calls when the system loads and unloads it, and when a thread starts or ends. It must
+// call next to nothing, because the system holds the loader lock meanwhile.
 #include <gtest/gtest.h>
 #include <windows.h>
 

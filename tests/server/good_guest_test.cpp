@@ -1,4 +1,4 @@
-// The release DLL as a guest in another program's process: what it requests of the process, and that it
+// Tests the release DLL as a guest in another program's process: what it requests of the process, and that it
 // releases all of it.
 #include <gtest/gtest.h>
 #include <windows.h>

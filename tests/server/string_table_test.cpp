@@ -1,4 +1,4 @@
-// The string table of the built DLL.
+// Tests the string table of the built DLL.
 #include <gtest/gtest.h>
 #include <windows.h>
 

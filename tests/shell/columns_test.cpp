@@ -1,4 +1,4 @@
-// The columns of the Details view.
+// Tests the columns of the Details view.
 #include <gtest/gtest.h>
 #include <windows.h>
 

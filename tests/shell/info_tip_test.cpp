@@ -1,4 +1,4 @@
-// The info tip.
+// Tests the info tip.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -43,7 +43,8 @@ class InfoTip : public ServerTest {
     return text;
   }
 
-  /// Returns the tip of a file that has been renamed after Load, so that only its contents appear.
+  /// Returns the tip of a file that has been renamed after Load, so that the tip shows only what its contents
+  /// say.
   std::wstring TipOfContents(const std::filesystem::path& name, const std::string& bytes) {
     const std::filesystem::path file = folder_.Write(name, bytes);
     const Object object = Load(file);

@@ -1,4 +1,4 @@
-// The property sets and their enumerators.
+// Tests the property sets and their enumerators.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -377,7 +377,7 @@ TEST_F(PropertySet, ListsTheCommentAsAString) {
   EXPECT_EQ(elements[0].vt, VT_BSTR);
 }
 
-// The enumerator of properties is tested in full, the one of sets in short: both have the same
+// The enumerator of properties is tested completely, the one of sets briefly: both have the same
 // implementation.
 
 TEST_F(PropertySet, NextReturnsAsManyAsThereAre) {

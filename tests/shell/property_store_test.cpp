@@ -1,4 +1,4 @@
-// The property-store handlers.
+// Tests the property-store handlers.
 #include <gtest/gtest.h>
 #include <windows.h>
 

@@ -1,5 +1,5 @@
-// How the objects handle the system's results, failures included. Replacements of the DLL's imports supply
-// the results.
+// Tests how the objects handle the system's results, failures included. Replacements of the DLL's imports
+// supply the results.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -29,7 +29,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-constexpr HRESULT kFailure = STG_E_MEDIUMFULL;  // a result of nothing else here
+constexpr HRESULT kFailure = STG_E_MEDIUMFULL;  // no other call here returns this
 
 class SystemAnswers : public ServerTest {
  protected:
@@ -279,7 +279,7 @@ TEST_F(SystemsLines, AreLeftOutWhenTheFileIsNotVisible) {
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kCommentLine);
 }
 
-// The memory for a tip.
+// A lack of memory for a tip.
 
 /// The shell's allocator, without memory.
 class ExhaustedAllocator final : public IMalloc {
@@ -327,7 +327,7 @@ TEST_F(SystemAnswers, TipNeedsMemoryForItsTextAndItsTerminator) {
   EXPECT_EQ(g_allocator.references, 1u);
 }
 
-// The memory for values.
+// A lack of memory for values.
 
 BSTR WINAPI NoText(const OLECHAR*) {
   return nullptr;
@@ -435,7 +435,7 @@ TEST_F(SystemAnswers, PropertyStoreGivesAnEmptyValueWithoutMemoryForAString) {
   }
 }
 
-// The bitmap.
+// A bitmap that cannot be created.
 
 struct BitmapRequest {
   BITMAPINFOHEADER header;

@@ -21,7 +21,7 @@ class HeapMeter {
  public:
   HeapMeter();
 
-  /// Returns how far the bytes in use have risen at most above those in use at construction.
+  /// Returns the maximum of the bytes in use since construction, less those in use at construction.
   std::int64_t Peak() const;
 
   /// Returns the bytes of the largest single allocation.

@@ -1,4 +1,4 @@
-// A file in memory that counts the reads of it and can make one fail.
+// A file in memory that counts its reads and can make one of them fail.
 #pragma once
 
 #include <algorithm>

@@ -10,7 +10,7 @@ struct ProcessCensus {
   std::size_t heapBytes = 0;
   std::size_t threadSlots = 0;  // thread-local storage
   std::size_t fiberSlots = 0;   // fiber-local storage
-  std::size_t handles = 0;      // of kernel objects
+  std::size_t handles = 0;      // kernel objects
   std::size_t gdiObjects = 0;
 
   /// Counts what the process holds now. No other thread may run meanwhile.
