@@ -443,7 +443,7 @@ class Installation(Test):
                 results.append((status, out.read().decode()))
         (installed, _), (found, told), (removed, _) = results
         self.assertEqual((installed, found, removed), (DONE, 4, DONE), results)
-        self.assertIn(f"{self.image}: is not read. The header is not acceptable: mode is 99", told)
+        self.assertIn(f"{self.image}: has no thumbnail. The header is not acceptable: mode is 99", told)
         self.assertIn("QelShellExt is registered and works.", told)
         self.assertRemoved()
 
