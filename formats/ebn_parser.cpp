@@ -2,6 +2,7 @@
 
 #include <array>
 #include <charconv>
+#include <cmath>
 #include <limits>
 #include <string_view>
 
@@ -15,13 +16,18 @@ namespace {
 constexpr std::int32_t kHeaderBytes = 54;
 constexpr std::int32_t kMaxTypeCode = 8;  // the format has no complex types
 
-/// A code is stored as a double; half is added, the rest of the fraction cut off. On purpose that is not the
-/// nearest integer below 0: a stored -2.0 is the code -1. What no int can hold is no code, like 0.
+constexpr double kMaxCode = 4;  // of the texts below
+
+/// Returns the integer that a double stands for: the double plus half, truncated toward zero. Intentionally,
+/// that is not the nearest integer below 0: a stored -2.0 is -1.
+double WholeNumber(double stored) {
+  return std::trunc(stored + 0.5);
+}
+
+/// Returns a code without a text as 0.
 std::int32_t CodeOf(double stored) {
-  using Limits = std::numeric_limits<std::int32_t>;
-  const double code = stored + 0.5;
-  const bool fits = code > Limits::min() - 1.0 && code < Limits::max() + 1.0;
-  return fits ? static_cast<std::int32_t>(code) : 0;
+  const double code = WholeNumber(stored);
+  return std::abs(code) <= kMaxCode ? static_cast<std::int32_t>(code) : 0;
 }
 
 std::string_view ModelText(std::int32_t code) {
@@ -56,11 +62,12 @@ std::string_view LensText(std::int32_t code) {
   }
 }
 
-/// One digit after the point, whatever the locale of the host.
-std::string OneDecimal(double number) {
-  // The digits of the largest double, a sign, the point and the digit behind it.
+/// Returns a number with `decimals` digits after the point, at most 1, in any locale of the host.
+std::string Decimal(double number, int decimals) {
+  // The digits of the largest double, a sign, the point and the digit after it.
   std::array<char, std::numeric_limits<double>::max_exponent10 + 4> text;
-  const auto end = std::to_chars(text.data(), text.data() + text.size(), number, std::chars_format::fixed, 1);
+  const auto end =
+      std::to_chars(text.data(), text.data() + text.size(), number, std::chars_format::fixed, decimals);
   return {text.data(), end.ptr};
 }
 
@@ -68,8 +75,9 @@ std::string Describe(const EbnInstrument& instrument) {
   std::string text(ModelText(CodeOf(instrument.model)));
   text += SourceText(CodeOf(instrument.source));
   text += LensText(CodeOf(instrument.lens));
-  if (const std::int32_t d = CodeOf(instrument.dNumber); d != 0) text += " D" + std::to_string(d);
-  return text + " " + OneDecimal(instrument.kilovolts) + " kV";
+  const double d = WholeNumber(instrument.dNumber);
+  if (std::isfinite(d) && d != 0) text += " D" + Decimal(d, 0);
+  return text + " " + Decimal(instrument.kilovolts, 1) + " kV";
 }
 
 }  // namespace

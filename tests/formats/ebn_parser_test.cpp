@@ -168,7 +168,6 @@ TEST(EbnComment, KnowsEveryCode) {
       {&EbnFile::dNumber, 0, L""},
       {&EbnFile::dNumber, 1, L" D1"},
       {&EbnFile::dNumber, -1, L" D-1"},
-      {&EbnFile::dNumber, 2147483647, L" D2147483647"},
   };
   for (const Row& row : kRows) {
     const double stored = row.code < 0 ? row.code - 0.5 : row.code;
@@ -198,11 +197,27 @@ TEST(EbnComment, NumbersThatAreNoCodesAddNothing) {
   using Limits = std::numeric_limits<double>;
   for (const double stored : {Limits::quiet_NaN(), Limits::infinity(), -Limits::infinity(), Limits::max(),
                               Limits::lowest(), 2147483647.5, -2147483649.5, 4294967297.0}) {
-    for (const auto field : {&EbnFile::model, &EbnFile::source, &EbnFile::lens, &EbnFile::dNumber}) {
+    for (const auto field : {&EbnFile::model, &EbnFile::source, &EbnFile::lens}) {
       EXPECT_EQ(TextOf(field, stored), L"") << stored;
     }
   }
-  EXPECT_EQ(TextOf(&EbnFile::dNumber, -2147483648.5), L" D-2147483648");
+}
+
+TEST(EbnComment, EveryFiniteDNumberHasAllItsDigits) {
+  using Limits = std::numeric_limits<double>;
+  const auto text = [](double stored) { return TextOf(&EbnFile::dNumber, stored); };
+  EXPECT_EQ(text(2147483647), L" D2147483647");
+  EXPECT_EQ(text(3e9), L" D3000000000");
+  EXPECT_EQ(text(-3e9), L" D-2999999999");
+  EXPECT_EQ(text(1e15), L" D1000000000000000");
+  EXPECT_EQ(text(1e22), L" D10000000000000000000000");
+  EXPECT_EQ(text(Limits::max()).size(), 2 + 309u);
+  EXPECT_EQ(text(Limits::lowest()).size(), 2 + 1 + 309u);
+  EXPECT_TRUE(text(Limits::lowest()).starts_with(L" D-17976931348623157"));
+  EXPECT_EQ(text(-0.9), L"");
+  for (const double none : {Limits::quiet_NaN(), Limits::infinity(), -Limits::infinity()}) {
+    EXPECT_EQ(text(none), L"") << none;
+  }
 }
 
 TEST(EbnComment, VoltageHasOneDecimal) {
