@@ -32,9 +32,8 @@ constexpr std::int64_t kMinReadBytes = 4096;
 // this, which bounds its time to a few seconds.
 constexpr std::int64_t kMaxTileReadBytes = 1LL << 34;
 
-/// Whether the layout has pixels, all inside its block, and not too many for its bytes.
+/// Returns whether all pixels of the layout are inside its block and not too many for its bytes.
 bool IsReadable(const FrameLayout& layout) {
-  if (layout.size.width < 1 || layout.size.height < 1) return false;
   const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
   if (pixels - layout.blockBytes > kMaxSharedPixels) return false;
   const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
@@ -43,16 +42,12 @@ bool IsReadable(const FrameLayout& layout) {
       layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
   const std::int64_t last =
       layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
-  return first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
+  return layout.blockPosition >= 0 && first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
 }
 
-/// Whether the stream holds the layout's whole block, so that a truncated file is refused before any work. If
-/// not, the stream is left as by a short read.
+/// Returns whether the stream has the layout's whole block, so that a truncated file is refused before any
+/// work. If not, leaves the stream as a short read does.
 bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
-  if (layout.blockPosition < 0) {
-    stream.setstate(std::ios_base::failbit);
-    return false;
-  }
   stream.seekg(0, std::ios_base::end);
   const std::int64_t size = stream.tellg();
   if (!stream.good()) return false;
@@ -288,11 +283,16 @@ class BandReader {
 }  // namespace
 
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request) {
-  if (!IsReadable(layout) || !HoldsBlock(stream, layout)) return nullptr;
+  if (layout.size.width < 1 || layout.size.height < 1) return nullptr;
+  if (!IsReadable(layout)) stream.setstate(std::ios_base::failbit);
+  if (stream.fail() || !HoldsBlock(stream, layout)) return nullptr;
   const auto renderer = MakeFrameRenderer(layout.type.tag, layout.size, request);
   if (renderer == nullptr) return nullptr;
   const bool hasBlocks = renderer->reduction().HasBlocks();
-  if (hasBlocks && !BandReader(stream, layout, *renderer).ReadFrame()) return nullptr;
+  if (hasBlocks && !BandReader(stream, layout, *renderer).ReadFrame()) {
+    stream.setstate(std::ios_base::failbit);
+    return nullptr;
+  }
   return renderer->Finish();
 }
 

@@ -13,10 +13,10 @@ namespace Qel::Lumetra::ShellExt {
 /// not depend on the size of the frame, which is read in bands, in the order of the file if the layout allows
 /// it, or else in tiles.
 ///
-/// Returns null for a frame without pixels or of an unknown pixel type, for a layout that places a pixel
-/// outside of its block or would take too long (more than 2^26 pixels that share their bytes, or pixels too
-/// scattered), and when the stream does not hold the whole block or fails; a short stream is left
-/// failed, as by a short read.
+/// Returns null for a frame without pixels or of an unknown pixel type. Returns null and leaves the stream
+/// failed, as a short read does, for a layout that places a pixel outside its block or would take too long
+/// (too many pixels that share bytes, or too scattered ones), and when the stream has not the whole block or
+/// fails.
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -309,7 +309,10 @@ TEST(MrcThumbnail, PositionOfASectionWrapsAt32Bits) {
 TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
   const auto width = [](std::int32_t mode, std::int32_t nx, std::int32_t ny) {
     const MrcFile file{.nx = nx, .ny = ny, .mode = mode, .pixels = std::string(256, 'x')};
-    return OpenMrc(file).Thumbnail({256, 256}).width;
+    const OpenMrc mrc(file);
+    const int result = mrc.Thumbnail({256, 256}).width;
+    EXPECT_EQ(mrc->IsValid(), result > 0);  // as after any picture that is not there
+    return result;
   };
   EXPECT_EQ(width(0, 1, 256), 1);
   EXPECT_EQ(width(0, 0x1000001, 256), 0);  // 2^32 + 256 pixels

@@ -121,6 +121,19 @@ TEST(Raw, AcceptsAnySize) {
   }
 }
 
+TEST(Raw, AColourPictureWithoutPixelsIsNoFault) {
+  for (const DataType type : {DataType::kRgb24, DataType::kBgr24}) {
+    for (const Size2 size : {Size2{0, 0}, Size2{0, 2}, Size2{2, 0}, Size2{-2, 2}, Size2{-2, -2}}) {
+      RawFile file = PackedRawFile(type, 2, 2, std::string(12, 'x'));
+      file.width = size.width;
+      file.height = size.height;
+      const OpenRaw raw(file);
+      EXPECT_EQ(raw.Thumbnail(kWholeSize).width, 0);
+      EXPECT_TRUE(raw->IsValid());
+    }
+  }
+}
+
 TEST(Raw, PixelsFollowTheHeader) {
   const OpenRaw raw(PackedRawFile(DataType::kUInt8, 3, 2, BytesOf<std::uint8_t>({0, 1, 2, 3, 4, 255})));
   EXPECT_EQ(raw.Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
@@ -180,6 +193,23 @@ TEST(Raw, PixelInFrontOfTheBlockCannotBeRead) {
   file.offset = 0;
   file.rowStride = -2;
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 0);
+}
+
+TEST(Raw, PixelsThatAreNotThereFailTheFile) {
+  const auto isValidAfterwards = [](const RawFile& file) {
+    const OpenRaw raw(file);
+    EXPECT_EQ(raw.Thumbnail(kWholeSize).width, 0);
+    return raw->IsValid();
+  };
+  RawFile file = PackedRawFile(DataType::kUInt8, 2, 2, "0123");
+  file.offset = -1;  // in front of the block
+  EXPECT_FALSE(isValidAfterwards(file));
+  file.offset = 1;  // behind the file
+  EXPECT_FALSE(isValidAfterwards(file));
+  file.offset = 0;
+  file.pixelStride = file.rowStride = 0;
+  file.width = file.height = 10'000;  // too many for four bytes
+  EXPECT_FALSE(isValidAfterwards(file));
 }
 
 TEST(Raw, ExtentThatWrapsCannotBeRead) {
