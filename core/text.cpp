@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <array>
-#include <iterator>
 
 // The linker defines this symbol in every module. Its address is the instance handle of the module that this
 // code is linked into, the DLL or a test program.
@@ -19,10 +18,9 @@ std::wstring LoadResourceString(std::uint32_t id) {
   return buffer.data();
 }
 
-std::wstring WidenComment(std::string_view bytes) {
-  std::wstring wide;
-  wide.reserve(bytes.size());
-  std::ranges::transform(bytes, std::back_inserter(wide), [](char byte) {
+std::wstring WidenComment(const char* first, const char* last) {
+  std::wstring wide(static_cast<std::size_t>(last - first), L'\0');
+  std::transform(first, last, wide.begin(), [](char byte) {
     return static_cast<wchar_t>(static_cast<std::uint16_t>(static_cast<signed char>(byte)));
   });
   return wide;

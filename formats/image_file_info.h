@@ -27,7 +27,10 @@ class ImageFileInfo final : public FileTypeInfo {
   std::int32_t GetFrameCount() const override { return parser_.frameCount(); }
   std::int32_t GetBitDepth() const override { return parser_.frame().type.bits; }
   std::wstring GetDataTypeName() const override { return parser_.frame().type.name; }
-  std::wstring GetComment() const override { return WidenComment(parser_.comment()); }
+  std::wstring GetComment() const override {
+    const auto comment = parser_.comment();
+    return WidenComment(comment.data(), comment.data() + comment.size());
+  }
   HBITMAP CreateThumbnail(const SIZE& size) const override {
     return ReadThumbnail(parser_.stream(), parser_.frame(), size);
   }

@@ -2,31 +2,37 @@
 
 #include <gtest/gtest.h>
 
+#include <string_view>
+
 #include "same_text.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
+std::wstring Widen(std::string_view bytes) {
+  return WidenComment(bytes.data(), bytes.data() + bytes.size());
+}
+
 TEST(WidenComment, KeepsTheLowerHalfOfTheBytes) {
   for (int byte = 0; byte < 0x80; ++byte) {
-    EXPECT_EQ(WidenComment(std::string(1, static_cast<char>(byte))),
-              std::wstring(1, static_cast<wchar_t>(byte)));
+    EXPECT_EQ(Widen(std::string(1, static_cast<char>(byte))), std::wstring(1, static_cast<wchar_t>(byte)));
   }
 }
 
 TEST(WidenComment, ExtendsTheSignOfTheUpperHalf) {
   for (int byte = 0x80; byte < 0x100; ++byte) {
-    EXPECT_EQ(WidenComment(std::string(1, static_cast<char>(byte))),
+    EXPECT_EQ(Widen(std::string(1, static_cast<char>(byte))),
               std::wstring(1, static_cast<wchar_t>(0xFF00 + byte)));
   }
-  EXPECT_EQ(WidenComment("\xB5"), std::wstring(1, wchar_t{0xFFB5}));
-  EXPECT_EQ(WidenComment("\xE9"), std::wstring(1, wchar_t{0xFFE9}));
+  EXPECT_EQ(Widen("\xB5"), std::wstring(1, wchar_t{0xFFB5}));
+  EXPECT_EQ(Widen("\xE9"), std::wstring(1, wchar_t{0xFFE9}));
 }
 
 TEST(WidenComment, KeepsTheLength) {
-  EXPECT_EQ(WidenComment(""), L"");
-  EXPECT_EQ(WidenComment("a text"), L"a text");
-  EXPECT_EQ(WidenComment(std::string_view("a\0b", 3)), std::wstring(L"a\0b", 3));
+  EXPECT_EQ(WidenComment(nullptr, nullptr), L"");
+  EXPECT_EQ(Widen(""), L"");
+  EXPECT_EQ(Widen("a text"), L"a text");
+  EXPECT_EQ(Widen(std::string_view("a\0b", 3)), std::wstring(L"a\0b", 3));
 }
 
 TEST(SameIgnoringCase, IgnoresTheCaseOfAToZOnly) {
