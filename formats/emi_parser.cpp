@@ -1,7 +1,6 @@
 #include "emi_parser.h"
 
 #include <optional>
-#include <stdexcept>
 
 #include "byte_order.h"
 #include "data_type.h"
@@ -91,12 +90,12 @@ void EmiParser::Walk() {
     if (!stream().good()) return;
     if (id.type == 0) {  // the end of a list
       if (objectPath_.empty()) return;
-      objectPath_.pop_back();
+      objectPath_.CloseInnermost();
       continue;
     }
-    objectPath_.push_back(id);
+    objectPath_.Open(id);
     if (id == kImageObject) ++imageCount_;
-    if (ReadValue()) objectPath_.pop_back();
+    if (ReadValue()) objectPath_.CloseInnermost();
   }
 }
 
@@ -108,14 +107,14 @@ EmiItemId EmiParser::ReadItemId() {
 }
 
 bool EmiParser::ReadValue() {
-  const std::uint16_t type = objectPath_.back().type;
+  const std::uint16_t type = objectPath_.At(-1).type;
   if (const auto bytes = BytesOfNumber(type)) {
-    if (type == kDouble) PathEntry(-3);  // belongs to an object of an object
+    if (type == kDouble) objectPath_.At(-3);  // belongs to an object of an object
     SkipBytes(stream(), *bytes);
     return true;
   }
   if (type == kText) {
-    PathEntry(-2);  // belongs to an object
+    objectPath_.At(-2);  // belongs to an object
     SkipBytes(stream(), ReadLittleEndian<std::uint32_t>(stream()));
     return true;
   }
@@ -128,9 +127,9 @@ bool EmiParser::ReadValue() {
 
 void EmiParser::ReadArray() {
   const auto byteCount = ReadLittleEndian<std::uint32_t>(stream());
-  const EmiItemId id = objectPath_.back();
+  const EmiItemId id = objectPath_.At(-1);
   if (IsDataArray(id.type)) {
-    const bool inImage = PathEntry(-2) == kImageObject;
+    const bool inImage = objectPath_.At(-2) == kImageObject;
     if (inImage && IsPixelArray(id)) ReadPixelArray();
   }
   // The byte count says where the next item is, whatever the array's width and height come to.
@@ -142,16 +141,10 @@ void EmiParser::ReadPixelArray() {
   const auto width = ReadLittleEndian<std::int32_t>(stream());
   const auto height = ReadLittleEndian<std::int32_t>(stream());
   // The array belongs to the image that was opened last.
-  if (const auto type = ElementType(objectPath_.back().type); type && imageCount_ == 1) {
+  if (const auto type = ElementType(objectPath_.At(-1).type); type && imageCount_ == 1) {
     frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, stream().tellg());
   }
   stream().seekg(start);
-}
-
-const EmiItemId& EmiParser::PathEntry(std::ptrdiff_t index) const {
-  const auto depth = static_cast<std::ptrdiff_t>(objectPath_.size());
-  if (-index > depth) throw std::invalid_argument("bad EMI object index");
-  return objectPath_[static_cast<std::size_t>(depth + index)];
 }
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -1,23 +1,14 @@
 // .emi files: a tree of tagged items, some of which are image objects. The first image stands for the file.
 #pragma once
 
-#include <cstddef>
 #include <cstdint>
 #include <istream>
 #include <string_view>
-#include <vector>
 
+#include "emi_object_path.h"
 #include "file_parser.h"
 
 namespace Qel::Lumetra::ShellExt {
-
-/// What every item begins with. Its type says how its value is stored, type and tag together what it means.
-struct EmiItemId {
-  std::uint16_t type = 0;
-  std::uint16_t tag = 0;
-
-  friend bool operator==(const EmiItemId&, const EmiItemId&) = default;
-};
 
 /// Walks once through the whole tree, from the stream's position, counts its images and keeps the first.
 /// The tree may be of any depth: the open items are kept on the heap, four bytes each as in the file.
@@ -29,7 +20,7 @@ class EmiParser final : public FileParser {
   explicit EmiParser(std::istream& stream);
 
   /// The stream may be at its end or have failed in a read.
-  bool IsValid() const { return !stream().bad() && !fault(); }
+  bool IsValid() const { return !stream().bad() && imageCount_ > 0; }
 
   static std::string_view comment() { return "VRA EMI File"; }
 
@@ -42,10 +33,7 @@ class EmiParser final : public FileParser {
   void ReadArray();
   void ReadPixelArray();
 
-  /// An open item: -1 is the innermost one, -2 its parent.
-  const EmiItemId& PathEntry(std::ptrdiff_t index) const;
-
-  std::vector<EmiItemId> objectPath_;  // the open items, innermost last
+  EmiObjectPath objectPath_;
   std::uint64_t imageCount_ = 0;
 };
 
