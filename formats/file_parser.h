@@ -32,7 +32,7 @@ class FileParser {
   /// 0.
   const std::optional<Fault>& fault() const { return fault_; }
 
-  bool IsValid() const { return stream_->good() && !fault_; }
+  bool IsValid() const { return stream_->good(); }
 
   /// Whether the header is read as one that a big-endian machine wrote.
   bool isSwapped() const { return isSwapped_; }

@@ -63,6 +63,8 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   Require(validElements >= 1, "valid elements", validElements, "at least 1");
   Require(totalElements >= validElements, "total elements", totalElements,
           "at least the number of valid elements");
+  // What the elements are is known before the kind of their tags.
+  isImageSeries_ = !fault() && dataTypeId == kImages;
   Require(dataTypeId == kLines || dataTypeId == kImages, "data type id", dataTypeId,
           "0x4122 (images) or 0x4120 (lines)");
   Require(tagTypeId == kTimeTags || tagTypeId == kPositionTags, "tag type id", tagTypeId,
@@ -73,7 +75,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   }
   SkipDimensions(stream, dimensionCount);
   ReadElements(arrayOffset, validElements);
-  Require(dataTypeId == kImages, "This is a series of lines (data type id 0x4120), which have no picture.");
+  Require(isImageSeries_, "This is a series of lines (data type id 0x4120), which have no picture.");
 }
 
 void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {

@@ -15,11 +15,16 @@ class SerParser final : public FileParser {
   /// Throws std::length_error for a text of negative length.
   explicit SerParser(std::istream& stream);
 
+  /// A series of lines is parsed too, but is not valid.
+  bool IsValid() const { return stream().good() && isImageSeries_; }
+
  private:
   void ReadElements(std::uint32_t arrayOffset, std::uint32_t count);
 
   /// Fails the stream for an element that is not there or of an unknown type.
   FrameLayout ReadElement(std::uint32_t position);
+
+  bool isImageSeries_ = false;
 };
 
 }  // namespace Qel::Lumetra::ShellExt

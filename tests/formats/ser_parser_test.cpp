@@ -121,6 +121,27 @@ TEST(Ser, RejectsUnknownKindsOfDataAndTags) {
   EXPECT_FALSE(IsValid(file));
 }
 
+TEST(Ser, AnUnknownKindOfTagsIsAFaultOfTheStreamAlone) {
+  // What the elements are is known by then.
+  SerFile file = OneImage();
+  file.tagTypeId = 0x4143;
+  OpenSer tags(file);
+  EXPECT_TRUE(tags.stream().fail());
+  tags.stream().clear();
+  EXPECT_TRUE(tags->IsValid());
+
+  file.dataTypeId = 0x4121;
+  OpenSer data(file);
+  data.stream().clear();
+  EXPECT_FALSE(data->IsValid());
+
+  file = OneImage();
+  file.seriesId = 0x0196;
+  OpenSer header(file);
+  header.stream().clear();
+  EXPECT_FALSE(header->IsValid());
+}
+
 TEST(Ser, SeriesOfLinesIsParsedButNotValid) {
   SerFile file = OneImage();
   file.dataTypeId = 0x4120;
