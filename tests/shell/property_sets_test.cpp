@@ -318,7 +318,7 @@ TEST_F(PropertySet, IsBuiltOncePerLoad) {
   EXPECT_EQ(Read(before, 3), Number(VT_INT, 512));
 }
 
-TEST_F(PropertySet, HoldsNoReferenceOnTheObjectOfItsFile) {
+TEST_F(PropertySet, HoldsNoReferenceToItsObject) {
   const Sets sets = MakeLoaded();
   const ULONG before = References(sets);
   {

@@ -282,7 +282,7 @@ TEST_F(PropertyStore, RefusesChanges) {
   EXPECT_EQ(stream.writes, 0);
 }
 
-TEST_F(PropertyStore, HoldsOneReferenceOnItsStream) {
+TEST_F(PropertyStore, HoldsOneReferenceToItsStream) {
   ScriptedStream stream(MrcBytes() + MrcBytes());
   {
     const Handler handler = Open(stream);

@@ -75,7 +75,7 @@ ComPtr<Interface> As(const ComPtr<Object>& object, REFIID iid) {
   return answer;
 }
 
-/// Returns how many references exist on `object` besides this one.
+/// Returns how many references to `object` exist besides this one.
 template <class Object>
 ULONG References(const ComPtr<Object>& object) {
   object->AddRef();

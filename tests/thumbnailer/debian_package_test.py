@@ -51,7 +51,7 @@ class Package(unittest.TestCase):
             "./usr/share/thumbnailers/qelthumb.thumbnailer": "-rw-r--r--",
         })
 
-    def test_is_named_and_described_as_debian_wants_it(self):
+    def test_has_the_name_and_description_that_debian_requires(self):
         version = self.field("Version")
         self.assertRegex(version, r"\A\d+\.\d+\.\d+\Z")
         architecture = run("dpkg", "--print-architecture").strip()
@@ -64,12 +64,12 @@ class Package(unittest.TestCase):
             self.assertLessEqual(len(line), 80)
         self.assertIn(".mrc", " ".join(description))
 
-    def test_depends_on_the_libraries_of_the_program_and_on_what_reads_its_types(self):
+    def test_depends_on_the_libraries_of_the_program_and_on_the_package_that_reads_its_types(self):
         depends = self.field("Depends")
         for package in ("libc6", "libpng16-16", "libstdc++6", "shared-mime-info"):
             self.assertRegex(depends, rf"(^|, ){re.escape(package)}(t64)?( \(|,|$)")
 
-    def test_holds_a_stripped_program_whose_addresses_cannot_be_overwritten(self):
+    def test_contains_a_stripped_program_with_read_only_relocations(self):
         program = self.root / "usr" / "bin" / "qelthumb"
         self.assertNotIn(".symtab", run("readelf", "--wide", "--section-headers", program))
         self.assertIn("GNU_RELRO", run("readelf", "--wide", "--program-headers", program))
@@ -83,7 +83,7 @@ class Package(unittest.TestCase):
         thumbnailer = (share / "thumbnailers/qelthumb.thumbnailer").read_text()
         self.assertEqual(re.search(r"(?m)^MimeType=(.*)$", thumbnailer)[1].strip(";").split(";"), types)
 
-    def test_holds_documents_that_are_compressed_without_a_time(self):
+    def test_contains_documents_that_are_compressed_without_a_time(self):
         for name, beginning in (("doc/qelthumb/changelog.gz", f"qelthumb ({self.field('Version')})"),
                                 ("man/man1/qelthumb.1.gz", ".TH QELTHUMB 1 ")):
             content = (self.root / "usr" / "share" / name).read_bytes()
