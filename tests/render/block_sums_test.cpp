@@ -28,7 +28,8 @@ TYPED_TEST_SUITE(ExactBlockSumsOf, ExactSamples);
 
 TYPED_TEST(ExactBlockSumsOf, ExtremeValuesDoNotOverflowAtAnyFactor) {
   using Limits = std::numeric_limits<TypeParam>;
-  // 181 squared is the largest number of 16-bit samples that is summed in 32 bits. 8-bit lanes hold 255 rows.
+  // Blocks of 181 by 181 16-bit samples are the largest that are folded in 32 bits. 8-bit lanes hold 255
+  // rows.
   for (const std::int32_t factor : {2, 8, 15, 16, 181, 182, 200, 255, 256, 257, 258, 259, 300, 600}) {
     for (const TypeParam value : {Limits::min(), Limits::max()}) {
       EXPECT_EQ(SumOfSquare(factor, value), std::int64_t{factor} * factor * value) << factor;

@@ -166,7 +166,7 @@ TEST_F(ClassObjects, AggregatedObjectsBelongToTheirOuterObject) {
     EXPECT_EQ(dll_.LockCount(), 1);
     EXPECT_EQ(outer.references(), 1u);
     {
-      // The inner object's IUnknown counts references on the inner object, its other interfaces on the outer
+      // The inner object's IUnknown counts references to the inner object, its other interfaces to the outer
       // one.
       const auto same = As<IUnknown>(outer.inner, IID_IUnknown);
       EXPECT_EQ(same.Get(), outer.inner.Get());
