@@ -18,7 +18,7 @@ FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t positio
 
 FrameLayout FlippedVertically(const FrameLayout& layout) {
   FrameLayout flipped = layout;
-  flipped.firstPixel += (layout.size.height - std::int64_t{1}) * layout.rowStride;
+  flipped.firstPixel = layout.blockBytes - layout.rowStride;  // height * rowStride may not fit in 64 bits
   flipped.rowStride = -layout.rowStride;
   return flipped;
 }

@@ -25,7 +25,7 @@ struct FrameLayout {
 /// Returns the layout of rows without padding, from the top, that begin at file offset `position`.
 FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t position);
 
-/// Returns the layout of the same rows with the first one at the bottom of the picture.
+/// Returns the layout of the same packed rows with the first one at the bottom of the picture.
 FrameLayout FlippedVertically(const FrameLayout& layout);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -334,5 +334,12 @@ TEST(MrcThumbnail, HugeSectionsHaveNone) {
   }
 }
 
+TEST(MrcThumbnail, SectionsWhoseBytesExceed64BitsHaveNone) {
+  // Only a swapped header can have both sizes this large.
+  const MrcFile file{.nx = kMax, .ny = kMax, .mode = 4, .order = ByteOrder::kBigEndian, .pixels = "x"};
+  EXPECT_TRUE(IsValid(file));
+  EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);
+}
+
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt
