@@ -6,6 +6,7 @@
 #include <locale>
 
 #include "ebn_file.h"
+#include "memory_buffer.h"
 #include "open_file.h"
 
 namespace Qel::Lumetra::ShellExt {
@@ -105,6 +106,20 @@ TEST(Ebn, HugePicturesHaveNoThumbnail) {
     EXPECT_EQ(OpenEbn(file)->GetDimensions(), size);
     EXPECT_EQ(OpenEbn(file).Thumbnail({256, 256}).width, 0);
   }
+}
+
+TEST(Ebn, PictureWhosePixelsWrapHasNoThumbnailThoughItsBytesAreThere) {
+  EbnFile file;
+  file.width = 0x10000;
+  file.height = 0x10001;
+  const std::string head = file.Bytes();
+  Testing::MemoryBuffer buffer(head);
+  buffer.zerosBehind = std::int64_t{6} << 30;
+  std::istream stream(&buffer);
+  const EbnFileInfo ebn(stream);
+  EXPECT_TRUE(ebn.IsValid());
+  EXPECT_EQ(Testing::TakeBitmap(ebn.CreateThumbnail({256, 256})).width, 0);
+  EXPECT_EQ(buffer.bytesRead, static_cast<std::int64_t>(head.size()));
 }
 
 TEST(EbnComment, NamesTheMicroscope) {

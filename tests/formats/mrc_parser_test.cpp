@@ -178,6 +178,13 @@ TEST(MrcComment, HasAtMostTenLabels) {
   }
 }
 
+TEST(MrcComment, NumberOfLabelsHasTheByteOrderOfTheHeader) {
+  MrcFile file{.nx = 2, .ny = 2, .order = ByteOrder::kBigEndian};
+  file.labels = {"used", "not used"};
+  file.nlabl = 1;
+  EXPECT_EQ(OpenMrc(file)->GetComment(), L"used");
+}
+
 TEST(MrcComment, WidensBytesWithTheirSign) {
   MrcFile file;
   file.labels = {"5 \xB5m"};
@@ -317,6 +324,17 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
   EXPECT_EQ(width(0, 1, 256), 1);
   EXPECT_EQ(width(0, 0x1000001, 256), 0);  // 2^32 + 256 pixels
   EXPECT_EQ(width(2, 0x1000001, 64), 0);   // 2^30 + 64 pixels, 2^32 + 256 bytes
+}
+
+TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneThoughItsBytesAreThere) {
+  const std::string head = MrcFile{.nx = 0x1000001, .ny = 256}.Bytes();
+  Testing::MemoryBuffer buffer(head);
+  buffer.zerosBehind = std::int64_t{6} << 30;
+  std::istream stream(&buffer);
+  const MrcFileInfo mrc(stream, L"mrc");
+  EXPECT_TRUE(mrc.IsValid());
+  EXPECT_EQ(Testing::TakeBitmap(mrc.CreateThumbnail({256, 256})).width, 0);
+  EXPECT_EQ(buffer.bytesRead, 1024);
 }
 
 TEST(MrcThumbnail, HugeSectionsHaveNone) {

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <limits>
 
+#include "memory_buffer.h"
 #include "open_file.h"
 #include "raw_file.h"
 
@@ -218,6 +219,35 @@ TEST(Raw, ExtentThatWrapsCannotBeRead) {
   file.pixelStride = 0x10000;
   EXPECT_TRUE(OpenRaw(file)->IsValid());
   EXPECT_EQ(OpenRaw(file).Thumbnail({0x10001, 1}).width, 0);
+}
+
+TEST(Raw, ExtentThatWrapsCannotBeReadThoughItsBytesAreThere) {
+  struct Row {
+    std::int32_t width, height, offset, pixelStride, rowStride;
+  };
+  constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
+  constexpr Row kRows[] = {
+      {0x10001, 1, 0, 0x10000, 0},        // across a row
+      {1, 0x10001, 0, 0, 0x10000},        // down a column
+      {2, 1, 0x40000000, 0x40000000, 0},  // with the offset
+      {1, 2, 0x40000000, 0, 0x40000000},  //
+      {2, 2, 0, 0x40000000, 0x40000000},  // both ways
+      {1, 1, kMax, 0, 0},                 // with the bytes of the pixel
+  };
+  for (const Row& row : kRows) {
+    RawFile file = PackedRawFile(DataType::kUInt8, row.width, row.height, "");
+    file.offset = row.offset;
+    file.pixelStride = row.pixelStride;
+    file.rowStride = row.rowStride;
+    const std::string head = file.Bytes();
+    Testing::MemoryBuffer buffer(head);
+    buffer.zerosBehind = std::int64_t{6} << 30;
+    std::istream stream(&buffer);
+    const RawFileInfo raw(stream);
+    EXPECT_TRUE(raw.IsValid());
+    EXPECT_EQ(Testing::TakeBitmap(raw.CreateThumbnail({row.width, row.height})).width, 0) << &row - kRows;
+    EXPECT_EQ(buffer.bytesRead, 49);
+  }
 }
 
 /// Whether all pixels of a file with 8-bit pixels lie in its block, in arithmetic that cannot wrap.

@@ -5,6 +5,7 @@
 #include <limits>
 #include <stdexcept>
 
+#include "memory_buffer.h"
 #include "open_file.h"
 #include "ser_file.h"
 
@@ -310,6 +311,30 @@ TEST(Ser, ElementsThatAreNotThereFailTheFile) {
     file.offsetArrayOffset = offset;
     EXPECT_FALSE(IsValid(file)) << offset;
   }
+}
+
+/// A series of 2000 elements whose offsets, all 0, begin just below 4 GiB. The header is an element too. What
+/// lies a little after it is no offset and no element.
+TEST(Ser, OffsetArraysCanPass4GiB) {
+  constexpr std::uint32_t kArrays = 0xFFFFFFF0;
+  constexpr std::uint32_t kCount = 2000;
+  SerFile file;
+  file.dimensions.clear();
+  file.totalElements = kCount;
+  file.validElements = kCount;
+  file.offsetArrayOffset = kArrays;
+  file.offsetArrays = std::string(10, '\0') + BytesOf<std::int16_t>({1}) + BytesOf<std::uint32_t>({1, 1}) +
+                      std::string(20'000, '\xFF');
+  const std::string head = file.Bytes();
+  const auto isValid = [&head](std::int64_t size) {
+    Testing::MemoryBuffer buffer(head);
+    buffer.zerosBehind = size - static_cast<std::int64_t>(head.size());
+    std::istream stream(&buffer);
+    return SerFileInfo(stream).IsValid();
+  };
+  constexpr std::int64_t kEnd = kArrays + std::int64_t{8} * kCount;
+  EXPECT_TRUE(isValid(kEnd));
+  EXPECT_FALSE(isValid(kEnd - 1));
 }
 
 TEST(Ser, HugeImagesHaveNoThumbnail) {

@@ -27,6 +27,7 @@ class MemoryBuffer : public std::streambuf {
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
   std::int64_t largestRead = 0;
+  std::int64_t readsBackward = 0;  // those that begin before the end of the read before them
 
  protected:
   std::streamsize xsgetn(char* target, std::streamsize count) override {
@@ -37,6 +38,8 @@ class MemoryBuffer : public std::streambuf {
       if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
       got = failure == Failure::kBringsHalf ? got / 2 : 0;
     }
+    if (position_ < endOfLastRead_) ++readsBackward;
+    endOfLastRead_ = position_ + got;
     const std::streamsize copied = std::clamp<std::streamsize>(stored - position_, 0, got);
     std::copy_n(bytes_.begin() + std::min(position_, stored), copied, target);
     std::fill(target + copied, target + got, '\0');
@@ -73,6 +76,7 @@ class MemoryBuffer : public std::streambuf {
  private:
   std::string_view bytes_;
   std::streamoff position_ = 0;
+  std::streamoff endOfLastRead_ = 0;
 };
 
 }  // namespace Qel::Lumetra::ShellExt::Testing
