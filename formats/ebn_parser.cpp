@@ -98,7 +98,7 @@ EbnParser::EbnParser(std::istream& stream) : FileParser(stream) {
   Require(type && typeCode <= kMaxTypeCode, "data type code", typeCode, "from 1 to 8");
   Require(width >= 1, "width", width, "at least 1");
   Require(height >= 1, "height", height, "at least 1");
-  Require(dataOffset >= kHeaderBytes, "data offset", dataOffset, "at least 54, behind the header");
+  Require(dataOffset >= kHeaderBytes, "data offset", dataOffset, "at least 54, the size of the header");
   if (fault()) {
     stream.setstate(std::ios_base::failbit);
     return;

@@ -49,7 +49,7 @@ FaultText FrameText(const FrameLayout& frame, std::int64_t end) {
   }
   const std::int64_t frameEnd = frame.blockPosition + frame.blockBytes;
   if (frameEnd > end) {
-    return {"The file is cut short: the picture takes the bytes up to " + std::to_string(frameEnd) +
+    return {"The file is cut short: the picture ends at byte " + std::to_string(frameEnd) +
                 ", and the file has " + Bytes(end) + ".",
             kIncomplete};
   }
@@ -60,7 +60,7 @@ template <Parser KindParser>
 FaultText TextOf(const KindParser& parser, std::int64_t end) {
   if (end == 0) return {"The file is empty.", kIncomplete};
   if (parser.stream().eof()) {
-    return {"The file ends before its header and index do: it has only " + Bytes(end) + ".", kIncomplete};
+    return {"The file ends within its header or index: it has only " + Bytes(end) + ".", kIncomplete};
   }
   if (parser.fault()) return HeaderText(*parser.fault(), parser.isSwapped());
   return FrameText(parser.frame(), end);
@@ -78,9 +78,9 @@ std::optional<FaultText> ExplainFault(std::istream& stream, const std::wstring& 
       text = TextOf(KindParser(stream), end);
     } catch (const std::exception& e) {
       stream.clear();
-      text = {"The contents cannot be followed beyond byte " + std::to_string(stream.tellg()) + ": " +
-                  e.what() + ".",
-              "The file is damaged: copy it again."};
+      text = {
+          "The contents cannot be read beyond byte " + std::to_string(stream.tellg()) + ": " + e.what() + ".",
+          "The file is damaged: copy it again."};
     }
   });
   return text;

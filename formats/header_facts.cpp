@@ -50,7 +50,7 @@ std::vector<HeaderFact> HeaderFacts(std::istream& stream, const std::wstring& ex
     try {
       facts = FactsOf(KindParser(stream));
     } catch (const std::exception&) {
-      // Why the contents cannot be followed is explained by FaultText.
+      // Why the contents cannot be followed is explained by ExplainFault.
     }
   });
   return facts;

@@ -46,7 +46,7 @@ fail() {
 }
 
 # takes_no_arguments "$@": ends a script that has got some.
-takes_no_arguments() { [[ $# -eq 0 ]] || fail "'$1' is one argument too many, see scripts/${0##*/} --help"; }
+takes_no_arguments() { [[ $# -eq 0 ]] || fail "unexpected argument '$1', see scripts/${0##*/} --help"; }
 
 # help_if_asked "$@": prints the comment that opens the calling script when its first argument asks for help.
 help_if_asked() {

@@ -46,8 +46,9 @@ TEST(FaultText, IsNoneForAnUnknownExtension) {
 TEST(FaultText, NamesTheFirstFieldThatIsNotAcceptable) {
   EXPECT_EQ(TextOf(MrcFile{.nx = 0, .mode = 99}.Bytes(), L"mrc"),
             "The header is not acceptable: nx is 0 and must be at least 1.");
-  EXPECT_EQ(TextOf(EbnFile{.dataOffset = 53}.Bytes(), L"ebn"),
-            "The header is not acceptable: data offset is 53 and must be at least 54, behind the header.");
+  EXPECT_EQ(
+      TextOf(EbnFile{.dataOffset = 53}.Bytes(), L"ebn"),
+      "The header is not acceptable: data offset is 53 and must be at least 54, the size of the header.");
 }
 
 TEST(FaultText, WritesACodeAsItsRuleDoes) {
@@ -75,9 +76,9 @@ TEST(FaultText, NamesAnElementOfAnUnknownType) {
 
 TEST(FaultText, TellsOfAFileThatEndsBeforeItsPicture) {
   EXPECT_EQ(TextOf("", L"mrc"), "The file is empty.");
-  EXPECT_EQ(TextOf("J", L"emi"), "The file ends before its header and index do: it has only 1 byte.");
+  EXPECT_EQ(TextOf("J", L"emi"), "The file ends within its header or index: it has only 1 byte.");
   EXPECT_EQ(TextOf(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"),
-            "The file is cut short: the picture takes the bytes up to 56, and the file has 55 bytes.");
+            "The file is cut short: the picture ends at byte 56, and the file has 55 bytes.");
 }
 
 TEST(FaultText, TellsOfAFileWithoutAPicture) {
@@ -118,7 +119,7 @@ TEST(FaultText, AdvisesWhatToDo) {
 
 TEST(FaultText, TellsOfContentsThatCannotBeFollowed) {
   EXPECT_EQ(TextOf(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),
-            "The contents cannot be followed beyond byte 12: bad EMI object index.");
+            "The contents cannot be read beyond byte 12: bad EMI object index.");
 }
 
 }  // namespace

@@ -125,7 +125,7 @@ class LongStages(WithSubstitutes):
     def test_end_with_their_command(self):
         status, errors = self.run_script("build", "windows", cmake="if [[ $1 == --build ]]; then echo No; exit 1; fi")
         self.assertEqual(status, 1)
-        self.assertTrue(errors.endswith("No\nbuild: preset windows does not build, the messages stand above\n"), errors)
+        self.assertTrue(errors.endswith("No\nbuild: cannot build the preset windows, see above\n"), errors)
 
 
 class Wine(unittest.TestCase):

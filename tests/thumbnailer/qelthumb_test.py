@@ -141,8 +141,8 @@ class Fault(Test):
         for name, sentence in (
             ("damaged.mrc", "The header is not acceptable: mode is 99 and must be from 0 to 16."),
             ("damaged.ser", "The header is not acceptable: series id is 0x0198 and must be 0x0197."),
-            ("damaged.emi", "The contents cannot be followed beyond byte 12: bad EMI object index."),
-            ("truncated.mrc", "The file is cut short: the picture takes the bytes up to 820224, and the file has "
+            ("damaged.emi", "The contents cannot be read beyond byte 12: bad EMI object index."),
+            ("truncated.mrc", "The file is cut short: the picture ends at byte 820224, and the file has "
                               "102528 bytes."),
         ):
             with self.subTest(name=name):

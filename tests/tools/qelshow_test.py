@@ -210,8 +210,8 @@ class CommandLine(Test):
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         machine = struct.unpack_from("<i", dll, 60)[0] + 4
         for name, contents, part in (
-            ("empty.dll", b"", "damaged or no DLL"),
-            ("cut.dll", dll[:len(dll) // 2], "damaged or no DLL"),
+            ("empty.dll", b"", "damaged or not a DLL"),
+            ("cut.dll", dll[:len(dll) // 2], "damaged or not a DLL"),
             ("x86.dll", dll[:machine] + b"\x4C\x01" + dll[machine + 2:], "32-bit"),
             ("arm.dll", dll[:machine] + b"\x64\xAA" + dll[machine + 2:], "other processors"),
             ("needy.dll", dll.replace(b"SHLWAPI.dll", b"NOTHERE.dll"), "another DLL that it needs is missing"),
@@ -397,9 +397,9 @@ class Output(Test):
         self.write("site/index.html", b"<!DOCTYPE html><title>Mine</title>")
         self.write("album/pictures/1.png", b"mine")
         for out in ("photo.png", "empty.png"):
-            self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "not written by qelshow"))
+            self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "not written by this version of qelshow", "delete it", "--out"))
         for folder, file in (("site", "index.html"), ("album", "1.png")):
-            self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by qelshow"))
+            self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by this version of qelshow", "delete it", "--out"))
 
     def test_is_no_folder_where_a_file_is_wanted_and_no_file_where_a_folder_is(self):
         (self.folder / "folder").mkdir()
@@ -651,14 +651,15 @@ class Answers(Test):
         names = ["n" * (length - len("Z:" + folder + "/")) for length in (259, 260)]
         longest, too_long = self.info(*(self.write(f"{folder}/{name[:-4]}.mrc", mrc()) for name in names))
         self.assertEqual([len(file["columns"]["items"]) for file in (longest, too_long)], [6, 0])
+        self.assertEqual([(file["width"], file["height"], file["frames"]) for file in (longest, too_long)], [(4, 3, 1)] * 2)
         self.assertIn("260 characters or more", too_long["columns"]["problem"])
         self.assertIsNone(longest["remark"])
         self.assertOneSentence(too_long["remark"], "260 characters", "no columns")
 
     def test_of_a_damaged_file_say_why_they_are_missing(self):
         file, = self.info(self.write("a.mrc", mrc(mode=17)))
-        self.assertEqual(file["tip"]["problem"], "The extension gives no tip: failed.")
-        self.assertEqual(file["propertySets"]["problem"], "The extension gives no property sets: failed.")
+        self.assertEqual(file["tip"]["problem"], "The extension returns no tip: failed.")
+        self.assertEqual(file["propertySets"]["problem"], "The extension returns no property sets: failed.")
         self.assertEqual({column["problem"] for column in file["columns"]["items"]}, {"no value"})
         self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"failed"})
         self.assertEqual({item["value"] for name in ("columns", "propertyStore") for item in file[name]["items"]}, {None})
@@ -854,7 +855,7 @@ class Page(Test):
 
 
 # What the doctor says under Wine, whose shell shows no thumbnails and properties to programs.
-UNANSWERED = "The shell of this system does not tell what it shows."
+UNANSWERED = "The shell of this system does not report what it shows."
 
 
 class Doctor(Test):
@@ -966,7 +967,7 @@ class Doctor(Test):
             with self.subTest(files=files):
                 result = run("doctor", *files, server=None)
                 self.assertEqual((result.returncode, result.stderr), (status, ""))
-                self.assertRegex(result.stdout, rf"{re.escape(str(good))}: is read, 300 x 200 pixels, frames: 2, 8 bit.*\n"
+                self.assertRegex(result.stdout, rf"{re.escape(str(good))}: is read, 300 x 200 pixels, 2 frames, 8 bit.*\n"
                                                 rf" +{re.escape(UNANSWERED)}\n")
                 for path, part in bad.items():
                     lines = [line for line in result.stdout.splitlines() if str(path) in line]
@@ -1033,7 +1034,7 @@ class Doctor(Test):
         ):
             self.set_dll(self.write(name, contents), clsid)
         document = self.assertProblems(
-            ("text.dll", "damaged or no DLL", "Install QelShellExt again."),
+            ("text.dll", "damaged or not a DLL", "Install QelShellExt again."),
             ("x86.dll", "32-bit", "Install QelShellExt again."),
             ("plain.dll", "does not export DllGetClassObject", "Install QelShellExt again."))
         self.assertWorksBut(document, {f".{kind} property store": "DLL not loaded" for kind in ("ebn", "raw", "mrc")}
@@ -1082,7 +1083,7 @@ class Doctor(Test):
         told = self.left_out(document)
         self.assertEqual(list(told), [".ser", ".raw"])
         for kind, sentence in told.items():
-            self.assertOneSentence(sentence, f"Nothing of QelShellExt is registered for {kind} files",
+            self.assertOneSentence(sentence, f"QelShellExt is not registered for {kind} files",
                                    f'run regsvr32 "Z:{SERVER}"'.replace("/", "\\"))
         missing = [".raw property store", (".raw", "property store")] + [
             (kind, role) for kind in told for role in ("thumbnail", "info tip", "properties")]
@@ -1103,7 +1104,7 @@ class Doctor(Test):
         result = run("doctor", file, server=None)
         self.assertEqual((result.returncode, result.stderr), (FAILED, ""))
         self.assertRegex(result.stdout, r"a\.raw: is read, 4 x 4 .*\n +Windows does not ask QelShellExt for \.raw files")
-        self.assertRegex(result.stdout, r"Left to other programs\n +Nothing .*\.ser files.*\n +Nothing .*\.raw files")
+        self.assertRegex(result.stdout, r"Left to other programs\n +QelShellExt .*\.ser files.*\n +QelShellExt .*\.raw files")
         result, document = self.doctor(self.write("a.mrc", mrc()))
         self.assertEqual((result.returncode, document["files"][0]["remark"]), (DONE, None))
         result, document = self.doctor(file)
@@ -1151,6 +1152,41 @@ class Doctor(Test):
         self.assertEqual({each["dll"] for each in document["classes"]}, {f"Z:{dll}".replace("/", "\\")})
         self.assertEqual({handler["class"] for kind in document["kinds"] for handler in kind["handlers"]},
                          {self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE})
+
+    def test_explains_damaged_and_hidden_files_and_says_what_to_do(self):
+        good = self.write("good.mrc", mrc())
+        os.symlink("circle.mrc", self.folder / "circle.mrc")
+        windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
+        icons = "HKEY_CURRENT_USER" + windows + "Explorer\\Advanced@IconsOnly"
+        policy = "HKEY_LOCAL_MACHINE" + windows + "Policies\\Explorer@DisableThumbnails"
+        self.addCleanup(self.set_registry, {icons: None, policy: None})
+
+        def explains(file, status, *parts):
+            with self.subTest(parts):
+                result = run("doctor", file, server=None)
+                self.assertEqual((result.returncode, result.stderr), (status, ""))
+                self.assertRegex(result.stdout, "(?s)" + ".*".join(map(re.escape, parts)))
+
+        explains(good, FAILED, "is not registered on this computer", "Problems", "run regsvr32", "as administrator.")
+        self.register()
+        explains(self.write("cut.mrc", mrc(200, 100, 3)[:41000]), DAMAGED, "cut short", "41000 bytes", "Copy it again")
+        explains(self.write("empty.ser", b""), DAMAGED, "The file is empty.", "Copy it again, or wait")
+        explains(self.write("photo.raw", b"II*\0" + bytes(300)), DAMAGED, "must be the text \"QEL RawImage\"",
+                 "Check that the file is of the kind that its extension says.")
+        explains(self.write("notes.txt", b"notes"), UNSUPPORTED, "shows .mrc", "give it that extension")
+        explains(self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3))), DAMAGED, "in colour and smaller",
+                 "View it with smaller icons")
+        explains(self.write("f" * 120 + "/" + "n" * 140 + ".mrc", mrc()), DONE, "is read, 4 x 3 pixels, 1 frame, 8 bit",
+                 "260 characters", "shorten a name")
+        explains(self.folder / "circle.mrc", FAILED, "cannot be opened", "Check that you have permission")
+        self.set_registry({icons: 1, policy: 0})
+        explains(good, FAILED, "\"Always show icons, never thumbnails\"", "clear it in Folder Options")
+        self.set_registry({icons: 0, policy: 1})
+        explains(good, FAILED, "the policy \"Turn off the display of thumbnails", "ask an administrator to remove it")
+        self.set_registry({policy: 0})
+        self.leave_out("raw", self.RAW_STORE)
+        explains(self.write("a.raw", raw(4, 4, 0, 8, bytes(16))), FAILED, "is not registered for .raw files",
+                 "To have it show them, run regsvr32")
 
     def test_names_the_settings_of_windows_that_hide_thumbnails(self):
         windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
@@ -1216,7 +1252,7 @@ class Doctor(Test):
                            choice + "@ProgId": "Peeker.Chosen", types[0] + "\\" + self.INFO_TIP: self.FOREIGN,
                            self.CLASSES + ".emi": "Peeker.Newer", types[1] + "\\" + self.NEWER_THUMBNAIL: self.FOREIGN,
                            self.CLASSES + ".raw": "Peeker.Plain", types[2] + "\\" + self.THUMBNAIL: self.FOREIGN})
-        told = (self.FOREIGN, "goes before", "remove that key")
+        told = (self.FOREIGN, "takes precedence", "remove that key")
         document = self.assertProblems(
             (".mrc", r"HKEY_CLASSES_ROOT\.mrc" + "\\" + self.NEWER_THUMBNAIL, *told),
             (".ser", r"HKEY_CLASSES_ROOT\Peeker.Chosen" + "\\" + self.INFO_TIP, *told),

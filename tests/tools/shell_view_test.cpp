@@ -245,7 +245,7 @@ TEST_F(ShellComparison, KnowsAShellThatDoesNotAnswer) {
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kUnanswered);
   EXPECT_EQ(view.properties.agreement, Agreement::kUnanswered);
   EXPECT_TRUE(IsInOrder(view));
-  EXPECT_EQ(ShellSentence(view, L"a.mrc"), L"The shell of this system does not tell what it shows.");
+  EXPECT_EQ(ShellSentence(view, L"a.mrc"), L"The shell of this system does not report what it shows.");
 }
 
 }  // namespace

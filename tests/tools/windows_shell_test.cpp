@@ -75,7 +75,8 @@ class WindowsShell : public testing::Test {
       EXPECT_TRUE(agreement != Agreement::kDiffers && agreement != Agreement::kNothing)
           << Utf8(asked.path) << ": " << Utf8(ShellSentence(asked.view, asked.path));
     }
-    if (!isAnswered && !HasFailure()) GTEST_SKIP() << "The shell of this system does not tell what it shows.";
+    if (!isAnswered && !HasFailure())
+      GTEST_SKIP() << "The shell of this system does not report what it shows.";
   }
 
   const Testing::TempFolder folder_;

@@ -21,22 +21,22 @@ commands:
   info FILE...           everything that the shell learns about each file
   thumbnail FILE -o PNG  the thumbnail of one file
   page FOLDER|FILE...    a page of all thumbnails and everything else
-  doctor [FILE...]       whether the extension works, and if not, why
+  doctor [FILE...]       whether the extension works, and what to do if not
   help COMMAND           more about a command
   --version              the version of this program
 
-FILE can be a pattern, such as *.mrc. After "--" every word is a FILE.
+FILE can be a pattern such as *.mrc. After "--" every argument is a FILE.
 
 options of info, thumbnail and page:
-  --server PATH  ask this QelShellExt.DLL instead of the registered one
-  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
+  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
-exit status, of several files the highest:
+exit status, the highest one of several files:
   0  done
-  1  failed: something cannot be read, written or loaded
+  1  something cannot be read, written or loaded
   2  the command line is wrong
-  3  a file is of no kind that the extension shows
-  4  a file is damaged: it has no thumbnail
+  3  the kind of a file is not supported
+  4  a file has no thumbnail, for example because it is damaged
 )";
 
 constexpr const wchar_t* kInfoHelp =
@@ -47,24 +47,24 @@ thumbnail or why there is none, the tip, the columns of the Details view with
 the declared and the delivered types, the property sets, the property store.
 
   --json         print one JSON document: {"schema": 2, "files": [...]}
-  --server PATH  ask this QelShellExt.DLL instead of the registered one
-  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
+  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported
-kind, 4 a damaged file; of several files the highest
+exit status: 0 done, 1 failed, 2 wrong command line, 3 the kind of a file is not
+supported, 4 a file has no thumbnail; the highest one of several files
 )";
 
 constexpr const wchar_t* kThumbnailHelp =
     LR"(usage: qelshow thumbnail FILE -o PNG [--server PATH] [--size N]
 
-Writes the thumbnail of the file as a PNG image.
+Writes the thumbnail of a file as a PNG image.
 
   -o, --out PNG  the file to write; - for standard output
-  --server PATH  ask this QelShellExt.DLL instead of the registered one
-  --size N       ask for a thumbnail of N by N pixels (1 to 4096, else 256)
+  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --size N       request a thumbnail of N by N pixels (1 to 4096; default 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 a file of no supported
-kind, 4 a damaged file
+exit status: 0 done, 1 failed, 2 wrong command line, 3 the kind of the file is
+not supported, 4 the file has no thumbnail
 )";
 
 constexpr const wchar_t* kPageHelp =
@@ -72,33 +72,34 @@ constexpr const wchar_t* kPageHelp =
 
 Writes DIR\index.html, a page of the files' thumbnails with everything else that
 the shell learns about them, and prints a table of the files. The page needs
-nothing but its folder. Of a folder, all files of the supported kinds are shown,
-those in the folders below it too.
+only its own folder. FOLDER stands for all files of the supported kinds in it
+and in its subfolders.
 
-  -o, --out DIR  the folder of the page, made if it is missing; else
-                 qelshow-page in the current folder
-  --server PATH  ask this QelShellExt.DLL instead of the registered one
-  --size N       ask for thumbnails of N by N pixels (1 to 4096, else 256)
+  -o, --out DIR  the folder of the page, created if it does not exist (default:
+                 qelshow-page in the current folder)
+  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
-exit status: 0 the page is written, whatever it says about single files,
-1 failed, 2 wrong command line, 3 no file of a supported kind, so no page
+exit status: 0 the page is written, even if files have no thumbnail, 1 failed,
+2 wrong command line, 3 no page, because no file is of a supported kind
 )";
 
 constexpr const wchar_t* kDoctorHelp =
     LR"(usage: qelshow doctor [FILE...] [--json]
 
-Says whether the extension works on this computer: for each kind of file which
-handlers are registered, whether their DLL is found and loads, its version, and
-whether objects of its classes can be made; and whether the registered extension
-reads each file. What is wrong is told with its reason and what to do about it.
-A kind of file that was left to other programs is no fault.
+Reports whether the extension works on this computer: for each file kind, which
+handlers are registered, whether their DLL exists and loads, its version, and
+whether objects of its classes can be created; whether settings of Windows hide
+thumbnails; and whether the registered extension can read each FILE. For each
+problem, it gives the reason and says what to do. A file kind that was left to
+other programs is not a problem.
 
   --json  print one JSON document: {"schema": 2, "classes": [...],
           "kinds": [...], "problems": [...], "files": [...]}
 
-exit status: 0 everything works, 1 something does not, or a file is of a kind
-that was left to other programs, 2 wrong command line, 3 a file of no supported
-kind, 4 a damaged file; of several the highest
+exit status: 0 everything works, 1 something does not work, or a file is of a
+kind that was left to other programs, 2 wrong command line, 3 the kind of a file
+is not supported, 4 a file has no thumbnail; the highest one that applies
 )";
 
 struct CommandFacts {
@@ -171,7 +172,7 @@ class OptionReader {
       if (argument.size() < 2 || argument.front() != L'-') {
         line.files.push_back(argument);
       } else if (!ReadOption(argument, line)) {
-        WrongUsage(L"\"" + argument + L"\" is no option of \"" + facts_.name + L"\".", facts_.name);
+        WrongUsage(L"\"" + argument + L"\" is not an option of \"" + facts_.name + L"\".", facts_.name);
       }
     }
     Check(line);
@@ -212,17 +213,16 @@ class OptionReader {
 
   /// Completes the line, or finds that it cannot be carried out.
   void Check(CommandLine& line) const {
-    if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is named.", facts_.name);
+    if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is given.", facts_.name);
     if (line.command == Command::kThumbnail && line.files.size() > 1) {
-      WrongUsage(L"A thumbnail is made of one file, not of " + std::to_wstring(line.files.size()) + L".",
-                 facts_.name);
+      WrongUsage(L"thumbnail takes one file, not " + std::to_wstring(line.files.size()) + L".", facts_.name);
     }
     if (line.command == Command::kPage && line.out.empty()) line.out = kPageFolder;
     if (facts_.takesOut && line.out.empty()) {
-      WrongUsage(L"The option --out, which says where to write, is missing.", facts_.name);
+      WrongUsage(L"--out is missing: it names the file to write.", facts_.name);
     }
     if (line.command == Command::kPage && line.out == L"-") {
-      WrongUsage(L"A page is a folder of files, which cannot be written to standard output.", facts_.name);
+      WrongUsage(L"A page cannot be written to standard output: name a folder with --out.", facts_.name);
     }
   }
 
@@ -239,7 +239,7 @@ CommandLine ParseCommandLine(const std::vector<std::wstring>& arguments) {
   const bool isVersion = first == L"--version";
   if (isVersion || first == L"help" || IsHelp(first)) {
     const std::size_t count = first == L"help" ? 2 : 1;
-    if (arguments.size() > count) WrongUsage(L"\"" + arguments[count] + L"\" is one argument too many.");
+    if (arguments.size() > count) WrongUsage(L"Unexpected argument \"" + arguments[count] + L"\".");
     if (isVersion) return HelpLine(kVersion);
     return HelpLine(arguments.size() == 2 ? FindCommand(arguments[1]).help : kHelp);
   }

@@ -43,7 +43,7 @@ Worker StartWorker(const CommandLine& line) {
   } catch (const Failure& failure) {
     if (!line.server.empty()) throw;
     throw Failure(failure.sentence +
-                  L" \"qelshow doctor\" says what to do; --server names a DLL that is not registered.");
+                  L" Run \"qelshow doctor\" to find out what to do, or name a DLL with --server.");
   }
 }
 

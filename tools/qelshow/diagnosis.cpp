@@ -50,7 +50,7 @@ Diagnosis Unreachable(const std::wstring& path, DWORD error) {
       return {Verdict::kFailed, problem + SystemErrorText(error) + L".", L"Check its name and its folder."};
     default:
       return {Verdict::kFailed, problem + SystemErrorText(error) + L".",
-              L"Check that you may read it, and that no other program keeps it for itself."};
+              L"Check that you have permission to read it and that no other program has locked it."};
   }
 }
 
@@ -60,7 +60,7 @@ Diagnosis Diagnose(const std::wstring& path) {
   const DWORD attributes = GetFileAttributesW(path.c_str());
   if (attributes == INVALID_FILE_ATTRIBUTES) return Unreachable(path, GetLastError());
   if ((attributes & FILE_ATTRIBUTE_DIRECTORY) != 0)
-    return {Verdict::kFailed, L"This is a folder.", L"\"qelshow page\" shows the files in it."};
+    return {Verdict::kFailed, L"This is a folder.", L"Use \"qelshow page\" for the files in it."};
 
   std::ifstream stream;
   OpenPath(stream, path.c_str());
@@ -68,7 +68,7 @@ Diagnosis Diagnose(const std::wstring& path) {
   const auto text = ExplainFault(stream, GetExtension(path));
   if (!text) {
     return {Verdict::kUnsupported, L"The extension shows " + SupportedExtensions(L"and") + L" files only.",
-            L"If it is one of these, rename it."};
+            L"If the file is of one of these kinds, give it that extension."};
   }
   Diagnosis diagnosis;
   if (!text->fault.empty()) diagnosis = {Verdict::kDamaged, Wide(text->fault), Wide(text->advice)};

@@ -94,7 +94,7 @@ bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
     const std::wstring path = AbsolutePath(facts.path);
     ShellView view;
     if (const auto end = worker->Ask({Subject::kShellView, path, size}, view)) {
-      facts.shell = L"Asked what it shows, the shell ends its process with " + ProcessEndText(*end) + L".";
+      facts.shell = L"Asking the shell what it shows ends the process with " + ProcessEndText(*end) + L".";
       isInOrder = false;
     } else {
       facts.shell = ShellSentence(view, path);
@@ -141,7 +141,8 @@ std::wstring FileText(const FileFacts& facts) {
   if (facts.verdict != Verdict::kGood)
     return text + L"has no thumbnail. " + facts.problem + L"\n      " + facts.advice + L"\n";
   text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
-          L" pixels, frames: " + std::to_wstring(facts.frames) + L", " + facts.type + L"\n";
+          L" pixels, " + std::to_wstring(facts.frames) + (facts.frames == 1 ? L" frame, " : L" frames, ") +
+          facts.type + L"\n";
   for (const auto& sentence : {facts.remark, facts.shell}) {
     if (!sentence.empty()) text += L"      " + sentence + L"\n";
   }

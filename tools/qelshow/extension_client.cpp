@@ -33,9 +33,9 @@ std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
   if (error != ERROR_BAD_EXE_FORMAT) return SystemErrorText(error);
   switch (MachineOf(path)) {
     case IMAGE_FILE_MACHINE_AMD64:
-    case IMAGE_FILE_MACHINE_UNKNOWN: return L"it is damaged or no DLL";
-    case IMAGE_FILE_MACHINE_I386: return L"it is made for 32-bit programs, and a 64-bit one is needed";
-    default: return L"it is made for other processors, and one for x64 is needed";
+    case IMAGE_FILE_MACHINE_UNKNOWN: return L"it is damaged or not a DLL";
+    case IMAGE_FILE_MACHINE_I386: return L"it is for 32-bit programs; use the 64-bit DLL";
+    default: return L"it is for other processors; use the DLL for x64";
   }
 }
 
@@ -58,7 +58,7 @@ std::wstring ExtensionClient::Open(const std::wstring& path) {
   }
   const FARPROC procedure = GetProcAddress(module, "DllGetClassObject");
   if (procedure == nullptr) {
-    return L"The DLL \"" + path + L"\" is no COM server: it does not export DllGetClassObject.";
+    return L"The DLL \"" + path + L"\" is not a COM server: it does not export DllGetClassObject.";
   }
   getClassObject_ = reinterpret_cast<decltype(getClassObject_)>(reinterpret_cast<void*>(procedure));
   return {};

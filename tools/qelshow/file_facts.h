@@ -108,7 +108,7 @@ struct FileFacts {
   OptionalText remark;   // one sentence worth knowing about a file, good or not
   OptionalText shell;    // one sentence on what Windows itself shows, where that was asked
 
-  // What the columns and the tip say; 0 or empty when they say nothing.
+  // From the property sets and the tip; 0 or empty where they are missing.
   std::int32_t width = 0;
   std::int32_t height = 0;
   std::int32_t frames = 0;

@@ -34,28 +34,29 @@ std::wstring Square(std::int32_t size) {
 template <class Answer>
 void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
   if (const auto end = worker.Ask({subject, path}, answer)) {
-    answer.problem = std::wstring(L"Asked for ") + what + L", the extension ends its process with " +
-                     ProcessEndText(*end) + L".";
+    answer.problem =
+        std::wstring(L"A request for ") + what + L" ends the process with " + ProcessEndText(*end) + L".";
   }
 }
 
-/// The number that a column delivered; 0 without one.
-std::int32_t Number(const ListAnswer<Column>& columns, std::uint32_t id) {
-  const auto column = std::ranges::find(columns.items, id, &Column::id);
+/// Returns the value of a property, 0 without one.
+std::int32_t Number(const ListAnswer<Property>& properties, std::uint32_t id) {
+  const auto property = std::ranges::find(properties.items, id, &Property::id);
   const auto* const number =
-      column == columns.items.end() ? nullptr : std::get_if<std::int64_t>(&column->value);
+      property == properties.items.end() ? nullptr : std::get_if<std::int64_t>(&property->value);
   return number == nullptr ? 0 : static_cast<std::int32_t>(*number);
 }
 
-/// The pixel type is told in the tip only, at the end of its first line: "Dimensions: (640 × 480) 8 bit
-/// unsigned".
+/// Returns the pixel type, which only the tip contains, at the end of its first line: "Dimensions: (640 ×
+/// 480) 8 bit unsigned".
 std::wstring PixelType(const std::wstring& tip) {
   const std::wstring line = tip.substr(0, tip.find(L"\r\n"));
   const std::size_t end = line.find(L") ");
   return end == std::wstring::npos ? std::wstring() : line.substr(end + 2);
 }
 
-constexpr const wchar_t* kReport = L"Please report this, if you can with the file.";
+constexpr const wchar_t* kReport =
+    L"Please report this to the authors of QelShellExt, with the file if you can.";
 
 /// Whether the picture is one that ends the process which requests it.
 bool IsSmallColourPicture(const FileFacts& facts, std::int32_t size) {
@@ -70,13 +71,13 @@ void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, 
   facts.png = std::move(answer.png);
   if (!end) return;
   if (IsSmallColourPicture(facts, size)) {
-    facts.thumbnail.problem =
-        L"The picture is in colour and smaller than the thumbnail requested, " + Square(size) +
-        L" pixels: it has none, and the process that requests it ends with " + ProcessEndText(*end) + L".";
-    facts.advice = L"View it with smaller icons, or save it in a larger size.";
+    facts.thumbnail.problem = L"The picture is in colour and smaller than the requested thumbnail of " +
+                              Square(size) + L" pixels; such a request ends its process with " +
+                              ProcessEndText(*end) + L".";
+    facts.advice = L"View it with smaller icons, or save it as a larger picture.";
   } else {
-    facts.thumbnail.problem = L"Asked for a thumbnail of " + Square(size) +
-                              L" pixels, the extension ends its process with " + ProcessEndText(*end) + L".";
+    facts.thumbnail.problem = L"A request for a thumbnail of " + Square(size) +
+                              L" pixels ends the process with " + ProcessEndText(*end) + L".";
   }
 }
 
@@ -111,10 +112,10 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   Fill(worker, Subject::kColumns, absolute, L"the columns", facts.columns);
   Fill(worker, Subject::kPropertySets, absolute, L"the property sets", facts.propertySets);
   Fill(worker, Subject::kPropertyStore, absolute, L"the property store", facts.propertyStore);
-  facts.width = Number(facts.columns, 3);
-  facts.height = Number(facts.columns, 4);
-  facts.bitDepth = Number(facts.columns, 7);
-  facts.frames = Number(facts.columns, 12);
+  facts.width = Number(facts.propertySets, 3);
+  facts.height = Number(facts.propertySets, 4);
+  facts.bitDepth = Number(facts.propertySets, 7);
+  facts.frames = Number(facts.propertySets, 12);
   facts.type = PixelType(facts.tip.text);
   FillThumbnail(worker, absolute, size, facts);
 
@@ -129,8 +130,10 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
     if (facts.advice.empty()) facts.advice = kReport;
   }
   if (absolute.size() >= MAX_PATH) {
-    facts.remark = L"Its path has " + std::to_wstring(absolute.size()) +
-                   L" characters, and from 260 on Windows shows no columns: move it or shorten a name.";
+    facts.remark =
+        L"Its path has " + std::to_wstring(absolute.size()) +
+        L" characters; from 260 characters on, Windows shows no columns: move the file or shorten a "
+        L"name.";
   }
   return facts;
 }

@@ -82,7 +82,7 @@ std::wstring FolderOfAll(const std::vector<std::wstring>& paths) {
   }
   const std::wstring& first = paths.front();
   std::error_code ignored;
-  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" holds no" : L"\" is no") + L" " +
+  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" contains no " : L"\" is not a ") +
                     SupportedExtensions(L"or") + L" file.",
                 static_cast<int>(Verdict::kUnsupported));
 }

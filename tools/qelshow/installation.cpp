@@ -52,7 +52,7 @@ void ExamineObject(ExaminedClass& examined, Workers& workers) {
     Worker& worker = workers.try_emplace(dll, dll).first->second;
     examined.condition = Condition::kNoObject;
     if (const auto end = worker.Ask({Subject::kCreation, GuidText(examined.clsid)}, examined.problem)) {
-      examined.problem = L"The DLL \"" + dll + L"\" ends the process in which it makes an object of the " +
+      examined.problem = L"The DLL \"" + dll + L"\" ends the process when it creates an object of the " +
                          examined.name + L", with " + ProcessEndText(*end) + L".";
     }
   } catch (const Failure& failure) {
@@ -76,7 +76,7 @@ void ExamineUse(ExaminedClass& examined, const std::wstring& id) {
   } else if (registered.isUnapproved) {
     examined.condition = Condition::kUnapproved;
     examined.problem = subject + L", " + id +
-                       L", is not in the list of approved extensions, which a policy demands: " +
+                       L", is not in the list of approved extensions, which a policy enforces: " +
                        RegisterAdvice(registered.dll) + L".";
   } else if (!SameIgnoringCase(registered.threadingModel, L"Apartment") &&
              !SameIgnoringCase(registered.threadingModel, L"Both")) {
@@ -136,11 +136,12 @@ std::wstring ForeignHandlerProblem(const std::wstring& extension, const Handler&
                                    const std::wstring& advice) {
   const std::wstring text = L"The " + handler.role + L" of " + extension + L" files comes from " +
                             ForeignClassText(handler.registered) + L", registered in " + handler.key;
-  return handler.isOwnKey ? text + L": to have it from QelShellExt, " + advice + L"."
-                          : text +
-                                L", which goes before QelShellExt: to have it from QelShellExt, remove "
-                                L"that key, or assign " +
-                                extension + L" files to another program.";
+  return handler.isOwnKey
+             ? text + L". To get it from QelShellExt, " + advice + L"."
+             : text +
+                   L", which takes precedence over QelShellExt. To get it from QelShellExt, remove "
+                   L"that key, or assign " +
+                   extension + L" files to another program.";
 }
 
 std::wstring MissingHandlersProblem(const ExaminedKind& kind, const std::wstring& advice) {
@@ -170,14 +171,14 @@ void FindLeftOut(Installation& installation) {
   if (!extension.registered.exists || std::ranges::all_of(installation.kinds, hasNothing)) return;
   for (ExaminedKind& kind : installation.kinds) {
     if (!hasNothing(kind)) continue;
-    std::wstring text = L"Nothing of QelShellExt is registered for " + kind.extension + L" files";
+    std::wstring text = L"QelShellExt is not registered for " + kind.extension + L" files";
     for (const auto& [handler, condition] : kind.handlers) {
       if (condition != Condition::kForeign) continue;
       text += L", whose " + handler.role + L" comes from " + ForeignClassText(handler.registered);
       break;
     }
-    kind.leftOut = text + L": if they are to be shown by it, " +
-                   AddAdvice(kind.extension, extension.registered.dll) + L".";
+    kind.leftOut =
+        text + L". To have it show them, " + AddAdvice(kind.extension, extension.registered.dll) + L".";
   }
 }
 

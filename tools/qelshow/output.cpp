@@ -58,10 +58,12 @@ std::string Beginning(const std::wstring& path, std::size_t count) {
   return bytes;
 }
 
-constexpr const wchar_t* kForeign = L"was not written by qelshow, and is not replaced.";
+constexpr const wchar_t* kForeign =
+    L"was not written by this version of qelshow and is not replaced: delete it, or choose another --out.";
 
 void RefuseImageExtension(const std::wstring& path) {
-  if (IsSupported(path)) Refuse(path, L"has the extension of an image file, which qelshow does not write.");
+  if (IsSupported(path))
+    Refuse(path, L"has the extension of an image file, which qelshow does not write: choose another --out.");
 }
 
 bool IsOwnPng(const std::wstring& path) {
@@ -72,7 +74,8 @@ bool IsOwnPng(const std::wstring& path) {
 
 void CheckPictureOutput(const std::wstring& path, const std::wstring& input) {
   const std::optional<Identity> existing = IdentityOf(path);
-  if (existing && existing == IdentityOf(input)) Refuse(path, L"is the file to read, and is not replaced.");
+  if (existing && existing == IdentityOf(input))
+    Refuse(path, L"is the file to read and is not replaced: choose another --out.");
   if (IsFolder(path)) Refuse(path, L"is a folder; --out names the file to write.");
   RefuseImageExtension(path);
   if (Exists(path) && !IsOwnPng(path)) Refuse(path, kForeign);

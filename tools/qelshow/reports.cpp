@@ -79,7 +79,7 @@ std::wstring Section(const wchar_t* title, const Answer& answer, const std::wstr
 std::wstring ThumbnailText(const Thumbnail& thumbnail) {
   if (thumbnail.width == 0) return L"none";
   return Dimensions(thumbnail.width, thumbnail.height) + L", " + std::to_wstring(thumbnail.bitsPerPixel) +
-         L" bits per pixel, asked for at " + Dimensions(thumbnail.request, thumbnail.request);
+         L" bits per pixel, requested at " + Dimensions(thumbnail.request, thumbnail.request);
 }
 
 }  // namespace

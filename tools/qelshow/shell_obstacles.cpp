@@ -73,13 +73,13 @@ std::wstring CauseOfNoThumbnail(const std::wstring& path) {
     if (setting.isForNetworkFolders && !PathIsNetworkPathW(path.c_str())) continue;
     if (!KeysThatTurnOn(setting).empty()) return NameOf(setting);
   }
-  if (IsPlaceholder(path)) return L"that the file is a placeholder of cloud storage, not on this computer";
+  if (IsPlaceholder(path)) return L"that the file is in cloud storage and not on this computer";
   if (NumberValue(HKEY_CLASSES_ROOT, L"CLSID\\" + GuidText(CLSID_QelShellExt), L"DisableProcessIsolation") ==
       0) {
     return L"the isolated process in which Windows runs thumbnail handlers: see \"Before you deploy\" in the "
-           L"user guide about the feature inprocess";
+           L"user guide for the feature inprocess";
   }
-  return L"not known: log on again, and see \"Why a thumbnail may be missing\" in the user guide";
+  return L"unknown: log on again, and see \"Why a thumbnail may be missing\" in the user guide";
 }
 
 std::wstring CauseOfAnotherThumbnail() {

@@ -38,7 +38,7 @@ using PropertyValue = OwnedVariant<PROPVARIANT, &PropVariantInit, &PropVariantCl
 using ColumnValue = OwnedVariant<VARIANT, &VariantInit, &VariantClear>;
 
 std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
-  return std::wstring(L"The extension gives no ") + what + L": " + ResultText(result) + L".";
+  return std::wstring(L"The extension returns no ") + what + L": " + ResultText(result) + L".";
 }
 
 /// Runs `request`; an exception that leaves the extension becomes the problem.
@@ -153,7 +153,7 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
     }
     SHCOLUMNDATA file{};
     if (path.size() >= std::size(file.wszFile)) {
-      answer.problem = L"The shell asks for no columns of a file whose path has 260 characters or more.";
+      answer.problem = L"The shell requests no columns for a file whose path has 260 characters or more.";
       return;
     }
     std::copy(path.begin(), path.end(), file.wszFile);
@@ -288,7 +288,7 @@ std::wstring RequestObject(const std::wstring& clsid) {
                               reinterpret_cast<void**>(object.Put()));
   }
   if (SUCCEEDED(result)) return {};
-  return L"No object of the class " + clsid + L" can be made: " + ResultText(result) + L".";
+  return L"An object of the class " + clsid + L" cannot be created: " + ResultText(result) + L".";
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

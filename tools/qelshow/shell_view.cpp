@@ -193,7 +193,7 @@ std::wstring Phrase(const ShellAnswer& answer, const std::wstring& what) {
     case Agreement::kNothing: return L"no " + what + L" (" + answer.detail + L")";
     case Agreement::kUnanswered: break;
   }
-  return L"a " + what + L" that it does not tell";
+  return L"a " + what + L" that it does not report";
 }
 
 bool IsInOrder(const ShellAnswer& answer) {
@@ -230,7 +230,7 @@ bool IsInOrder(const ShellView& view) {
 std::wstring ShellSentence(const ShellView& view, const std::wstring& path) {
   if (view.thumbnail.agreement == Agreement::kUnanswered &&
       view.properties.agreement == Agreement::kUnanswered) {
-    return L"The shell of this system does not tell what it shows.";
+    return L"The shell of this system does not report what it shows.";
   }
   std::wstring text = L"Windows shows " + Phrase(view.thumbnail, L"thumbnail") + L" and " +
                       Phrase(view.properties, L"set of properties");

@@ -97,7 +97,7 @@ void Worker::Start() {
   OwnedHandle childInput;
   OwnedHandle childOutput;
   if (!MakePipe(childInput, toProcess_, toProcess_) || !MakePipe(fromProcess_, childOutput, fromProcess_)) {
-    throw Failure(L"A pipe cannot be made: " + SystemErrorText(GetLastError()) + L".");
+    throw Failure(L"A pipe cannot be created: " + SystemErrorText(GetLastError()) + L".");
   }
   STARTUPINFOW startup{};
   startup.cb = sizeof startup;
@@ -110,7 +110,7 @@ void Worker::Start() {
   PROCESS_INFORMATION process{};
   if (!CreateProcessW(program.c_str(), command.data(), nullptr, nullptr, TRUE, 0, nullptr, nullptr, &startup,
                       &process)) {
-    throw Failure(L"The program cannot start itself again: " + SystemErrorText(GetLastError()) + L".");
+    throw Failure(L"qelshow cannot start its second process: " + SystemErrorText(GetLastError()) + L".");
   }
   const OwnedHandle thread(process.hThread);
   process_ = OwnedHandle(process.hProcess);
@@ -119,8 +119,7 @@ void Worker::Start() {
 
   Json reply;
   if (!Exchange({Subject::kLoading, dllPath_}, reply)) {
-    throw Failure(L"The extension ends its process with " + ProcessEndText(Finish()) +
-                  L" while it is loaded.");
+    throw Failure(L"Loading the extension ends the process with " + ProcessEndText(Finish()) + L".");
   }
   const auto problem = reply.get<std::wstring>();
   if (!problem.empty()) throw Failure(problem);

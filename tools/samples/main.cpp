@@ -22,7 +22,7 @@ int Run(int count, const std::filesystem::path::value_type* const* arguments) {
     std::ofstream file(folder / sample.name, std::ios_base::binary);
     file << sample.make();
     if (!file.flush()) {
-      std::fprintf(stderr, "qelsamples: %s cannot be written.\n", (folder / sample.name).string().c_str());
+      std::fprintf(stderr, "qelsamples: cannot write %s.\n", (folder / sample.name).string().c_str());
       return 1;
     }
   }
