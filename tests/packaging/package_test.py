@@ -19,6 +19,11 @@ import tempfile
 import unittest
 import zipfile
 
+import gi
+
+gi.require_version("Libmsi", "1.0")
+from gi.repository import Libmsi  # noqa: E402
+
 SOURCES, BUILD, EXTENSION_USER = map(pathlib.Path, sys.argv[1:4])
 
 FILES = ("NOTICES.txt", "QelShellExt.dll", "README.txt", "qelshow.exe")
@@ -195,6 +200,111 @@ class Contents(Test):
         with self.assertRaises(subprocess.CalledProcessError):
             subprocess.run(["osslsigncode", "verify", "-CAfile", certificate, "-in", package(self.out)],
                            check=True, capture_output=True)
+
+
+# Windows Installer recognises components by these codes, whatever the version. A new component adds its own.
+COMPONENT_CODES = {
+    "Server": "{F8215D5A-6F96-4564-BD55-BB9B40A76325}",
+    "Qelshow": "{AB40842A-41B6-4C7F-892D-800CB74FE713}",
+    "Readme": "{C65546FD-ADAA-4A15-A93E-765ED872F442}",
+    "Notices": "{2C5542BD-A7B8-4F23-8320-7C62D90C7C64}",
+    "mrc": "{391B1E31-23C5-483B-BA33-E4239E5B6DF0}",
+    "ali": "{9BADCDF1-0601-41C7-987D-74C1A271EB24}",
+    "rec": "{3AA43BE5-06C6-4158-BAD1-828B5EC88B4E}",
+    "ser": "{740C5EF6-9115-48B3-B949-B76EC1CEB2BC}",
+    "emi": "{0A445D8E-A1B9-4180-9268-7463A27B6D76}",
+    "ebn": "{56C4E05E-F9D1-4270-AE88-330510AB3CD4}",
+    "raw": "{6B2969AC-EE3C-4CC3-AF34-B35B3AD9DDCB}",
+    "inprocess": "{2CBB922D-6861-4AC6-A65E-AE0EAB4F0327}",
+}
+UPGRADE_CODE = "{D5320353-60A9-41CE-A794-4CBF1BCBA0D4}"
+
+
+class Database:
+    """The tables of an installer package."""
+
+    def __init__(self, msi):
+        self.database = Libmsi.Database.new(str(msi), Libmsi.DbFlags.READONLY, None)
+        self.properties = dict(self.rows("Property"))
+        summary = Libmsi.SummaryInfo.new(self.database, 0)
+        self.package_code = summary.get_string(Libmsi.Property.UUID)
+        self.times = {summary.get_filetime(time) for time in (Libmsi.Property.CREATED_TM, Libmsi.Property.LASTSAVED_TM)}
+
+    def rows(self, table):
+        """Returns each row as a tuple of strings, in the order of the table's columns."""
+        query = Libmsi.Query.new(self.database, f"SELECT * FROM `{table}`")
+        query.execute(None)
+        return [tuple(record.get_string(i + 1) for i in range(record.get_field_count()))
+                for record in iter(query.fetch, None)]
+
+
+class InstallerPackage(Test):
+    """Checks tables of the package, because Wine ignores much of them."""
+
+    @classmethod
+    def setUpClass(cls):
+        folder = tempfile.TemporaryDirectory()
+        cls.addClassCleanup(folder.cleanup)
+        cls.folder = pathlib.Path(folder.name)
+        make_packages(cls.folder / "out")
+        cls.database = Database(package(cls.folder / "out"))
+
+    def test_keeps_its_codes(self):
+        codes = {row[0]: row[1] for row in self.database.rows("Component")}
+        self.assertEqual(codes | COMPONENT_CODES, codes)
+        self.assertEqual(len(set(codes.values())), len(codes))
+        self.assertEqual(self.database.properties["UpgradeCode"], UPGRADE_CODE)
+        self.assertEqual({row[0] for row in self.database.rows("Upgrade")}, {UPGRADE_CODE})
+
+    def test_has_a_product_code_for_each_version_and_a_package_code_for_each_content(self):
+        build = copy_build(self.folder / "build")
+        (build / "qelshow.exe").write_bytes((build / "qelshow.exe").read_bytes() + b"changed")
+        make_packages(self.folder / "changed", build)
+        changed = Database(package(self.folder / "changed"))
+        make_packages(self.folder / "next", next_version(build))
+        following = Database(package(self.folder / "next"))
+        self.assertEqual(changed.properties["ProductCode"], self.database.properties["ProductCode"])
+        self.assertNotEqual(changed.properties["ProductCode"], following.properties["ProductCode"])
+        self.assertEqual(len({database.package_code for database in (self.database, changed, following)}), 3)
+
+    def test_never_closes_explorer_restarts_windows_or_offers_a_dialog(self):
+        expected = {"ALLUSERS": "1", "ARPNOMODIFY": "1", "MSIRESTARTMANAGERCONTROL": "DisableShutdown",
+                    "REBOOT": "ReallySuppress"}
+        self.assertEqual({name: self.database.properties.get(name) for name in expected}, expected)
+
+    def test_installs_64_bit_components_that_a_registry_value_of_their_kind_identifies(self):
+        is_64_bit, key_path_is_registry = 256, 4
+        keys = {row[0]: row for row in self.database.rows("Registry")}
+        for name, _, folder, attributes, _, key_path in self.database.rows("Component"):
+            with self.subTest(component=name):
+                self.assertEqual(folder, "InstallFolder")
+                if name in ("Server", "Qelshow", "Readme", "Notices"):
+                    self.assertEqual(int(attributes), is_64_bit)
+                else:
+                    self.assertEqual(int(attributes), is_64_bit | key_path_is_registry)
+                    self.assertEqual(keys[key_path][-1], name)
+                    self.assertNotIn(keys[key_path][3], ("*", "+"))
+
+    def test_has_features_that_are_never_advertised_and_one_that_is_off(self):
+        not_advertised, always = 8, 16
+        features = {row[0]: (int(row[5]), int(row[7])) for row in self.database.rows("Feature")}
+        self.assertEqual(features.pop("QelShellExt"), (1, not_advertised | always))
+        self.assertEqual(features.pop("inprocess"), (2, not_advertised))
+        self.assertEqual(set(features.values()), {(1, not_advertised)})
+        self.assertGreaterEqual(set(features), {"mrc", "ali", "rec", "ser", "emi", "ebn", "raw"})
+
+    def test_replaces_the_dll_by_its_version_and_an_older_product_within_the_transaction(self):
+        version = self.database.properties["ProductVersion"]
+        files = {row[0]: (row[4], row[5]) for row in self.database.rows("File")}
+        self.assertEqual(files["QelShellExt.dll"], (f"{version}.0", "1033"))
+        self.assertEqual({row[0] for row in self.database.rows("MsiFileHash")}, set(FILES) - {"QelShellExt.dll"})
+        actions = {row[0]: int(row[2]) for row in self.database.rows("InstallExecuteSequence")}
+        order = ("InstallInitialize", "RemoveExistingProducts", "ProcessComponents", "RemoveRegistryValues",
+                 "RemoveFiles", "InstallFiles", "WriteRegistryValues", "RegisterProduct", "InstallFinalize")
+        self.assertEqual(sorted(order, key=actions.get), list(order))
+
+    def test_carries_the_given_time(self):
+        self.assertEqual(self.database.times, {(int(EPOCH) + 11644473600) * 10**7})
 
 
 class Prefix:
