@@ -26,6 +26,9 @@ from gi.repository import Libmsi  # noqa: E402
 
 SOURCES, BUILD, EXTENSION_USER = map(pathlib.Path, sys.argv[1:4])
 
+sys.path.append(str(SOURCES / "packaging"))
+from make_packages import component_code  # noqa: E402
+
 FILES = ("NOTICES.txt", "QelShellExt.dll", "README.txt", "qelshow.exe")
 PROGRAMS = ("QelShellExt.dll", "qelshow.exe")
 EPOCH = "1700000000"
@@ -253,6 +256,7 @@ class InstallerPackage(Test):
         codes = {row[0]: row[1] for row in self.database.rows("Component")}
         self.assertEqual(codes | COMPONENT_CODES, codes)
         self.assertEqual(len(set(codes.values())), len(codes))
+        self.assertEqual(component_code("abc"), "{F678095A-EDEF-5557-B64D-F8448E982C9C}")  # of an extension that is added later
         self.assertEqual(self.database.properties["UpgradeCode"], UPGRADE_CODE)
         self.assertEqual({row[0] for row in self.database.rows("Upgrade")}, {UPGRADE_CODE})
 
