@@ -1,6 +1,5 @@
-# The Wine in which Windows programs of the project run: a prefix of its own in the build folder, quiet, and
-# without anything that would reach into the user's desktop. A script that needs another prefix names it in
-# QEL_WINEPREFIX before it sources this.
+# The project's Wine: a separate prefix in the build folder, quiet, and without anything that would affect the user's
+# desktop. A script that needs another prefix sets QEL_WINEPREFIX before it sources this.
 # shellcheck shell=bash
 . "$(dirname "${BASH_SOURCE[0]}")/common.sh"
 
@@ -11,11 +10,11 @@ export WINEDEBUG=-all
 # No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types, no Wayland.
 export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe,winewayland.drv="
 
-# Pipes are closed, as Wine's services inherit them and would keep whoever reads them waiting.
+# Wine's services inherit standard input and output, so these are not pipes: a reader would wait as long as they run.
 wine_boot() { wine wineboot "$@" >/dev/null 2>&1 </dev/null && wineserver -w; }
 
-# wine_alone "$@": starts the calling script again as the only one that changes the prefix, since several register the
-# extension in it. What a script leaves behind does not keep the lock.
+# wine_alone "$@": restarts the calling script under a lock, because several scripts register the extension in the prefix.
+# Processes that the script leaves running do not hold the lock.
 wine_alone() {
   [[ ${QEL_ALONE_IN-} != "$WINEPREFIX" ]] || return 0
   mkdir -p "$root/build"
@@ -24,20 +23,20 @@ wine_alone() {
   QEL_ALONE_IN=$WINEPREFIX exec flock --close "$lock" "$0" "$@"
 }
 
-# Makes the prefix if there is none yet.
+# Creates the prefix if it does not exist.
 wine_make_prefix() {
   [[ ! -f $WINEPREFIX/.complete ]] || return 0
   "$root/scripts/setup" wine
   progress "Making a Wine prefix"
   mkdir -p "$WINEPREFIX"
-  # Rarely the first boot of a new prefix fails; the second one then completes it.
+  # The first boot of a new prefix sometimes fails. The second boot then completes the prefix.
   patiently wine_boot --init || patiently wine_boot --init || fail "Wine cannot make its prefix in $WINEPREFIX"
   touch "$WINEPREFIX/.complete"
 }
 
-# Boots the prefix and keeps its server until the script ends, so that programs start at once. A server that already
-# runs serves as well. It runs as long as a program does: here one that waits for the end of its standard input, which
-# comes with the end of the script.
+# Boots the prefix and keeps its server running until the script ends, so that programs start at once. The server may be
+# running already. It ends with its last program, so a program waits here for its standard input to close, which happens
+# when the script ends.
 wine_start() {
   "$root/scripts/setup" wine
   wine_make_prefix
@@ -45,7 +44,7 @@ wine_start() {
   wine wineboot >/dev/null 2>&1 </dev/null || fail "Wine cannot boot its prefix in $WINEPREFIX"
 }
 
-# windows_path PATH: the path under which Windows programs find it, whether it exists or not.
+# windows_path PATH: prints the path for Windows programs. The file need not exist.
 windows_path() {
   local path
   path=$(realpath --no-symlinks --canonicalize-missing -- "$1")
