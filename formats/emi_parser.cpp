@@ -1,9 +1,11 @@
 #include "emi_parser.h"
 
 #include <optional>
+#include <utility>
 
 #include "byte_order.h"
 #include "data_type.h"
+#include "read_text.h"
 #include "skip_bytes.h"
 #include "wrap.h"
 
@@ -14,13 +16,25 @@ constexpr std::uint16_t kMagic = 0x4B4A;
 constexpr std::int16_t kMaxVersion = 0x0200;
 
 constexpr EmiItemId kImageObject = {0x49B0, 0x0610};
-constexpr std::uint16_t kDataTag = 0x0202;  // of the one array of an image that holds its pixels
+constexpr EmiItemId kLineDataObject = {0x4700, 0x0610};
+constexpr std::uint16_t kDataTag = 0x0202;  // of the one array of an object that holds its pixels or values
+
+/// Where an object has its extra values: directly in `structure`, which lies directly in the object.
+struct ExtraValues {
+  EmiItemId object;
+  EmiItemId structure;
+  std::uint16_t tag1;
+  std::uint16_t tag2;
+};
+
+constexpr ExtraValues kExtraValues[] = {{kImageObject, {0x4102, 0x0300}, 0x0120, 0x0130},
+                                        {kLineDataObject, {0x4100, 0x0300}, 0x0100, 0x0120}};
 
 constexpr std::uint16_t kDouble = 0x0041;
 constexpr std::uint16_t kText = 0x0060;
 constexpr std::uint16_t kArrayBit = 0x2000;
 
-/// Bytes of the value of an item that is one number; none for another item.
+/// Bytes of the value of an item that is one number of no meaning; none for another item.
 std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
   switch (type) {
     case 0x0010:
@@ -31,8 +45,7 @@ std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
     case 0x0031:
     case 0x0033:
     case 0x0040: return 4;
-    case 0x0034:
-    case kDouble: return 8;
+    case 0x0034: return 8;
     default: return std::nullopt;
   }
 }
@@ -44,8 +57,20 @@ bool IsDataArray(std::uint16_t type) {
   return (series == 0x2100 || series == 0x2200) && elementType <= 0x14 && elementType % 2 == 0;
 }
 
-bool IsPixelArray(EmiItemId id) {
-  return IsDataArray(id.type) && (id.type & 0xFF00) == 0x2200 && id.tag == kDataTag;
+/// `series` is 0x2100 for the values of a line, 0x2200 for the pixels of an image.
+bool IsArrayOf(EmiItemId id, int series) {
+  return IsDataArray(id.type) && (id.type & 0xFF00) == series && id.tag == kDataTag;
+}
+
+/// The text of an object with the tag `tag`; null for a text that is not kept.
+std::string* LabelOf(EmiDataObject& object, std::uint16_t tag) {
+  switch (tag) {
+    case 0x0100: return &object.label100;
+    case 0x0419: return &object.label419;
+    case 0x0400: return &object.label400;
+    case 0x0440: return &object.label440;
+    default: return nullptr;
+  }
 }
 
 /// The elements of a data array. The larger of the complex types has the smaller number.
@@ -95,6 +120,7 @@ void EmiParser::Walk() {
     }
     objectPath_.Open(id);
     if (id == kImageObject) ++imageCount_;
+    if (id == kLineDataObject) ++lineDataCount_;
     if (ReadValue()) objectPath_.CloseInnermost();
   }
 }
@@ -108,14 +134,16 @@ EmiItemId EmiParser::ReadItemId() {
 
 bool EmiParser::ReadValue() {
   const std::uint16_t type = objectPath_.At(-1).type;
+  if (type == kDouble) {
+    ReadDoubleValue();
+    return true;
+  }
   if (const auto bytes = BytesOfNumber(type)) {
-    if (type == kDouble) objectPath_.At(-3);  // belongs to an object of an object
     SkipBytes(stream(), *bytes);
     return true;
   }
   if (type == kText) {
-    objectPath_.At(-2);  // belongs to an object
-    SkipBytes(stream(), ReadLittleEndian<std::uint32_t>(stream()));
+    ReadTextValue();
     return true;
   }
   if ((type & kArrayBit) != 0) {
@@ -125,12 +153,39 @@ bool EmiParser::ReadValue() {
   return false;
 }
 
+void EmiParser::ReadDoubleValue() {
+  const EmiItemId object = objectPath_.At(-3);  // a double belongs to an object of an object
+  const auto number = ReadLittleEndian<double>(stream());
+  if (!stream().good()) return;
+  for (const ExtraValues& values : kExtraValues) {
+    if (object != values.object || objectPath_.At(-2) != values.structure) continue;
+    EmiDataObject* const kept = KeptObject(object);
+    if (kept == nullptr) return;
+    const std::uint16_t tag = objectPath_.At(-1).tag;
+    if (tag == values.tag1) kept->extraValue1 = number;
+    if (tag == values.tag2) kept->extraValue2 = number;
+  }
+}
+
+void EmiParser::ReadTextValue() {
+  EmiDataObject* const kept = KeptObject(objectPath_.At(-2));  // a text belongs to an object
+  std::string* const label = kept == nullptr ? nullptr : LabelOf(*kept, objectPath_.At(-1).tag);
+  const auto length = ReadLittleEndian<std::uint32_t>(stream());
+  if (label == nullptr) {
+    SkipBytes(stream(), length);
+    return;
+  }
+  std::string text = ReadText(stream(), length);
+  if (stream().good()) *label = std::move(text);
+}
+
 void EmiParser::ReadArray() {
   const auto byteCount = ReadLittleEndian<std::uint32_t>(stream());
   const EmiItemId id = objectPath_.At(-1);
   if (IsDataArray(id.type)) {
-    const bool inImage = objectPath_.At(-2) == kImageObject;
-    if (inImage && IsPixelArray(id)) ReadPixelArray();
+    const EmiItemId& parent = objectPath_.At(-2);
+    if (parent == kImageObject && IsArrayOf(id, 0x2200)) ReadPixelArray();
+    if (parent == kLineDataObject && IsArrayOf(id, 0x2100)) ReadLineArray();
   }
   // The byte count says where the next item is, whatever the array's width and height come to.
   SkipBytes(stream(), byteCount);
@@ -145,6 +200,24 @@ void EmiParser::ReadPixelArray() {
     frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, stream().tellg());
   }
   stream().seekg(start);
+}
+
+void EmiParser::ReadLineArray() {
+  const auto type = ElementType(objectPath_.At(-1).type);
+  if (!type || lineDataCount_ != 1) return;
+  const std::int64_t start = stream().tellg();
+  const auto length = ReadLittleEndian<std::uint32_t>(stream());
+  if (stream().good()) {
+    lineData_.length = length;
+    lineData_.dataType = type;
+  }
+  stream().seekg(start);
+}
+
+EmiDataObject* EmiParser::KeptObject(const EmiItemId& id) {
+  if (id == kImageObject && imageCount_ == 1) return &image_;
+  if (id == kLineDataObject && lineDataCount_ == 1) return &lineData_;
+  return nullptr;
 }
 
 }  // namespace Qel::Lumetra::ShellExt

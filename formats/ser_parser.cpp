@@ -3,10 +3,11 @@
 #include <algorithm>
 #include <array>
 #include <stdexcept>
+#include <utility>
 
 #include "byte_order.h"
 #include "data_type.h"
-#include "skip_bytes.h"
+#include "read_text.h"
 #include "type_code.h"
 #include "wrap.h"
 
@@ -22,22 +23,28 @@ constexpr std::uint32_t kImages = 0x4122;
 constexpr std::uint32_t kTimeTags = 0x4152;
 constexpr std::uint32_t kPositionTags = 0x4142;
 
-constexpr std::uint32_t kCalibrationBytes = 20;
+constexpr std::size_t kCalibrationBytes = 20;
 
-void SkipText(std::istream& stream) {
-  const auto length = ReadLittleEndian<std::int32_t>(stream);
-  if (!stream.good()) return;
-  if (length < 0) throw std::length_error("negative SER text length");
-  SkipBytes(stream, static_cast<std::uint32_t>(length));
+SerCalibration LoadCalibration(const unsigned char* bytes) {
+  return {.offset = LoadLittleEndian<double>(bytes),
+          .delta = LoadLittleEndian<double>(bytes + 8),
+          .element = LoadLittleEndian<std::int32_t>(bytes + 16)};
 }
 
-/// Nothing of the dimensions is shown, but a series that ends within them is not a valid one.
-void SkipDimensions(std::istream& stream, std::uint32_t count) {
-  for (std::uint32_t i = 0; i < count && stream.good(); ++i) {
-    SkipBytes(stream, sizeof(std::uint32_t) + kCalibrationBytes);  // its size and calibration
-    SkipText(stream);                                              // its description
-    SkipText(stream);                                              // and its units
-  }
+std::string ReadTextWithLength(std::istream& stream) {
+  const auto length = ReadLittleEndian<std::int32_t>(stream);
+  if (!stream.good()) return {};
+  if (length < 0) throw std::length_error("negative SER text length");
+  return ReadText(stream, static_cast<std::uint32_t>(length));
+}
+
+SerDimension ReadDimension(std::istream& stream) {
+  std::array<unsigned char, sizeof(std::uint32_t) + kCalibrationBytes> bytes{};
+  stream.read(reinterpret_cast<char*>(bytes.data()), bytes.size());
+  return {.dimensionSize = LoadLittleEndian<std::uint32_t>(bytes.data()),
+          .calibration = LoadCalibration(&bytes[sizeof(std::uint32_t)]),
+          .description = ReadTextWithLength(stream),
+          .units = ReadTextWithLength(stream)};
 }
 
 }  // namespace
@@ -73,9 +80,20 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
     stream.setstate(std::ios_base::failbit);
     return;
   }
-  SkipDimensions(stream, dimensionCount);
+  if (!stream.good()) return;
+  series_ = {
+      .hasPositionTags = tagTypeId == kPositionTags, .dimensionCount = dimensionCount, .dimensions = {}};
+  ReadDimensions();
   ReadElements(arrayOffset, validElements);
   Require(isImageSeries_, "This is a series of lines (data type id 0x4120), which have no picture.");
+}
+
+/// A series that ends within its dimensions is not a valid one.
+void SerParser::ReadDimensions() {
+  for (std::uint32_t i = 0; i < series_->dimensionCount && stream().good(); ++i) {
+    SerDimension dimension = ReadDimension(stream());
+    if (stream().good() && i < kMaxDimensions) series_->dimensions.push_back(std::move(dimension));
+  }
 }
 
 void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
@@ -96,15 +114,17 @@ void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
     stream().read(reinterpret_cast<char*>(offsets.data()), std::streamsize{kEntryBytes} * entries);
     for (std::uint32_t i = 0; i < entries && stream().good(); ++i) {
       const auto offset = LoadLittleEndian<std::uint32_t>(&offsets[i * kEntryBytes]);
-      const FrameLayout element = ReadElement(offset);
-      if (done + i == 0) frame_ = element;
+      SerElement element;
+      const FrameLayout frame = ReadElement(offset, element);
+      if (done + i > 0) continue;
+      frame_ = frame;
+      if (stream().good()) element_ = element;
     }
     done += entries;
   }
 }
 
-FrameLayout SerParser::ReadElement(std::uint32_t position) {
-  // The calibrations of both axes come first.
+FrameLayout SerParser::ReadElement(std::uint32_t position, SerElement& element) {
   constexpr std::size_t kTypeCode = std::size_t{2} * kCalibrationBytes;
   constexpr std::size_t kSizeX = kTypeCode + sizeof(std::int16_t);
   constexpr std::size_t kSizeY = kSizeX + sizeof(std::uint32_t);
@@ -120,6 +140,8 @@ FrameLayout SerParser::ReadElement(std::uint32_t position) {
     stream().setstate(std::ios_base::failbit);
     return {};
   }
+  element = {.calibrationX = LoadCalibration(bytes.data()),
+             .calibrationY = LoadCalibration(&bytes[kCalibrationBytes])};
   const Size2 size = {LoadLittleEndian<std::int32_t>(&bytes[kSizeX]),
                       LoadLittleEndian<std::int32_t>(&bytes[kSizeY])};
   return PackedLayout(PixelTypeOf(*type), size, position + std::int64_t{kBytes});

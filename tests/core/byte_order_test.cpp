@@ -8,6 +8,7 @@
 #include <string>
 
 #include "memory_buffer.h"
+#include "read_text.h"
 #include "skip_bytes.h"
 #include "wrap.h"
 
@@ -83,6 +84,27 @@ TEST(SkipBytes, FailsWhenTheLastByteIsMissing) {
     SkipBytes(stream, count);
     EXPECT_EQ(stream.good(), count <= 1000) << count;
     EXPECT_LE(buffer.bytesRead, 512);
+  }
+}
+
+TEST(ReadText, ReturnsTheFirst512BytesAndSkipsTheRest) {
+  for (const std::uint32_t length : {0u, 1u, 511u, 512u, 513u, 1024u, 1025u, 99998u}) {
+    const std::string text = std::string(length / 2, 'x') + std::string(length - length / 2, 'y');
+    std::istringstream stream('a' + text + 'z');
+    stream.get();
+    EXPECT_EQ(ReadText(stream, length), text.substr(0, 512)) << length;
+    EXPECT_TRUE(stream.good());
+    EXPECT_EQ(stream.get(), 'z') << length;
+  }
+}
+
+TEST(ReadText, FailsTheStreamAtItsEnd) {
+  for (const std::uint32_t length : {0u, 1u, 511u, 512u, 513u, 99998u}) {
+    for (const std::uint32_t claimed : {length, length + 1, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFFFu}) {
+      std::istringstream stream(std::string(length, 'x'));
+      EXPECT_LE(ReadText(stream, claimed).size(), length);
+      EXPECT_EQ(stream.good(), claimed == length) << claimed << " of " << length;
+    }
   }
 }
 

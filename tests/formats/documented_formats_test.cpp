@@ -13,6 +13,7 @@
 #include "data_type.h"
 #include "ebn_file.h"
 #include "emi_file.h"
+#include "header_facts.h"
 #include "image_file_info.h"
 #include "mrc_file.h"
 #include "open_file.h"
@@ -26,6 +27,7 @@ using namespace Testing;
 
 using Row = std::vector<std::string>;
 using Table = std::vector<Row>;
+using Facts = std::vector<HeaderFact>;
 
 std::string Trimmed(const std::string& text) {
   const std::size_t first = text.find_first_not_of(" `");
@@ -431,6 +433,32 @@ TEST(DocumentedEmi, ValuesAreAsLongAsTheyAre) {
   EXPECT_EQ(others["a list of items"], bit);
   const auto list = static_cast<std::uint16_t>(~bit);
   EXPECT_EQ(ImagesBehind(EmiStructure(list, 1, EmiImageObject(""))), 2);
+}
+
+Facts EmiFacts(const std::string& items) {
+  std::istringstream stream(EmiFile{.items = items}.Bytes());
+  return HeaderFacts(stream, L"emi");
+}
+
+TEST(DocumentedEmi, LabelsHaveTheirTags) {
+  const Table table = Documented("EMI", "Tag of a text");
+  EXPECT_EQ(table.size(), 4u);
+  for (const Row& row : table) {
+    const std::string text = EmiText(static_cast<std::uint16_t>(Number(row[0])), "text");
+    EXPECT_EQ(EmiFacts(EmiImageObject(text)), (Facts{{"Image " + row[1], "text"}}));
+  }
+}
+
+TEST(DocumentedEmi, ExtraValuesAreWhereTheyAre) {
+  const Table table = Documented("EMI", "Object");
+  EXPECT_EQ(table.size(), 2u);
+  for (const Row& row : table) {
+    const auto number = [&row](std::size_t i) { return static_cast<std::uint16_t>(Number(row[i])); };
+    const std::string values = EmiDouble(number(4), 1.5) + EmiDouble(number(5), 2.5);
+    Facts facts = EmiFacts(EmiStructure(number(1), 0x0610, EmiStructure(number(2), number(3), values)));
+    if (row[0] == "Line" && !facts.empty()) facts.erase(facts.begin());  // the number of lines
+    EXPECT_EQ(facts, (Facts{{row[0] + " extra value 1", 1.5}, {row[0] + " extra value 2", 2.5}}));
+  }
 }
 
 TEST(DocumentedEmi, TypesAreWhatTheyAre) {

@@ -4,6 +4,7 @@
 #include <istream>
 #include <sstream>
 #include <string>
+#include <utility>
 
 #include "emi_file.h"
 #include "image_file_info.h"
@@ -105,6 +106,41 @@ TEST(EmiCost, TreeIsWalkedInOnePass) {
   ExpectOnePass(openings + ends, 0);
   ExpectOnePass(images, kMany);
   ExpectOnePass(openings + arrays + images, kMany);
+}
+
+TEST(EmiCost, OnlyTheFirstLineIsLookedAt) {
+  const std::string array = EmiArray(0x2102, 0x0202, BytesOf<std::uint32_t>({100}) + std::string(1000, 'x'));
+  const auto cost = [](const std::string& items) {
+    const std::string bytes = EmiFile{.items = items}.Bytes();
+    CountingBuffer buffer(bytes);
+    std::istream stream(&buffer);
+    const EmiFileInfo emi(stream);
+    return std::pair(buffer.bytes(), buffer.seeks() + buffer.reads());
+  };
+  const auto [plainBytes, plainCalls] =
+      cost(EmiStructure(0x4000, 1, EmiArray(0x2060, 1, std::string(1004, 'x'))));
+  const auto [firstBytes, firstCalls] = cost(EmiLineDataObject(array));
+  const auto [manyBytes, manyCalls] = cost(EmiLineDataObject(array) + EmiLineDataObject(array));
+  EXPECT_EQ(firstBytes, plainBytes + 4);
+  EXPECT_EQ(firstCalls, plainCalls + 3);
+  EXPECT_LE(manyBytes, 2 * plainBytes + 4);
+  EXPECT_LE(manyCalls, 2 * plainCalls + 3);
+}
+
+TEST(Cost, OfALongTextIsItsFirstBytes) {
+  SerFile ser;
+  ser.elements.resize(1);
+  ser.dimensions[0].units = std::string(1000000, 'u');
+  CountingBuffer serBuffer(ser.Bytes());
+  std::istream serStream(&serBuffer);
+  EXPECT_TRUE(SerFileInfo(serStream).IsValid());
+  EXPECT_LE(serBuffer.bytes(), 512 + 200);
+
+  const std::string label = EmiText(0x0100, std::string(1000000, 'x'));
+  CountingBuffer emiBuffer(EmiFile{.items = EmiImageObject(label)}.Bytes());
+  std::istream emiStream(&emiBuffer);
+  EXPECT_TRUE(EmiFileInfo(emiStream).IsValid());
+  EXPECT_LE(emiBuffer.bytes(), 512 + 100);
 }
 
 TEST(EmiCost, LongValuesAreNotRead) {

@@ -186,7 +186,7 @@ TYPED_TEST(RandomSer, EqualsTheNaivePicture) {
     file.version = random.OneIn(2) ? 0x0210 : 0x0220;
     file.tagTypeId = random.OneIn(2) ? 0x4152 : 0x4142;
     file.dimensions.resize(static_cast<std::size_t>(random.Between(0, 3)));
-    for (SerDimension& dimension : file.dimensions) dimension.units = Noise(random, 30);
+    for (auto& dimension : file.dimensions) dimension.units = Noise(random, 30);
     file.elements.resize(static_cast<std::size_t>(random.Between(1, 4)));
     file.elements[0].typeCode = TypeParam::kCode;
     file.elements[0].width = static_cast<std::uint32_t>(frame.width);

@@ -6,8 +6,11 @@
 #include <numeric>
 #include <stdexcept>
 #include <tuple>
+#include <vector>
 
 #include "file_type_factory.h"
+#include "header_facts.h"
+#include "read_text.h"
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
@@ -71,12 +74,14 @@ bool IsRequiredFault(Size2 frame, bool colour, const SIZE& request) {
   return request.cx == 0 || request.cy == 0 || Factor(frame, colour, request) == 0;
 }
 
-Answers AskEverything(std::istream& stream, const std::wstring& extension, std::span<const SIZE> requests) {
-  Answers answers;
+namespace {
+
+void AskReader(std::istream& stream, const std::wstring& extension, std::span<const SIZE> requests,
+               Answers& answers) {
   const std::unique_ptr<FileTypeInfo> reader = MakeReader(stream, extension);
   answers.constructed = reader != nullptr;
   answers.valid = answers.constructed && reader->IsValid();
-  if (!answers.valid) return answers;
+  if (!answers.valid) return;
 
   const auto metadata = Metadata(*reader);
   const Size2 frame = reader->GetDimensions();
@@ -87,6 +92,26 @@ Answers AskEverything(std::istream& stream, const std::wstring& extension, std::
     if (bitmap != nullptr) Take(bitmap, frame, colour, request, answers);
   }
   if (Metadata(*reader) != metadata) answers.wrong = "the metadata changed when thumbnails were made";
+}
+
+void AskHeader(std::istream& stream, const std::wstring& extension, Answers& answers) {
+  constexpr std::size_t kMaxFacts = 200;
+  const std::vector<HeaderFact> facts = HeaderFacts(stream, extension);
+  if (facts.size() > kMaxFacts) answers.wrong = "a header has more facts than a reader may keep";
+  for (const HeaderFact& fact : facts) {
+    const auto* const text = std::get_if<std::string>(&fact.value);
+    if ((text != nullptr && text->size() > kMaxTextBytes) || fact.unit.size() > kMaxTextBytes) {
+      answers.wrong = "a text of a header is longer than a reader may keep";
+    }
+  }
+}
+
+}  // namespace
+
+Answers AskEverything(std::istream& stream, const std::wstring& extension, std::span<const SIZE> requests) {
+  Answers answers;
+  AskReader(stream, extension, requests, answers);
+  AskHeader(stream, extension, answers);
   return answers;
 }
 

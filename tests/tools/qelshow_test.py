@@ -83,6 +83,15 @@ def ebn(*instrument):
     return struct.pack("<Hiii5d", 1, 2, 2, 54, *instrument) + bytes(4)
 
 
+def ser(units):
+    axis = struct.pack("<ddi", 0, 1.2e-9, 4)
+    dimension = struct.pack("<Iddi", 3, -1.5, 0.25, 2) + b"".join(
+        struct.pack("<i", len(text)) + text for text in (b"Defocus", units))
+    header = struct.pack("<HHHIIIIII", 0x4949, 0x0197, 0x0210, 0x4122, 0x4152, 1, 1, 30 + len(dimension), 1)
+    element = axis + axis + struct.pack("<hII", 1, 2, 2) + bytes(4)
+    return header + dimension + struct.pack("<II", 30 + len(dimension) + 8, 0) + element
+
+
 def png_facts(png):
     """Width, height, bits of a sample and colour type of a PNG file."""
     assert png[:8] == b"\x89PNG\r\n\x1a\n" and png[12:16] == b"IHDR"
@@ -635,6 +644,22 @@ class Answers(Test):
         for line in ("Microscope model code  2\n", "Electron source code   nan\n", "Objective lens code    -1.6\n",
                      "D number               1.2e-09\n", "Accelerating voltage   300 kV\n"):
             self.assertIn(line, text)
+
+        # A text in UTF-8, one in the code page of western Windows, and one of two lines.
+        for units, told in ((b"\xc2\xb5m", "µm"), (b"\xb5m", "µm"), (b"n\r\nm", "n\r\nm")):
+            path = self.write("a.ser", ser(units))
+            file, = self.info(path)
+            self.assertEqual(
+                [(fact["name"], fact["value"], fact["unit"]) for fact in file["header"]],
+                [("Tags", "times", None), ("Dimensions of the series", 1, None), ("Dimension 1 size", 3, None),
+                 ("Dimension 1 calibration offset", -1.5, told), ("Dimension 1 calibration delta", 0.25, told),
+                 ("Dimension 1 calibration element", 2, None), ("Dimension 1 description", "Defocus", None),
+                 ("Dimension 1 units", told, None), ("X calibration offset", 0, None),
+                 ("X calibration delta", 1.2e-9, None), ("X calibration element", 4, None),
+                 ("Y calibration offset", 0, None), ("Y calibration delta", 1.2e-9, None),
+                 ("Y calibration element", 4, None)])
+            self.assertIn("    Dimension 1 calibration delta    0.25 " + told.replace("\r\n", " ") + "\n",
+                          run("info", path).stdout)
 
         path = self.write("a.mrc", mrc())
         self.assertEqual(self.info(path)[0]["header"], [])
