@@ -1,7 +1,7 @@
 #!/usr/bin/python3
 """Makes the packages of a release from the programs in a build folder.
 
-usage: make_packages.py BUILD OUT
+usage: make_packages.py [--without-tests] BUILD OUT
 
 BUILD is the build folder of the preset windows, and OUT is the folder for the packages, whose paths are printed.
 scripts/package runs this program; its help describes the packages and how to sign them. The same programs and the
@@ -11,6 +11,7 @@ everything in the packages.
 It needs Debian's Python, because Debian packages the bindings of libmsi for that one only.
 """
 
+import argparse
 import hashlib
 import os
 import pathlib
@@ -241,16 +242,16 @@ def make_zip(path, files, epoch):
         for name, content in sorted(files.items()):
             entry = zipfile.ZipInfo(f"{path.stem}/{name}", date)
             entry.external_attr = 0o100644 << 16
-            archive.writestr(entry, content, zipfile.ZIP_DEFLATED, 9)
+            archive.writestr(entry, content, zipfile.ZIP_DEFLATED)
 
 
-def make_packages(build, out, epoch):
+def make_packages(build, out, epoch, with_tests):
     project = Project(build)
     signing = Signing(os.environ, epoch)
     out.mkdir(parents=True, exist_ok=True)
     out = out.resolve()  # wixl runs in another folder
     name = f"QelShellExt-{project.version}-x64"
-    packages = [out / f"{name}{ending}" for ending in (".msi", ".zip", "-symbols.zip", "-tests.zip")]
+    msi = out / f"{name}.msi"
     registry_scripts = build / "registration" / "scripts"
     with tempfile.TemporaryDirectory() as folder:
         content = pathlib.Path(folder)
@@ -262,15 +263,18 @@ def make_packages(build, out, epoch):
             contents = (HERE / text).read_text().replace("@PACKAGES@", packages_used)
             contents = contents.replace("@EXTENSIONS@", EXTENSIONS_IN_WORDS)
             (content / text).write_bytes(with_windows_line_ends(contents))
-        make_msi(content, registry_scripts, project, epoch, packages[0])
-        signing.sign(packages[0])
+        make_msi(content, registry_scripts, project, epoch, msi)
+        signing.sign(msi)
         released = {name: (content / name).read_bytes() for name in (*PROGRAMS, *TEXTS)}
         symbols = {f"{program}.debug": (build / f"{program}.debug").read_bytes() for program in PROGRAMS}
-        tests = test_kit_files(build, registry_scripts)
-        # The kit tests the released programs, signed if the release is.
-        tests |= {name: content for name, content in released.items() if name != "README.txt"}
-        for path, files in zip(packages[1:], (released, symbols, tests)):
+        archives = {out / f"{name}.zip": released, out / f"{name}-symbols.zip": symbols}
+        if with_tests:
+            # The kit tests the released programs, signed if the release is.
+            archives[out / f"{name}-tests.zip"] = test_kit_files(build, registry_scripts) | {
+                name: content for name, content in released.items() if name != "README.txt"}
+        for path, files in archives.items():
             make_zip(path, files, epoch)
+    packages = [msi, *archives]
     sums = [f"{hashlib.sha256(package.read_bytes()).hexdigest()}  {package.name}\n" for package in packages]
     (out / "SHA256SUMS").write_text("".join(sums))
     for path in (*packages, out / "SHA256SUMS"):
@@ -278,9 +282,12 @@ def make_packages(build, out, epoch):
 
 
 if __name__ == "__main__":
-    if len(sys.argv) != 3:
-        sys.exit("usage: make_packages.py BUILD OUT")
+    parser = argparse.ArgumentParser(allow_abbrev=False)
+    parser.add_argument("--without-tests", action="store_true")
+    parser.add_argument("build", type=pathlib.Path)
+    parser.add_argument("out", type=pathlib.Path)
+    arguments = parser.parse_args()
     try:
-        make_packages(pathlib.Path(sys.argv[1]), pathlib.Path(sys.argv[2]), int(os.environ["SOURCE_DATE_EPOCH"]))
+        make_packages(arguments.build, arguments.out, int(os.environ["SOURCE_DATE_EPOCH"]), not arguments.without_tests)
     except OSError as error:
         fail(f"{error.filename}: {error.strerror}")

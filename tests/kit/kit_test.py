@@ -29,12 +29,13 @@ class Test(unittest.TestCase):
         self.folder = pathlib.Path(folder.name) / "a folder"
         self.folder.mkdir()
 
-    def run_kit(self, kit):
+    def run_kit(self, kit, **environment):
         """Returns the exit status of run-tests.cmd, the lines that it prints, and the lines of its log."""
         out = self.folder / "out"
         with out.open("wb") as file:  # Wine's desktop process would keep a pipe open
             status = subprocess.run(["wine", CMD, "/c", "run-tests.cmd"], cwd=kit, stdin=subprocess.DEVNULL,
-                                    stdout=file, stderr=subprocess.DEVNULL).returncode  # Wine's own messages
+                                    stdout=file, stderr=subprocess.DEVNULL,  # Wine's own messages
+                                    env=os.environ | environment).returncode
         log = kit / "test-log.txt"
         return status, out.read_text().splitlines(), log.read_text("utf-8", "replace").splitlines()
 
@@ -52,13 +53,13 @@ class Runner(Test):
         shutil.copyfile(program, self.kit / "tests" / program.name)
 
     def test_counts_every_test_even_of_a_program_that_ends_early(self):
-        self.add(BUILD / "tests" / "render_test.exe")
+        self.add(BUILD / "tests" / "com_test.exe")
         self.add(FAULTY_TEST)
         (self.kit / "tests" / "other_test.exe").write_text("no program")
         status, out, log = self.run_kit(self.kit)
         self.assertEqual(status, 1)
-        passed = int(re.fullmatch(r"render_test: (\d+) passed, 0 failed, 0 skipped", out[-2])[1])
-        self.assertEqual(out[1:-2], ["  Exited with status 7.", "faulty_test: 1 passed, 2 failed, 1 skipped",
+        passed = int(re.fullmatch(r"com_test: (\d+) passed, 0 failed, 0 skipped", out[1])[1])
+        self.assertEqual(out[2:-1], ["  Exited with status 7.", "faulty_test: 1 passed, 2 failed, 1 skipped",
                                      "  Skipped: for a reason", "  Could not be started: error 193.",
                                      "other_test: 0 passed, 1 failed, 0 skipped"])
         self.assertEqual(out[-1], f"{passed + 1} passed, 3 failed, 1 skipped")
@@ -68,7 +69,7 @@ class Runner(Test):
     def test_succeeds_only_when_tests_have_passed(self):
         status, out, _ = self.run_kit(self.kit)
         self.assertEqual((status, out[1:]), (1, ["0 passed, 0 failed, 0 skipped"]))
-        self.add(BUILD / "tests" / "render_test.exe")
+        self.add(BUILD / "tests" / "com_test.exe")
         status, out, _ = self.run_kit(self.kit)
         self.assertEqual(status, 0, out)
 
@@ -83,7 +84,8 @@ class Kit(Test):
         with zipfile.ZipFile(archive) as files:
             files.extractall(self.folder)
         kit = self.folder / archive.stem
-        status, told, log = self.run_kit(kit)
+        # Two tests take almost as long as all the others and read no file of the kit. ctest runs them by themselves.
+        status, told, log = self.run_kit(kit, GTEST_FILTER="-InterruptedRegistration.That*")
         programs = sorted(path.stem for path in (kit / "tests").glob("*_test.exe"))
         self.assertGreater(len(programs), 15)
         self.assertEqual([line.split(":")[0] for line in told[1:-1] if not line.startswith("  ")], programs)
