@@ -8,7 +8,7 @@
 namespace Qel::Com {
 
 /// Owns a handle or none, and closes it in its destructor.
-template <class Handle, auto close>
+template <class Handle, auto kClose>
 class HandleOwner {
  public:
   HandleOwner() = default;
@@ -26,7 +26,7 @@ class HandleOwner {
   }
 
   ~HandleOwner() {
-    if (handle_ != nullptr) close(handle_);
+    if (handle_ != nullptr) kClose(handle_);
   }
 
   Handle Get() const { return handle_; }

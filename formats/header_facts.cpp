@@ -103,7 +103,7 @@ std::vector<HeaderFact> HeaderFacts(std::istream& stream, const std::wstring& ex
   WithKindOf(extension, [&]<class KindParser>(const FileKind<KindParser>&) {
     try {
       facts = FactsOf(KindParser(stream));
-    } catch (const std::exception&) {
+    } catch (const std::exception&) {  // NOLINT(bugprone-empty-catch)
       // Why the contents cannot be followed is explained by ExplainFault.
     }
   });

@@ -16,7 +16,7 @@
 // Frees the emergency memory that libstdc++ reserves for exceptions thrown when memory is exhausted. No
 // header of libstdc++ declares it.
 namespace __gnu_cxx {
-void __freeres();
+void __freeres();  // NOLINT(misc-use-internal-linkage)
 }
 
 // Laid out as the C++ ABI defines it: the stack of caught exceptions, and the number of uncaught ones.
@@ -130,7 +130,7 @@ int pthread_cond_broadcast(pthread_cond_t*) {
 
 // NOLINTNEXTLINE(readability-*): declared by the system, with names and types of its own.
 int pthread_once(pthread_once_t* once, void (*run)()) {
-  std::atomic_ref state(*once);
+  const std::atomic_ref state(*once);
   if (state == kDone) return 0;
   g_lock.Lock();
   while (state == kRunning) g_lock.Wait();

@@ -14,7 +14,7 @@ using Qel::Lumetra::ShellExt::UpdateRegistration;
 
 namespace {
 
-const auto g_instance = reinterpret_cast<HINSTANCE>(&__ImageBase);
+const auto kInstance = reinterpret_cast<HINSTANCE>(&__ImageBase);
 
 // Constructed before DllMain runs, destroyed when the DLL is unloaded.
 CQelShellExtModule g_module(ObjectMap());
@@ -34,9 +34,9 @@ STDAPI DllCanUnloadNow() {
 }
 
 STDAPI DllRegisterServer() {
-  return UpdateRegistration(ScriptDirection::kRegister, g_instance, g_module, ObjectMap());
+  return UpdateRegistration(ScriptDirection::kRegister, kInstance, g_module, ObjectMap());
 }
 
 STDAPI DllUnregisterServer() {
-  return UpdateRegistration(ScriptDirection::kUnregister, g_instance, g_module, ObjectMap());
+  return UpdateRegistration(ScriptDirection::kUnregister, kInstance, g_module, ObjectMap());
 }

@@ -27,7 +27,7 @@ PROPERTYKEY ShownKey(const SHCOLUMNID& column) {
 }
 
 std::wstring PathOf(const SHCOLUMNDATA& item) {
-  return {std::begin(item.wszFile), std::find(std::begin(item.wszFile), std::end(item.wszFile), L'\0')};
+  return {std::begin(item.wszFile), std::ranges::find(item.wszFile, L'\0')};
 }
 
 /// Reads the property of `column` from a file. Returns nothing for a key without a property, and for a file

@@ -1,7 +1,6 @@
 #include "property_sets.h"
 
 #include <algorithm>
-#include <iterator>
 #include <tuple>
 
 #include "com_object.h"
@@ -32,8 +31,7 @@ HRESULT AddPropertySet(const FileTypeInfo& reader, const FMTID& set, PropertySet
 bool FormatIdLess::operator()(const FMTID& a, const FMTID& b) const {
   const auto fields = [](const FMTID& id) { return std::tie(id.Data1, id.Data2, id.Data3); };
   if (fields(a) != fields(b)) return fields(a) < fields(b);
-  return std::lexicographical_compare(std::begin(a.Data4), std::end(a.Data4), std::begin(b.Data4),
-                                      std::end(b.Data4));
+  return std::ranges::lexicographical_compare(a.Data4, b.Data4);
 }
 
 HRESULT BuildPropertySets(const FileTypeInfo& reader, std::shared_ptr<const PropertySets>& sets) {
