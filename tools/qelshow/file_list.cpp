@@ -25,7 +25,7 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   const std::size_t first = files.size();
   std::error_code error;
   // The folder that was named has to open; one below it that does not is passed over.
-  fs::directory_iterator named(folder, error);
+  const fs::directory_iterator named(folder, error);
   fs::recursive_directory_iterator entry;
   if (!error) entry = {folder, fs::directory_options::skip_permission_denied, error};
   for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {

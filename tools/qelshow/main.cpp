@@ -43,8 +43,8 @@ int Main(const std::vector<std::wstring>& arguments) {
 
 /// Tells the C runtime of mingw-w64 to replace patterns on the command line by the files that they match, as
 /// shells of Windows leave that to the programs.
-int _dowildcard = -1;
+int _dowildcard = -1;  // NOLINT(misc-use-internal-linkage)
 
-int wmain(int count, wchar_t** arguments) {
+int wmain(int count, wchar_t** arguments) {  // NOLINT(misc-use-internal-linkage)
   return Qel::Lumetra::ShellExt::Show::Main({arguments + 1, arguments + count});
 }

@@ -124,9 +124,8 @@ void WriteNewFile(const std::wstring& path, const std::vector<std::uint8_t>& byt
   CannotWrite(path, error);
 }
 
-void MoveInto(const std::wstring& path, const std::wstring& place) {
-  if (!MoveFileExW(path.c_str(), place.c_str(), MOVEFILE_REPLACE_EXISTING))
-    CannotWrite(place, GetLastError());
+void MoveInto(const std::wstring& from, const std::wstring& to) {
+  if (!MoveFileExW(from.c_str(), to.c_str(), MOVEFILE_REPLACE_EXISTING)) CannotWrite(to, GetLastError());
 }
 
 void ReplaceFileAt(const std::wstring& path, const std::vector<std::uint8_t>& bytes) {
