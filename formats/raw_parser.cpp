@@ -61,11 +61,11 @@ RawParser::RawParser(std::istream& stream) : FileParser(stream) {
   }
   // The bytes from the end of the header to the end of the furthest pixel after it. The sums are 32-bit and
   // wrap, which leaves pixels outside of the block: such an image cannot be read.
-  const std::int64_t right = WrappingProduct(WrapToInt32(width - std::int64_t{1}), pixelStride);
-  const std::int64_t down = WrappingProduct(WrapToInt32(height - std::int64_t{1}), rowStride);
+  const std::int64_t right = WrapToInt32((width - std::int64_t{1}) * pixelStride);
+  const std::int64_t down = WrapToInt32((height - std::int64_t{1}) * rowStride);
   const std::int32_t furthest = std::max(
       {offset, WrapToInt32(offset + right), WrapToInt32(offset + down), WrapToInt32(offset + right + down)});
-  const std::int32_t bytesPerPixel = (bitsPerPixel + 7) / 8;
+  const std::int32_t bytesPerPixel = bitsPerPixel / 8;  // every accepted number of bits is whole bytes
   frame_ = {.type = PixelTypeOf(*type),
             .size = {width, height},
             .blockPosition = kHeaderBytes,

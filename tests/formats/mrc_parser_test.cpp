@@ -337,6 +337,18 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneThoughItsBytesAreThere) {
   EXPECT_EQ(buffer.bytesRead, 1024);
 }
 
+TEST(MrcThumbnail, ExtendedHeaderThatLeadsBehind2GiBLeadsNowhere) {
+  // Extended header and section are each less than 2 GiB, and together more.
+  MrcFile file{.nx = 1000, .ny = 1000, .nz = 2};
+  file.next = kMax - 1024;
+  const std::string head = file.Bytes();
+  Testing::MemoryBuffer buffer(head);
+  buffer.zerosBehind = std::int64_t{6} << 30;
+  std::istream stream(&buffer);
+  EXPECT_EQ(Testing::TakeBitmap(MrcFileInfo(stream, L"mrc").CreateThumbnail({256, 256})).width, 0);
+  EXPECT_EQ(buffer.bytesRead, 1024);
+}
+
 TEST(MrcThumbnail, HugeSectionsHaveNone) {
   MrcFile file = Stack(1);
   for (const std::int32_t mode : {0, 1, 2, 3, 4, 6, 16}) {
