@@ -99,6 +99,14 @@ TEST(Ser, RejectsNumbersOfElementsThatCannotBe) {
   EXPECT_FALSE(IsValid(file));
   file.totalElements = 1;
   EXPECT_TRUE(IsValid(file));
+
+  file = OneImage();
+  file.elements.push_back(Image(1, 1, "x"));
+  file.validElements = 2;
+  for (const std::uint32_t total : {1u, 2u, 3u}) {
+    file.totalElements = total;
+    EXPECT_EQ(IsValid(file), total >= 2) << total;
+  }
 }
 
 TEST(Ser, RejectionFailsTheStreamAndKeepsNothing) {
