@@ -13,7 +13,9 @@ ARGUMENTS = ("--headless", "--no-sandbox", "--disable-gpu", "--disable-dev-shm-u
 
 KEYS = {"Enter": Keys.ENTER, "Escape": Keys.ESCAPE, "Tab": Keys.TAB, "Home": Keys.HOME, "End": Keys.END,
         "ArrowLeft": Keys.ARROW_LEFT, "ArrowUp": Keys.ARROW_UP, "ArrowRight": Keys.ARROW_RIGHT,
-        "ArrowDown": Keys.ARROW_DOWN}
+        "ArrowDown": Keys.ARROW_DOWN, "Space": Keys.SPACE}
+
+MODIFIERS = {"Control": Keys.CONTROL, "Shift": Keys.SHIFT}
 
 
 class Browser:
@@ -73,11 +75,20 @@ class Tab:
         """Returns what is in sight, as the bytes of a PNG image."""
         return self._driver.get_screenshot_as_png()
 
+    def load(self, path):
+        """Runs a JavaScript file in the page, past the page's security policy."""
+        self._driver.execute_script(path.read_text("utf-8"))
+
     def press(self, *keys):
-        """Presses and releases keys: characters, or names such as "Enter"."""
+        """Presses and releases keys: characters, or names such as "Enter" and "Control+v"."""
         actions = webdriver.ActionChains(self._driver, duration=0)
         for key in keys:
-            actions.send_keys(KEYS.get(key, key))
+            *held, last = [key] if len(key) == 1 else key.split("+")
+            for modifier in held:
+                actions.key_down(MODIFIERS[modifier])
+            actions.send_keys(KEYS.get(last, last))
+            for modifier in held:
+                actions.key_up(MODIFIERS[modifier])
         actions.perform()
 
     def type(self, text):
