@@ -53,7 +53,7 @@ std::wstring UnusedFolder(const std::wstring& folder) {
 }  // namespace
 
 bool IsMarkedPage(std::string_view beginning) {
-  return beginning.find("<meta name=\"generator\" content=\"qelshow\">") != std::string_view::npos;
+  return beginning.find(R"(<meta name="generator" content="qelshow">)") != std::string_view::npos;
 }
 
 std::wstring PagePath(const std::wstring& folder) {

@@ -145,7 +145,7 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
   Guard(answer.problem, [&] {
     ComPtr<IColumnProvider> provider;
     HRESULT result = client.Create(CLSID_QelShellExt, provider);
-    SHCOLUMNINIT folder{};
+    const SHCOLUMNINIT folder{};
     if (SUCCEEDED(result)) result = provider->Initialize(&folder);
     if (FAILED(result)) {
       answer.problem = NoAnswer(L"columns", result);
@@ -156,7 +156,7 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
       answer.problem = L"The shell requests no columns for a file whose path has 260 characters or more.";
       return;
     }
-    std::copy(path.begin(), path.end(), file.wszFile);
+    std::ranges::copy(path, file.wszFile);
     std::wstring extension = L"." + GetExtension(path);
     file.pwszExt = extension.data();
     file.dwFileAttributes = FILE_ATTRIBUTE_NORMAL;
