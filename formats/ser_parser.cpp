@@ -114,17 +114,14 @@ void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
     stream().read(reinterpret_cast<char*>(offsets.data()), std::streamsize{kEntryBytes} * entries);
     for (std::uint32_t i = 0; i < entries && stream().good(); ++i) {
       const auto offset = LoadLittleEndian<std::uint32_t>(&offsets[i * kEntryBytes]);
-      SerElement element;
-      const FrameLayout frame = ReadElement(offset, element);
-      if (done + i > 0) continue;
-      frame_ = frame;
-      if (stream().good()) element_ = element;
+      const FrameLayout element = ReadElement(offset);
+      if (done + i == 0) frame_ = element;
     }
     done += entries;
   }
 }
 
-FrameLayout SerParser::ReadElement(std::uint32_t position, SerElement& element) {
+FrameLayout SerParser::ReadElement(std::uint32_t position) {
   constexpr std::size_t kTypeCode = std::size_t{2} * kCalibrationBytes;
   constexpr std::size_t kSizeX = kTypeCode + sizeof(std::int16_t);
   constexpr std::size_t kSizeY = kSizeX + sizeof(std::uint32_t);
@@ -140,8 +137,10 @@ FrameLayout SerParser::ReadElement(std::uint32_t position, SerElement& element) 
     stream().setstate(std::ios_base::failbit);
     return {};
   }
-  element = {.calibrationX = LoadCalibration(bytes.data()),
-             .calibrationY = LoadCalibration(&bytes[kCalibrationBytes])};
+  if (stream().good() && !element_) {
+    element_ = {.calibrationX = LoadCalibration(bytes.data()),
+                .calibrationY = LoadCalibration(&bytes[kCalibrationBytes])};
+  }
   const Size2 size = {LoadLittleEndian<std::int32_t>(&bytes[kSizeX]),
                       LoadLittleEndian<std::int32_t>(&bytes[kSizeY])};
   return PackedLayout(PixelTypeOf(*type), size, position + std::int64_t{kBytes});

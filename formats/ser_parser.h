@@ -62,8 +62,9 @@ class SerParser final : public FileParser {
   void ReadDimensions();
   void ReadElements(std::uint32_t arrayOffset, std::uint32_t count);
 
-  /// Reads the header of an image. Fails the stream for an element that is not there or of an unknown type.
-  FrameLayout ReadElement(std::uint32_t position, SerElement& element);
+  /// Reads the header of an image, and keeps the calibrations of the first one. Fails the stream for an
+  /// element that is not there or of an unknown type.
+  FrameLayout ReadElement(std::uint32_t position);
 
   bool isImageSeries_ = false;
   std::optional<SerSeries> series_;
