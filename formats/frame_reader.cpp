@@ -167,7 +167,7 @@ class BandReader {
         static_cast<double>(rowStep_) / static_cast<double>(std::max<std::int64_t>(pixelStep_, 1));
     const double square =
         std::min(std::sqrt(static_cast<double>(maxPixels) * ratio), static_cast<double>(maxPixels));
-    const auto minColumns = std::max(static_cast<std::int32_t>(square), factor_) / factor_ * factor_;
+    const auto minColumns = std::max(static_cast<std::int32_t>(square), factor_);
     const auto rows = static_cast<std::int32_t>(std::min<std::int64_t>(maxPixels / minColumns, height_));
     const auto columns = static_cast<std::int32_t>(std::min<std::int64_t>(maxPixels / rows, width_));
     return {0, 0, columns / factor_ * factor_, rows};
