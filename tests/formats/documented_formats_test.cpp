@@ -1,4 +1,5 @@
-// The tables of docs/formats.md against the readers and the writers of the tests; the current folder is docs.
+// Compares the tables of docs/formats.md with the readers, and with the writers of the tests. The current
+// folder is docs.
 #include <gtest/gtest.h>
 
 #include <bit>
@@ -41,7 +42,9 @@ Row Cells(const std::string& line) {
   return cells;
 }
 
-/// The rows of the table in section `section`, or before all sections, whose first column is called `column`.
+/// Returns the rows of the table whose first column is called `column`, in the section `section`. An empty
+/// `section` means
+/// the part before all sections.
 Table Documented(const std::string& section, const std::string& column) {
   std::ifstream file("formats.md");
   EXPECT_TRUE(file.is_open());
@@ -77,7 +80,7 @@ std::wstring Wide(const std::string& text) {
   return {text.begin(), text.end()};
 }
 
-/// The value of a field, as text, so that numbers of all types can be compared.
+/// Returns the value of a field as a string, so that numbers of all types can be compared.
 std::string ValueAt(const std::string& bytes, const Row& row) {
   const auto* const field = reinterpret_cast<const unsigned char*>(bytes.data()) + Number(row[0]);
   const std::string& type = row[1];
@@ -99,7 +102,7 @@ std::string Value(T value) {
   return std::to_string(value);
 }
 
-/// Whether every documented field is where it is said to be; `fields` are all of them.
+/// Expects every documented field at its documented offset. `fields` lists all of them.
 void ExpectFields(const Table& table, const std::string& bytes, const Fields& fields) {
   EXPECT_EQ(table.size(), fields.size());
   for (const Row& row : table) {
@@ -109,13 +112,13 @@ void ExpectFields(const Table& table, const std::string& bytes, const Fields& fi
   }
 }
 
-/// Numbers that a documented rule accepts and numbers that it does not, as near to each other as can be.
+/// The numbers next to the limits of a documented rule: those that it accepts and those that it rejects.
 struct Samples {
   std::vector<int> accepted;
   std::vector<int> rejected;
 };
 
-/// Rules are "7", "7 or 9", "7 to 9", "at least 7" and "at most 7".
+/// Returns the samples of a rule. Rules are "7", "7 or 9", "7 to 9", "at least 7" and "at most 7".
 Samples SamplesOf(const std::string& rule) {
   if (rule.starts_with("at least ")) {
     const int least = Number(rule.substr(9));
@@ -137,14 +140,14 @@ Samples SamplesOf(const std::string& rule) {
   return samples;
 }
 
-/// Bytes as a writer, for OpenFile.
+/// Gives bytes the interface of a file writer, for OpenFile.
 struct PlainFile {
   std::string bytes;
 
   std::string Bytes() const { return bytes; }
 };
 
-/// The file with `value` in the field, which is an integer.
+/// Returns the file with `value` in an integer field.
 PlainFile WithField(std::string bytes, const Row& field, int value) {
   const std::string& type = field[1];
   const std::size_t size =
@@ -155,8 +158,9 @@ PlainFile WithField(std::string bytes, const Row& field, int value) {
   return {bytes};
 }
 
-/// Whether the reader accepts in a good file what is said to be accepted in a field, and nothing else.
-/// `count` is the number of fields with a rule.
+/// Expects that the reader accepts the documented values of each field in an otherwise valid file, and no
+/// other values.
+/// `count` is the expected number of fields with a rule.
 template <class Reader, class File, class... Arguments>
 void ExpectRules(const Table& table, std::size_t count, const File& good, const Arguments&... arguments) {
   std::size_t rules = 0;
@@ -176,7 +180,7 @@ void ExpectRules(const Table& table, std::size_t count, const File& good, const 
   EXPECT_EQ(rules, count);
 }
 
-/// Whether the reader of a file with one of the documented types answers its bits and its name.
+/// Expects that the reader reports the bits and the name of the documented type.
 template <class Reader>
 void ExpectType(const OpenFile<Reader>& file, const std::string& bits, const std::string& name) {
   EXPECT_TRUE(file->IsValid()) << name;
@@ -185,7 +189,7 @@ void ExpectType(const OpenFile<Reader>& file, const std::string& bits, const std
 }
 
 TEST(DocumentedNames, HaveTheirBits) {
-  std::map<std::wstring, int> bits = {{L"32 bit complex integer", 32}};  // of MRC files only
+  std::map<std::wstring, int> bits = {{L"32 bit complex integer", 32}};  // in MRC files only
   for (std::uint32_t value = 0; value < 32; ++value) {
     const auto type = static_cast<DataType>(value);
     if (BitsPerPixel(type) > 0) bits[DataTypeName(type)] = BitsPerPixel(type);
@@ -197,7 +201,7 @@ TEST(DocumentedNames, HaveTheirBits) {
   EXPECT_EQ(documented, bits);
 }
 
-TEST(DocumentedMrc, FieldsAreWhereTheyAre) {
+TEST(DocumentedMrc, HasTheDocumentedFields) {
   MrcFile file;
   file.nx = 11;
   file.ny = 12;
@@ -216,11 +220,11 @@ TEST(DocumentedMrc, FieldsAreWhereTheyAre) {
                 {"label", file.labels[0]}});
 }
 
-TEST(DocumentedMrc, RulesAreKept) {
+TEST(DocumentedMrc, FollowsTheDocumentedRules) {
   ExpectRules<MrcFileInfo>(Documented("MRC", "Offset"), 4, MrcFile{}, std::wstring(L"mrc"));
 }
 
-TEST(DocumentedMrc, TypesAreWhatTheyAre) {
+TEST(DocumentedMrc, HasTheDocumentedTypes) {
   const Table table = Documented("MRC", "Mode");
   EXPECT_EQ(table.size(), 7u);
   for (const Row& row : table) {
@@ -229,7 +233,7 @@ TEST(DocumentedMrc, TypesAreWhatTheyAre) {
   }
 }
 
-TEST(DocumentedRaw, FieldsAreWhereTheyAre) {
+TEST(DocumentedRaw, HasTheDocumentedFields) {
   RawFile file;
   file.word1 = 11;
   file.width = 12;
@@ -253,11 +257,11 @@ TEST(DocumentedRaw, FieldsAreWhereTheyAre) {
                 {"rowStride", Value(file.rowStride)}});
 }
 
-TEST(DocumentedRaw, RulesAreKept) {
+TEST(DocumentedRaw, FollowsTheDocumentedRules) {
   ExpectRules<RawFileInfo>(Documented("RAW", "Offset"), 2, RawFile{});
 }
 
-TEST(DocumentedRaw, TypesAreWhatTheyAre) {
+TEST(DocumentedRaw, HasTheDocumentedTypes) {
   const Table table = Documented("RAW", "Value class");
   EXPECT_EQ(table.size(), 12u);
   for (const Row& row : table) {
@@ -268,7 +272,7 @@ TEST(DocumentedRaw, TypesAreWhatTheyAre) {
   }
 }
 
-TEST(DocumentedEbn, FieldsAreWhereTheyAre) {
+TEST(DocumentedEbn, HasTheDocumentedFields) {
   EbnFile file;
   file.typeCode = 11;
   file.width = 12;
@@ -291,11 +295,11 @@ TEST(DocumentedEbn, FieldsAreWhereTheyAre) {
                 {"kilovolts", Value(file.kilovolts)}});
 }
 
-TEST(DocumentedEbn, RulesAreKept) {
+TEST(DocumentedEbn, FollowsTheDocumentedRules) {
   ExpectRules<EbnFileInfo>(Documented("EBN", "Offset"), 4, EbnFile{});
 }
 
-TEST(DocumentedEbn, TypesAreWhatTheyAre) {
+TEST(DocumentedEbn, HasTheDocumentedTypes) {
   const Table table = Documented("EBN", "Code");
   EXPECT_EQ(table.size(), 8u);
   for (const Row& row : table) {
@@ -305,7 +309,7 @@ TEST(DocumentedEbn, TypesAreWhatTheyAre) {
   }
 }
 
-TEST(DocumentedEbn, CodesHaveTheirTexts) {
+TEST(DocumentedEbn, HasTheDocumentedTextsOfCodes) {
   const Table table = Documented("EBN", "Field");
   EXPECT_EQ(table.size(), 14u);
   const std::map<std::string, double EbnFile::*> fields = {
@@ -333,7 +337,7 @@ SerFile Series() {
   return file;
 }
 
-TEST(DocumentedSer, FieldsAreWhereTheyAre) {
+TEST(DocumentedSer, HasTheDocumentedFields) {
   SerFile file = Series();
   ExpectFields(Documented("SER", "Offset"), file.Bytes(),
                {{"byteOrder", Value(file.byteOrder)},
@@ -351,13 +355,13 @@ TEST(DocumentedSer, FieldsAreWhereTheyAre) {
                 {"dimensionCount", Value(*file.dimensionCount)}});
 }
 
-TEST(DocumentedSer, RulesAreKept) {
+TEST(DocumentedSer, FollowsTheDocumentedRules) {
   SerFile file;
   file.elements.resize(1);
   ExpectRules<SerFileInfo>(Documented("SER", "Offset"), 6, file);
 }
 
-TEST(DocumentedSer, FieldsOfImagesAreWhereTheyAre) {
+TEST(DocumentedSer, HasTheDocumentedFieldsOfImages) {
   Testing::SerElement element;
   element.calibrationX = {11.5, 12.5, 13};
   element.calibrationY = {14.5, 15.5, 16};
@@ -376,7 +380,7 @@ TEST(DocumentedSer, FieldsOfImagesAreWhereTheyAre) {
                 {"height", Value(element.height)}});
 }
 
-TEST(DocumentedSer, TypesAreWhatTheyAre) {
+TEST(DocumentedSer, HasTheDocumentedTypes) {
   const Table table = Documented("SER", "Code");
   EXPECT_EQ(table.size(), 10u);
   for (const Row& row : table) {
@@ -387,24 +391,26 @@ TEST(DocumentedSer, TypesAreWhatTheyAre) {
   }
 }
 
-TEST(DocumentedEmi, FieldsAreWhereTheyAre) {
+TEST(DocumentedEmi, HasTheDocumentedFields) {
   const EmiFile file{.magic = 11, .version = 12, .ignored = 13};
   ExpectFields(
       Documented("EMI", "Offset"), file.Bytes(),
       {{"magic", Value(file.magic)}, {"version", Value(file.version)}, {"ignored", Value(file.ignored)}});
 }
 
-TEST(DocumentedEmi, RulesAreKept) {
+TEST(DocumentedEmi, FollowsTheDocumentedRules) {
   ExpectRules<EmiFileInfo>(Documented("EMI", "Offset"), 2, OneImageEmiFile(0x2200, 1, 1, "x"));
 }
 
-/// The number of images that are found when an image is the next item after `item`, three deep.
+/// Returns the number of images in a file where `item` and then an image are three levels deep: 1 if `item`
+/// has the length
+/// that the reader skips.
 int ImagesBehind(const std::string& item) {
   const std::string items = EmiStructure(0x4000, 1, EmiStructure(0x4000, 1, item + EmiImageObject("")));
   return OpenFile<EmiFileInfo>(EmiFile{.items = items})->GetFrameCount();
 }
 
-TEST(DocumentedEmi, ValuesAreAsLongAsTheyAre) {
+TEST(DocumentedEmi, HasTheDocumentedLengthsOfValues) {
   std::size_t scalars = 0;
   std::map<std::string, std::uint16_t> others;
   for (const Row& row : Documented("EMI", "Type of an item")) {
@@ -424,7 +430,7 @@ TEST(DocumentedEmi, ValuesAreAsLongAsTheyAre) {
   ASSERT_EQ(others.size(), 3u);
   const std::uint16_t text = others["a text"];
   EXPECT_EQ(ImagesBehind(EmiArray(text, 1, "\xFF\xFF\xFF")), 1);
-  // A text at the top is an error, which tells it from other items.
+  // Only a string is an error at the top level, so this shows that the type is a string.
   EXPECT_THROW(OpenFile<EmiFileInfo>(EmiFile{.items = EmiArray(text, 1, "x")}), std::exception);
   const std::uint16_t bit = others["an array"];
   EXPECT_TRUE(std::has_single_bit(bit));
@@ -440,7 +446,7 @@ Facts EmiFacts(const std::string& items) {
   return HeaderFacts(stream, L"emi");
 }
 
-TEST(DocumentedEmi, LabelsHaveTheirTags) {
+TEST(DocumentedEmi, HasTheDocumentedTagsOfLabels) {
   const Table table = Documented("EMI", "Tag of a text");
   EXPECT_EQ(table.size(), 4u);
   for (const Row& row : table) {
@@ -449,7 +455,7 @@ TEST(DocumentedEmi, LabelsHaveTheirTags) {
   }
 }
 
-TEST(DocumentedEmi, ExtraValuesAreWhereTheyAre) {
+TEST(DocumentedEmi, HasTheDocumentedExtraValues) {
   const Table table = Documented("EMI", "Object");
   EXPECT_EQ(table.size(), 2u);
   for (const Row& row : table) {
@@ -461,7 +467,7 @@ TEST(DocumentedEmi, ExtraValuesAreWhereTheyAre) {
   }
 }
 
-TEST(DocumentedEmi, TypesAreWhatTheyAre) {
+TEST(DocumentedEmi, HasTheDocumentedTypes) {
   const Table table = Documented("EMI", "Type of the array");
   EXPECT_EQ(table.size(), 10u);
   for (const Row& row : table) {

@@ -17,7 +17,7 @@ using Testing::EbnFile;
 
 using OpenEbn = Testing::OpenFile<EbnFileInfo>;
 
-constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr SIZE kWholeSize = {1000, 1000};  // larger than all frames here, so that none is reduced
 
 using Bytes = std::vector<std::uint8_t>;
 
@@ -51,7 +51,7 @@ TEST(Ebn, HasTheTypeOfItsCode) {
   }
 }
 
-TEST(Ebn, RejectsEmptyPictures) {
+TEST(Ebn, RejectsEmptyFrames) {
   for (const std::int32_t size : {0, -1, std::numeric_limits<std::int32_t>::min()}) {
     EbnFile file;
     file.width = size;
@@ -61,7 +61,7 @@ TEST(Ebn, RejectsEmptyPictures) {
   }
 }
 
-TEST(Ebn, RejectsPixelsInsideOfTheHeader) {
+TEST(Ebn, RejectsPixelsInsideTheHeader) {
   EbnFile file;
   for (const std::int32_t offset : {std::numeric_limits<std::int32_t>::min(), -1, 0, 53}) {
     file.dataOffset = offset;
@@ -71,7 +71,7 @@ TEST(Ebn, RejectsPixelsInsideOfTheHeader) {
   EXPECT_TRUE(OpenEbn(file)->IsValid());
 }
 
-TEST(Ebn, AnswersForItsOnePicture) {
+TEST(Ebn, DescribesItsOneFrame) {
   EbnFile file;
   file.width = 3;
   file.height = 2;
@@ -94,7 +94,7 @@ TEST(Ebn, PixelsBeginAtTheirOffset) {
   EXPECT_EQ(OpenEbn(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 }
 
-TEST(Ebn, HugePicturesHaveNoThumbnail) {
+TEST(Ebn, HugeFramesHaveNoThumbnail) {
   constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
   EbnFile file;
   file.typeCode = 8;
@@ -114,7 +114,7 @@ TEST(Ebn, PictureWhosePixelsWrapHasNoThumbnailThoughItsBytesAreThere) {
   file.height = 0x10001;
   const std::string head = file.Bytes();
   Testing::MemoryBuffer buffer(head);
-  buffer.zerosBehind = std::int64_t{6} << 30;
+  buffer.trailingZeros = std::int64_t{6} << 30;
   std::istream stream(&buffer);
   const EbnFileInfo ebn(stream);
   EXPECT_TRUE(ebn.IsValid());
@@ -139,8 +139,9 @@ TEST(EbnComment, AlwaysHasTheVoltage) {
   EXPECT_EQ(CommentOf({}), L" 0.0 kV");
 }
 
-/// What a header with `stored` in `field` has in front of the voltage. A code of -n is stored as -(n + 0.5)
-/// or a little less, one of n as n.
+/// Returns what the comment has before the voltage when `field` holds `stored`. A code n is stored as n, a
+/// code -n as
+/// -(n + 0.5) or a little less.
 std::wstring TextOf(double EbnFile::* field, double stored) {
   EbnFile file;
   file.*field = stored;
@@ -150,7 +151,7 @@ std::wstring TextOf(double EbnFile::* field, double stored) {
   return comment.substr(0, comment.size() - voltage.size());
 }
 
-TEST(EbnComment, KnowsEveryCode) {
+TEST(EbnComment, HasATextForEveryCode) {
   struct Row {
     double EbnFile::* field;
     int code;
@@ -195,7 +196,7 @@ TEST(EbnComment, CodesAreTruncatedAfterAddingHalf) {
   EXPECT_EQ(TextOf(&EbnFile::model, 2.5), L"");
   EXPECT_EQ(TextOf(&EbnFile::model, 1.5), L"Halden 30");
   EXPECT_EQ(TextOf(&EbnFile::model, 0.4), L"");
-  // Below 0 this is not the nearest integer.
+  // Below 0, adding a half and truncating does not give the nearest integer.
   EXPECT_EQ(TextOf(&EbnFile::model, -1.0), L"");
   EXPECT_EQ(TextOf(&EbnFile::model, -1.49), L"");
   EXPECT_EQ(TextOf(&EbnFile::model, -1.5), L"Halden 12");
@@ -208,7 +209,7 @@ TEST(EbnComment, CodesAreTruncatedAfterAddingHalf) {
   EXPECT_EQ(TextOf(&EbnFile::dNumber, 0.5), L" D1");
 }
 
-TEST(EbnComment, NumbersThatAreNoCodesAddNothing) {
+TEST(EbnComment, UnknownCodesAddNothing) {
   using Limits = std::numeric_limits<double>;
   for (const double stored : {Limits::quiet_NaN(), Limits::infinity(), -Limits::infinity(), Limits::max(),
                               Limits::lowest(), 2147483647.5, -2147483649.5, 4294967297.0}) {
@@ -243,8 +244,8 @@ TEST(EbnComment, VoltageHasOneDecimal) {
   };
   EXPECT_EQ(voltage(300), L" 300.0 kV");
   EXPECT_EQ(voltage(119.96), L" 120.0 kV");
-  EXPECT_EQ(voltage(0.05), L" 0.1 kV");  // a little more than 0.05
-  EXPECT_EQ(voltage(0.25), L" 0.2 kV");  // a tie goes to the even digit
+  EXPECT_EQ(voltage(0.05), L" 0.1 kV");  // the double is a little above 0.05
+  EXPECT_EQ(voltage(0.25), L" 0.2 kV");  // ties round to even
   EXPECT_EQ(voltage(-0.04), L" -0.0 kV");
   EXPECT_EQ(voltage(-60), L" -60.0 kV");
   EXPECT_EQ(voltage(1e22), L" 10000000000000000000000.0 kV");

@@ -14,7 +14,7 @@ using namespace Testing;
 
 using OpenEmi = OpenFile<EmiFileInfo>;
 
-constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr SIZE kWholeSize = {1000, 1000};  // larger than all frames here, so that none is reduced
 constexpr std::uint16_t kUInt8Image = 0x2202;
 constexpr std::uint16_t kPlainStructure = 0x4100;
 
@@ -24,7 +24,7 @@ std::string Picture() {
   return EmiPixelArray(kUInt8Image, 3, 2, BytesOf<std::uint8_t>({0, 1, 2, 3, 4, 255}));
 }
 
-/// Whether the reader finds the picture that Picture() makes behind everything it has to pass.
+/// Expects that the reader skips the other items and finds the picture that Picture() makes.
 void ExpectPicture(const std::string& items) {
   const OpenEmi emi(EmiFile{.items = items});
   EXPECT_TRUE(emi->IsValid());
@@ -32,7 +32,7 @@ void ExpectPicture(const std::string& items) {
   EXPECT_EQ(emi.Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 }
 
-/// Opens a file of items and answers how many images it has.
+/// Returns the number of images in a file of these items.
 std::int32_t ImageCount(const std::string& items) {
   return OpenEmi(EmiFile{.items = items})->GetFrameCount();
 }
@@ -40,7 +40,7 @@ std::int32_t ImageCount(const std::string& items) {
 void ExpectBadIndex(const std::string& items) {
   try {
     OpenEmi emi(EmiFile{.items = items});
-    ADD_FAILURE() << "nothing was thrown";
+    ADD_FAILURE() << "no exception was thrown";
   } catch (const std::invalid_argument& error) {
     EXPECT_STREQ(error.what(), "bad EMI object index");
   }
@@ -87,7 +87,7 @@ TEST(Emi, HasTheTypeOfItsArray) {
   }
 }
 
-TEST(Emi, OtherArraysLeaveTheImageAsItWas) {
+TEST(Emi, OtherArraysDoNotChangeTheImage) {
   for (const std::uint16_t arrayType :
        std::initializer_list<std::uint16_t>{0x2201, 0x2203, 0x220D, 0x220F, 0x2210, 0x2211, 0x2213, 0x2215,
                                             0x2216, 0x2102, 0x2302, 0x6202, 0xA202}) {
@@ -103,25 +103,25 @@ TEST(Emi, OtherArraysLeaveTheImageAsItWas) {
   }
 }
 
-TEST(Emi, ArrayWithAnotherTagIsNotTheImages) {
+TEST(Emi, IgnoresAnArrayWithAnotherTag) {
   std::string array = Picture();
   array[2] = 0x03;
   EXPECT_EQ(OpenEmi(EmiFile{.items = EmiImageObject(array)})->GetDimensions(), (Size2{0, 0}));
   ExpectPicture(EmiImageObject(array + Picture()));
 }
 
-TEST(Emi, ArrayOfAnotherObjectIsNotTheImages) {
+TEST(Emi, IgnoresAnArrayOfAnotherObject) {
   const std::string deeper = EmiStructure(kPlainStructure, 0x0610, Picture());
   EXPECT_EQ(OpenEmi(EmiFile{.items = EmiImageObject(deeper)})->GetDimensions(), (Size2{0, 0}));
   const std::string lines = EmiLineDataObject(Picture());
   EXPECT_EQ(OpenEmi(EmiFile{.items = EmiImageObject(lines)})->GetDimensions(), (Size2{0, 0}));
-  // Type and tag together make the image object.
+  // An image object needs both its type and its tag.
   EXPECT_EQ(ImageCount(EmiStructure(0x49B0, 0x0611, Picture())), 0);
   EXPECT_EQ(ImageCount(EmiStructure(0x49B1, 0x0610, Picture())), 0);
   EXPECT_EQ(ImageCount(EmiLineDataObject(Picture())), 0);
 }
 
-TEST(Emi, LastArrayOfAnImageCounts) {
+TEST(Emi, UsesTheLastArrayOfAnImage) {
   const std::string first = EmiPixelArray(0x220E, 1, 1, BytesOf({1.0}));
   ExpectPicture(EmiImageObject(first + Picture()));
 }
@@ -131,7 +131,7 @@ TEST(Emi, ShowsTheFirstOfTwoImages) {
   const std::string items = EmiImageObject(Picture()) + second;
   EXPECT_EQ(ImageCount(items), 2);
   ExpectPicture(items);
-  // An array belongs to the image that was opened last, also when that is closed again.
+  // An array belongs to the image that was opened last, even after that image has been closed.
   const OpenEmi nested(EmiFile{.items = EmiImageObject(second + Picture())});
   EXPECT_EQ(nested->GetFrameCount(), 2);
   EXPECT_EQ(nested->GetDimensions(), (Size2{0, 0}));
@@ -180,7 +180,7 @@ TEST(Emi, StaysValidWhenItsPixelsCannotBeRead) {
   EXPECT_FALSE(emi->IsValid());
 }
 
-TEST(Emi, PassesEveryKindOfValue) {
+TEST(Emi, SkipsEveryKindOfValue) {
   struct Row {
     std::uint16_t type;
     std::size_t bytes;
@@ -207,7 +207,7 @@ TEST(Emi, EndOfTheTopLevelListEndsTheFile) {
   EXPECT_EQ(ImageCount(EmiEnd() + EmiImageObject(Picture())), 0);
 }
 
-TEST(Emi, PassesTextsOfImagesAndLines) {
+TEST(Emi, SkipsStringsOfImagesAndLines) {
   std::string texts;
   for (const std::uint16_t tag :
        std::initializer_list<std::uint16_t>{0x0100, 0x0400, 0x0419, 0x0440, 0x0441}) {
@@ -216,13 +216,13 @@ TEST(Emi, PassesTextsOfImagesAndLines) {
   ExpectPicture(EmiLineDataObject(texts) + EmiImageObject(texts + Picture() + texts));
 }
 
-TEST(Emi, PassesDoublesOfImagesAndLines) {
+TEST(Emi, SkipsDoublesOfImagesAndLines) {
   const std::string doubles = EmiDouble(0x0100, 1) + EmiDouble(0x0120, 2) + EmiDouble(0x0130, 3);
   ExpectPicture(EmiLineDataObject(EmiStructure(0x4100, 0x0300, doubles) + EmiArray(0x2102, 0x0202, "4567")) +
                 EmiImageObject(EmiStructure(0x4102, 0x0300, doubles) + Picture()));
 }
 
-TEST(Emi, TextAtTheTopIsABadIndex) {
+TEST(Emi, StringAtTheTopIsABadIndex) {
   ExpectBadIndex(EmiText(0x0100, "text"));
   ExpectBadIndex(EmiImageObject(Picture()) + EmiText(0x0100, "text"));
   ExpectBadIndex(EmiOpening(0x0060, 0x0100));  // even if the file ends with it
@@ -252,22 +252,23 @@ TEST(Emi, DataArrayAtTheTopIsABadIndex) {
   }
 }
 
-TEST(Emi, ByteCountSaysWhereTheNextItemIs) {
+TEST(Emi, ByteCountGivesThePositionOfTheNextItem) {
   const std::string pixels = BytesOf<std::uint8_t>({0, 1, 2, 3, 4, 255});
   const std::string payload = FileBytes().Put(std::uint32_t{3}).Put(std::uint32_t{2}).Text(pixels).bytes();
   const std::string second = EmiImageObject("");
-  // More bytes than the picture has.
+  // The array has more bytes than the picture needs.
   const std::string longer = EmiArray(kUInt8Image, 0x0202, payload + std::string(1000, 'x'));
   EXPECT_EQ(ImageCount(EmiImageObject(longer) + second), 2);
   ExpectPicture(EmiImageObject(longer) + second);
-  // Fewer: the rest of the picture is the next item.
-  const std::string shorter = EmiArray(kUInt8Image, 0x0202, payload, 12);  // leaves the bytes 4 and 255
+  // The array has fewer bytes: the rest of the picture is read as the next item.
+  const std::string shorter = EmiArray(kUInt8Image, 0x0202, payload, 12);  // leaves out the bytes 4 and 255
   ExpectPicture(EmiImageObject(shorter) + second);
   EXPECT_EQ(ImageCount(EmiImageObject(shorter) + second), 1);
 }
 
 TEST(Emi, ByteCountMayLeadBackToTheWidth) {
-  // The width of 0x0010 and the height of 0x0000 are then an item of one byte, 0, and an end marker.
+  // The bytes of the width 0x0010 and the height 0x0000 are then read as a one-byte item with the value 0 and
+  // an end marker.
   const std::string array = EmiArray(kUInt8Image, 0x0202, FileBytes().Put(0x0010).Put(0).bytes(), 0);
   const OpenEmi emi(EmiFile{.items = EmiImageObject(array) + EmiEnd()});
   EXPECT_EQ(emi->GetDimensions(), (Size2{0x10, 0}));
@@ -275,8 +276,8 @@ TEST(Emi, ByteCountMayLeadBackToTheWidth) {
   EXPECT_EQ(emi.Thumbnail(kWholeSize).width, 0);
 }
 
-TEST(Emi, WidthAndHeightThatAreNotThereEndTheWalk) {
-  // The array claims to have no bytes. Its width and height are read all the same.
+TEST(Emi, MissingWidthAndHeightEndTheWalk) {
+  // The array claims to have no bytes, but its width and height are read nevertheless.
   const std::string empty = EmiOpening(0x49B0, 0x0610) + EmiArray(kUInt8Image, 0x0202, "") + EmiEnd();
   const std::string opening = EmiOpening(0x49B0, 0x0610);
   EXPECT_EQ(ImageCount(empty + opening), 1);
@@ -284,7 +285,7 @@ TEST(Emi, WidthAndHeightThatAreNotThereEndTheWalk) {
   EXPECT_EQ(ImageCount(EmiImageObject(Picture()) + empty + opening + EmiEnd()), 3);
 }
 
-TEST(Emi, LengthsBehindTheEndOfTheFileEndTheWalk) {
+TEST(Emi, LengthsBeyondTheEndOfTheFileEndTheWalk) {
   for (const std::uint32_t length : {100u, 1000u, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFF0u, 0xFFFFFFFFu}) {
     SCOPED_TRACE(length);
     const std::string second = EmiImageObject("");

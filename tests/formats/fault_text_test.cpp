@@ -16,7 +16,8 @@ namespace {
 
 using namespace Testing;
 
-/// "none" for an extension that has no parser.
+/// Returns the text of the fault; "none" for an extension without a parser. Every fault must come with
+/// advice.
 std::string TextOf(const std::string& bytes, const std::wstring& extension) {
   std::istringstream stream(bytes);
   const auto text = ExplainFault(stream, extension);
@@ -29,7 +30,7 @@ SerFile OneImageSeries() {
   return SerFile{.elements = {SerElement{.pixels = "p"}}};
 }
 
-TEST(FaultText, IsEmptyForAFileThatIsWell) {
+TEST(FaultText, IsEmptyForAnIntactFile) {
   EXPECT_EQ(TextOf(MrcFile{.pixels = "p"}.Bytes(), L"mrc"), "");
   EXPECT_EQ(TextOf(MrcFile{.pixels = "p"}.Bytes(), L"Ali"), "");
   EXPECT_EQ(TextOf(OneImageSeries().Bytes(), L"ser"), "");
@@ -43,7 +44,7 @@ TEST(FaultText, IsNoneForAnUnknownExtension) {
   EXPECT_EQ(TextOf("", L""), "none");
 }
 
-TEST(FaultText, NamesTheFirstFieldThatIsNotAcceptable) {
+TEST(FaultText, NamesTheFirstInvalidField) {
   EXPECT_EQ(TextOf(MrcFile{.nx = 0, .mode = 99}.Bytes(), L"mrc"),
             "The header is not acceptable: nx is 0 and must be at least 1.");
   EXPECT_EQ(
@@ -51,7 +52,7 @@ TEST(FaultText, NamesTheFirstFieldThatIsNotAcceptable) {
       "The header is not acceptable: data offset is 53 and must be at least 54, the size of the header.");
 }
 
-TEST(FaultText, WritesACodeAsItsRuleDoes) {
+TEST(FaultText, WritesACodeInHexadecimalLikeItsRule) {
   EXPECT_EQ(TextOf(EmiFile{.magic = 0x4A}.Bytes(), L"emi"),
             "The header is not acceptable: magic is 0x004A and must be 0x4B4A.");
 }
@@ -74,14 +75,14 @@ TEST(FaultText, NamesAnElementOfAnUnknownType) {
             "The header is not acceptable: the data type code of an element is 11 and must be from 1 to 10.");
 }
 
-TEST(FaultText, TellsOfAFileThatEndsBeforeItsPicture) {
+TEST(FaultText, ReportsAFileThatEndsBeforeItsPicture) {
   EXPECT_EQ(TextOf("", L"mrc"), "The file is empty.");
   EXPECT_EQ(TextOf("J", L"emi"), "The file ends within its header or index: it has only 1 byte.");
   EXPECT_EQ(TextOf(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"),
             "The file is cut short: the picture ends at byte 56, and the file has 55 bytes.");
 }
 
-TEST(FaultText, TellsOfAFileWithoutAPicture) {
+TEST(FaultText, ReportsAFileWithoutAPicture) {
   EXPECT_EQ(TextOf(EmiFile{}.Bytes(), L"emi"), "The file holds no image object.");
   EXPECT_EQ(TextOf(EmiFile{.items = EmiImageObject("")}.Bytes(), L"emi"),
             "The picture has no pixels: it is 0 x 0.");
@@ -91,7 +92,7 @@ TEST(FaultText, TellsOfAFileWithoutAPicture) {
             "This is a series of lines (data type id 0x4120), which have no picture.");
 }
 
-TEST(FaultText, TellsOfAPictureThatIsTooFarAway) {
+TEST(FaultText, ReportsAPictureThatIsTooFarAway) {
   EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"),
             "The picture lies beyond the first 2 GiB of the file, where this format is not read.");
 }
@@ -117,7 +118,7 @@ TEST(FaultText, AdvisesWhatToDo) {
             "Save the frames in several smaller files.");
 }
 
-TEST(FaultText, TellsOfContentsThatCannotBeFollowed) {
+TEST(FaultText, ReportsContentsThatCannotBeFollowed) {
   EXPECT_EQ(TextOf(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),
             "The contents cannot be read beyond byte 12: bad EMI object index.");
 }

@@ -19,7 +19,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Whether the factory makes a `Reader` for `path`, on a stream that holds `bytes`.
+/// Returns whether the factory makes a `Reader` for `path`, on a stream of `bytes`.
 template <class Reader>
 bool Makes(const std::wstring& path, const std::string& bytes = {}) {
   std::istringstream stream(bytes);
@@ -50,7 +50,7 @@ TEST(GetExtension, SearchesTheWholePath) {
   EXPECT_EQ(GetExtension(L"C:\\scans.old\\image.raw"), L"raw");
 }
 
-TEST(Extensions, AreComparedWholeAndWithoutCase) {
+TEST(Extensions, AreComparedAsAWholeIgnoringCase) {
   struct Row {
     std::function<bool(const std::wstring&)> test;
     std::wstring extension;
@@ -70,9 +70,9 @@ TEST(Extensions, AreComparedWholeAndWithoutCase) {
     EXPECT_FALSE(row.test(L"." + row.extension));
     EXPECT_FALSE(row.test(row.extension + L" "));
     EXPECT_FALSE(row.test(row.extension + std::wstring(1, L'\0')));
-    // A character that other bits make of the first letter is another one.
+    // A character that differs from the first letter in another bit than that of the case is different.
     EXPECT_FALSE(row.test(static_cast<wchar_t>(first ^ 0x80) + row.extension.substr(1)));
-    // Each test knows its own extensions only.
+    // Each test accepts its own extensions only.
     for (const Row& other : rows) {
       const bool same = row.extension == other.extension ||
                         (IsMrcExtension(row.extension) && IsMrcExtension(other.extension));
@@ -81,14 +81,14 @@ TEST(Extensions, AreComparedWholeAndWithoutCase) {
   }
 }
 
-// New kinds are registered after these.
-TEST(FileKinds, AreInTheOrderInWhichTheyHaveAlwaysBeenRegistered) {
+// New file kinds are registered after these.
+TEST(FileKinds, KeepTheirOrderOfRegistration) {
   const std::array<std::wstring_view, 7> first = {L"mrc", L"ali", L"rec", L"ser", L"ebn", L"emi", L"raw"};
   ASSERT_GE(kExtensions.size(), first.size());
   EXPECT_TRUE(std::equal(first.begin(), first.end(), kExtensions.begin()));
 }
 
-TEST(FileKinds, HaveExtensionsThatDifferAndAReaderEach) {
+TEST(FileKinds, HaveDistinctExtensionsAndAReaderEach) {
   for (const std::wstring_view extension : kExtensions) {
     EXPECT_EQ(std::ranges::count(kExtensions, extension), 1) << std::wstring(extension);
     std::istringstream stream;
@@ -134,14 +134,14 @@ TEST(CreateFileTypeInfo, HasParsedTheHeader) {
   EXPECT_TRUE(valid(Testing::RawFile().Bytes(), L"raw"));
 }
 
-TEST(CreateFileTypeInfo, ContentsPlayNoPart) {
+TEST(CreateFileTypeInfo, IgnoresTheContents) {
   const std::string bytes = Testing::RawFile().Bytes();
   EXPECT_TRUE(Makes<EbnFileInfo>(L"a.ebn", bytes));
   std::istringstream stream(bytes);
   EXPECT_FALSE(CreateFileTypeInfo(stream, L"ebn")->IsValid());
 }
 
-TEST(CreateFileTypeInfo, PassesOnWhatAReaderThrows) {
+TEST(CreateFileTypeInfo, LetsTheExceptionsOfReadersThrough) {
   std::istringstream emi(Testing::EmiFile{.items = Testing::EmiText(0, "text")}.Bytes());
   EXPECT_THROW(CreateFileTypeInfo(emi, L"emi"), std::invalid_argument);
   Testing::SerFile file;
@@ -151,7 +151,7 @@ TEST(CreateFileTypeInfo, PassesOnWhatAReaderThrows) {
   EXPECT_THROW(CreateFileTypeInfo(ser, L"ser"), std::length_error);
 }
 
-TEST(CreateFileTypeInfo, DeletingAReaderLeavesTheStreamAlone) {
+TEST(CreateFileTypeInfo, DeletingAReaderDoesNotChangeTheStream) {
   std::istringstream stream(Testing::EbnFile{.model = 1, .afterHeader = "x"}.Bytes());
   auto reader = CreateFileTypeInfo(stream, L"ebn");
   const auto position = stream.tellg();

@@ -1,4 +1,6 @@
-// Files that another program wrote, and what it says of them (write_mrc_files.py), in the current folder.
+// Reads files that another program has written, and compares them with what it says about them
+// (write_mrc_files.py). They
+// are in the current folder.
 #include <gtest/gtest.h>
 
 #include <fstream>
@@ -73,7 +75,7 @@ std::string Narrow(const std::wstring& wide) {
   return narrow;
 }
 
-TEST(ForeignMrc, IsReadAsItWasMeant) {
+TEST(ForeignMrc, IsReadAsItsWriterExpects) {
   const std::vector<Expectation> all = ReadExpectations();
   ASSERT_EQ(all.size(), 48u);
   for (const Expectation& expected : all) {

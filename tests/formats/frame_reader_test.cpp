@@ -1,4 +1,4 @@
-// Streamed frames of every pixel type and layout against the naive picture of the same bytes.
+// Compares streamed frames of every pixel type and layout with the naive picture of the same bytes.
 #include "frame_reader.h"
 
 #include <gtest/gtest.h>
@@ -48,7 +48,7 @@ const PixelType kTypes[] = {
     PixelTypeOf(DataType::kBgr24),
 };
 
-/// The bytes of a file: `before` bytes of something else, then the block.
+/// Returns the bytes of a file: `before` bytes of something else, then the block, all random.
 std::string RandomFile(Random& random, std::int64_t before, std::int64_t blockBytes) {
   std::string bytes(static_cast<std::size_t>(before + blockBytes), '\0');
   for (char& byte : bytes) byte = static_cast<char>(random.Bits());
@@ -101,8 +101,7 @@ struct NaivePictureOf {
   BitmapPixels operator()(std::monostate) const { return {}; }
 };
 
-/// A layout whose pixels need not touch: columns right of each other or, if `byColumn`, below each other.
-/// Some share their bytes.
+/// Returns a layout whose pixels may have gaps. Rows are contiguous, or columns if `byColumn`. Pixels may overlap.
 FrameLayout RandomLayout(Random& random, const PixelType& type, Size2 size, bool byColumn) {
   FrameLayout layout;
   layout.type = type;
@@ -132,7 +131,7 @@ void CompareWithTheNaivePicture(Random& random, const FrameLayout& layout, int c
   ASSERT_EQ(TakeBitmap(ReadThumbnail(stream, layout, {cx, cy})),
             std::visit(NaivePictureOf{file, layout, {cx, cy}}, layout.type.tag))
       << layout.type.bits << " bits (" << layout.type.tag.index() << "), " << layout.size.width << " x "
-      << layout.size.height << " asked at " << cx << " x " << cy << ", strides " << layout.pixelStride
+      << layout.size.height << " requested as " << cx << " x " << cy << ", strides " << layout.pixelStride
       << " and " << layout.rowStride;
   EXPECT_TRUE(stream.good());
 }
@@ -163,7 +162,7 @@ TEST(FrameReader, EqualsTheNaivePictureForFramesLargerThanTheBand) {
 }
 
 TEST(FrameReader, BlockRowsLargerThanTheBandAreSummedFromTheTop) {
-  // 2000 floats a row and a factor of 100: a row of blocks has 800,000 bytes.
+  // A row of blocks has 800,000 bytes: 2000 floats by 100 rows.
   Random random(3);
   for (const PixelType& type : {kFloat32, kInt32, kComplexFloat32}) {
     for (const bool bottomUp : {false, true}) {
@@ -186,7 +185,7 @@ TEST(FrameReader, ReadsEachByteOfTheWholeBlocksOnce) {
   EXPECT_LE(buffer.reads, 16);
 }
 
-TEST(FrameReader, ReadsColumnsOnceWhenRowsLieAcrossTheFile) {
+TEST(FrameReader, ReadsColumnsOnceWhenTheFileIsStoredByColumn) {
   const std::string file(2'000'000, '\1');
   MemoryBuffer buffer(file);
   std::istream stream(&buffer);
@@ -196,7 +195,8 @@ TEST(FrameReader, ReadsColumnsOnceWhenRowsLieAcrossTheFile) {
   EXPECT_EQ(buffer.bytesRead, 2'000'000);
 }
 
-/// Pixels as far apart as from row to row, so that neither rows nor columns lie together.
+/// Returns a layout whose pixel stride equals its row stride, so that neither rows nor columns are
+/// contiguous.
 FrameLayout InterleavedLayout(const PixelType& type, std::int32_t edge, std::int64_t stride) {
   return {.type = type,
           .size = {edge, edge},
@@ -275,7 +275,7 @@ struct Cost {
 
 Cost CostOf(const FrameLayout& layout, const SIZE& request) {
   MemoryBuffer buffer("");
-  buffer.zerosBehind = layout.blockPosition + layout.blockBytes;
+  buffer.trailingZeros = layout.blockPosition + layout.blockBytes;
   std::istream stream(&buffer);
   const bool shown = TakeBitmap(ReadThumbnail(stream, layout, request)).width > 0;
   EXPECT_EQ(stream.good(), shown);
@@ -344,7 +344,7 @@ TEST(FrameReader, RefusesAScatteredFrameBeforeAnyRead) {
   }
 }
 
-TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
+TEST(FrameReader, AFailureOfAnyReadGivesNoBitmap) {
   const FrameLayout layout = PackedLayout(kFloat32, {600, 600}, 0);
   const std::string file(std::size_t{600} * 600 * 4, '\0');
   std::int64_t reads = 0;
@@ -364,8 +364,8 @@ TEST(FrameReader, AFailedReadGivesNoBitmapWhereverItHappens) {
   }
 }
 
-TEST(FrameReader, ABlockThatIsNotWholeIsRefusedBeforeAnyRead) {
-  // The last row would be dropped by the reduction, and is wanted all the same.
+TEST(FrameReader, AnIncompleteBlockIsRefusedBeforeAnyRead) {
+  // The last row is required although the reduction drops it.
   const FrameLayout layout = PackedLayout(kUInt8, {100, 101}, 10);
   for (const std::size_t size : {0u, 9u, 10u, 10u + 100u * 100u, 10u + 100u * 101u - 1u}) {
     const std::string file(size, '\0');
@@ -389,13 +389,13 @@ TEST(FrameReader, AFrameWithoutPixelsHasNoBitmap) {
   EXPECT_TRUE(stream.good());
 }
 
-TEST(FrameReader, AFrameOfUnknownPixelsHasNoBitmap) {
+TEST(FrameReader, AFrameOfAnUnknownTypeHasNoBitmap) {
   std::istringstream stream(std::string(1000, '\0'));
   EXPECT_EQ(ReadThumbnail(stream, PackedLayout(PixelTypeOf(DataType{3}), {5, 5}, 0), {96, 96}), nullptr);
   EXPECT_TRUE(stream.good());
 }
 
-TEST(FrameReader, APixelOutsideOfTheBlockFailsTheStream) {
+TEST(FrameReader, APixelOutsideTheBlockFailsTheStream) {
   const FrameLayout packed = PackedLayout(kUInt16, {4, 4}, 100);
   const auto refused = [](const FrameLayout& layout) {
     std::istringstream stream(std::string(1000, '\0'));
@@ -418,7 +418,7 @@ TEST(FrameReader, APixelOutsideOfTheBlockFailsTheStream) {
   layout = packed;
   layout.blockBytes = 31;
   EXPECT_TRUE(refused(layout));
-  // 65536 * 65536 pixels wrap to none.
+  // 65536 * 65536 pixels would wrap to 0.
   EXPECT_TRUE(refused(PackedLayout(kUInt8, {65536, 65536}, 0)));
 }
 

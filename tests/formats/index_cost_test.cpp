@@ -1,4 +1,4 @@
-// What the readers of indexed files ask of their stream, counted at the stream's buffer.
+// Counts what the readers of indexed files read and seek, at the stream's buffer.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -54,13 +54,13 @@ TEST(SerCost, ElementHeaderTakesOneSeekAndOneRead) {
   const SerFileInfo ser(stream);
   ASSERT_TRUE(ser.IsValid());
   EXPECT_EQ(ser.GetFrameCount(), kElements);
-  // Beyond that: the fixed header, and one seek and one read for every thousand offsets.
+  // The rest is the fixed header, and one seek and one read for every thousand offsets.
   EXPECT_LE(buffer.seeks(), kElements + kElements / 1000 + 1);
   EXPECT_LE(buffer.reads(), kElements + kElements / 1000 + 20);
   EXPECT_LE(buffer.bytes(), kElements * (50 + 4) + 100);
 }
 
-TEST(SerCost, NumbersThatLieTakeNoMoreThanTheFileHolds) {
+TEST(SerCost, FalseNumbersCostNoMoreThanTheFileHolds) {
   SerFile honest;
   honest.elements.resize(100);
   SerFile elements = honest;
@@ -79,7 +79,7 @@ TEST(SerCost, NumbersThatLieTakeNoMoreThanTheFileHolds) {
   }
 }
 
-/// Walks a tree and expects that no byte is read twice, but for the widths and heights of pixel arrays.
+/// Walks a tree and expects that no byte is read twice, except the widths and heights of pixel arrays.
 void ExpectOnePass(const std::string& items, std::int64_t images) {
   const std::string bytes = EmiFile{.items = items}.Bytes();
   CountingBuffer buffer(bytes);

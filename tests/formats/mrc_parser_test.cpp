@@ -18,7 +18,7 @@ using Testing::MrcFile;
 
 using Bytes = std::vector<std::uint8_t>;
 
-constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr SIZE kWholeSize = {1000, 1000};  // larger than all frames here, so that none is reduced
 constexpr std::int32_t kMin = std::numeric_limits<std::int32_t>::min();
 constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
 
@@ -31,7 +31,7 @@ bool IsValid(const MrcFile& file) {
   return OpenMrc(file)->IsValid();
 }
 
-TEST(Mrc, AnswersFromItsHeader) {
+TEST(Mrc, DescribesItsHeader) {
   MrcFile file;
   file.nx = 7;
   file.ny = 5;
@@ -74,7 +74,7 @@ TEST(Mrc, HasTheTypeOfItsMode) {
   }
 }
 
-TEST(Mrc, RejectsModesOutsideOf0To16) {
+TEST(Mrc, RejectsModesOutside0To16) {
   for (const std::int32_t mode : {17, 101, kMax, -1, kMin}) {
     MrcFile file;
     file.mode = mode;
@@ -121,16 +121,16 @@ TEST(Mrc, BigEndianHeaderIsRecognisedByItsSize) {
   EXPECT_EQ(mrc->GetComment(), L"one\r\ntwo");
 }
 
-TEST(Mrc, BothEdgesMustBeTooLargeForTheOtherByteOrder) {
+TEST(Mrc, IsBigEndianOnlyIfBothEdgesAreTooLarge) {
   MrcFile file;
   file.nx = 65536;
   file.ny = 65535;
   EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{65536, 65535}));
-  file.ny = 65536;  // both are 256 in the other order, and so are their high bits
+  file.ny = 65536;  // in big-endian order both are 256
   EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x100, 0x100}));
   file.nz = 0x01000000;
   EXPECT_EQ(OpenMrc(file)->GetFrameCount(), 1);
-  file.nx = kMin;  // as an unsigned number
+  file.nx = kMin;  // too large as an unsigned number
   EXPECT_EQ(OpenMrc(file)->GetDimensions(), (Size2{0x80, 0x100}));
 }
 
@@ -140,7 +140,7 @@ TEST(MrcComment, JoinsTheLabels) {
   EXPECT_EQ(OpenMrc(file)->GetComment(), L"first\r\n  second\r\nfifth");
 }
 
-TEST(MrcComment, LabelsOfOnlySpacesLeaveNoEmptyLines) {
+TEST(MrcComment, BlankLabelsLeaveNoEmptyLines) {
   MrcFile file;
   file.labels = {" ", "text", std::string(80, ' ')};
   EXPECT_EQ(OpenMrc(file)->GetComment(), L"text");
@@ -152,7 +152,7 @@ TEST(MrcComment, LabelEndsAtItsFirstZero) {
   EXPECT_EQ(OpenMrc(file)->GetComment(), L"before");
 }
 
-TEST(MrcComment, LabelCanFillItsPlace) {
+TEST(MrcComment, LabelCanFillItsField) {
   MrcFile file;
   file.labels = {std::string(80, 'a'), std::string(79, 'b') + ' '};
   EXPECT_EQ(OpenMrc(file)->GetComment(), std::wstring(80, L'a') + L"\r\n" + std::wstring(79, L'b'));
@@ -191,7 +191,7 @@ TEST(MrcComment, WidensBytesWithTheirSign) {
   EXPECT_EQ(OpenMrc(file)->GetComment(), (std::wstring{L'5', L' ', wchar_t{0xFFB5}, L'm'}));
 }
 
-/// Sections of one column: 255 at the bottom, the section's number, and 0 at the top.
+/// Returns a stack whose sections are one column: 255 at the bottom, the section's number, and 0 at the top.
 MrcFile Stack(std::int32_t sections) {
   MrcFile file;
   file.ny = 3;
@@ -209,10 +209,10 @@ TEST(MrcThumbnail, ShowsTheMiddleSectionWithItsFirstRowAtTheBottom) {
   }
 }
 
-TEST(MrcThumbnail, CanBeAskedForAgain) {
+TEST(MrcThumbnail, CanBeRequestedAgain) {
   const OpenMrc mrc(Stack(5));
   EXPECT_EQ(mrc.Thumbnail(kWholeSize).bytes, (Bytes{0, 2, 255}));
-  EXPECT_EQ(mrc.Thumbnail({1, 1}).width, 0);  // no whole block
+  EXPECT_EQ(mrc.Thumbnail({1, 1}).width, 0);  // not one whole block
   EXPECT_EQ(mrc.Thumbnail(kWholeSize).bytes, (Bytes{0, 2, 255}));
 }
 
@@ -229,12 +229,12 @@ TEST(MrcThumbnail, PixelsFollowTheExtendedHeader) {
   MrcFile file = Stack(1);
   file.extendedHeader = std::string(4096, 'x');
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 0, 255}));
-  // A negative length leads back into the header, a more negative one out of the file.
+  // A length of -1024 leads to the beginning of the header, any smaller one before the file.
   file.next = -1024;
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 1);
   file.next = -1025;
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
-  file.next = kMax;  // wraps to a negative position
+  file.next = kMax;  // the position wraps to a negative number
   EXPECT_EQ(OpenMrc(file).Thumbnail(kWholeSize).width, 0);
 }
 
@@ -254,7 +254,7 @@ TEST(MrcThumbnail, OnlySixteenBitPixelsAreSwapped) {
     EXPECT_EQ(thumbnail(mode, kBig, BytesOf<std::int16_t>({0, 1, 256}, kLittle)), (Bytes{0, 255, 0}));
     EXPECT_EQ(thumbnail(mode, kLittle, BytesOf<std::int16_t>({0, 1, 255}, kLittle)), (Bytes{0, 1, 255}));
   }
-  // All others are read as they are, whatever the header's order.
+  // All other types are never swapped, whatever the header's order.
   EXPECT_EQ(thumbnail(0, kBig, BytesOf<std::uint8_t>({0, 1, 255})), (Bytes{0, 1, 255}));
   EXPECT_EQ(thumbnail(2, kBig, BytesOf<float>({0, 1, 255})), (Bytes{0, 1, 255}));
   EXPECT_EQ(thumbnail(3, kBig, BytesOf<std::int16_t>({1, 0, 3, 0, 9, 0})), (Bytes{0, 127, 255}));
@@ -263,7 +263,7 @@ TEST(MrcThumbnail, OnlySixteenBitPixelsAreSwapped) {
             (Bytes{3, 2, 1, 6, 5, 4, 9, 8, 7}));
 }
 
-/// A file of `sections` sections of 64 KiB, and its reader. The first section is a ramp, every other is 0.
+/// A file of `sections` sections of 64 KiB, and its reader. The first section is a ramp, the others are 0.
 struct SparseStack {
   static constexpr std::int64_t kSectionBytes = 0x10000;
 
@@ -277,7 +277,7 @@ struct SparseStack {
   }
 
   explicit SparseStack(std::int32_t sections) : head(Head(sections)) {
-    buffer.zerosBehind = (sections - 1) * kSectionBytes;
+    buffer.trailingZeros = (sections - 1) * kSectionBytes;
   }
 
   Testing::BitmapPixels Thumbnail() const { return Testing::TakeBitmap(reader.CreateThumbnail({256, 256})); }
@@ -288,7 +288,7 @@ struct SparseStack {
   MrcFileInfo reader{stream, L"mrc"};
 };
 
-TEST(MrcThumbnail, SectionFarIntoAStackCostsWhatOneSectionCosts) {
+TEST(MrcThumbnail, SectionFarIntoAStackCostsNoMoreThanTheFirst) {
   for (const std::int32_t sections : {1, 1000, 30000}) {
     const SparseStack stack(sections);
     EXPECT_EQ(stack.Thumbnail().width, 256);
@@ -297,9 +297,9 @@ TEST(MrcThumbnail, SectionFarIntoAStackCostsWhatOneSectionCosts) {
   }
 }
 
-TEST(MrcThumbnail, SectionBehind2GiBIsNotReached) {
-  EXPECT_EQ(SparseStack(2 * 0x7FFF).Thumbnail().width, 256);  // begins 64 KiB before
-  SparseStack behind(2 * 0x8000);                             // at 2 GiB, which is negative in 32 bits
+TEST(MrcThumbnail, SectionFrom2GiBOnIsNotReached) {
+  EXPECT_EQ(SparseStack(2 * 0x7FFF).Thumbnail().width, 256);  // begins 64 KiB before 2 GiB
+  SparseStack behind(2 * 0x8000);                             // begins at 2 GiB, which is negative in 32 bits
   EXPECT_TRUE(behind.reader.IsValid());
   EXPECT_EQ(behind.Thumbnail().width, 0);
   EXPECT_TRUE(behind.stream.fail());
@@ -307,7 +307,7 @@ TEST(MrcThumbnail, SectionBehind2GiBIsNotReached) {
 }
 
 TEST(MrcThumbnail, PositionOfASectionWrapsAt32Bits) {
-  // The section in the middle is said to begin at 4 GiB, which is where the first one is.
+  // The middle section should begin at 4 GiB, which wraps to the position of the first section.
   const auto first = SparseStack(1).Thumbnail();
   EXPECT_EQ(SparseStack(2 * 0x10000).Thumbnail(), first);
   EXPECT_NE(SparseStack(2 * 0x10001).Thumbnail(), first);
@@ -329,7 +329,7 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
 TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneThoughItsBytesAreThere) {
   const std::string head = MrcFile{.nx = 0x1000001, .ny = 256}.Bytes();
   Testing::MemoryBuffer buffer(head);
-  buffer.zerosBehind = std::int64_t{6} << 30;
+  buffer.trailingZeros = std::int64_t{6} << 30;
   std::istream stream(&buffer);
   const MrcFileInfo mrc(stream, L"mrc");
   EXPECT_TRUE(mrc.IsValid());

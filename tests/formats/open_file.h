@@ -1,4 +1,4 @@
-// A reader on a file in memory.
+// Opens a reader on a file in memory.
 #pragma once
 
 #include <sstream>
@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Made of a writer (mrc_file.h and its neighbours) and of what else the reader's constructor takes.
+/// Made from a file writer (mrc_file.h and others) and the further arguments of the reader's constructor.
 template <class Reader>
 class OpenFile {
  public:
@@ -18,7 +18,7 @@ class OpenFile {
 
   const Reader* operator->() const { return &reader_; }
 
-  /// The thumbnail; empty where there is none.
+  /// Returns the thumbnail; an empty one if there is none.
   BitmapPixels Thumbnail(const SIZE& size) const { return TakeBitmap(reader_.CreateThumbnail(size)); }
 
   std::istringstream& stream() { return stream_; }

@@ -1,4 +1,4 @@
-// Random valid files of every kind and pixel type against the naive picture of the frame they were made of.
+// Compares random valid files of every kind and pixel type with the naive picture of their frame.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -18,7 +18,7 @@ namespace {
 
 using namespace Testing;
 
-// The two orders of colours in a file; as values both are red, green, blue.
+// Colour pixels of both byte orders in a file. As values, both are red, green, blue.
 struct RedFirst : NaiveColour {};
 struct BlueFirst : NaiveColour {};
 
@@ -95,16 +95,16 @@ void ExpectPicture(Random& random, const OpenFile<Reader>& file, const NaiveFram
   ASSERT_TRUE(file->IsValid());
   EXPECT_EQ(file->GetDimensions(), (Size2{frame.width, frame.height}));
   for (int i = 0; i < 3; ++i) {
-    const int cx = random.Between(1, frame.width);  // colours cannot be asked for larger than they are
+    const int cx = random.Between(1, frame.width);  // a colour frame must not be smaller than the request
     const int cy = random.Between(1, 80);
     ASSERT_EQ(file.Thumbnail({cx, cy}), NaivePicture(frame, cx, cy))
-        << frame.width << " x " << frame.height << " asked at " << cx << " x " << cy;
+        << frame.width << " x " << frame.height << " requested as " << cx << " x " << cy;
   }
 }
 
 constexpr int kRounds = 60;
 
-// One instance of a test for every pixel type of a file kind.
+// Makes one instance of a test for every pixel type of a file kind.
 template <class T, int kNumber>
 struct TypeCode {
   using Pixel = T;
@@ -124,7 +124,7 @@ TYPED_TEST(RandomMrc, EqualsTheNaivePicture) {
   Random random(TypeParam::kCode);
   for (int round = 0; round < kRounds && !this->HasFatalFailure(); ++round) {
     const NaiveFrame<T> frame = RandomFrame<T>(random);
-    NaiveFrame<T> stored = frame;  // from the bottom
+    NaiveFrame<T> stored = frame;  // the bottom row first
     for (int y = 0; y < frame.height; ++y) {
       std::copy_n(frame.values.begin() + y * frame.width, frame.width,
                   stored.values.begin() + (frame.height - 1 - y) * frame.width);
@@ -206,7 +206,7 @@ using EmiTypes =
                    TypeCode<NaiveComplex<float>, 0x2214>>;
 TYPED_TEST_SUITE(RandomEmi, EmiTypes);
 
-/// A list of items that say nothing, to be put anywhere below an object.
+/// Returns random items that the reader ignores anywhere below an object.
 std::string RandomItems(Random& random, int most) {
   std::string items;
   for (int i = random.Between(0, most); i > 0; --i) {
@@ -248,8 +248,9 @@ using RawTypes =
                    TypeCode<NaiveComplex<double>, 13>, TypeCode<RedFirst, 16>, TypeCode<BlueFirst, 18>>;
 TYPED_TEST_SUITE(RandomRaw, RawTypes);
 
-/// Spreads the pixels of a packed file: gaps between them, between rows or columns and in front, either
-/// direction, rows and columns exchanged or not.
+/// Spreads the pixels of a packed file. Random gaps separate pixels, rows or columns and precede the first
+/// pixel. Each
+/// direction may be reversed, and rows and columns may be exchanged.
 void Spread(Random& random, RawFile& file) {
   const std::int32_t pixelBytes = file.pixelStride;
   const bool byColumn = random.OneIn(2);

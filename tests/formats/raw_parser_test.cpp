@@ -18,7 +18,7 @@ using Testing::RawFile;
 
 using OpenRaw = Testing::OpenFile<RawFileInfo>;
 
-constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr SIZE kWholeSize = {1000, 1000};  // larger than all frames here, so that none is reduced
 
 using Bytes = std::vector<std::uint8_t>;
 
@@ -56,7 +56,7 @@ TEST(Raw, CombinesClassAndBitsIn32Bits) {
   file.bitsPerPixel = 0x10008;
   EXPECT_EQ(OpenRaw(file)->GetDataTypeName(), L"8 bit signed");
   EXPECT_TRUE(OpenRaw(file)->IsValid());
-  // Each pixel is said to have 8193 bytes, which are not there.
+  // Each pixel should have 8193 bytes, more than the file has.
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 0);
 
   file.bitsPerPixel = 8 - 0x10000;
@@ -79,7 +79,7 @@ TEST(Raw, RejectsAnotherMagic) {
     other.magic[i] = static_cast<char>(other.magic[i] ^ 0x20);
     EXPECT_FALSE(OpenRaw(other)->IsValid()) << "byte " << i;
   }
-  file.magic[11] = '\0';  // a text of 11 characters
+  file.magic[11] = '\0';  // a string of 11 characters
   EXPECT_FALSE(OpenRaw(file)->IsValid());
 }
 
@@ -101,7 +101,7 @@ TEST(Raw, RejectionSetsBadbit) {
   EXPECT_TRUE(raw.stream().bad());
 }
 
-TEST(Raw, AnswersWhatTheFormatHasNot) {
+TEST(Raw, HasOneFrameAndNoComment) {
   const OpenRaw raw(PackedRawFile(DataType::kUInt8, 7, 5, {}));
   EXPECT_EQ(raw->GetDimensions(), (Size2{7, 5}));
   EXPECT_EQ(raw->GetFrameCount(), 1);
@@ -147,7 +147,7 @@ TEST(Raw, BottomUpFileShowsTheSamePictureAsTopDown) {
   const OpenRaw bottomUp(file);
   EXPECT_EQ(bottomUp.Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 
-  // It needs no byte more than the packed picture has.
+  // It needs exactly as many bytes as the packed picture.
   file.pixels.pop_back();
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 0);
 }
@@ -186,7 +186,7 @@ TEST(Raw, ReadsOverlappingPixels) {
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 7, 7, 255}));
 }
 
-TEST(Raw, PixelInFrontOfTheBlockCannotBeRead) {
+TEST(Raw, PixelBeforeTheBlockCannotBeRead) {
   RawFile file = PackedRawFile(DataType::kUInt8, 2, 2, "0123");
   file.offset = -1;
   EXPECT_TRUE(OpenRaw(file)->IsValid());
@@ -214,7 +214,7 @@ TEST(Raw, PixelsThatAreNotThereFailTheFile) {
 }
 
 TEST(Raw, ExtentThatWrapsCannotBeRead) {
-  // (width - 1) * pixelStride is 2^32, which the 32-bit extent takes for 0.
+  // (width - 1) * pixelStride is 2^32, which is 0 in the 32-bit extent.
   RawFile file = PackedRawFile(DataType::kUInt8, 0x10001, 1, std::string(0x10001, '0'));
   file.pixelStride = 0x10000;
   EXPECT_TRUE(OpenRaw(file)->IsValid());
@@ -241,7 +241,7 @@ TEST(Raw, ExtentThatWrapsCannotBeReadThoughItsBytesAreThere) {
     file.rowStride = row.rowStride;
     const std::string head = file.Bytes();
     Testing::MemoryBuffer buffer(head);
-    buffer.zerosBehind = std::int64_t{6} << 30;
+    buffer.trailingZeros = std::int64_t{6} << 30;
     std::istream stream(&buffer);
     const RawFileInfo raw(stream);
     EXPECT_TRUE(raw.IsValid());
@@ -250,7 +250,7 @@ TEST(Raw, ExtentThatWrapsCannotBeReadThoughItsBytesAreThere) {
   }
 }
 
-/// Whether all pixels of a file with 8-bit pixels lie in its block, in arithmetic that cannot wrap.
+/// Returns whether all 8-bit pixels are inside the block, in arithmetic that cannot wrap.
 bool Fits(const RawFile& file) {
   if (file.width < 1 || file.height < 1) return false;
   for (const double right : {0.0, (file.width - 1.0) * file.pixelStride}) {
@@ -262,7 +262,7 @@ bool Fits(const RawFile& file) {
   return true;
 }
 
-TEST(Raw, ExtremeNumbersAreReadOnlyWhereThePixelsAreThere) {
+TEST(Raw, ExtremeNumbersAreReadOnlyIfAllPixelsExist) {
   using Limits = std::numeric_limits<std::int32_t>;
   constexpr std::int32_t kNumbers[] = {Limits::min(), Limits::min() + 1, -0x10000,     -1, 0, 1, 2,
                                        0x10000,       Limits::max() - 1, Limits::max()};
@@ -270,7 +270,7 @@ TEST(Raw, ExtremeNumbersAreReadOnlyWhereThePixelsAreThere) {
   file.pixels = "0123";
   for (const std::int32_t width : {Limits::min(), 0, 1, 2, 0x10001, Limits::max()}) {
     for (const std::int32_t height : {Limits::min(), 0, 1, 2, 0x10001, Limits::max()}) {
-      // A picture with so many pixels in four bytes is refused.
+      // A frame with so many overlapping pixels is refused.
       const bool tooMany = std::int64_t{width} * height > (1 << 26) + 4;
       for (file.offset = -1; file.offset <= 3; ++file.offset) {
         for (const std::int32_t pixelStride : kNumbers) {
@@ -299,10 +299,10 @@ TEST(Raw, ShortPictureHasNoThumbnail) {
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 2);
 }
 
-TEST(Raw, ThumbnailsCanBeAskedForAgain) {
+TEST(Raw, ThumbnailsCanBeRequestedAgain) {
   const OpenRaw raw(PackedRawFile(DataType::kUInt8, 2, 1, BytesOf<std::uint8_t>({0, 255})));
   EXPECT_EQ(raw.Thumbnail(kWholeSize).bytes, (Bytes{0, 255}));
-  EXPECT_EQ(raw.Thumbnail({1, 1}).width, 0);  // no whole block
+  EXPECT_EQ(raw.Thumbnail({1, 1}).width, 0);  // not one whole block
   EXPECT_EQ(raw.Thumbnail(kWholeSize).bytes, (Bytes{0, 255}));
 }
 

@@ -18,7 +18,7 @@ using Testing::SerFile;
 
 using OpenSer = Testing::OpenFile<SerFileInfo>;
 
-constexpr SIZE kWholeSize = {1000, 1000};  // a request that nothing here is reduced for
+constexpr SIZE kWholeSize = {1000, 1000};  // larger than all frames here, so that none is reduced
 
 using Bytes = std::vector<std::uint8_t>;
 
@@ -89,7 +89,7 @@ TEST(Ser, RejectsOtherHeaders) {
   EXPECT_FALSE(IsValid(file));
 }
 
-TEST(Ser, RejectsNumbersOfElementsThatCannotBe) {
+TEST(Ser, RejectsImpossibleNumbersOfElements) {
   SerFile file = OneImage();
   file.validElements = 0;
   EXPECT_FALSE(IsValid(file));
@@ -176,7 +176,7 @@ TEST(Ser, OnlyTheLowHalfOfAWideOffsetCounts) {
   EXPECT_EQ(OpenSer(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 }
 
-TEST(Ser, WideVersionsHaveNarrowEntriesAllTheSame) {
+TEST(Ser, WideVersionsStillHaveNarrowEntries) {
   SerFile file = OneImage();
   file.version = 0x0220;
   file.dimensions.clear();
@@ -184,13 +184,13 @@ TEST(Ser, WideVersionsHaveNarrowEntriesAllTheSame) {
   constexpr std::uint32_t kFirstElement = 34;
   const auto elementBytes = static_cast<std::uint32_t>(file.elements[0].Bytes().size());
 
-  // The halves of the first wide entry are the offsets of two elements.
+  // The halves of the first 64-bit entry are the offsets of two elements.
   const std::uint64_t secondElement = kFirstElement + elementBytes;
   file.offsetArrays = BytesOf<std::uint64_t>({kFirstElement | (secondElement << 32), 0});
   EXPECT_EQ(OpenSer(file)->GetFrameCount(), 2);
   EXPECT_TRUE(IsValid(file));
 
-  // Of a true wide entry the high half is 0, where no element is.
+  // The upper half of a genuine 64-bit offset is 0, where there is no element.
   file.offsetArrays = BytesOf<std::uint64_t>({kFirstElement, secondElement});
   EXPECT_FALSE(IsValid(file));
 }
@@ -198,7 +198,7 @@ TEST(Ser, WideVersionsHaveNarrowEntriesAllTheSame) {
 TEST(Ser, TagOffsetsFollowTheValidOffsets) {
   SerFile file = OneImage();
   file.totalElements = 3;
-  // One offset, and in the place of its tag's the unused second one; nothing more is needed.
+  // The tag's offset is the unused second offset. Nothing more is needed.
   EXPECT_TRUE(IsValid(file));
   EXPECT_EQ(OpenSer(file)->GetFrameCount(), 1);
 
@@ -223,14 +223,14 @@ TEST(Ser, ShowsTheFirstOfManyImages) {
   file.validElements = 2500;
   EXPECT_EQ(OpenSer(file)->GetFrameCount(), 2500);
 
-  // Every element counts, not only the first.
+  // Every element is checked, not only the first.
   file.elements[2499].typeCode = 11;
   EXPECT_FALSE(IsValid(file));
   file.validElements = 2499;
   EXPECT_TRUE(IsValid(file));
 }
 
-TEST(Ser, ElementsCanLieAnywhere) {
+TEST(Ser, ElementsCanBeAnywhere) {
   SerFile file = OneImage();
   file.elements.push_back(Image(1, 1, "x"));
   const std::string bytes = file.Bytes();
@@ -254,7 +254,7 @@ TEST(Ser, OffsetArraysCanComeFirst) {
   EXPECT_EQ(OpenSer(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 }
 
-TEST(Ser, ReadsDimensionsOfAnyNumberAndTexts) {
+TEST(Ser, ReadsAnyNumberOfDimensionsWithStringsOfAnyLength) {
   SerFile file = OneImage();
   file.dimensions.clear();
   EXPECT_TRUE(IsValid(file));
@@ -267,7 +267,7 @@ TEST(Ser, ReadsDimensionsOfAnyNumberAndTexts) {
   EXPECT_EQ(OpenSer(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 }
 
-TEST(Ser, NegativeTextLengthIsALengthError) {
+TEST(Ser, NegativeStringLengthIsALengthError) {
   for (const std::int32_t length : {-1, std::numeric_limits<std::int32_t>::min()}) {
     SerFile file = OneImage();
     file.dimensions[0].descriptionLength = length;
@@ -277,13 +277,13 @@ TEST(Ser, NegativeTextLengthIsALengthError) {
     EXPECT_THROW(OpenSer{file}, std::length_error);
     file.dataTypeId = 0x4120;
     EXPECT_THROW(OpenSer{file}, std::length_error);
-    // What is not read cannot throw.
+    // A length that is not read cannot cause an exception.
     file.dimensionCount = 0;
     EXPECT_NO_THROW(OpenSer{file});
   }
 }
 
-TEST(Ser, TextsAndDimensionsThatAreNotThereFailTheFile) {
+TEST(Ser, MissingStringsAndDimensionsFailTheFile) {
   constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
   SerFile file = OneImage();
   file.dimensions[0].descriptionLength = kMax;
@@ -292,7 +292,7 @@ TEST(Ser, TextsAndDimensionsThatAreNotThereFailTheFile) {
   file.dimensions[0].unitsLength = kMax;
   EXPECT_FALSE(IsValid(file));
 
-  // The last text ends with the file, or a byte behind it.
+  // The last string ends with the file, then one byte beyond it.
   file = OneImage();
   const std::string bytes = file.Bytes();
   const std::size_t units = 30 + 4 + 20 + 4 + file.dimensions[0].description.size() + 4;
@@ -307,7 +307,7 @@ TEST(Ser, TextsAndDimensionsThatAreNotThereFailTheFile) {
   EXPECT_FALSE(IsValid(file));
 }
 
-TEST(Ser, ElementsThatAreNotThereFailTheFile) {
+TEST(Ser, MissingElementsFailTheFile) {
   SerFile file = OneImage();
   for (const std::uint32_t count : {2u, 0x40000000u, 0x80000000u, 0xFFFFFFFFu}) {
     file.totalElements = count;
@@ -336,7 +336,7 @@ TEST(Ser, OffsetArraysCanPass4GiB) {
   const std::string head = file.Bytes();
   const auto isValid = [&head](std::int64_t size) {
     Testing::MemoryBuffer buffer(head);
-    buffer.zerosBehind = size - static_cast<std::int64_t>(head.size());
+    buffer.trailingZeros = size - static_cast<std::int64_t>(head.size());
     std::istream stream(&buffer);
     return SerFileInfo(stream).IsValid();
   };

@@ -1,4 +1,4 @@
-// Files that end early, at every one of their bytes.
+// Files of every kind, truncated at every byte.
 #include <gtest/gtest.h>
 
 #include <filesystem>
@@ -24,8 +24,8 @@ using namespace Testing;
 struct Specimen {
   std::wstring extension;
   std::string bytes;
-  std::size_t validFrom;  // the length from which on the file is valid
-  std::size_t shownFrom;  // the length from which on it has a thumbnail
+  std::size_t validFrom;  // the smallest length of a valid file
+  std::size_t shownFrom;  // the smallest length of a file with a thumbnail
 };
 
 Specimen MrcSpecimen() {
@@ -64,7 +64,7 @@ SerFile TwoImageSeries() {
 
 Specimen SerSpecimen() {
   const std::string bytes = TwoImageSeries().Bytes();
-  return {L"ser", bytes, bytes.size(), bytes.size()};  // its index is at its end
+  return {L"ser", bytes, bytes.size(), bytes.size()};  // its index comes last
 }
 
 Specimen WideSerSpecimen() {
@@ -113,15 +113,15 @@ void ExpectAnswers(std::istream& stream, const Specimen& specimen, std::size_t l
 
 class TruncatedFile : public testing::TestWithParam<Specimen> {};
 
-TEST_P(TruncatedFile, InMemoryIsAcceptedAsFarAsItGoes) {
+TEST_P(TruncatedFile, InMemoryIsAcceptedFromItsSmallestLengthOn) {
   for (std::size_t length = 0; length <= GetParam().bytes.size(); ++length) {
     std::istringstream stream(GetParam().bytes.substr(0, length));
     ExpectAnswers(stream, GetParam(), length);
   }
 }
 
-// A file can be positioned after its end, a stream of bytes in memory cannot.
-TEST_P(TruncatedFile, OnDiskIsAcceptedAsFarAsItGoes) {
+// Unlike a stream in memory, a file can be positioned after its end.
+TEST_P(TruncatedFile, OnDiskIsAcceptedFromItsSmallestLengthOn) {
   const TempFolder folder;
   const std::filesystem::path path = folder.Write("file", GetParam().bytes);
   for (std::size_t length = GetParam().bytes.size();; --length) {

@@ -1,9 +1,9 @@
 #!/usr/bin/env python3
 """Usage: write_mrc_files.py FOLDER
 
-Writes MRC files of every mode, kind and byte order that the mrcfile package knows into FOLDER, and what is to
-be seen of each into FOLDER/expected.txt. The files are another program's work, and the pictures are made here
-with numpy, so that nothing is shared with the code that is tested.
+Writes MRC files of every mode, kind and byte order that the mrcfile package supports into FOLDER, and their
+expected properties and pictures into FOLDER/expected.txt. The files are written by that package, and the pictures
+are computed here with numpy, so nothing is shared with the code under test.
 """
 
 import math
@@ -13,7 +13,7 @@ import sys
 import mrcfile
 import numpy
 
-# Bits and name of the pixels by mode. Half floats (12) are shown as 8 bits.
+# Bits per pixel and type name of each mode. Half floats (12) are read as 8-bit pixels.
 TYPES = {
     0: (8, "8 bit unsigned"),
     1: (16, "16 bit signed"),
@@ -25,15 +25,15 @@ TYPES = {
 
 
 def shown_values(data, section, mode):
-    """The pixels of a section as they are to be shown: the first row last, and as the type of the mode."""
-    if mode in (0, 12):  # pixels of one byte, even if two have been written
+    """Returns the pixels of a section in the type that its mode is shown as, with the first row last."""
+    if mode in (0, 12):  # one-byte pixels, even if the file has two bytes per pixel
         shape = data.shape
         count = shape[1] * shape[2]
         pixels = numpy.frombuffer(data.tobytes(), numpy.uint8, count, section * count)
         return pixels.reshape(shape[1:])[::-1]
     frame = data[section]
     flipped = frame[::-1]
-    if mode in (2, 4) and frame.dtype.byteorder == ">":  # numbers of more than 16 bits are not swapped
+    if mode in (2, 4) and frame.dtype.byteorder == ">":  # values of more than 16 bits are not swapped
         little = frame.dtype.newbyteorder("<")
         flipped = numpy.frombuffer(flipped.tobytes(), little).reshape(frame.shape)
     if mode == 4:
@@ -44,7 +44,7 @@ def shown_values(data, section, mode):
 
 
 def picture(values, request):
-    """The grey levels of a thumbnail."""
+    """Returns the grey levels of a thumbnail."""
     height, width = values.shape
     f = max(width // request[0], height // request[1], 1)
     rows, columns = height // f * f, width // f * f
@@ -60,7 +60,7 @@ def picture(values, request):
 
 
 def frames(random, count, shape, dtype):
-    """Random frames with a bright disc, each of another level."""
+    """Returns random frames with a bright disc, each at another level."""
     dtype = numpy.dtype(dtype)
     y, x = numpy.mgrid[: shape[0], : shape[1]]
     disc = (x - shape[1] / 2) ** 2 + (y - shape[0] / 3) ** 2 < (min(shape) / 4) ** 2
@@ -98,7 +98,7 @@ def main(folder):
                     else:
                         mrc.set_data(data)
                         mrc.set_image_stack() if kind == "stack" else mrc.set_volume()
-                    mrc.header.label[0] = "Created by mrcfile.py"  # without the time, so that runs agree
+                    mrc.header.label[0] = "Created by mrcfile.py"  # without the time, so that the output is reproducible
                     mrc.add_label(f"  {kind} of {code}")
                     if kind in ("stack", "volumes"):
                         mrc.set_extended_header(numpy.arange(777, dtype="u1"))

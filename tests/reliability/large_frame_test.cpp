@@ -23,7 +23,7 @@ constexpr std::int64_t kFrameBytes = std::int64_t{kEdge} * kEdge * 4;
 /// The most memory in use while a thumbnail is made of a file that is `head` and a frame of zeros.
 std::int64_t PeakOfThumbnail(const std::string& head, const std::wstring& extension) {
   Testing::MemoryBuffer buffer(head);
-  buffer.zerosBehind = kFrameBytes;
+  buffer.trailingZeros = kFrameBytes;
   std::istream stream(&buffer);
   const Testing::HeapMeter meter;
   const auto reader = CreateFileTypeInfo(stream, extension);
@@ -53,7 +53,7 @@ constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and 
 /// The most memory in use while a frame is reduced to `side` by `side` pixels, without the reduced image.
 std::int64_t PeakBesideTheReducedImage(const FrameLayout& layout, LONG side, std::int64_t averageBytes) {
   Testing::MemoryBuffer buffer("");
-  buffer.zerosBehind = layout.blockBytes;
+  buffer.trailingZeros = layout.blockBytes;
   std::istream stream(&buffer);
   const Testing::HeapMeter meter;
   const HBITMAP bitmap = ReadThumbnail(stream, layout, {side, side});

@@ -22,7 +22,7 @@ class MemoryBuffer : public std::streambuf {
   std::int64_t failingRead = -1;  // its index, from 0; -1 for none
   Failure failure = Failure::kBringsNothing;
   bool seekable = true;
-  std::int64_t zerosBehind = 0;  // the zero bytes that follow the file's own, as in a sparse file
+  std::int64_t trailingZeros = 0;  // the zero bytes that follow the file's own, as in a sparse file
 
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
@@ -33,7 +33,7 @@ class MemoryBuffer : public std::streambuf {
   std::streamsize xsgetn(char* target, std::streamsize count) override {
     if (count == 0) return 0;  // not a read of the file
     const auto stored = static_cast<std::streamsize>(bytes_.size());
-    std::streamsize got = std::clamp<std::streamsize>(stored + zerosBehind - position_, 0, count);
+    std::streamsize got = std::clamp<std::streamsize>(stored + trailingZeros - position_, 0, count);
     if (reads++ == failingRead) {
       if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
       got = failure == Failure::kBringsHalf ? got / 2 : 0;
@@ -61,7 +61,8 @@ class MemoryBuffer : public std::streambuf {
   }
 
   pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
-    const off_type base = direction == std::ios_base::end ? static_cast<off_type>(bytes_.size()) + zerosBehind
+    const off_type base = direction == std::ios_base::end
+                              ? static_cast<off_type>(bytes_.size()) + trailingZeros
                           : direction == std::ios_base::cur ? position_
                                                             : 0;
     return seekpos(base + offset, std::ios_base::in);
