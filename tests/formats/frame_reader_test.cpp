@@ -101,7 +101,8 @@ struct NaivePictureOf {
   BitmapPixels operator()(std::monostate) const { return {}; }
 };
 
-/// Returns a layout whose pixels may have gaps. Rows are contiguous, or columns if `byColumn`. Pixels may overlap.
+/// Returns a layout whose pixels may have gaps. Rows are contiguous, or columns if `byColumn`. Pixels may
+/// overlap.
 FrameLayout RandomLayout(Random& random, const PixelType& type, Size2 size, bool byColumn) {
   FrameLayout layout;
   layout.type = type;
@@ -221,8 +222,8 @@ TEST(FrameReader, InterleavedRowsAndColumnsAreReadInTiles) {
   }
 }
 
-/// Returns a layout of pixels and rows that are this many bytes apart in one or the other direction of the
-/// file.
+/// Returns a layout with these strides, either of which may be negative, whose block begins with its lowest
+/// pixel.
 FrameLayout LayoutOfSteps(const PixelType& type, Size2 size, std::int64_t pixelStride,
                           std::int64_t rowStride) {
   const std::int64_t right = (size.width - 1) * pixelStride;
@@ -243,15 +244,15 @@ TEST(FrameReader, TilesOfEveryShapeGiveTheSamePicture) {
     SIZE request;
   };
   constexpr Shape kShapes[] = {
-      {{40, 30}, 20'000, 20'000, {40, 30}},  // every pixel is a read of its own
+      {{40, 30}, 20'000, 20'000, {40, 30}},  // every pixel takes one read
       {{40, 30}, 20'000, -20'000, {8, 8}},   //
       {{30, 40}, -10'000, 30'000, {1, 1}},   //
       {{30'000, 2}, 30, 20, {15'000, 1}},    // a frame of a few rows
-      {{2, 30'000}, 20, 30, {1, 15'000}},    // and of a few columns
-      {{400'000, 3}, 1, 0, {133'000, 1}},    // the same row several times, longer than the buffer
-      {{3, 400'000}, 0, 1, {1, 133'000}},    // and the same column
-      {{3000, 100}, 100, 1, {96, 96}},       // rows that overlap and lie across the file
-      {{300, 1000}, 3000, 3, {33, 33}},      // columns that lie together
+      {{2, 30'000}, 20, 30, {1, 15'000}},    // a frame of a few columns
+      {{400'000, 3}, 1, 0, {133'000, 1}},    // the same row three times, longer than the buffer
+      {{3, 400'000}, 0, 1, {1, 133'000}},    // the same column three times
+      {{3000, 100}, 100, 1, {96, 96}},       // overlapping rows, stored by column
+      {{300, 1000}, 3000, 3, {33, 33}},      // contiguous columns
       {{300, 1000}, 3000, -3, {300, 1000}},  //
   };
   Random random(5);
@@ -264,7 +265,7 @@ TEST(FrameReader, TilesOfEveryShapeGiveTheSamePicture) {
   }
 }
 
-/// What a thumbnail of a file of the same bytes takes.
+/// The cost of the thumbnail of a file whose bytes are all 0.
 struct Cost {
   bool shown;
   std::int64_t reads;
@@ -328,14 +329,14 @@ TEST(FrameReader, ALargeInterleavedBlockIsReadSeveralTimesInBands) {
   const Cost cost = CostOf(layout, {100, 100});
   EXPECT_TRUE(cost.shown);
   EXPECT_LE(cost.largestRead, 256 * 1024);
-  // A read has at least a square of 16 by 16 pixels.
+  // Each read covers at least a square of 16 by 16 pixels.
   EXPECT_LE(cost.reads, 100 * 100);
 }
 
 TEST(FrameReader, RefusesAScatteredFrameBeforeAnyRead) {
-  // 64 pixels to a read.
+  // A read would give only 64 pixels.
   const FrameLayout few = InterleavedLayout(kUInt8, 40'000, 20'001);
-  // Blocks of 16,400 pixels a row, which are larger than the buffer.
+  // A row of a block has 16,400 pixels, more than the buffer holds.
   const FrameLayout wide =
       LayoutOfSteps(PixelTypeOf(DataType::kComplexFloat64), {16'400, 16'400}, 16, 12'600);
   for (const Cost& cost : {CostOf(few, {256, 256}), CostOf(wide, {1, 1})}) {

@@ -1,6 +1,8 @@
-// Files that change under the release DLL: at every single read another program appends to the file, cuts it
-// short, writes over it, deletes it or takes it away. There is a thumbnail or a refusal, the object goes on
-// to answer, and a new one shows the file as it is then.
+// Files that change while the release DLL reads them: before every single read another program appends to the
+// file,
+// truncates it, overwrites it, deletes it or makes it unreadable. The object must return a thumbnail or a
+// failure and stay
+// usable, and a new object must show the file as it is then.
 #include <gtest/gtest.h>
 #include <io.h>
 #include <windows.h>
@@ -24,7 +26,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// What another program does before the read of the DLL that has this number, counted from 0.
+/// What another program does before the DLL's read with the index g_interruptedRead, counted from 0.
 std::function<void()> g_interrupt;
 int g_interruptedRead = -1;
 bool g_readFails = false;
@@ -41,7 +43,7 @@ int InterruptedRead(int file, void* bytes, unsigned int count) {
   return _read(file, bytes, count);
 }
 
-/// A frame that takes several reads.
+/// Returns a file whose frame takes several reads.
 std::string FrameBytes(char pixel = 'p') {
   MrcFile file;
   file.nx = 700;
@@ -60,8 +62,8 @@ class ChangingFile : public ServerTest {
     BitmapPixels picture;
   };
 
-  /// What an object says that loads the file and shows it, while `interrupt` happens at the read `number`. It
-  /// is asked for everything else afterwards.
+  /// Returns the answers of an object that loads the file and extracts its thumbnail, with `interrupt` called
+  /// before the read `number`. Sends the other requests afterwards.
   Answers Ask(int number = -1, std::function<void()> interrupt = {}, bool readFails = false) {
     g_reads = 0;
     g_interruptedRead = number;
@@ -73,7 +75,7 @@ class ChangingFile : public ServerTest {
     reads_ = g_reads;
     g_interruptedRead = -1;
 
-    // The object is in order, whatever has become of its file.
+    // The object is still usable, whatever has happened to its file.
     const Answers again = Extract(object);
     if (answers.extract == E_FAIL) {
       EXPECT_EQ(again.extract, E_FAIL);
@@ -97,8 +99,8 @@ class ChangingFile : public ServerTest {
     std::ofstream(path_, std::ios_base::binary | std::ios_base::trunc) << bytes;
   }
 
-  /// Does `interrupt` at every read and lets `check` see what came of it. The file is whole before, and
-  /// afterwards nobody holds it open.
+  /// Calls `interrupt` before every read, one read at a time, and passes the answers to `check`. The file is
+  /// intact at first; afterwards nobody may have it open.
   template <class Check>
   void InterruptEveryRead(const std::function<void()>& interrupt, bool readFails, const Check& check) {
     Write(whole_);
@@ -128,17 +130,17 @@ class ChangingFile : public ServerTest {
   const BitmapPixels picture_ = Ask().picture;
 };
 
-TEST_F(ChangingFile, ThatIsAppendedToShowsTheSame) {
+TEST_F(ChangingFile, ShowsTheSameWhenItGrows) {
   InterruptEveryRead([&] { std::ofstream(path_, std::ios_base::binary | std::ios_base::app) << whole_; },
                      false, [&](const Answers& answers) { EXPECT_EQ(answers.picture, picture_); });
 }
 
-TEST_F(ChangingFile, ThatIsDeletedShowsTheSame) {
+TEST_F(ChangingFile, ShowsTheSameWhenItIsDeleted) {
   InterruptEveryRead([&] { EXPECT_TRUE(std::filesystem::remove(path_)); }, false,
                      [&](const Answers& answers) { EXPECT_EQ(answers.picture, picture_); });
 }
 
-TEST_F(ChangingFile, ThatIsCutShortIsRefusedOrWasReadBefore) {
+TEST_F(ChangingFile, IsRefusedWhenItIsTruncatedUnlessItWasReadBefore) {
   for (const std::size_t length :
        {std::size_t{0}, std::size_t{1}, std::size_t{1024}, whole_.size() / 2, whole_.size() - 1}) {
     int refusals = 0;
@@ -151,7 +153,7 @@ TEST_F(ChangingFile, ThatIsCutShortIsRefusedOrWasReadBefore) {
   }
 }
 
-TEST_F(ChangingFile, ThatIsWrittenOverShowsOldOrNewPixels) {
+TEST_F(ChangingFile, ShowsOldOrNewPixelsWhenItIsOverwritten) {
   const std::string other = FrameBytes('q');
   InterruptEveryRead(
       [&] { std::fstream(path_, std::ios_base::binary | std::ios_base::in | std::ios_base::out) << other; },
@@ -162,12 +164,12 @@ TEST_F(ChangingFile, ThatIsWrittenOverShowsOldOrNewPixels) {
       });
 }
 
-TEST_F(ChangingFile, ThatCannotBeReadAnyMoreIsRefused) {
-  // As where another program locks a part of it, or the medium is gone.
+TEST_F(ChangingFile, IsRefusedWhenItCannotBeReadAnyMore) {
+  // This happens when another program locks a part of the file, or when the medium is removed.
   InterruptEveryRead({}, true, [&](const Answers& answers) { EXPECT_EQ(answers.extract, E_FAIL); });
 }
 
-TEST_F(ChangingFile, ThatAnotherProgramHasForItselfIsRefusedUntilItLetsGo) {
+TEST_F(ChangingFile, IsRefusedWhileAnotherProgramHasItOpenExclusively) {
   const HANDLE own =
       CreateFileW(path_.c_str(), GENERIC_READ | GENERIC_WRITE, 0, nullptr, OPEN_EXISTING, 0, nullptr);
   ASSERT_NE(own, INVALID_HANDLE_VALUE);
@@ -183,7 +185,7 @@ TEST_F(ChangingFile, ThatAnotherProgramHasForItselfIsRefusedUntilItLetsGo) {
   EXPECT_EQ(Ask().picture, picture_);
 }
 
-TEST_F(ChangingFile, ThatIsStillBeingWrittenIsShownWhenItIsWhole) {
+TEST_F(ChangingFile, IsShownAsSoonAsItIsCompletelyWritten) {
   constexpr std::size_t kPiece = 100'000;
   std::filesystem::resize_file(path_, 0);
   std::ofstream writer(path_, std::ios_base::binary);

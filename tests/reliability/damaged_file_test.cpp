@@ -1,5 +1,6 @@
-// Files that lie: whatever a header says, there is an answer or a refusal, no fault, and no more memory than
-// the limit. The sanitizers of the native build find what is read or written outside of its bounds.
+// Files whose contents are false. Whatever a header says, the reader must answer or refuse, without a fault
+// and without
+// exceeding the memory limit. The sanitizers of the native build find accesses outside of bounds.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -26,13 +27,14 @@ using Testing::kBoundaryValues;
 using Testing::PutField;
 using Testing::SampleFile;
 
-/// A lie in a header may cost this much more than the true file takes.
+/// How much more memory, in bytes, a file may take than the same file without its damage.
 constexpr std::int64_t kMaxBytesForALie = 1 << 20;
 
-/// And a file of 100 bytes takes no more than this, whatever it says.
+/// The most memory, in bytes, that a file of 100 bytes may take.
 constexpr std::int64_t kMaxBytesForAHundred = 1 << 20;
 
-/// Two are enough for hundreds of thousands of files: a reduced picture, and one of every pixel.
+/// A reduced picture, and one of every pixel. More requests would take too long with hundreds of thousands of
+/// files.
 constexpr SIZE kRequests[] = {{3, 2}, {Testing::kMaxRequest, Testing::kMaxRequest}};
 
 class DamagedFile : public Testing::FileKindTest {
@@ -40,11 +42,11 @@ class DamagedFile : public Testing::FileKindTest {
   ~DamagedFile() override {
     std::printf("%s: %d files take at most %lld bytes of memory", kind_.c_str(), files_,
                 static_cast<long long>(most_));
-    if (mostBeyond_) std::printf(", %lld more than the sound file", static_cast<long long>(*mostBeyond_));
+    if (mostBeyond_) std::printf(", %lld more than the intact file", static_cast<long long>(*mostBeyond_));
     std::printf("\n");
   }
 
-  /// The most memory that the questions take.
+  /// Returns the most memory in use while all questions are asked, in bytes.
   std::int64_t Ask(const std::string& bytes) {
     const Testing::HeapMeter meter;
     Testing::MemoryBuffer buffer(bytes);
@@ -57,8 +59,8 @@ class DamagedFile : public Testing::FileKindTest {
     return peak;
   }
 
-  /// Asks about the sample as `damage` leaves it, which may take `beyond` more than the `whole` of the
-  /// sample.
+  /// Asks about the sample after `damage`. It may take `beyond` more bytes of memory than `whole`, which the
+  /// intact sample takes.
   template <class Damage>
   void AskDamaged(const SampleFile& sample, std::int64_t whole, std::int64_t beyond, const Damage& damage) {
     std::string bytes = sample.bytes;
@@ -86,7 +88,7 @@ TEST_P(DamagedFile, EveryByteOfEveryValue) {
 }
 
 TEST_P(DamagedFile, EveryFieldOfBoundaryValues) {
-  constexpr std::size_t kHeaderBytes = 96;  // of all samples; of the first one all there is
+  constexpr std::size_t kHeaderBytes = 96;  // of the first sample every byte is damaged
   for (const SampleFile& sample : samples_) {
     const std::int64_t whole = Ask(sample.bytes);
     const std::size_t end = &sample == &samples_.front() ? sample.bytes.size() : kHeaderBytes;
@@ -99,7 +101,7 @@ TEST_P(DamagedFile, EveryFieldOfBoundaryValues) {
 }
 
 TEST_P(DamagedFile, HundredBytesTakeAtMostAMebibyte) {
-  // Sizes of which pictures become large when many pixels share their bytes.
+  // Sizes that give large pictures when many pixels overlap.
   constexpr std::uint32_t kSizes[] = {0, 1, 2, 8, 255, 256, 257, 512, 1000, 1024, 65536};
   Testing::Random random(7);
   const auto pick = [&random](const auto& values) {
@@ -125,8 +127,8 @@ TEST_P(DamagedFile, EveryLength) {
   }
 }
 
-/// Strides make pixels share their bytes, so that a few bytes are a picture of any size. What is asked for is
-/// not larger for that.
+/// The strides of a RAW file can make pixels overlap, so a few bytes can hold a picture of any size. The
+/// memory must follow the request nevertheless.
 TEST(SharedPixels, HundredBytesTakeAtMostAMebibyte) {
   constexpr SIZE kRequest = {96, 96};
   int thumbnails = 0;
@@ -150,7 +152,7 @@ TEST(SharedPixels, HundredBytesTakeAtMostAMebibyte) {
     }
   }
   EXPECT_EQ(thumbnails, 5 * 4 * 4);
-  std::printf("raw: %d pictures of shared pixels take at most %lld bytes of memory\n", thumbnails,
+  std::printf("raw: %d pictures of overlapping pixels take at most %lld bytes of memory\n", thumbnails,
               static_cast<long long>(most));
 }
 

@@ -1,6 +1,8 @@
-// The release DLL in a process whose memory runs out, at every single request that the DLL makes for memory,
-// a text, a lock or a bitmap: the result that is promised, nothing left behind, and an object that answers
-// again as soon as there is memory.
+// The release DLL when memory runs out. Every single request of the DLL for memory, a string, a lock or a
+// bitmap fails
+// once. The call must end with the promised result and leave nothing allocated, and the object must work
+// again as soon as
+// there is memory.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -32,41 +34,42 @@ namespace {
 
 using Then = ScarceSystem::Then;
 
-/// What a method answers; none when it ends with std::bad_alloc, as none of them catches it.
+/// The result of a method. Empty if it throws std::bad_alloc, which no method catches.
 using Result = std::optional<HRESULT>;
 constexpr Result kThrew = std::nullopt;
 constexpr Result kNoMemory = E_OUTOFMEMORY;
 constexpr Result kNoBitmap = E_FAIL;
 
-/// No larger than any sample, so that colour frames can be reduced to it as well.
+/// Not larger than any sample, because a colour frame must not be smaller than the request.
 constexpr SIZE kRequest = {2, 2};
 
 /// One request of the shell.
 struct Request {
-  std::function<void()> prepare;  // what has to be there before, made while there is memory
+  std::function<void()> prepare;  // prepares the call, while there is memory
   std::function<HRESULT()> send;
-  std::function<void()> check;  // takes the answer to one that has succeeded
+  std::function<void()> check;  // checks and frees the answer of a call that has succeeded
 
-  Result withoutMemory;             // what it ends with when the C runtime's memory runs out
-  Result withoutOther = kNoMemory;  // when anything else fails
-  int madeObjects = 0;              // allocations of COM objects that it makes: without them E_OUTOFMEMORY
-  int firstPlace = 0;               // to fail
+  Result withoutMemory;             // the result when the C runtime has no memory
+  Result withoutOther = kNoMemory;  // the result when anything else fails
+  int madeObjects = 0;              // how many COM objects it allocates; these failures give E_OUTOFMEMORY
+  int firstPlace = 0;               // the first place that fails
 };
 
 Result Send(const Request& request, Then then) {
   try {
     return request.send();
   } catch (const std::bad_alloc&) {
-    // Without any memory the exception lies in what the DLL has set aside, enough for some hundred of them,
-    // and must not be given back to this program's heap: a reference on it is kept for good.
+    // Without memory the exception is in the DLL's reserve, which has room for some hundred exceptions. This
+    // program's heap must not free it, so a reference to it is kept permanently.
     static auto* const kept = new std::vector<std::exception_ptr>();
     if (then == Then::kStaysEmpty) kept->push_back(std::current_exception());
     return kThrew;
   }
 }
 
-/// Sends `request` while what the DLL asks for at its place `number` is not there. Returns whether there was
-/// such a place.
+/// Sends `request` while the DLL's request for resources with the index `number` fails. Returns whether there
+/// is such a
+/// request.
 bool FailOnce(const Request& request, std::int64_t number, Then then, int* objectsNotMade = nullptr) {
   request.prepare();
   ScarceSystem::FailAt(number, then);
@@ -76,18 +79,18 @@ bool FailOnce(const Request& request, std::int64_t number, Then then, int* objec
   if (request.madeObjects > 0 && lack == ScarceSystem::Lack::kMemory && result == kNoMemory) {
     if (objectsNotMade != nullptr) ++*objectsNotMade;
   } else if (failed && then == Then::kStaysEmpty && result == request.withoutMemory) {
-    // The memory failed too, after what failed first.
+    // After the first failure an allocation failed too.
   } else if (failed) {
     EXPECT_EQ(result, lack == ScarceSystem::Lack::kMemory ? request.withoutMemory : request.withoutOther)
         << "place " << number;
   }
-  // The same request again, to the same object.
+  // The same request to the same object must succeed now.
   EXPECT_EQ(failed ? request.send() : result, S_OK) << "place " << number;
   request.check();
   return failed;
 }
 
-/// Lets every place fail, one after the other. Returns how many there are.
+/// Makes every place fail, one after the other. Returns the number of places.
 int FailEverywhere(const Request& request, Then then) {
   int places = request.firstPlace;
   int objectsNotMade = 0;
@@ -96,7 +99,7 @@ int FailEverywhere(const Request& request, Then then) {
   return places;
 }
 
-/// The same, each time in a thread that has never seen an exception.
+/// Makes every place fail, each time in a new thread that has never handled an exception.
 void FailEverywhereInNewThreads(const Request& request) {
   bool failed = true;
   for (int number = request.firstPlace; failed; ++number) {
@@ -108,7 +111,7 @@ class DllOutOfMemory : public ServerTest {
  protected:
   ~DllOutOfMemory() override { Forget(); }
 
-  /// Lets everything that `request` needs fail in every way and looks at what is left.
+  /// Makes everything that `request` needs fail in every way, and checks that nothing is left allocated.
   void Try(const Request& request) {
     EXPECT_GT(FailEverywhere(request, Then::kRecovers), 0);
     FailEverywhere(request, Then::kStaysEmpty);
@@ -116,7 +119,8 @@ class DllOutOfMemory : public ServerTest {
     ExpectNothingLeft(request);
   }
 
-  /// What the system takes for itself it takes once; a leak grows with every round.
+  /// Checks that repeating the failures leaves nothing. The system's permanent allocations occur once; a leak
+  /// grows with every round.
   void ExpectNothingLeft(const Request& request) {
     const auto take = [&] {
       FailEverywhere(request, Then::kRecovers);
@@ -131,7 +135,7 @@ class DllOutOfMemory : public ServerTest {
               next.gdiObjects > least.gdiObjects;
       least = next;
     }
-    EXPECT_FALSE(grows) << "something is left after every round";
+    EXPECT_FALSE(grows) << "every round leaves something allocated";
     EXPECT_EQ(dll_.LockCount(), 0);
   }
 
@@ -215,7 +219,7 @@ TEST_F(DllOutOfMemory, WhileAFileIsLoaded) {
            try {
              return Load();
            } catch (const std::bad_alloc&) {
-             // It is without a file, as one whose file is not acceptable. The shell takes a new object.
+             // The object has no file, as after Load of an invalid one. The shell would make a new object.
              EXPECT_EQ(Ask<IExtractImage>(IID_IExtractImage)->Extract(&bitmap_), E_FAIL);
              throw;
            }
@@ -271,7 +275,7 @@ TEST_F(DllOutOfMemory, WhileAColumnIsRead) {
   }
 }
 
-/// The object and the map that it shares with its enumerators.
+/// The allocations of a property storage: the object, and the map that it shares with its enumerators.
 constexpr int kAllocationsOfAStorage = 2;
 
 TEST_F(DllOutOfMemory, WhilePropertySetsAreBuiltAndListed) {
@@ -339,7 +343,7 @@ TEST_F(DllOutOfMemory, WhileAPropertyStoreIsFilledAndRead) {
     const auto read = [&] { return handler_->GetValue(kDimensionsKey, &value); };
     const auto check = [&] { EXPECT_EQ(TakeValue(value).type, VT_LPWSTR); };
 
-    // Without its buffer a store is without a file, as one whose file is not acceptable.
+    // Without a buffer for its stream, a store has no file, as after an invalid one.
     make();
     ScarceSystem::FailAt(0, Then::kRecovers);
     EXPECT_EQ(initialize(), S_OK);
@@ -365,7 +369,7 @@ TEST_F(DllOutOfMemory, WhileAPropertyStoreIsFilledAndRead) {
   }
 }
 
-/// A DLL that was never asked for the class object, as it is kept.
+/// Uses a DLL that has not made the class object yet, because it keeps the class object afterwards.
 TEST(FreshDllOutOfMemory, WhileAClassObjectIsMade) {
   for (const Then then : {Then::kRecovers, Then::kStaysEmpty}) {
     bool failed = true;

@@ -1,5 +1,6 @@
-// The release DLL in a process that has no thread-local and fiber-local slots left: the exceptions of readers
-// reach their caller all the same, in every thread.
+// The release DLL in a process without free thread-local and fiber-local slots. The exceptions of readers
+// must still reach
+// their caller, in every thread.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -18,7 +19,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-/// Takes every slot that is free in the process and gives them back at the end.
+/// Allocates every free slot of the process, and frees them when it is destroyed.
 template <auto allocate, auto free>
 class AllSlots {
  public:
@@ -42,15 +43,15 @@ DWORD AllocateFiberSlot() {
 class ExhaustedProcess : public testing::Test {
  protected:
   ExhaustedProcess() {
-    // A text outside of any object, which its reader refuses with an exception.
+    // A pixel array outside every image, for which the reader throws an exception.
     EmiFile emi;
     emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside of any image");
     path_ = folder_.Write("throwing.emi", emi.Bytes());
-    // This program's own runtime has what it needs for exceptions from now on.
+    // After its first exception, this program's own runtime needs no further slot.
     EXPECT_THROW(throw std::runtime_error("first"), std::runtime_error);
   }
 
-  /// Loads the file in an object of its own, which throws what the reader throws.
+  /// Loads the file into a new object. Throws the reader's exception.
   void Load(const ServerDll& dll) const {
     const auto file = dll.CreateInstance<IPersistFile>(kShellExtClass, IID_IPersistFile);
     file->Load(path_.c_str(), STGM_READ);
@@ -61,7 +62,7 @@ class ExhaustedProcess : public testing::Test {
 };
 
 TEST_F(ExhaustedProcess, GetsTheExceptionsOfReaders) {
-  // This program imports from the same modules of the system, so that only the DLL itself is loaded now.
+  // This program imports from the same system modules, so loading the DLL now loads nothing else.
   const AllSlots<&TlsAlloc, &TlsFree> threadSlots;
   const AllSlots<&AllocateFiberSlot, &FlsFree> fiberSlots;
   const ServerDll dll;
@@ -79,7 +80,7 @@ TEST_F(ExhaustedProcess, GetsTheExceptionsOfManyThreadsAtOnce) {
     threads.emplace_back([&] {
       try {
         Load(dll);
-        ADD_FAILURE() << "nothing was thrown";
+        ADD_FAILURE() << "no exception was thrown";
         everyThreadHasOne.count_down();
       } catch (const std::invalid_argument& e) {
         everyThreadHasOne.arrive_and_wait();

@@ -1,4 +1,4 @@
-// Streams that fail: at every single read, in every way, and those that cannot be positioned.
+// Streams that fail: at every single read and in every way, and streams that cannot be positioned.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -20,7 +20,7 @@ using Testing::MemoryBuffer;
 using Testing::SampleFile;
 using Failure = MemoryBuffer::Failure;
 
-/// A file, its reader and what it reads.
+/// A file, its reader and the buffer that counts its reads.
 struct OpenSample {
   OpenSample(const SampleFile& sample, const std::wstring& extension, std::int64_t failingRead,
              Failure failure)
@@ -41,12 +41,12 @@ struct OpenSample {
 
 class FailingStream : public Testing::FileKindTest {
  protected:
-  /// Lets read `failingRead` of the sample fail and looks at what comes of it.
+  /// Makes the read `failingRead` of the sample fail and checks the reader.
   void Fail(const SampleFile& sample, const OpenSample& whole, std::int64_t readsOfHeader,
             std::int64_t failingRead, Failure failure) {
     OpenSample open(sample, extension_, failingRead, failure);
     if (failingRead < readsOfHeader) {
-      // An item tree that ends early keeps the images that it has shown so far.
+      // If the tree of an EMI file ends early, the images up to there count.
       EXPECT_TRUE(!open.reader->IsValid() || kind_ == "emi");
       if (open.reader->IsValid()) open.Thumbnail();
       return;
@@ -55,13 +55,13 @@ class FailingStream : public Testing::FileKindTest {
     EXPECT_EQ(open.Thumbnail(), BitmapPixels());
     EXPECT_TRUE(open.stream.fail());
     EXPECT_EQ(open.reader->GetDimensions(), whole.reader->GetDimensions());
-    EXPECT_EQ(open.Thumbnail(), BitmapPixels()) << "from a stream that is left failed";
+    EXPECT_EQ(open.Thumbnail(), BitmapPixels()) << "although the stream has failed before";
     open.stream.clear();
     EXPECT_EQ(open.Thumbnail(), whole.Thumbnail());
   }
 };
 
-TEST_P(FailingStream, AtEveryReadIsRefusedOrGivesNoThumbnailAndIsOverAfterIt) {
+TEST_P(FailingStream, AtAnyReadIsRefusedOrGivesNoThumbnailAndRecovers) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     const OpenSample whole(sample, extension_, -1, Failure::kBringsNothing);
@@ -79,7 +79,7 @@ TEST_P(FailingStream, AtEveryReadIsRefusedOrGivesNoThumbnailAndIsOverAfterIt) {
   }
 }
 
-TEST_P(FailingStream, ThatCannotBePositionedIsNoFault) {
+TEST_P(FailingStream, ThatCannotBePositionedCausesNoFault) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     MemoryBuffer buffer(sample.bytes);
@@ -91,9 +91,10 @@ TEST_P(FailingStream, ThatCannotBePositionedIsNoFault) {
   }
 }
 
-/// Frames that are larger than the reader's buffer: of several bands, of rows that are larger than it, and
-/// one whose columns lie one after the other in the file.
-TEST(FailingStreamOfALargeFrame, AtAnyReadGivesNoThumbnailAndIsOverAfterIt) {
+/// Frames that do not fit into the reader's buffer: one of several bands, one whose rows are larger than the
+/// buffer, and one
+/// that is stored column by column.
+TEST(FailingStreamOfALargeFrame, AtAnyReadGivesNoThumbnailAndRecovers) {
   struct Shape {
     std::int32_t width, height, pixelStride, rowStride;
     SIZE request;

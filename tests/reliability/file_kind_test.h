@@ -1,4 +1,4 @@
-// What the tests that run once for each file kind have in common.
+// The base of tests that run once for each file kind.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -12,7 +12,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Its parameter is one of kSampleKinds.
+/// A test of one file kind. The parameter is one of kSampleKinds.
 class FileKindTest : public testing::TestWithParam<const char*> {
  protected:
   std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream) const {
@@ -26,12 +26,12 @@ class FileKindTest : public testing::TestWithParam<const char*> {
 
 inline const auto kEachFileKind = testing::ValuesIn(kSampleKinds);
 
-/// The name of a test's instance for a kind.
+/// Returns the name of a test's instance for a kind.
 inline std::string KindName(const testing::TestParamInfo<const char*>& kind) {
   return kind.param;
 }
 
-/// Small, and no larger than any sample, so that colour frames can be reduced to it as well.
+/// Not larger than any sample, because a colour frame must not be smaller than the request.
 inline constexpr SIZE kSmallRequest = {2, 2};
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

@@ -1,4 +1,4 @@
-// How much memory a large picture takes.
+// Measures how much memory a large frame takes.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -20,7 +20,9 @@ namespace {
 constexpr std::int32_t kEdge = 4096;
 constexpr std::int64_t kFrameBytes = std::int64_t{kEdge} * kEdge * 4;
 
-/// The most memory in use while a thumbnail is made of a file that is `head` and a frame of zeros.
+/// Returns the most memory in use, in bytes, while the thumbnail is made of a file that consists of `head`
+/// and a frame of
+/// zeros.
 std::int64_t PeakOfThumbnail(const std::string& head, const std::wstring& extension) {
   Testing::MemoryBuffer buffer(head);
   buffer.trailingZeros = kFrameBytes;
@@ -39,7 +41,7 @@ TEST(LargeFrame, ThumbnailTakesMemoryForABandAndNotForTheFrame) {
             kMax);
 }
 
-/// A pixel type, and the bytes of the average of a block.
+/// A pixel type, and the bytes of a block's average.
 struct Case {
   PixelType type;
   std::int64_t averageBytes;
@@ -48,9 +50,10 @@ struct Case {
 class ThumbnailMemory : public testing::TestWithParam<Case> {};
 
 constexpr std::int64_t kBandBytes = 256 * 1024;
-constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // of a row of blocks, and of complex pixels in batches
+constexpr std::int64_t kSumsAndObjects = 96 * 1024;  // for a row of blocks, and for batches of complex pixels
 
-/// The most memory in use while a frame is reduced to `side` by `side` pixels, without the reduced image.
+/// Returns the most memory in use, in bytes, while a frame is reduced to `side` by `side` pixels, without the
+/// reduced image.
 std::int64_t PeakBesideTheReducedImage(const FrameLayout& layout, LONG side, std::int64_t averageBytes) {
   Testing::MemoryBuffer buffer("");
   buffer.trailingZeros = layout.blockBytes;

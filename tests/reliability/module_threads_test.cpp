@@ -1,6 +1,8 @@
 // What the threads of a process share: the module's lock count, its class objects, and free-threaded objects.
-// Native, so that it is built with ThreadSanitizer too (preset linux-tsan); the same through the DLL is in
-// class_objects_test.
+// The test is
+// native, so that it can be built with ThreadSanitizer too (preset linux-tsan). class_objects_test does the
+// same with the
+// DLL.
 #include <gtest/gtest.h>
 
 #include <array>
@@ -17,7 +19,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct ICounter : IUnknown {
-  /// Counts one further, under the object's own lock.
+  /// Increments the count under the object's own lock, and returns it.
   virtual int Count() = 0;
 
  protected:
@@ -58,7 +60,7 @@ class Counter : public Com::CComRoot<Com::FreeThreaded, ICounter> {
   int count_ = 0;
 };
 
-/// Lets other threads come in between, where they must not.
+/// Gives other threads the chance to run in the middle of an operation, which must not harm it.
 void Dawdle() {
   for (int i = 0; i < 5; ++i) std::this_thread::yield();
 }
@@ -81,7 +83,7 @@ class SlowModule : public CQelShellExtModule {
   }
 };
 
-/// Runs `work` in all threads, which begin at once.
+/// Runs `work` in all threads, which start it at the same time.
 void RunInThreads(const std::function<void(std::size_t thread)>& work) {
   std::atomic<bool> go = false;
   std::vector<std::thread> threads;
@@ -122,7 +124,7 @@ class ModuleThreads : public testing::Test {
   SlowModule module_{map_};
 };
 
-TEST_F(ModuleThreads, GetTheOneClassObject) {
+TEST_F(ModuleThreads, GetTheSameClassObject) {
   g_madeClassObjects = 0;
   std::array<ComPtr<IClassFactory>, kThreads> factories;
   RunInThreads([&](std::size_t thread) { factories[thread] = Factory(); });
@@ -145,7 +147,7 @@ TEST_F(ModuleThreads, MakeAndReleaseObjectsOfTheirOwn) {
     for (int i = 0; i < kRounds; ++i) {
       const auto factory = Factory();
       EXPECT_EQ(Make<ICounter>(factory, nullptr, kCounterId)->Count(), 1);
-      // An aggregated object is released through its own IUnknown; its outer object is asked for nothing.
+      // An aggregated object is released through its own IUnknown. Its outer object is not called.
       const auto outer = Make<IUnknown>(factory, nullptr, IID_IUnknown);
       EXPECT_TRUE(Make<IUnknown>(factory, outer.Get(), IID_IUnknown));
     }
@@ -166,11 +168,12 @@ TEST_F(ModuleThreads, LockAndUnlockTheServer) {
 TEST_F(ModuleThreads, AskForTheInterfaceTable) {
   RunInThreads([&](std::size_t) {
     IGlobalInterfaceTable* table = nullptr;
-    EXPECT_EQ(module_.GetGITPtr(&table), REGDB_E_CLASSNOTREG);  // there are no registered classes here
+    EXPECT_EQ(module_.GetGITPtr(&table),
+              REGDB_E_CLASSNOTREG);  // there are no registered classes in this process
   });
 }
 
-TEST_F(ModuleThreads, ShareAnObjectWhichTheLastOfThemDeletes) {
+TEST_F(ModuleThreads, ShareAnObjectThatTheLastReferenceDeletes) {
   for (int round = 0; round < kRounds; ++round) {
     std::array<ComPtr<ICounter>, kThreads> references;
     references.fill(Make<ICounter>(Factory(), nullptr, kCounterId));

@@ -1,5 +1,6 @@
-// Memory that runs out at every single allocation: the standard exception or no thumbnail, nothing leaked,
-// and an object that answers again as soon as there is memory.
+// Memory that runs out at every single allocation. The call must throw std::bad_alloc or return no thumbnail,
+// and leak
+// nothing. The object must work again as soon as there is memory.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -20,14 +21,14 @@ using Testing::BitmapPixels;
 using Testing::FailingHeap;
 using Testing::SampleFile;
 
-/// What came of a call while an allocation failed.
+/// How a call ended in which an allocation should fail.
 enum class Outcome { kAnswered, kThrew, kNotReached };
 
-// Exact results of a thumbnail whose allocations fail in turn, besides exceptions and the two calls in which
-// no allocation is left to fail. In Windows the system takes no memory from this heap. The stand-in for it
-// has four allocations for a grey bitmap: a device context, which the bitmap does not need, and three for the
-// bitmap itself. One fewer is for a colour bitmap, which has no colour table; when memory stays out, the
-// buffer that is allocated after it throws.
+// The exact numbers of results when the allocations of a thumbnail fail in turn, without exceptions and
+// without the two calls in which no allocation is left to fail. Windows itself takes no memory from this
+// heap. Its POSIX stand-in makes four allocations for a grey bitmap: the device context, which the bitmap
+// does not need, and three for the bitmap. A colour bitmap has no colour table and needs one fewer; if memory
+// stays exhausted, the allocation of the buffer after it throws.
 #ifdef _WIN32
 constexpr int kPicturesWithoutDeviceContext = 0;
 constexpr int kGreyAnswersWithoutBitmap = 0;
@@ -38,7 +39,7 @@ constexpr int kGreyAnswersWithoutBitmap = 3 + 4;
 constexpr int kColourAnswersWithoutBitmap = 2;
 #endif
 
-/// Calls `call` with its allocation number `allocation` failing.
+/// Calls `call` and makes the allocation with the index `allocation` fail.
 template <class Call>
 Outcome CallWithFailingHeap(std::int64_t allocation, FailingHeap::Then then, const Call& call) {
   const FailingHeap heap(allocation, then);
@@ -50,9 +51,9 @@ Outcome CallWithFailingHeap(std::int64_t allocation, FailingHeap::Then then, con
   return heap.Failed() ? Outcome::kAnswered : Outcome::kNotReached;
 }
 
-/// Calls `call` with its first allocation failing, its second, and so on until it comes to no further one,
-/// and after each time `check`, which is to free what the call has answered. Returns how often the call
-/// threw.
+/// Calls `call` again and again. Its first allocation fails, then its second, and so on, until it has no
+/// further one. Calls
+/// `check` after each call, to check and free what it returned. Returns how often the call threw.
 template <class Call, class Check>
 int FailEveryAllocation(const Call& call, const Check& check) {
   int exceptions = 0;
@@ -72,7 +73,8 @@ int FailEveryAllocation(const Call& call, const Check& check) {
 
 class OutOfMemory : public Testing::FileKindTest {
  protected:
-  /// The first exception of a thread allocates what the runtime keeps for all others.
+  /// Throws the first exception of this thread, for which the runtime allocates what it keeps for all later
+  /// ones.
   static void SetUpTestSuite() {
     try {
       throw std::bad_alloc();
@@ -81,7 +83,7 @@ class OutOfMemory : public Testing::FileKindTest {
   }
 };
 
-TEST_P(OutOfMemory, WhileAReaderIsMadeLeavesNothingBehind) {
+TEST_P(OutOfMemory, WhileAReaderIsMadeLeaksNothing) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     Testing::MemoryBuffer buffer(sample.bytes);
@@ -100,7 +102,7 @@ TEST_P(OutOfMemory, WhileAReaderIsMadeLeavesNothingBehind) {
   }
 }
 
-TEST_P(OutOfMemory, WhileAThumbnailIsMadeLeavesNothingBehind) {
+TEST_P(OutOfMemory, WhileAThumbnailIsMadeLeaksNothing) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     Testing::MemoryBuffer buffer(sample.bytes);
@@ -126,7 +128,7 @@ TEST_P(OutOfMemory, WhileAThumbnailIsMadeLeavesNothingBehind) {
   }
 }
 
-TEST_P(OutOfMemory, WhileTextsAreMadeLeavesNothingBehind) {
+TEST_P(OutOfMemory, WhileStringsAreMadeLeaksNothing) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     Testing::MemoryBuffer buffer(sample.bytes);

@@ -1,5 +1,6 @@
-// Readers share nothing: as many threads as there are may read files of every kind at once. Built with
-// ThreadSanitizer too (preset linux-tsan).
+// Readers share no state, so any number of threads may read files of every kind at the same time. Also built
+// with
+// ThreadSanitizer (preset linux-tsan).
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -32,7 +33,8 @@ std::vector<Question> EveryQuestion() {
   return questions;
 }
 
-/// The sum over the bitmaps of every file, beginning with file number `first`.
+/// Returns the sum over the bitmaps of each file. Begins with the file `first`, so that threads read
+/// different files.
 std::vector<std::uint64_t> AskAll(const std::vector<Question>& questions, std::size_t first) {
   std::vector<std::uint64_t> sums(questions.size());
   for (std::size_t i = 0; i < questions.size(); ++i) {
@@ -46,7 +48,7 @@ std::vector<std::uint64_t> AskAll(const std::vector<Question>& questions, std::s
   return sums;
 }
 
-TEST(ReaderThreads, GiveTheAnswersOfOne) {
+TEST(ReaderThreads, GiveTheSameAnswersAsOneThread) {
   constexpr std::size_t kThreads = 8;
   const std::vector<Question> questions = EveryQuestion();
   std::vector<std::vector<std::uint64_t>> sums(kThreads);
@@ -60,7 +62,7 @@ TEST(ReaderThreads, GiveTheAnswersOfOne) {
   }
   go = true;
   for (std::thread& thread : threads) thread.join();
-  // Asked last, so that what is made on first use is made by threads that want it at once.
+  // This thread asks last, so that the other threads race for everything that is made on first use.
   const auto alone = AskAll(questions, 0);
   for (const auto& sum : sums) EXPECT_EQ(sum, alone);
 }

@@ -1,4 +1,4 @@
-// The files that the reliability tests and the fuzzers begin with are what they claim to be.
+// Checks that the samples from which the reliability tests and the fuzzers start are valid.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -15,7 +15,7 @@ using Testing::SampleFile;
 
 class SampleFilesOfKind : public Testing::FileKindTest {};
 
-TEST_P(SampleFilesOfKind, AreAtLeastTwentyAndAllDifferent) {
+TEST_P(SampleFilesOfKind, AreAtLeastTwentyAndDistinct) {
   std::set<std::string> names;
   std::set<std::string> contents;
   for (const SampleFile& sample : samples_) {
@@ -27,7 +27,7 @@ TEST_P(SampleFilesOfKind, AreAtLeastTwentyAndAllDifferent) {
   EXPECT_GE(contents.size(), 20u);
 }
 
-TEST_P(SampleFilesOfKind, AreValidAndHaveTheSameThumbnailsAgain) {
+TEST_P(SampleFilesOfKind, AreValidAndGiveTheSameThumbnailsTwice) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
     std::uint64_t sums[2] = {};
