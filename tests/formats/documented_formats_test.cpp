@@ -43,8 +43,7 @@ Row Cells(const std::string& line) {
 }
 
 /// Returns the rows of the table whose first column is called `column`, in the section `section`. An empty
-/// `section` means
-/// the part before all sections.
+/// `section` means the part before all sections.
 Table Documented(const std::string& section, const std::string& column) {
   std::ifstream file("formats.md");
   EXPECT_TRUE(file.is_open());
@@ -159,8 +158,7 @@ PlainFile WithField(std::string bytes, const Row& field, int value) {
 }
 
 /// Expects that the reader accepts the documented values of each field in an otherwise valid file, and no
-/// other values.
-/// `count` is the expected number of fields with a rule.
+/// other values. `count` is the expected number of fields with a rule.
 template <class Reader, class File, class... Arguments>
 void ExpectRules(const Table& table, std::size_t count, const File& good, const Arguments&... arguments) {
   std::size_t rules = 0;
@@ -403,8 +401,7 @@ TEST(DocumentedEmi, FollowsTheDocumentedRules) {
 }
 
 /// Returns the number of images in a file where `item` and then an image are three levels deep: 1 if `item`
-/// has the length
-/// that the reader skips.
+/// has the length that the reader skips.
 int ImagesBehind(const std::string& item) {
   const std::string items = EmiStructure(0x4000, 1, EmiStructure(0x4000, 1, item + EmiImageObject("")));
   return OpenFile<EmiFileInfo>(EmiFile{.items = items})->GetFrameCount();

@@ -1,6 +1,5 @@
 // Reads files that another program has written, and compares them with what it says about them
-// (write_mrc_files.py). They
-// are in the current folder.
+// (write_mrc_files.py). They are in the current folder.
 #include <gtest/gtest.h>
 
 #include <fstream>

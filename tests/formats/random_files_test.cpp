@@ -249,8 +249,7 @@ using RawTypes =
 TYPED_TEST_SUITE(RandomRaw, RawTypes);
 
 /// Spreads the pixels of a packed file. Random gaps separate pixels, rows or columns and precede the first
-/// pixel. Each
-/// direction may be reversed, and rows and columns may be exchanged.
+/// pixel. Each direction may be reversed, and rows and columns may be exchanged.
 void Spread(Random& random, RawFile& file) {
   const std::int32_t pixelBytes = file.pixelStride;
   const bool byColumn = random.OneIn(2);

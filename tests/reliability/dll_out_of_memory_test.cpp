@@ -1,8 +1,6 @@
 // The release DLL when memory runs out. Every single request of the DLL for memory, a string, a lock or a
-// bitmap fails
-// once. The call must end with the promised result and leave nothing allocated, and the object must work
-// again as soon as
-// there is memory.
+// bitmap fails once. The call must end with the promised result and leave nothing allocated, and the object
+// must work again as soon as there is memory.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -68,8 +66,7 @@ Result Send(const Request& request, Then then) {
 }
 
 /// Sends `request` while the DLL's request for resources with the index `number` fails. Returns whether there
-/// is such a
-/// request.
+/// is such a request.
 bool FailOnce(const Request& request, std::int64_t number, Then then, int* objectsNotMade = nullptr) {
   request.prepare();
   ScarceSystem::FailAt(number, then);

@@ -92,8 +92,7 @@ TEST_P(FailingStream, ThatCannotBePositionedCausesNoFault) {
 }
 
 /// Frames that do not fit into the reader's buffer: one of several bands, one whose rows are larger than the
-/// buffer, and one
-/// that is stored column by column.
+/// buffer, and one that is stored column by column.
 TEST(FailingStreamOfALargeFrame, AtAnyReadGivesNoThumbnailAndRecovers) {
   struct Shape {
     std::int32_t width, height, pixelStride, rowStride;

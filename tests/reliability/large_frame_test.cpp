@@ -21,8 +21,7 @@ constexpr std::int32_t kEdge = 4096;
 constexpr std::int64_t kFrameBytes = std::int64_t{kEdge} * kEdge * 4;
 
 /// Returns the most memory in use, in bytes, while the thumbnail is made of a file that consists of `head`
-/// and a frame of
-/// zeros.
+/// and a frame of zeros.
 std::int64_t PeakOfThumbnail(const std::string& head, const std::wstring& extension) {
   Testing::MemoryBuffer buffer(head);
   buffer.trailingZeros = kFrameBytes;

@@ -1,6 +1,5 @@
 // Memory that runs out at every single allocation. The call must throw std::bad_alloc or return no thumbnail,
-// and leak
-// nothing. The object must work again as soon as there is memory.
+// and leak nothing. The object must work again as soon as there is memory.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -52,8 +51,8 @@ Outcome CallWithFailingHeap(std::int64_t allocation, FailingHeap::Then then, con
 }
 
 /// Calls `call` again and again. Its first allocation fails, then its second, and so on, until it has no
-/// further one. Calls
-/// `check` after each call, to check and free what it returned. Returns how often the call threw.
+/// further one. Calls `check` after each call, to check and free what it returned. Returns how often the call
+/// threw.
 template <class Call, class Check>
 int FailEveryAllocation(const Call& call, const Check& check) {
   int exceptions = 0;

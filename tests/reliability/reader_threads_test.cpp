@@ -1,6 +1,5 @@
 // Readers share no state, so any number of threads may read files of every kind at the same time. Also built
-// with
-// ThreadSanitizer (preset linux-tsan).
+// with ThreadSanitizer (preset linux-tsan).
 #include <gtest/gtest.h>
 
 #include <atomic>
