@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Runs the project's scripts: copies of them with substitutes for slow programs, and the originals under Wine.
+"""Tests the project's scripts. Copies of them run with substitutes for slow programs, the originals under Wine.
 
 usage: scripts_test.py ROOT [unittest arguments]
 """
@@ -14,7 +14,7 @@ import unittest
 
 ROOT = pathlib.Path(sys.argv[1]).resolve()
 
-# What the substitutes do unless a test says otherwise. The program that keeps Wine's server reads until the script ends.
+# The default substitutes. The program that keeps Wine's server running reads until the script ends.
 SUBSTITUTES = {
     "apt-get": "",
     "cmake": "",
@@ -26,7 +26,7 @@ SUBSTITUTES = {
 
 
 class WithSubstitutes(unittest.TestCase):
-    """Runs a copy of the scripts in a folder of its own, in which nothing is built."""
+    """Runs a copy of the scripts in a separate folder, in which nothing is built."""
 
     def setUp(self):
         folder = tempfile.TemporaryDirectory()
@@ -37,7 +37,7 @@ class WithSubstitutes(unittest.TestCase):
         self.errors = self.folder / "errors"
 
     def run_script(self, name, *arguments, **substitutes):
-        """Returns the exit status and what the script writes to standard error. `calls` gets what it runs."""
+        """Returns the exit status and the standard error of the script. `calls` gets the programs that it runs."""
         programs = self.folder / "programs"
         programs.mkdir()
         for program, text in (SUBSTITUTES | substitutes).items():
@@ -67,7 +67,7 @@ class Show(WithSubstitutes):
                 self.assertFalse((self.folder / "build").exists())
 
     def page(self):
-        """The page of an earlier run."""
+        """Writes the page of an earlier run. Returns its path."""
         path = self.folder / "build" / "show" / "index.html"
         path.parent.mkdir(parents=True)
         path.write_text("earlier")
@@ -87,7 +87,7 @@ class Show(WithSubstitutes):
 
     def test_does_not_announce_an_earlier_page_after_ctrl_c(self):
         self.page()
-        # Wine's programs may end as if all were well.
+        # Programs under Wine may end with status 0 after Ctrl-C.
         status, errors = self.run_script("show", wine=SUBSTITUTES["wine"] + "; [[ $1 != */qelshow.exe ]] || kill -INT $PPID")
         self.assertEqual(status, 130)
         self.assertIn("qelshow.exe page", self.calls.read_text())
@@ -95,7 +95,7 @@ class Show(WithSubstitutes):
 
 
 class LongStages(WithSubstitutes):
-    """Each stage is made to last until the script has written two lines."""
+    """Tests the progress lines of stages. Each stage lasts until the script has written two lines."""
 
     def setUp(self):
         super().setUp()

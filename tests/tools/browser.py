@@ -6,7 +6,7 @@ from selenium import webdriver
 from selenium.webdriver.chrome.service import Service
 from selenium.webdriver.common.keys import Keys
 
-# No window, no shared memory of a container's small /dev/shm, and nothing that would reach for a network by itself.
+# No window, no use of /dev/shm, which is small in a container, and no network access of the browser's own.
 ARGUMENTS = ("--headless", "--no-sandbox", "--disable-gpu", "--disable-dev-shm-usage", "--disable-quic",
              "--disable-background-networking", "--disable-component-update", "--hide-scrollbars",
              "--force-device-scale-factor=1", "--lang=en-US")
@@ -19,7 +19,7 @@ MODIFIERS = {"Control": Keys.CONTROL, "Shift": Keys.SHIFT}
 
 
 class Browser:
-    """The process, which shows the tab that was opened last."""
+    """A browser process. It shows the tab that was opened last."""
 
     def __init__(self):
         options = webdriver.ChromeOptions()
@@ -34,14 +34,14 @@ class Browser:
         self._driver.quit()
 
     def open(self, url, width=1200, height=900, dark=False):
-        """Returns a new tab when its page is loaded."""
+        """Opens a page in a new tab. Returns the tab once the page is loaded."""
         self._driver.switch_to.window(self._blank)
         self._driver.switch_to.new_window("tab")
         return Tab(self._driver, url, width, height, dark)
 
 
 class Tab:
-    """One page. What it requests and complains of is in `requests` and `complaints`."""
+    """A page. `requests` has the URLs that it requested, `complaints` its errors and warnings."""
 
     def __init__(self, driver, url, width, height, dark):
         self._driver = driver
@@ -49,7 +49,7 @@ class Tab:
         self._requests = []
         self._complaints = []
         for kind in ("browser", "performance"):
-            driver.get_log(kind)  # of earlier tabs
+            driver.get_log(kind)  # drops the entries of earlier tabs
         driver.execute_cdp_cmd("Performance.enable", {})
         driver.execute_cdp_cmd("Emulation.setFocusEmulationEnabled", {"enabled": True})
         driver.execute_cdp_cmd("Emulation.setDeviceMetricsOverride",
@@ -67,12 +67,12 @@ class Tab:
         return self._driver.execute_script(f"return ({script})")
 
     def counters(self):
-        """Returns the browser's own counts of what it has made and done for the page, by name."""
+        """Returns the browser's performance counters for the page, by name."""
         metrics = self._driver.execute_cdp_cmd("Performance.getMetrics", {})["metrics"]
         return {metric["name"]: metric["value"] for metric in metrics}
 
     def screenshot(self):
-        """Returns what is in sight, as the bytes of a PNG image."""
+        """Returns the visible part of the page as the bytes of a PNG image."""
         return self._driver.get_screenshot_as_png()
 
     def load(self, path):

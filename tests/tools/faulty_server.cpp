@@ -1,5 +1,6 @@
-// A server that misbehaves on purpose, in place of the extension: what it does to whoever asks is in the name
-// of the file. It knows fewer interfaces and classes than the extension, too.
+// A server that misbehaves on purpose, in place of the extension. The name of the file decides how. It also
+// has fewer
+// interfaces and classes than the extension.
 #include <windows.h>
 
 #include <stdexcept>

@@ -1,4 +1,4 @@
-// Texts in JSON documents, and questions on their way to the worker process.
+// The strings of JSON documents, and the questions that are sent to the worker process.
 #include "json_records.h"
 
 #include <gtest/gtest.h>
@@ -15,7 +15,7 @@ std::string Written(const std::wstring& text) {
   return Json(text).dump();
 }
 
-TEST(JsonRecords, EscapesWhatAJsonStringCannotHold) {
+TEST(JsonRecords, EscapesTheCharactersThatAJsonStringCannotContain) {
   EXPECT_EQ(Written(L"\x1F \" \\ \n"), R"("\u001f \" \\ \n")");
   EXPECT_EQ(Written(L"\x20"), "\" \"");
 }
@@ -33,7 +33,7 @@ TEST(JsonRecords, WritesHalfOfASurrogatePairAsTheReplacementCharacter) {
   EXPECT_EQ(Written({0xDC00, 0xD800}), "\"\xEF\xBF\xBD\xEF\xBF\xBD\"");
 }
 
-TEST(JsonRecords, WriteAnEmptyTextAsNullWhereItMayBeMissing) {
+TEST(JsonRecords, WriteAnEmptyOptionalStringAsNull) {
   Property property;
   EXPECT_TRUE(Json(property).at("problem").is_null());
   EXPECT_EQ(Json(property).at("set"), "");

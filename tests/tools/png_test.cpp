@@ -1,4 +1,4 @@
-// PNG files of bitmaps, read back by the platform's decoder.
+// Writes bitmaps as PNG files and reads them back with the decoder of Windows.
 #include "png.h"
 
 #include <gtest/gtest.h>
@@ -25,7 +25,7 @@ class Png : public testing::Test {
   Png() { CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED); }
   ~Png() override { CoUninitialize(); }
 
-  /// The pixels that the platform's decoder finds, converted to `format`.
+  /// Returns the pixels that the decoder of Windows reads, converted to `format`.
   static std::vector<std::uint8_t> Decode(const std::vector<std::uint8_t>& png, const GUID& format,
                                           UINT bytesPerPixel) {
     ComPtr<IStream> stream;
@@ -64,7 +64,7 @@ class Png : public testing::Test {
 };
 
 TEST_F(Png, OfAGreyBitmapHoldsItsPixels) {
-  // Widths whose rows are padded, and one whose rows are not.
+  // At most of these widths a bitmap's rows are padded; at one they are not.
   for (const std::int32_t width : {1, 2, 3, 64, 333}) {
     DibSection section;
     section.CreateGrey(width, 57);

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Runs qelshow as its users do and looks at what it prints, writes and answers.
+"""Runs qelshow as its users do, and checks its output, its files and its exit status.
 
 usage: qelshow_test.py EMULATOR QELSHOW SERVER FAULTY_SERVER [TEST_CLASS ...]
 """
@@ -30,15 +30,15 @@ DONE, FAILED, USAGE, UNSUPPORTED, DAMAGED = range(5)
 
 
 def run(*arguments, server=SERVER, folder=None, program=QELSHOW):
-    """Runs qelshow; the answer has its exit status, and its output as text."""
+    """Runs qelshow. Returns the finished process, with its output as strings."""
     result = run_for_bytes(*arguments, server=server, folder=folder, program=program)
     result.stdout = result.stdout.decode("utf-8")
     return result
 
 
 def run_for_bytes(*arguments, server=SERVER, folder=None, program=QELSHOW):
-    """Runs qelshow; the answer has its exit status, standard output as bytes and standard error as text."""
-    # Files, as pipes would be kept open by a desktop that Wine starts and that lives a second longer.
+    """Runs qelshow. Returns the finished process, with standard output as bytes and standard error as a string."""
+    # Files, because Wine's desktop process would keep pipes open for a second after the program has ended.
     with tempfile.TemporaryFile() as out, tempfile.TemporaryFile() as errors:
         process = start(*arguments, server=server, program=program, cwd=folder, stdout=out, stderr=errors)
         process.wait()
@@ -53,7 +53,7 @@ def start(*arguments, server=SERVER, program=QELSHOW, **options):
 
 
 def read_terminal(terminal):
-    """The next part of what is written to a terminal; empty when nobody can write to it any more."""
+    """Returns the next part of a terminal's output; an empty string once no process can write to it any more."""
     try:
         return os.read(terminal, 4096).decode("utf-8", "replace")
     except OSError:
@@ -61,7 +61,7 @@ def read_terminal(terminal):
 
 
 def mrc(width=4, height=3, frames=1, mode=0, label=b"", pixels=None):
-    """The bytes of an .mrc file whose pixels count upwards."""
+    """Returns the bytes of an .mrc file whose pixel bytes count upwards."""
     pixel_bytes = {0: 1, 1: 2, 2: 4, 16: 3}.get(mode, 1)
     header = bytearray(1024)
     struct.pack_into("<4i", header, 0, width, height, frames, mode)
@@ -73,7 +73,7 @@ def mrc(width=4, height=3, frames=1, mode=0, label=b"", pixels=None):
 
 
 def raw(width, height, value_class, bits, pixels):
-    """The bytes of a .raw file with packed rows."""
+    """Returns the bytes of a .raw file with packed rows."""
     step = bits // 8
     return (b"QEL RawImage\0" + struct.pack("<9i", 1, width, height, 1, bits, value_class, 0, step, width * step)
             + pixels)
@@ -93,7 +93,7 @@ def ser(units):
 
 
 def png_facts(png):
-    """Width, height, bits of a sample and colour type of a PNG file."""
+    """Returns the width, height, bits per sample and colour type of a PNG file."""
     assert png[:8] == b"\x89PNG\r\n\x1a\n" and png[12:16] == b"IHDR"
     return struct.unpack(">IIBB", png[16:26])
 
@@ -113,13 +113,13 @@ class Test(unittest.TestCase):
         return path
 
     def assertOneSentence(self, text, *parts):
-        """A failure is told in one line, which names what it is about."""
+        """Checks that a message is a single line that contains these parts."""
         self.assertEqual(len(text.strip().splitlines()), 1, text)
         for part in parts:
             self.assertIn(str(part), text)
 
     def info(self, *paths, server=SERVER):
-        """The files of the JSON that info prints."""
+        """Returns the files of the JSON document that info prints."""
         result = run("info", *paths, "--json", server=server)
         document = json.loads(result.stdout)
         self.assertEqual(document["schema"], 2)
@@ -127,7 +127,7 @@ class Test(unittest.TestCase):
 
 
 class CommandLine(Test):
-    def test_help_is_for_the_program_and_for_each_command(self):
+    def test_help_exists_for_the_program_and_for_each_command(self):
         texts = [run("--help", server=None)] + [run(command, "--help", server=None) for command in COMMANDS]
         for result in texts:
             self.assertEqual((result.returncode, result.stderr), (DONE, ""))
@@ -137,7 +137,7 @@ class CommandLine(Test):
             self.assertIn(f"  {command} ", texts[0].stdout)
         self.assertEqual(len({result.stdout for result in texts}), 5)
 
-    def test_help_is_found_by_its_other_names(self):
+    def test_help_has_other_spellings(self):
         whole, info = run("--help", server=None).stdout, run("info", "--help", server=None).stdout
         for arguments, text in ((("/?",), whole), (("-h",), whole), (("help",), whole), (("info", "/?"), info),
                                 (("info", "-h"), info), (("help", "info"), info)):
@@ -145,7 +145,7 @@ class CommandLine(Test):
                 result = run(*arguments, server=None)
                 self.assertEqual((result.returncode, result.stdout, result.stderr), (DONE, text, ""))
 
-    def test_tells_its_version(self):
+    def test_prints_its_version(self):
         result = run("--version", server=None)
         self.assertEqual((result.returncode, result.stderr), (DONE, ""))
         self.assertRegex(result.stdout, r"\Aqelshow \d+\.\d+\.\d+\n\Z")
@@ -167,7 +167,7 @@ class CommandLine(Test):
         self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
         self.assertOneSentence(result.stderr, 'No file matches "*.mrc".')
 
-    def test_what_cannot_be_understood_is_a_usage_error_of_one_sentence(self):
+    def test_invalid_arguments_are_a_usage_error_of_one_sentence(self):
         for arguments, *parts in (
             ((), "No command"),
             (("show",), '"show"', "qelshow --help"),
@@ -215,7 +215,7 @@ class CommandLine(Test):
             self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
             self.assertOneSentence(result.stderr, server)
 
-    def test_what_is_wrong_with_a_server_is_told(self):
+    def test_the_fault_of_a_server_is_reported(self):
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         machine = struct.unpack_from("<i", dll, 60)[0] + 4
         for name, contents, part in (
@@ -231,8 +231,8 @@ class CommandLine(Test):
                 self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
                 self.assertOneSentence(result.stderr, server, part)
 
-    def test_a_pattern_stands_for_the_files_that_it_matches(self):
-        # Shells of Windows leave that to the program.
+    def test_a_pattern_is_replaced_by_the_files_that_it_matches(self):
+        # The command interpreters of Windows leave patterns to the program.
         for name in ("ä 1.mrc", "ä 2.mrc", "ä 3.ali"):
             self.write(name, mrc())
         files = self.info(str(self.folder / "*.mrc"), str(self.folder / "?3.ali"), str(self.folder / "??3.ali"))
@@ -241,7 +241,7 @@ class CommandLine(Test):
 
 
 class ExitStatus(Test):
-    def test_tells_how_the_worst_file_is(self):
+    def test_is_that_of_the_worst_file(self):
         good = self.write("good.mrc", mrc())
         missing = self.folder / "missing.mrc"
         text = self.write("notes.txt", b"notes")
@@ -258,7 +258,7 @@ class ExitStatus(Test):
             with self.subTest(path=path):
                 self.assertEqual(run("thumbnail", path, "-o", self.folder / "out.png").returncode, status)
 
-    def test_a_failure_is_one_sentence_that_names_the_file_and_what_is_wrong(self):
+    def test_a_failure_is_one_sentence_that_names_the_file_and_the_fault(self):
         files = []
         ser = struct.pack("<3H5I", 0x4949, 0x0197, 0x0210, 0x4122, 0x4152, 1, 1, 30) + struct.pack("<I", 0)
         element = bytes(40) + struct.pack("<hII", 11, 1, 1) + b"\0"
@@ -298,15 +298,15 @@ class ExitStatus(Test):
             with self.subTest(path.name):
                 self.assertOneSentence(line, path, *parts)
 
-    def test_a_thumbnail_that_is_not_there_is_not_written(self):
+    def test_a_missing_thumbnail_is_not_written(self):
         path = self.write("mode.mrc", mrc(mode=17))
         result = run("thumbnail", path, "-o", self.folder / "out.png")
         self.assertEqual((result.returncode, result.stdout), (DAMAGED, ""))
         self.assertOneSentence(result.stderr, path, "mode is 17")
         self.assertFalse((self.folder / "out.png").exists())
 
-    def test_what_cannot_be_printed_is_a_failure(self):
-        self.assertTrue(pathlib.Path("/dev/full").is_char_device(), "/dev/full is no device on this machine")
+    def test_output_that_cannot_be_printed_is_a_failure(self):
+        self.assertTrue(pathlib.Path("/dev/full").is_char_device(), "/dev/full is not a device on this machine")
         path = self.write("a.mrc", mrc())
         for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-"),
                           ("page", path, "--out", self.folder / "page")):
@@ -315,7 +315,7 @@ class ExitStatus(Test):
                 errors.seek(0)
                 self.assertOneSentence(errors.read().decode(), "Standard output cannot be written: Disk full")
 
-    def test_that_nobody_reads_what_is_printed_is_no_failure(self):
+    def test_output_that_nobody_reads_is_no_failure(self):
         path = self.write("a.mrc", mrc())
         for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-")):
             reading, writing = os.pipe()
@@ -337,7 +337,7 @@ class ExitStatus(Test):
         self.assertEqual(result.stdout.count("\n\n"), 0)
         self.assertNotIn("notes.txt", result.stdout)
 
-    def test_a_folder_is_no_file(self):
+    def test_a_folder_is_not_a_file(self):
         result = run("info", self.folder)
         self.assertEqual(result.returncode, FAILED)
         self.assertOneSentence(result.stderr, self.folder, "folder")
@@ -358,7 +358,7 @@ class Thumbnail(Test):
         self.assertEqual(run("thumbnail", self.write("c.mrc", mrc(300, 260, mode=16)), "-o", out).returncode, DONE)
         self.assertEqual(png_facts(out.read_bytes()), (300, 260, 8, 2))
 
-    def test_that_cannot_be_written_is_a_failure_that_names_the_place(self):
+    def test_that_cannot_be_written_is_a_failure_that_names_the_file(self):
         out = self.folder / "no such folder" / "out.png"
         result = run("thumbnail", self.write("a.mrc", mrc()), "-o", out)
         self.assertEqual(result.returncode, FAILED)
@@ -366,16 +366,16 @@ class Thumbnail(Test):
 
 
 class Output(Test):
-    """What is written, and what is never overwritten."""
+    """What qelshow writes, and what it never overwrites."""
 
-    NO_SERVER = "no such.dll"  # which nothing complains about before it is needed
+    NO_SERVER = "no such.dll"  # refused outputs are reported before the server is needed
 
     def setUp(self):
         super().setUp()
         self.source = self.write("source.mrc", mrc(20, 10))
 
     def contents(self, *folders):
-        """The bytes of all files in the test's folder, by path."""
+        """Returns the bytes of all files in the test's folder, by path."""
         return {path: path.read_bytes() for path in self.folder.rglob("*") if path.is_file()}
 
     def assertRefused(self, *arguments, parts):
@@ -392,14 +392,14 @@ class Output(Test):
             with self.subTest(out=out):
                 self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "is the file to read"))
 
-    def test_is_never_called_as_an_image_file_is(self):
+    def test_never_has_the_extension_of_an_image_file(self):
         self.write("other.mrc", mrc())
         for out in ("other.mrc", "new.Ebn", "deep.er/new.raw"):
             with self.subTest(out=out):
                 self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "extension"))
                 self.assertRefused("page", "source.mrc", "--out", out, parts=(out, "extension"))
 
-    def test_does_not_replace_what_another_program_has_written(self):
+    def test_does_not_replace_the_files_of_other_programs(self):
         header = struct.pack(">I4sIIBBBBB", 13, b"IHDR", 1, 1, 8, 0, 0, 0, 0)
         self.write("photo.png", b"\x89PNG\r\n\x1a\n" + header + bytes(100))
         self.write("empty.png", b"")
@@ -410,7 +410,7 @@ class Output(Test):
         for folder, file in (("site", "index.html"), ("album", "1.png")):
             self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by this version of qelshow", "delete it", "--out"))
 
-    def test_is_no_folder_where_a_file_is_wanted_and_no_file_where_a_folder_is(self):
+    def test_is_not_a_folder_in_place_of_a_file_nor_a_file_in_place_of_a_folder(self):
         (self.folder / "folder").mkdir()
         self.write("file", b"mine")
         self.assertRefused("thumbnail", "source.mrc", "-o", "folder", parts=("folder", "is a folder"))
@@ -420,7 +420,7 @@ class Output(Test):
         out = self.folder / "out.png"
         self.assertEqual(run("thumbnail", self.source, "-o", out).returncode, DONE)
         earlier = out.read_bytes()
-        os.link(out, self.folder / "earlier.png")  # would change if the file were written to
+        os.link(out, self.folder / "earlier.png")  # would change if qelshow wrote into the existing file
         self.write("out.png.part", b"mine")
         self.assertEqual(run("thumbnail", self.write("larger.mrc", mrc(60, 40)), "-o", out).returncode, DONE)
         self.assertEqual(png_facts(out.read_bytes())[:2], (60, 40))
@@ -443,7 +443,7 @@ class Output(Test):
     def make_page(self, *paths, **options):
         return run("page", *paths, "--out", "page", folder=self.folder, **options)
 
-    def test_takes_the_place_of_an_earlier_page_with_its_pictures(self):
+    def test_replaces_an_earlier_page_with_its_pictures(self):
         other = self.write("other.mrc", mrc(8, 6))
         self.assertEqual(self.make_page(self.source, other, other).returncode, DONE)
         self.write("page/pictures/mine.png", b"mine")
@@ -455,7 +455,7 @@ class Output(Test):
                           "page/pictures/2.txt", "page/pictures/mine.png", "source.mrc"])
         self.assertEqual(png_facts((self.folder / "page/pictures/1.png").read_bytes())[:2], (8, 6))
 
-    def test_that_is_not_finished_leaves_the_earlier_page_as_it_was(self):
+    def test_that_is_not_finished_leaves_the_earlier_page_unchanged(self):
         self.make_page(self.source)
         before = self.contents()
         other = self.write("other.mrc", mrc(8, 6))
@@ -469,8 +469,8 @@ class Output(Test):
 
 
 class Faults(Test):
-    def test_of_the_extension_end_one_question_and_not_the_run(self):
-        # Smaller than the request, a colour picture divides by zero.
+    def test_of_the_extension_end_one_request_and_not_the_run(self):
+        # A colour frame that is smaller than the request causes a division by zero.
         small = self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3)))
         good = self.write("good.mrc", mrc())
         files = self.info(small, good)
@@ -489,7 +489,7 @@ class Faults(Test):
         result = run("thumbnail", small, "-o", out, "--size", 8)
         self.assertEqual((result.returncode, result.stderr, out.exists()), (DONE, "", True))
 
-    def test_in_any_question_are_reported_for_their_file(self):
+    def test_in_any_request_are_reported_for_their_file(self):
         names = ("fault in load.mrc", "fault in tip.mrc", "quiet.mrc")
         load, tip, quiet = self.info(*(self.write(name, mrc()) for name in names), server=FAULTY_SERVER)
         self.assertIn("0xC0000005 (access violation)", load["tip"]["problem"])
@@ -526,7 +526,7 @@ class Faults(Test):
         self.assertEqual(self.processes(program.name), [])
 
     def processes(self, name):
-        """The command lines of running processes in which `name` occurs."""
+        """Returns the command lines of the running processes that contain `name`."""
         found = []
         for path in pathlib.Path("/proc").glob("[0-9]*/cmdline"):
             with contextlib.suppress(OSError):
@@ -549,7 +549,7 @@ class Json(Test):
         self.assertEqual(file["name"], name)
         self.assertTrue(file["tip"]["text"].endswith("a\x1fb"))
 
-    def test_says_of_an_unsupported_file_what_is_supported(self):
+    def test_lists_the_supported_kinds_for_an_unsupported_file(self):
         file, = self.info(self.write("notes.txt", b"notes"))
         self.assertEqual((file["verdict"], file["kind"], file["width"]), ("unsupported", "txt", 0))
         self.assertIn(".mrc", file["problem"])
@@ -574,7 +574,7 @@ class Json(Test):
 
 
 class Answers(Test):
-    """What the shell learns, from the extension to the report."""
+    """The answers of the extension in the report."""
 
     IMAGE_SUMMARY = "{6444048F-4C8B-11D1-8B70-080036B11A03}"
     SUMMARY = "{F29F85E0-4FF9-1068-AB91-08002B27B3D9}"
@@ -692,7 +692,7 @@ class Answers(Test):
 
 class Page(Test):
     def document_of(self, page):
-        """The facts in a page."""
+        """Returns the files of the JSON document in a page."""
         text = page.read_text("utf-8")
         data = re.search(r'<script id="files" type="application/json">(.*?)</script>', text, re.DOTALL)
         document = json.loads(data[1])
@@ -737,7 +737,7 @@ class Page(Test):
         self.assertRegex(result.stdout, r"(?m)^big.MRC .* 4 x 3$")
         self.assertRegex(result.stdout, r"(?m)^broken.ser .* none: The file is empty\.$")
 
-    def test_shows_files_that_are_named_even_if_they_cannot_be_shown(self):
+    def test_lists_named_files_even_if_they_cannot_be_shown(self):
         out = self.folder / "page"
         result = run("page", self.write("b.mrc", mrc()), self.folder / "gone.mrc", self.write("a.txt", b""),
                      "--out", out)
@@ -777,7 +777,7 @@ class Page(Test):
     def windows_path(self, name):
         return f"Z:{self.folder / pathlib.PureWindowsPath(name).as_posix()}".replace("/", "\\")
 
-    def test_has_the_files_whose_names_windows_cannot_represent(self):
+    def test_lists_files_whose_names_windows_cannot_represent(self):
         for name in ("in/a.mrc", "in/b?.mrc"):
             self.write(name, mrc())
         result = run("page", self.folder / "in", "--out", self.folder / "page")
@@ -799,7 +799,7 @@ class Page(Test):
         self.assertOneSentence(result.stderr, self.folder / "in")
         self.assertFalse((self.folder / "page").exists())
 
-    def test_of_nothing_that_can_be_shown_is_not_made(self):
+    def test_is_not_made_when_no_file_can_be_shown(self):
         gone, text = self.folder / "gone.mrc", self.write("notes.txt", b"notes")
         for paths, status, *parts in (
             ((gone,), FAILED, gone, "cannot be opened"),
@@ -813,7 +813,7 @@ class Page(Test):
                 self.assertOneSentence(result.stderr, *parts)
                 self.assertFalse((self.folder / "page").exists())
 
-    def test_goes_where_one_is_and_says_where_if_no_folder_is_named(self):
+    def test_is_written_to_the_current_folder_by_default(self):
         self.write("in/a.mrc", mrc())
         result = run("page", "in", folder=self.folder)
         self.assertEqual((result.returncode, result.stderr), (DONE, ""))
@@ -825,12 +825,12 @@ class Page(Test):
         result = run("page", self.write("a.mrc", mrc()), "--out", self.folder / "page")
         self.assertTrue(result.stdout.endswith(": 1 thumbnail of 1 file\n"), result.stdout)
 
-    def test_that_cannot_be_written_leaves_an_earlier_one_as_it_is(self):
+    def test_that_cannot_be_written_leaves_an_earlier_one_unchanged(self):
         out, path = self.folder / "page", self.write("a.txt", b"")
         run("page", path, self.write("b.mrc", mrc()), "--out", out)
         earlier = (out / "index.html").read_bytes()
         shutil.rmtree(out / "pictures")
-        (out / "pictures").write_bytes(b"a file where the folder has to be")
+        (out / "pictures").write_bytes(b"a file in place of the folder")
         result = run("page", self.folder / "b.mrc", "--out", out)
         self.assertEqual(result.returncode, FAILED)
         self.assertOneSentence(result.stderr, "pictures", "cannot be written: Not a directory.")
@@ -843,7 +843,7 @@ class Page(Test):
         for name in ("index.html", "pictures/1.png"):
             self.assertEqual((self.folder / "one" / name).read_bytes(), (self.folder / "two" / name).read_bytes())
 
-    def test_shows_on_a_terminal_how_far_it_has_come(self):
+    def test_shows_its_progress_on_a_terminal(self):
         for name in ("a.mrc", "b.mrc", "c.mrc"):
             self.write("in/" + name, mrc())
         terminal, errors = pty.openpty()
@@ -858,11 +858,11 @@ class Page(Test):
         for part in ("[                              ] 0 of 3  a.mrc", "[==========                    ] 1 of 3  b.mrc",
                      "[====================          ] 2 of 3  c.mrc"):
             self.assertIn(part, seen)
-        # Nothing of it stays: at its end the line is empty.
+        # The progress disappears: the line is empty at the end.
         self.assertRegex(re.sub("\x1b\\[[?]25[hl]", "", seen), "\r(\x1b\\[K| +\r)\\Z")
 
     def test_takes_no_more_memory_for_more_pictures(self):
-        # Each of these pictures is a megabyte of noise, which does not shrink in a PNG file.
+        # Each picture is a megabyte of noise, which PNG cannot compress.
         path = self.write("noise.mrc", mrc(1024, 1024, pixels=random.Random(1).randbytes(1 << 20)))
         few, many = (self.peak_memory("page", *[path] * count, "--size", "1024", "--out", self.folder / "page")
                      for count in (2, 32))
@@ -871,7 +871,7 @@ class Page(Test):
         self.assertLess(many, few + (15 << 20))
 
     def peak_memory(self, *arguments):
-        """The largest amount of memory, in bytes, that the program takes, without that of the worker process."""
+        """Returns the peak memory of the program in bytes, without that of its worker process."""
         process = start(*arguments, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
         _, status, usage = os.wait4(process.pid, 0)
         process.returncode = os.waitstatus_to_exitcode(status)
@@ -879,12 +879,12 @@ class Page(Test):
         return usage.ru_maxrss << 10
 
 
-# What the doctor says under Wine, whose shell shows no thumbnails and properties to programs.
+# The doctor's message under Wine, whose shell gives programs no thumbnails and properties.
 UNANSWERED = "The shell of this system does not report what it shows."
 
 
 class Doctor(Test):
-    """Changes the registry of the Wine prefix, so that nothing else may use it at the same time."""
+    """Changes the registry of the Wine prefix, so nothing else may use the prefix at the same time."""
 
     EXTENSION = "{79E696A1-2FA5-4B3E-9610-D5F760417E62}"
     EBN_STORE = "{E37DEDA9-F652-401B-B619-A1A88EADD003}"
@@ -916,8 +916,8 @@ class Doctor(Test):
         cls.wine("regsvr32", "/s", *options, f"Z:{dll}")
 
     def set_registry(self, values):
-        """Sets values to texts and numbers: by their key, and after an "@" their name. None deletes the value, or
-        without a name the key."""
+        """Sets registry values to strings and numbers. A place is KEY or KEY@NAME. None deletes the value, or the
+        key if there is no name."""
         lines = ["Windows Registry Editor Version 5.00"]
         for place, text in values.items():
             key, _, name = place.partition("@")
@@ -935,7 +935,7 @@ class Doctor(Test):
                            for clsid in classes})
 
     def doctor(self, *files):
-        """The finished process, and the JSON document that it prints."""
+        """Returns the finished process and the JSON document that it prints."""
         result = run("doctor", *files, "--json", server=None)
         self.assertEqual(result.stderr, "")
         document = json.loads(result.stdout)
@@ -943,19 +943,19 @@ class Doctor(Test):
         return result, document
 
     def conditions(self, document):
-        """Of the classes by name, and of the handlers by extension and role."""
+        """Returns the conditions of the classes by name, and of the handlers by extension and role."""
         return ({each["name"]: each["condition"] for each in document["classes"]}
                 | {(kind["extension"], each["role"]): each["condition"]
                    for kind in document["kinds"] for each in kind["handlers"]})
 
     def assertWorksBut(self, document, differences):
-        """Everything works, with the exception of what is named with its condition."""
+        """Checks that everything works except `differences`, which have these conditions."""
         conditions = self.conditions(document)
         self.assertEqual(len(conditions), 4 + 7 * 3 + 3)
         self.assertEqual({name: each for name, each in conditions.items() if each != "works"}, differences)
 
     def assertProblems(self, *problems, files=()):
-        """Just these things are wrong, each told with its parts, in this order; answers the JSON."""
+        """Checks that exactly these problems are reported, each with its parts. Returns the JSON document."""
         result, document = self.doctor(*files)
         self.assertEqual(result.returncode, FAILED)
         self.assertEqual(len(document["problems"]), len(problems), document["problems"])
@@ -966,7 +966,7 @@ class Doctor(Test):
     def assertProblem(self, *parts, files=()):
         return self.assertProblems(parts, files=files)
 
-    def test_finds_nothing_where_everything_works(self):
+    def test_finds_nothing_when_everything_works(self):
         self.register()
         result, document = self.doctor()
         self.assertEqual((result.returncode, document["problems"], document["files"]), (DONE, [], []))
@@ -982,7 +982,7 @@ class Doctor(Test):
         self.assertRegex(result.stdout, r"(?m)^ +\.raw property store +works +[\d.]+ +Z:.*QelShellExt\.dll$")
         self.assertIn("QelShellExt is registered and works.", result.stdout)
 
-    def test_tells_of_each_file_whether_it_is_read_and_why_not(self):
+    def test_reports_of_each_file_whether_it_is_read_and_why_not(self):
         self.register()
         good = self.write("good ä.mrc", mrc(300, 200, 2))
         gone = self.folder / "gone.mrc"
@@ -1004,7 +1004,7 @@ class Doctor(Test):
         self.assertEqual([(each["verdict"], each["frames"], each["shell"]) for each in document["files"]],
                          [("good", 2, UNANSWERED)])
 
-    def test_tells_that_nothing_is_registered(self):
+    def test_reports_that_nothing_is_registered(self):
         document = self.assertProblem("not registered on this computer", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\"),
                                       "administrator")
         self.assertEqual(set(self.conditions(document).values()), {"not registered"})
@@ -1013,7 +1013,7 @@ class Doctor(Test):
         self.assertEqual(document["files"][0]["verdict"], "failed")
         self.assertOneSentence(document["files"][0]["problem"], "not registered")
         for text in (document["files"][0]["problem"], document["files"][0]["advice"]):
-            self.assertNotRegex(text, "qelshow doctor|--server")  # that would lead in a circle
+            self.assertNotRegex(text, "qelshow doctor|--server")  # this advice would lead in a circle
         result = run("info", self.write("a.mrc", mrc()), server=None)
         self.assertEqual(result.returncode, FAILED)
         self.assertOneSentence(result.stderr, "not registered", "qelshow doctor", "--server")
@@ -1022,7 +1022,7 @@ class Doctor(Test):
         self.assertEqual(result.returncode, FAILED)
         self.assertIn("with the path of QelShellExt.dll", result.stdout)
 
-    def test_takes_the_installer_s_advice_only_for_what_the_installer_has_installed(self):
+    def test_advises_the_installer_only_if_the_installer_has_installed_the_extension(self):
         entry = "HKEY_LOCAL_MACHINE\\Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\{0FF1CE}"
         self.addCleanup(self.set_registry, {entry: None})
         self.set_registry({entry + "@DisplayName": "QelShellExt"})
@@ -1032,14 +1032,14 @@ class Doctor(Test):
         self.set_registry({entry + "@WindowsInstaller": 1})
         self.assertProblem("run msiexec /i {0FF1CE} REINSTALL=ALL")
 
-    def test_tells_the_version_of_the_dll(self):
+    def test_reports_the_version_of_the_dll(self):
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         struct.pack_into("<4H", dll, dll.index(struct.pack("<I", 0xFEEF04BD)) + 8, 2, 1, 4, 3)
         self.register(dll=self.write("QelShellExt.dll", dll))
         _, document = self.doctor()
         self.assertEqual({each["version"] for each in document["classes"]}, {"1.2.3"})
 
-    def test_tells_that_the_dll_was_moved_away(self):
+    def test_reports_that_the_dll_was_moved_away(self):
         dll = self.write("it's here, ä Ω/QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
         self.register(dll=dll)
         self.assertEqual(self.doctor()[0].returncode, DONE)
@@ -1048,7 +1048,7 @@ class Doctor(Test):
         self.assertEqual(set(self.conditions(document).values()), {"DLL not found"})
         self.assertEqual({each["version"] for each in document["classes"]}, {None})
 
-    def test_tells_why_the_dll_does_not_load(self):
+    def test_reports_why_the_dll_does_not_load(self):
         self.register()
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         machine = struct.unpack_from("<i", dll, 60)[0] + 4
@@ -1065,7 +1065,7 @@ class Doctor(Test):
         self.assertWorksBut(document, {f".{kind} property store": "DLL not loaded" for kind in ("ebn", "raw", "mrc")}
                             | {(f".{kind}", "property store"): "DLL not loaded" for kind in ("ebn", "raw", "mrc")})
 
-    def test_tells_that_no_objects_can_be_made(self):
+    def test_reports_that_no_objects_can_be_made(self):
         self.register()
         self.set_dll(FAULTY_SERVER, self.EBN_STORE, self.MRC_STORE)
         document = self.assertProblems(("faulty_server.dll", "ends the process", "access violation", "again."),
@@ -1074,7 +1074,7 @@ class Doctor(Test):
             (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store")),
             "no object"))
 
-    def test_tells_which_part_of_the_registration_is_missing(self):
+    def test_reports_which_part_of_the_registration_is_missing(self):
         self.register()
         self.set_registry({self.CLASSES + ".mrc\\" + self.THUMBNAIL: None,
                            self.CLASSES + ".mrc\\ShellEx\\PropertyHandler": None,
@@ -1091,15 +1091,15 @@ class Doctor(Test):
              (".mrc", "thumbnail"), (".mrc", "properties"), (".raw", "property store")), "not registered"))
 
     def leave_out(self, kind, *classes):
-        """Takes a kind out of the registration, as an installation without it does."""
+        """Removes a kind from the registration, as an installation without it does."""
         self.set_registry(dict.fromkeys([f"{self.CLASSES}.{kind}\\ShellEx", self.PROPERTY_STORES + "." + kind,
                                          *(f"{self.CLASSES}CLSID\\{clsid}" for clsid in classes)]))
 
     def left_out(self, document):
-        """What is told of the kinds that were left out, by kind."""
+        """Returns what is reported about the kinds that were left out, by kind."""
         return {kind["extension"]: kind["leftOut"] for kind in document["kinds"] if kind["leftOut"]}
 
-    def test_takes_a_kind_that_was_left_out_for_no_fault(self):
+    def test_does_not_report_a_kind_that_was_left_out_as_a_fault(self):
         self.register()
         self.leave_out("raw", self.RAW_STORE)
         self.leave_out("ser")
@@ -1114,14 +1114,14 @@ class Doctor(Test):
             (kind, role) for kind in told for role in ("thumbnail", "info tip", "properties")]
         self.assertWorksBut(document, dict.fromkeys(missing, "not registered"))
 
-    def test_tells_that_the_dll_is_missing_also_where_a_kind_was_left_out(self):
+    def test_reports_a_missing_dll_even_if_a_kind_was_left_out(self):
         self.register()
         self.leave_out("ser")
         self.set_dll(self.folder / "gone.dll", self.EXTENSION)
         document = self.assertProblem("gone.dll", "is not found")
         self.assertEqual(list(self.left_out(document)), [".ser"])
 
-    def test_tells_of_a_file_whose_kind_was_left_out_that_windows_does_not_ask(self):
+    def test_reports_that_windows_does_not_ask_for_files_of_a_kind_that_was_left_out(self):
         self.register()
         self.leave_out("ser")
         self.leave_out("raw", self.RAW_STORE)
@@ -1148,7 +1148,7 @@ class Doctor(Test):
         self.assertOneSentence(self.left_out(document)[".raw"], "Stack Peeker", self.FOREIGN, "C:\\peek.dll")
         self.assertEqual(self.conditions(document)[".raw", "thumbnail"], "another program")
 
-    def test_takes_a_kind_for_damaged_of_which_something_is_left(self):
+    def test_reports_a_kind_that_is_only_partly_left_out_as_a_fault(self):
         self.register()
         self.leave_out("raw")
         document = self.assertProblem(".raw", "(thumbnail, info tip, properties, property store)")
@@ -1166,7 +1166,7 @@ class Doctor(Test):
             (".raw property store", (".raw", "property store"), ".mrc property store", (".mrc", "property store")),
             "disabled"))
 
-    def test_spells_classes_and_paths_in_one_way(self):
+    def test_normalises_the_spelling_of_classes_and_paths(self):
         dll = self.write("QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
         self.register(dll=dll)
         self.set_registry({self.CLASSES + ".mrc\\" + self.THUMBNAIL: self.EXTENSION.lower()})
@@ -1235,7 +1235,7 @@ class Doctor(Test):
         self.addCleanup(self.set_registry, {enforced: None})
         self.register()
         self.set_registry({enforced: 1})
-        self.assertEqual(self.doctor()[0].returncode, DONE)  # registering puts the classes into the list
+        self.assertEqual(self.doctor()[0].returncode, DONE)  # registering adds the classes to the list
         classes = (self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE)
         self.set_registry({f"{approved}@{clsid}": None for clsid in classes})
         _, document = self.doctor()
@@ -1245,7 +1245,7 @@ class Doctor(Test):
         self.set_registry({enforced: 0})
         self.assertEqual(self.doctor()[0].returncode, DONE)
 
-    def test_sees_that_a_class_has_the_wrong_threads(self):
+    def test_sees_that_a_class_has_the_wrong_threading_model(self):
         self.register()
         self.set_registry({f"{self.CLASSES}CLSID\\{self.EXTENSION}\\InProcServer32@ThreadingModel": "Free"})
         _, document = self.doctor()
@@ -1265,7 +1265,7 @@ class Doctor(Test):
         self.assertWorksBut(document, {(".ser", "thumbnail"): "another program",
                                        (".ebn", "property store"): "another program"})
 
-    def test_sees_the_handlers_that_go_before_the_extension_s_own(self):
+    def test_sees_the_handlers_that_take_precedence_over_the_extension_s_own(self):
         choice = ("HKEY_CURRENT_USER\\Software\\Microsoft\\Windows\\CurrentVersion\\Explorer\\FileExts\\"
                   ".ser\\UserChoice")
         newer_key = self.CLASSES + ".mrc\\" + self.NEWER_THUMBNAIL

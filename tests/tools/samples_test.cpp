@@ -1,4 +1,4 @@
-// The sample files, in every build: their bytes, and what the readers make of them.
+// The bytes of the sample files, and how the readers read them. Runs in every build.
 #include "samples.h"
 
 #include <gtest/gtest.h>
@@ -16,7 +16,7 @@
 namespace Qel::Lumetra::ShellExt::Samples {
 namespace {
 
-/// FNV-1a, which tells whether two collections differ in a single bit.
+/// Continues the FNV-1a hash `hash` with `bytes`. It changes with every single bit.
 std::uint64_t Hash(const std::string& bytes, std::uint64_t hash) {
   for (const char byte : bytes) hash = (hash ^ static_cast<unsigned char>(byte)) * 0x100000001B3u;
   return hash;
@@ -37,7 +37,7 @@ bool IsNamed(const Sample& sample, const char* beginning) {
   return std::string(sample.name).starts_with(beginning);
 }
 
-// The number is the same for every compiler and system, because this test runs in every build.
+// This test runs in every build, so the number must be the same with every compiler and on every system.
 TEST(Samples, HaveTheSameBytesInEveryRunAndOnEveryMachine) {
   EXPECT_EQ(HashOfAll(), 0x258CCA683ABB8A2Fu);
 }
@@ -48,7 +48,7 @@ TEST(Samples, AreSmall) {
   EXPECT_LT(bytes, 10'000'000u);
 }
 
-TEST(Samples, HaveNamesOfTheirOwn) {
+TEST(Samples, HaveDistinctNames) {
   std::set<std::string> names;
   for (const Sample& sample : AllSamples()) EXPECT_TRUE(names.insert(sample.name).second) << sample.name;
 }
@@ -73,7 +73,7 @@ TEST(Samples, CoverEveryKindAndEveryPixelType) {
                                     L"128 bit complex float", L"24 bit RGB", L"24 bit BGR"}));
 }
 
-TEST(Samples, HaveAThumbnailWithContrastUnlessTheyAreMeantToHaveNone) {
+TEST(Samples, HaveAThumbnailWithContrastUnlessTheyAreDamagedOrTruncated) {
   for (const Sample& sample : AllSamples()) {
     if (IsNamed(sample, "damaged")) continue;
     std::istringstream stream(sample.make());
@@ -87,7 +87,7 @@ TEST(Samples, HaveAThumbnailWithContrastUnlessTheyAreMeantToHaveNone) {
   }
 }
 
-TEST(Samples, DamagedOnesAreNotAccepted) {
+TEST(Samples, AreNotAcceptedIfTheyAreDamaged) {
   for (const Sample& sample : AllSamples()) {
     if (!IsNamed(sample, "damaged")) continue;
     std::istringstream stream(sample.make());

@@ -1,5 +1,4 @@
-// The comparison of what the shell shows with what the extension answers, for a shell that answers as it is
-// told.
+// The comparison of what the shell shows with what the extension answers. A fake shell gives the answers.
 #include "shell_view.h"
 
 #include <gtest/gtest.h>
@@ -28,7 +27,7 @@ using Com::ComPtr;
 
 constexpr std::int32_t kRequest = 20;
 
-/// A picture as the shell has it: 32 bits a pixel, from the bottom.
+/// Makes a bitmap as the shell does: 32 bits per pixel, bottom-up.
 HBITMAP ShellBitmap(std::int32_t width, std::int32_t height,
                     const std::function<std::uint8_t(std::int32_t, std::int32_t)>& level) {
   BITMAPINFO info{};
@@ -50,10 +49,10 @@ std::uint8_t Level(std::int32_t x, std::int32_t y) {
   return static_cast<std::uint8_t>(x * 10 + y);
 }
 
-/// A file in a shell whose answers are these.
+/// A file in a shell that gives these answers.
 class FakeItem final : public IShellItem2, public IShellItemImageFactory {
  public:
-  std::vector<HRESULT> failures;  // of the first requests for a picture
+  std::vector<HRESULT> failures;  // the results of the first requests for a picture
   std::function<HBITMAP()> picture;
   HRESULT storeResult = S_OK;
   ComPtr<IPropertyStore> store;
@@ -158,7 +157,7 @@ class ShellComparison : public testing::Test {
   ListAnswer<Property> properties_;
 };
 
-TEST_F(ShellComparison, IsInOrderWhereEveryPixelAndValueIsTheSame) {
+TEST_F(ShellComparison, AgreesIfEveryPixelAndValueIsTheSame) {
   const ShellView view = View();
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kSame);
   EXPECT_EQ(view.properties.agreement, Agreement::kSame);
@@ -168,7 +167,7 @@ TEST_F(ShellComparison, IsInOrderWhereEveryPixelAndValueIsTheSame) {
             L"Windows shows the thumbnail of QelShellExt and the set of properties of QelShellExt.");
 }
 
-TEST_F(ShellComparison, TellsByHowMuchASinglePixelDiffers) {
+TEST_F(ShellComparison, ReportsByHowMuchASinglePixelDiffers) {
   item_.picture = [] {
     return ShellBitmap(12, 8, [](std::int32_t x, std::int32_t y) {
       return static_cast<std::uint8_t>(Level(x, y) + (x == 11 && y == 0 ? 3 : 0));
@@ -179,13 +178,13 @@ TEST_F(ShellComparison, TellsByHowMuchASinglePixelDiffers) {
   EXPECT_FALSE(IsInOrder(View()));
 }
 
-TEST_F(ShellComparison, TellsAnotherSize) {
+TEST_F(ShellComparison, ReportsADifferentSize) {
   item_.picture = [] { return ShellBitmap(8, 12, Level); };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers);
   EXPECT_EQ(Thumbnail().detail, L"of 8 x 12 pixels instead of 12 x 8 pixels");
 }
 
-TEST_F(ShellComparison, ComparesTheShapeOfWhatTheShellReduces) {
+TEST_F(ShellComparison, ComparesTheProportionsOfAReducedThumbnail) {
   SetOwnPicture(39, 25);
   item_.picture = [] { return ShellBitmap(20, 13, Level); };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kReduced);
@@ -196,7 +195,7 @@ TEST_F(ShellComparison, ComparesTheShapeOfWhatTheShellReduces) {
   }
 }
 
-TEST_F(ShellComparison, ExpectsNoThumbnailWhereTheExtensionHasNone) {
+TEST_F(ShellComparison, ExpectsNoThumbnailIfTheExtensionHasNone) {
   own_.png.clear();
   EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers);
   item_.failures = {E_FAIL};
@@ -208,7 +207,7 @@ TEST_F(ShellComparison, WaitsForAThumbnailThatIsBeingMade) {
   EXPECT_EQ(Thumbnail().agreement, Agreement::kSame);
 }
 
-TEST_F(ShellComparison, TellsThatThereIsNoThumbnailAndALikelyCause) {
+TEST_F(ShellComparison, ReportsAMissingThumbnailWithALikelyCause) {
   item_.failures = {static_cast<HRESULT>(0x8004B200)};
   const ShellView view = View();
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kNothing);
@@ -219,7 +218,7 @@ TEST_F(ShellComparison, TellsThatThereIsNoThumbnailAndALikelyCause) {
       << Utf8(sentence);
 }
 
-TEST_F(ShellComparison, TellsWhichPropertyDiffers) {
+TEST_F(ShellComparison, ReportsWhichPropertyDiffers) {
   SetShellWidth(64);
   properties_.items[1].value = std::wstring(L"comment");
   const ShellAnswer answer = Properties();
@@ -238,7 +237,7 @@ TEST_F(ShellComparison, ComparesNoPropertiesForAKindWithoutAStore) {
   EXPECT_EQ(Properties().agreement, Agreement::kSame);
 }
 
-TEST_F(ShellComparison, KnowsAShellThatDoesNotAnswer) {
+TEST_F(ShellComparison, RecognisesAShellThatDoesNotAnswer) {
   item_.hasPictures = false;
   item_.storeResult = E_NOTIMPL;
   const ShellView view = View();

@@ -1,5 +1,6 @@
-// What the shell of this computer shows of the sample files when the extension is registered, compared with
-// what the extension answers directly. The extension is registered as long as a test runs.
+// Compares what the shell of this computer shows for the sample files with what the extension answers
+// directly. The
+// extension is registered while a test runs.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -23,7 +24,7 @@ namespace {
 
 constexpr std::int32_t kRequest = 256;
 
-/// The registered DLL; what it replaced is put back in the end.
+/// Keeps the DLL registered while it exists. The destructor restores what the registration has replaced.
 class RegisteredDll {
  public:
   RegisteredDll() { EXPECT_EQ(dll_.Register(), S_OK); }
@@ -66,7 +67,7 @@ class WindowsShell : public testing::Test {
     return views;
   }
 
-  /// Compares one kind of answer for every sample.
+  /// Compares one kind of answer for every sample. Skips the test if the shell answers for none.
   void Compare(ShellAnswer ShellView::* answer) {
     bool isAnswered = false;
     for (const SampleView& asked : AskForSamples()) {
@@ -93,7 +94,7 @@ TEST_F(WindowsShell, ShowsThePropertiesOfTheExtension) {
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt::Show
 
-/// The program is its own worker process.
+/// Runs the tests, or with --worker the worker process, which is this program too.
 int main(int count, char** arguments) {
   if (count == 2 && std::strcmp(arguments[1], "--worker") == 0)
     return Qel::Lumetra::ShellExt::Show::RunWorker();

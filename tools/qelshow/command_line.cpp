@@ -108,7 +108,7 @@ struct CommandFacts {
   Command command;
   bool takesJson;
   bool takesOut;
-  bool takesServer;  // and asks it about files
+  bool takesServer;  // and asks the extension about files
 };
 
 constexpr CommandFacts kCommands[] = {
@@ -152,7 +152,7 @@ bool IsHelp(const std::wstring& argument) {
   return argument == L"--help" || argument == L"-h" || argument == L"/?";
 }
 
-/// The arguments after the command.
+/// Reads the arguments after the command.
 class OptionReader {
  public:
   OptionReader(const CommandFacts& facts, const std::vector<std::wstring>& arguments)
@@ -199,7 +199,7 @@ class OptionReader {
     return true;
   }
 
-  /// The value of an option: after the equals sign, or the next argument.
+  /// Returns the value of an option, which follows the equals sign or is the next argument.
   std::wstring Value(const std::wstring& argument, std::size_t equals) {
     std::wstring value;
     if (equals != std::wstring::npos) {
@@ -211,7 +211,7 @@ class OptionReader {
     return value;
   }
 
-  /// Completes the line, or finds that it cannot be carried out.
+  /// Completes the command line. Throws Failure if it is invalid.
   void Check(CommandLine& line) const {
     if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is given.", facts_.name);
     if (line.command == Command::kThumbnail && line.files.size() > 1) {

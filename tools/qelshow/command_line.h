@@ -1,4 +1,4 @@
-// The command line: what the program is asked to do, and the texts of its help.
+// Parses the command line, and has the text of the help.
 #pragma once
 
 #include <cstdint>
@@ -11,15 +11,16 @@ enum class Command { kHelp, kInfo, kThumbnail, kPage, kDoctor };
 
 struct CommandLine {
   Command command = Command::kHelp;
-  std::wstring helpText;  // or the version, for kHelp
+  std::wstring helpText;  // for kHelp: the help, or the version
   std::vector<std::wstring> files;
-  std::wstring server;  // empty: the registered one
+  std::wstring server;  // if empty, the registered extension
   std::wstring out;     // a file or a folder
   std::int32_t size = 256;
   bool json = false;
 };
 
-/// `arguments` without the program's name. Throws Failure for a command line that cannot be carried out.
+/// Parses `arguments`, which do not include the program's name. Throws Failure with a sentence for the user
+/// if they are invalid.
 CommandLine ParseCommandLine(const std::vector<std::wstring>& arguments);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -30,13 +30,13 @@ std::wstring Counted(std::size_t count, const wchar_t* what) {
   return std::to_wstring(count) + L" " + what + (count == 1 ? L"" : L"s");
 }
 
-/// Names a file with what is wrong with it.
+/// Reports a file's problem.
 void PrintProblem(const FileFacts& facts) {
   if (!facts.problem.empty()) PrintError(facts.named + L": " + facts.problem + L" " + facts.advice);
   if (!facts.remark.empty()) PrintError(facts.named + L": " + facts.remark);
 }
 
-/// Loads the extension that the line names.
+/// Starts a worker process with the extension that the command line names.
 Worker StartWorker(const CommandLine& line) {
   try {
     return Worker(line.server);

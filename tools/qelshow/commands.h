@@ -1,4 +1,4 @@
-// The commands of the program. Each answers the program's exit status and throws Failure.
+// The commands of the program. Each returns the program's exit status, or throws Failure.
 #pragma once
 
 #include "command_line.h"

@@ -13,7 +13,7 @@ bool IsConsole(HANDLE handle) {
   return GetConsoleMode(handle, &mode) != 0;
 }
 
-/// Answers whether all of it is written.
+/// Returns whether all of the text has been written.
 bool PrintTo(DWORD which, std::wstring_view text) {
   const HANDLE target = GetStdHandle(which);
   if (IsConsole(target)) {
@@ -24,15 +24,15 @@ bool PrintTo(DWORD which, std::wstring_view text) {
   return WriteBytes(target, utf8.data(), utf8.size());
 }
 
-/// Standard output has or has not taken what was written to it.
+/// Throws Failure if standard output could not be written, except if nobody reads it.
 void RequirePrinted(bool isWritten) {
   if (isWritten) return;
   const DWORD error = GetLastError();
   switch (error) {
-    case ERROR_BROKEN_PIPE:  // a pipe at whose other end there is nobody
+    case ERROR_BROKEN_PIPE:  // the reader of the pipe has closed it
     case ERROR_NO_DATA:
     case ERROR_PIPE_NOT_CONNECTED:
-    case ERROR_INVALID_HANDLE:  // no standard output at all, as of a service
+    case ERROR_INVALID_HANDLE:  // there is no standard output, as in a service
       return;
     default: throw Failure(L"Standard output cannot be written: " + SystemErrorText(error) + L".");
   }

@@ -1,4 +1,5 @@
-// Standard output and standard error: text as UTF-8, or as it is to a console window.
+// Writes to standard output and standard error. Text is written as UTF-8, except to a console window, which
+// gets UTF-16.
 #pragma once
 
 #include <windows.h>
@@ -9,24 +10,24 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Answers whether all bytes were taken; the system's last error says why not.
+/// Returns whether all bytes have been written. If not, GetLastError gives the reason.
 bool WriteBytes(HANDLE target, const void* bytes, std::size_t size);
 
-/// Writes to standard output. Throws Failure if it cannot be written, here and below; that nobody reads it,
-/// or not to its end, is not an error of this program.
+/// Writes to standard output. Like the functions below, it throws Failure if the output cannot be written. It
+/// is no error if the reader of a pipe has closed it.
 void Print(std::wstring_view text);
 
 /// Writes UTF-8 to standard output.
 void PrintUtf8(std::string_view text);
 
-/// Writes bytes to standard output as they are.
+/// Writes bytes to standard output unchanged.
 void PrintBytes(const void* bytes, std::size_t size);
 
 /// Writes a sentence and a line end to standard error.
 void PrintError(std::wstring_view sentence);
 
-/// How far the work on many files has come: one line on standard error, if that is a terminal. The line is
-/// taken away before anything else is printed and at the end.
+/// Shows the progress of the work on many files as one line on standard error, if that is a terminal. The
+/// line is removed at the end, and before anything else is printed.
 class ProgressBar {
  public:
   explicit ProgressBar(std::size_t total);

@@ -39,7 +39,8 @@ static void to_json(Json& json, const ExaminedKind& kind) {
 
 namespace {
 
-/// Has the registered extension read the files. Where it cannot be had, that is every file's problem.
+/// Returns the facts about the files, as the registered extension reads them. If it cannot be loaded, each
+/// file reports that as its problem.
 std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
   std::vector<FileFacts> files;
   std::optional<Worker> worker;
@@ -67,8 +68,8 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
   return files;
 }
 
-/// Remarks on each file of a kind that was left to other programs. Answers whether there is one that would be
-/// shown otherwise.
+/// Adds a remark to each file whose kind is left to other programs. Returns whether the extension would show
+/// one of them.
 bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& files) {
   bool found = false;
   for (FileFacts& facts : files) {
@@ -83,8 +84,8 @@ bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& f
   return found;
 }
 
-/// Asks the shell about the files that the extension reads and that nothing is remarked on. Answers whether
-/// all that it says is in order.
+/// Asks the shell about the files that the extension reads and that have no remark. Returns whether all its
+/// answers are right.
 bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
   bool isInOrder = true;
   std::optional<Worker> worker;
@@ -127,7 +128,7 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
   for (const ExaminedKind& kind : kinds) {
     std::vector<std::wstring> row = {kind.extension};
     for (std::size_t i = 0; i < kind.handlers.size(); ++i) {
-      // Every kind has its handlers in the same order, some without the last.
+      // Every kind has its handlers in the same order; some lack the last.
       if (rows.front().size() == i + 1) rows.front().push_back(kind.handlers[i].registered.role);
       row.emplace_back(ConditionText(kind.handlers[i].condition));
     }

@@ -10,7 +10,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-/// For which processors a program or DLL is made; IMAGE_FILE_MACHINE_UNKNOWN if that cannot be told.
+/// Returns the processor type of a program or DLL; IMAGE_FILE_MACHINE_UNKNOWN if it cannot be determined.
 WORD MachineOf(const std::wstring& path) {
   std::ifstream file(std::filesystem::path(path), std::ios::binary);
   IMAGE_DOS_HEADER start{};
@@ -25,7 +25,7 @@ WORD MachineOf(const std::wstring& path) {
   return file && header.signature == IMAGE_NT_SIGNATURE ? header.machine : WORD{IMAGE_FILE_MACHINE_UNKNOWN};
 }
 
-/// Why the system does not load the DLL.
+/// Returns why the system does not load the DLL.
 std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
   if (error == ERROR_MOD_NOT_FOUND && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) {
     return L"another DLL that it needs is missing (error 126)";

@@ -1,4 +1,4 @@
-// Loads the extension, as it is registered or from the DLL at a path, and creates its objects.
+// Loads the extension, either the registered one or the DLL at a path, and creates its objects.
 #pragma once
 
 #include <windows.h>
@@ -16,11 +16,12 @@ using Com::ComPtr;
 
 class ExtensionClient {
  public:
-  /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. Returns a
-  /// sentence for the user if that fails, after which no object can be created.
+  /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. Returns an
+  /// empty string, or if it fails a sentence for the user; then no object can be created.
   std::wstring Open(const std::wstring& path);
 
-  /// Creates an object of the class and queries it for the interface.
+  /// Creates an object of the class and returns its interface in `object`. Returns the result of the
+  /// extension.
   template <class Interface>
   HRESULT Create(const CLSID& clsid, ComPtr<Interface>& object) const {
     return Create(clsid, Com::kInterfaceId<Interface>, reinterpret_cast<void**>(object.Put()));
@@ -29,7 +30,7 @@ class ExtensionClient {
  private:
   HRESULT Create(const CLSID& clsid, const IID& iid, void** object) const;
 
-  // A DLL stays loaded until the process ends: nothing is gained by unloading it before.
+  // The DLL stays loaded until the process ends, as there is no reason to unload it earlier.
   decltype(&DllGetClassObject) getClassObject_ = nullptr;
 };
 

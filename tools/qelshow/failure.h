@@ -1,4 +1,4 @@
-// The end of a command that cannot be carried out.
+// The exception that ends a command.
 #pragma once
 
 #include <string>
@@ -6,12 +6,12 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-// Exit statuses of the program, beside those of a file's verdict (file_facts.h).
+// Exit statuses of the program, in addition to the verdicts of files (file_facts.h).
 inline constexpr int kExitDone = 0;
 inline constexpr int kExitFailed = 1;
 inline constexpr int kExitUsage = 2;
 
-/// Thrown with a sentence for the user, which names what it is about.
+/// Has a sentence for the user, which names the file or the argument that it is about.
 struct Failure {
   explicit Failure(std::wstring what, int status = kExitFailed)
       : sentence(std::move(what)), exitStatus(status) {}

@@ -1,5 +1,5 @@
-// Everything that a shell learns about one file from the extension, as plain data: collected by the worker
-// process (shell_requests.h), sent to the parent process (json_records.h), shown by the reports.
+// Everything that a shell learns about one file from the extension, as plain data. The worker process
+// collects it (shell_requests.h) and sends it to the parent process (json_records.h), whose reports show it.
 #pragma once
 
 #include <cstdint>
@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// A text that may be missing, which is the empty text; null in JSON.
+/// A string that may be missing. Missing is the empty string, and null in JSON.
 struct OptionalText : std::wstring {
   using std::wstring::wstring;
   using std::wstring::operator=;
@@ -18,15 +18,15 @@ struct OptionalText : std::wstring {
   OptionalText(std::wstring text) : std::wstring(std::move(text)) {}
 };
 
-/// How a file is judged, in the order of severity. The values are the exit statuses of the program.
+/// The judgement of a file, in the order of severity. The values are exit statuses of the program.
 enum class Verdict : std::int32_t {
   kGood = 0,
-  kFailed = 1,  // could not be asked at all, for instance because it cannot be opened
+  kFailed = 1,  // could not be examined, for instance because it cannot be opened
   kUnsupported = 3,
   kDamaged = 4,
 };
 
-/// A number, a text, or nothing.
+/// A number, a string, or nothing.
 using Value = std::variant<std::monostate, std::int64_t, double, std::wstring>;
 
 /// One of the values that a file's header has beyond the picture (header_facts.h).
@@ -36,7 +36,7 @@ struct HeaderFact {
   OptionalText unit;
 };
 
-/// What the project's own readers find wrong with a file, and in its header.
+/// The results of the project's own readers: the fault of a file, and the facts of its header.
 struct Diagnosis {
   Verdict verdict = Verdict::kGood;
   OptionalText problem;
@@ -44,21 +44,21 @@ struct Diagnosis {
   std::vector<HeaderFact> header{};
 };
 
-/// An answer that is a list. The `problem` of this and of other answers is a sentence that says why there is
-/// none.
+/// An answer that is a list. The `problem` of this and other answers is a sentence that says why there is no
+/// answer.
 template <class Item>
 struct ListAnswer {
   std::vector<Item> items;
   OptionalText problem;
 };
 
-/// The tip, as the shell would show it.
+/// The info tip that the shell would show.
 struct TipAnswer {
   OptionalText text;
   OptionalText problem;
 };
 
-/// A column of the Details view. Types are names such as "VT_I4".
+/// A column of the Details view. Types are strings such as "VT_I4".
 struct Column {
   std::uint32_t index = 0;
   std::wstring title;
@@ -73,7 +73,7 @@ struct Column {
 };
 
 struct Property {
-  OptionalText name;  // canonical name, or a plain word where there is none
+  OptionalText name;  // canonical name, or a plain word if there is none
   std::wstring set;   // format id
   std::uint32_t id = 0;
   OptionalText type;
@@ -82,11 +82,11 @@ struct Property {
 };
 
 struct Thumbnail {
-  std::int32_t request = 0;  // both sides of the square that was asked for
+  std::int32_t request = 0;  // the edge of the requested square
   std::int32_t width = 0;
   std::int32_t height = 0;
   std::int32_t bitsPerPixel = 0;
-  OptionalText picture;  // where it was written, relative to the document
+  OptionalText picture;  // the path of its file, relative to the document
   OptionalText problem;
 };
 
@@ -99,14 +99,14 @@ struct FileFacts {
   std::wstring path;   // absolute
   std::wstring named;  // as on the command line; not in the document
   std::wstring name;
-  std::wstring kind;  // the extension in small letters
+  std::wstring kind;  // the extension in lower case
   std::uint64_t bytes = 0;
   OptionalText modified;  // when it was last written, in UTC: 2026-11-21T15:22:03Z
   Verdict verdict = Verdict::kGood;
-  OptionalText problem;  // one sentence for everything but a good file
+  OptionalText problem;  // one sentence for every file that is not good
   OptionalText advice;   // what to do about the problem, in one sentence
-  OptionalText remark;   // one sentence worth knowing about a file, good or not
-  OptionalText shell;    // one sentence on what Windows itself shows, where that was asked
+  OptionalText remark;   // one more sentence about a file, good or not
+  OptionalText shell;    // one sentence on what Windows itself shows, if it was asked
 
   // From the property sets and the tip; 0 or empty where they are missing.
   std::int32_t width = 0;
@@ -117,7 +117,7 @@ struct FileFacts {
 
   std::vector<HeaderFact> header;
   Thumbnail thumbnail;
-  std::vector<std::uint8_t> png;  // of the thumbnail; not in the document
+  std::vector<std::uint8_t> png;  // the thumbnail's file; not in the document
   TipAnswer tip;
   ListAnswer<Column> columns;
   ListAnswer<Property> propertySets;

@@ -30,7 +30,7 @@ std::wstring Square(std::int32_t size) {
   return std::to_wstring(size) + L" x " + std::to_wstring(size);
 }
 
-/// Fills `answer`; if the process ends instead, that becomes the answer's problem.
+/// Fills `answer`. If the process ends instead, that is the answer's problem.
 template <class Answer>
 void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
   if (const auto end = worker.Ask({subject, path}, answer)) {
@@ -58,7 +58,7 @@ std::wstring PixelType(const std::wstring& tip) {
 constexpr const wchar_t* kReport =
     L"Please report this to the authors of QelShellExt, with the file if you can.";
 
-/// Whether the picture is one that ends the process which requests it.
+/// Returns whether a request for the thumbnail ends the process, as the frame is in colour and too small.
 bool IsSmallColourPicture(const FileFacts& facts, std::int32_t size) {
   return facts.type.starts_with(L"24 bit") && facts.width < size && facts.height < size;
 }
@@ -85,7 +85,7 @@ void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, 
 
 FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size) {
   FileFacts facts;
-  // The shell names files by their full path.
+  // The shell passes full paths.
   const std::wstring absolute = AbsolutePath(path);
   facts.path = absolute;
   facts.named = path;
@@ -119,7 +119,7 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   facts.type = PixelType(facts.tip.text);
   FillThumbnail(worker, absolute, size, facts);
 
-  // What the extension shows counts, whatever this program's readers think of the file.
+  // A file for which the extension has a thumbnail is good, whatever this program's readers find.
   if (!facts.png.empty()) {
     facts.verdict = Verdict::kGood;
     facts.problem.clear();

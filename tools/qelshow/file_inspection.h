@@ -1,4 +1,4 @@
-// Collects everything that the extension says about one file and judges it.
+// Collects all answers of the extension about one file, and judges the file.
 #pragma once
 
 #include <cstdint>
@@ -9,8 +9,9 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Collects the facts of the file at `path`, with a thumbnail for a square of `size` pixels. A file that ends
-/// the worker process is judged by that, and the worker is ready for the next file.
+/// Returns the facts about the file at `path`, with a thumbnail for a request of `size` by `size` pixels. If
+/// a request about the file ends the worker process, the facts report that, and the worker is ready for the
+/// next file.
 FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstring& name, std::int32_t size);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,4 +1,4 @@
-// The files that a page shows.
+// Lists the files that a page shows.
 #pragma once
 
 #include <string>
@@ -9,27 +9,28 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 struct ListedFile {
   std::wstring path;
-  std::wstring name;  // what the page calls it: relative to the folder of the list
+  std::wstring name;  // its name on the page: relative to the folder of the list
 };
 
 struct FileList {
-  std::wstring
-      folder;  // full path of the deepest folder that holds all files; empty if they are on several drives
+  std::wstring folder;  // absolute path of the deepest folder that contains all files; empty if they are on
+                        // several drives
   std::vector<ListedFile> files;
 };
 
-/// Whether the extension shows files with this one's extension.
+/// Returns whether the extension supports the file-name extension of `path`.
 bool IsSupported(const std::wstring& path);
 
-/// Whether the path has wildcards and no file matches them.
+/// Returns whether the path has wildcards and no file matches them.
 bool IsUnmatchedPattern(const std::wstring& path);
 
-/// The files named, and of the folders named all files of the supported kinds, also in folders below them,
-/// in natural order of their names (9 before 10). A path that does not exist is kept as a file, so that it is
-/// reported. Throws Failure for a folder that cannot be listed, and if nothing is there that can be shown.
+/// Returns the files among `paths`, and all files of the supported kinds in the folders among them and their
+/// subfolders, in the natural order of their names (9 before 10). A path that does not exist is returned as a
+/// file, so that it is reported. Throws Failure if a folder cannot be listed, and if there is nothing to
+/// show.
 FileList ListFiles(const std::vector<std::wstring>& paths);
 
-/// The extensions of the supported kinds in a sentence, for instance ".mrc, .ser and .raw".
+/// Returns the extensions of the supported kinds for a sentence, for instance ".mrc, .ser and .raw".
 std::wstring SupportedExtensions(std::wstring_view conjunction);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -19,9 +19,9 @@ bool FileExists(const std::wstring& path) {
   return !path.empty() && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES;
 }
 
-/// What registers the extension, with the DLL that is registered, or else with the one beside this program.
-/// What the installer has installed, it is to register itself: regsvr32 would register what was left out too,
-/// and the installer would leave that behind.
+/// Returns the command that registers the extension: the registered DLL, or else the one beside this program.
+/// If Windows Installer has installed the extension, it must also repair it: regsvr32 would register the
+/// kinds that were left out too, and the installer would not remove those.
 std::wstring RegisterAdvice(const std::wstring& registeredDll) {
   const std::wstring product = InstalledProduct();
   if (!product.empty()) return L"run msiexec /i " + product + L" REINSTALL=ALL as administrator";
@@ -32,7 +32,8 @@ std::wstring RegisterAdvice(const std::wstring& registeredDll) {
                            L"QelShellExt again";
 }
 
-/// What registers a kind of file that was left out. The installer calls it as its extension without the dot.
+/// Returns the command that registers a file kind that was left out. The installer names a kind by its
+/// extension without the dot.
 std::wstring AddAdvice(const std::wstring& extension, const std::wstring& registeredDll) {
   const std::wstring product = InstalledProduct();
   if (product.empty()) return RegisterAdvice(registeredDll);
@@ -41,10 +42,10 @@ std::wstring AddAdvice(const std::wstring& extension, const std::wstring& regist
 
 constexpr const wchar_t* kReinstall = L" Install QelShellExt again.";
 
-/// Processes, each with the DLL that it has loaded.
+/// Worker processes, by the path of the DLL that they have loaded.
 using Workers = std::map<std::wstring, Worker>;
 
-/// Loads the DLL and makes an object, both in a worker process, which they may end.
+/// Loads the DLL and creates an object, both in a worker process, because either may end the process.
 void ExamineObject(ExaminedClass& examined, Workers& workers) {
   const std::wstring& dll = examined.registered.dll;
   examined.condition = Condition::kDllNotLoaded;
@@ -65,7 +66,7 @@ void ExamineObject(ExaminedClass& examined, Workers& workers) {
   }
 }
 
-/// Finds what keeps the shell from using a class that works in another program.
+/// Finds what prevents the shell from using a class that works in other programs.
 void ExamineUse(ExaminedClass& examined, const std::wstring& id) {
   const RegisteredClass& registered = examined.registered;
   const std::wstring subject = L"The class of the " + examined.name;
@@ -116,14 +117,14 @@ const ExaminedClass& FindClass(const std::vector<ExaminedClass>& classes, const 
   return *std::ranges::find(classes, clsid, &ExaminedClass::clsid);
 }
 
-/// The end of the way of a handler: the class behind it is one of the extension's own, or it is foreign.
+/// Returns the condition of a handler, which is that of its class if the class is the extension's.
 Condition ConditionOf(const Handler& handler, const std::vector<ExaminedClass>& classes) {
   if (handler.registered.empty()) return Condition::kNotRegistered;
   if (!SameIgnoringCase(handler.registered, GuidText(handler.expected))) return Condition::kForeign;
   return FindClass(classes, handler.expected).condition;
 }
 
-/// A class of another program, with what the registry says of it.
+/// Returns a description of another program's class from its registry entries.
 std::wstring ForeignClassText(const std::wstring& clsid) {
   const RegisteredClass foreign = ReadClass(clsid);
   std::wstring text = L"another program's class, " + clsid;
@@ -154,8 +155,8 @@ std::wstring MissingHandlersProblem(const ExaminedKind& kind, const std::wstring
   return L"No handler is registered for " + kind.extension + L" files (" + roles + L"): " + advice + L".";
 }
 
-/// Whether nothing of the extension is registered for this kind: no handler leads to it, and the class that
-/// only this kind has is not there.
+/// Returns whether nothing of the extension is registered for this kind: it has no handler of the extension,
+/// and the class that serves only this kind does not exist.
 bool HasNothing(const ExaminedKind& kind, const std::vector<ExaminedClass>& classes) {
   return std::ranges::none_of(kind.handlers, [&](const ExaminedHandler& examined) {
     const Handler& handler = examined.registered;
@@ -164,7 +165,7 @@ bool HasNothing(const ExaminedKind& kind, const std::vector<ExaminedClass>& clas
   });
 }
 
-/// An extension that is registered, but for some kinds of file not at all, has been left out there.
+/// Finds the file kinds that were left out: the extension is registered, but nothing of it for these kinds.
 void FindLeftOut(Installation& installation) {
   const ExaminedClass& extension = FindClass(installation.classes, CLSID_QelShellExt);
   const auto hasNothing = [&](const ExaminedKind& kind) { return HasNothing(kind, installation.classes); };
@@ -193,7 +194,7 @@ std::vector<std::wstring> FindProblems(const Installation& installation) {
 
   std::vector<std::wstring> problems;
   const auto add = [&](const std::wstring& problem) {
-    // What is wrong with the DLL is wrong with each of its classes.
+    // A fault of the DLL is reported once, although each of its classes has it.
     if (!problem.empty() && std::ranges::find(problems, problem) == problems.end())
       problems.push_back(problem);
   };

@@ -1,6 +1,6 @@
-// How the extension is installed on this computer: follows every way on which the shell comes to it, from a
-// kind of file to its handler, the class, the DLL, an object of the class, and judges each step. The doctor
-// shows what is found.
+// Examines how the extension is installed on this computer. It follows each path by which the shell reaches
+// the extension, from a file kind to its handler, the class, the DLL and an object of the class, and judges
+// each step. The doctor shows the result.
 #pragma once
 
 #include <windows.h>
@@ -13,7 +13,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// How far the way goes.
+/// How far the shell gets on such a path.
 enum class Condition {
   kWorks,
   kNotRegistered,
@@ -26,12 +26,12 @@ enum class Condition {
   kThreading
 };
 
-/// A few words, for tables and JSON.
+/// Returns a few words for tables and JSON.
 std::wstring ConditionText(Condition condition);
 
 /// One of the extension's classes.
 struct ExaminedClass {
-  std::wstring name;  // what it does
+  std::wstring name;  // its purpose
   CLSID clsid{};
   RegisteredClass registered;
   OptionalText version;  // of the DLL
@@ -47,18 +47,18 @@ struct ExaminedHandler {
 struct ExaminedKind {
   std::wstring extension;
   std::vector<ExaminedHandler> handlers;
-  // A sentence for the user, if nothing at all of the extension is registered for this kind, as when it was
-  // left to other programs at the installation. That is no problem.
+  // A sentence for the user if nothing of the extension is registered for this kind, because the installation
+  // has left it to other programs. This is not a problem.
   OptionalText leftOut;
 };
 
 struct Installation {
   std::vector<ExaminedClass> classes;
   std::vector<ExaminedKind> kinds;
-  std::vector<std::wstring> problems;  // sentences, each for another thing that is wrong and what to do
+  std::vector<std::wstring> problems;  // a sentence for each fault, with what to do about it
 };
 
-/// Loads the DLL in another process only.
+/// Examines the installation. It loads the DLL only in other processes.
 Installation ExamineInstallation();
 
 }  // namespace Qel::Lumetra::ShellExt::Show

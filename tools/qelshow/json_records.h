@@ -1,5 +1,5 @@
-// How the records of this program are written: as JSON in documents for other programs, as CBOR in the
-// messages between the program and its worker process. One description of a record serves both.
+// Converts the records of this program to JSON for documents, and to CBOR for the messages between the
+// program and its worker process. One description of a record serves both.
 #pragma once
 
 #include <cstdint>
@@ -11,7 +11,7 @@
 #include "question.h"
 #include "text_tools.h"
 
-/// A text is a UTF-8 string. Half of a surrogate pair, which UTF-8 cannot express, becomes U+FFFD.
+/// Strings are UTF-8. Half of a surrogate pair, which UTF-8 cannot represent, becomes U+FFFD.
 template <>
 struct nlohmann::adl_serializer<std::wstring> {
   static void to_json(nlohmann::json& json, const std::wstring& text) {
@@ -89,7 +89,7 @@ inline void from_json(const Json& json, ThumbnailAnswer& answer) {
 }
 
 inline void to_json(Json& json, const Question& question) {
-  // A path goes as its code units, because UTF-8 cannot express every name of a file.
+  // A path is sent as its UTF-16 code units, because UTF-8 cannot represent every file name.
   const std::vector<std::uint16_t> path(question.path.begin(), question.path.end());
   json = {{"subject", question.subject}, {"path", path}, {"size", question.size}};
 }

@@ -32,7 +32,7 @@ bool IsFolder(const std::wstring& path) {
   return fs::is_directory(path, ignored);
 }
 
-/// What tells a file from all others, whatever the path that leads to it.
+/// Identifies a file, whatever path leads to it.
 struct Identity {
   DWORD volume;
   DWORD high;
@@ -49,7 +49,7 @@ std::optional<Identity> IdentityOf(const std::wstring& path) {
   return Identity{facts.dwVolumeSerialNumber, facts.nFileIndexHigh, facts.nFileIndexLow};
 }
 
-/// The first bytes of a file, up to `count`.
+/// Returns the first bytes of a file, up to `count`.
 std::string Beginning(const std::wstring& path, std::size_t count) {
   std::string bytes(count, '\0');
   std::ifstream file(fs::path(path), std::ios::binary);

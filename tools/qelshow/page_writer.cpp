@@ -14,12 +14,12 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// Where the JSON document stands in the template.
+/// The placeholder of the JSON document in the template.
 constexpr std::string_view kPlaceOfFiles = "@FILES@";
 
 constexpr const wchar_t* kPicturesFolder = L"pictures";
 
-/// JSON that can stand in a script element of the page: without '<', which would be able to end the element.
+/// Returns the JSON for a script element of the page. It must not contain '<', which could end the element.
 std::string InScript(std::string json) {
   for (std::size_t i = 0; (i = json.find('<', i)) != std::string::npos;) json.replace(i, 1, "\\u003c");
   return json;
@@ -42,7 +42,7 @@ std::wstring PictureName(std::size_t number) {
   return std::to_wstring(number) + L".png";
 }
 
-/// A name in the folder that nothing has.
+/// Returns a path in the folder at which nothing exists.
 std::wstring UnusedFolder(const std::wstring& folder) {
   for (int i = 1;; ++i) {
     std::wstring path = folder + L"\\unfinished-" + std::to_wstring(i);
@@ -103,7 +103,7 @@ void PageWriter::Finish() {
   const std::wstring pictures = folder_ + L"\\" + kPicturesFolder + L"\\";
   for (const std::wstring& name : pictures_) MoveInto(unfinished_ + L"\\" + name, pictures + name);
   MoveInto(PagePath(unfinished_), PagePath(folder_));
-  // What the earlier page had more is left over.
+  // Removes the pictures that only the earlier page had.
   std::error_code error;
   for (const fs::directory_entry& entry : fs::directory_iterator(pictures, error)) {
     const std::wstring path = entry.path().wstring();

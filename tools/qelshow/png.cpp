@@ -13,7 +13,7 @@ using namespace std::string_view_literals;
 
 constexpr std::string_view kSignature = "\x89PNG\r\n\x1A\n"sv;
 
-/// A text chunk with its length and check sum, and its place after the signature and the header's chunk.
+/// A text chunk with its length and checksum, and its position after the signature and the header chunk.
 constexpr std::string_view kMark = "\0\0\0\x10tEXtSoftware\0qelshow\xE8\xA0\x60\x39"sv;
 constexpr std::size_t kMarkPosition = 33;
 static_assert(kMarkPosition + kMark.size() == kMarkedPngBytes);

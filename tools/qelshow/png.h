@@ -1,4 +1,4 @@
-// PNG files through the platform's imaging component (WIC).
+// Makes PNG files with the imaging component of Windows (WIC).
 #pragma once
 
 #include <windows.h>
@@ -10,12 +10,13 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// The file's bytes for a DIB section of 8-bit grey or 24-bit colour, whose rows lie from the top. COM must
-/// be initialised. `bitmap` stays the caller's. On failure `png` is empty. The file names this program as the
-/// software that made it.
+/// Stores the PNG file of a bitmap in `png`, with this program's name as its software. `bitmap` must be a
+/// top-down DIB section of 8-bit grey or 24-bit colour pixels; the caller keeps it. COM must be initialised.
+/// Returns a failure of the imaging component; then `png` is empty.
 HRESULT EncodePng(HBITMAP bitmap, std::vector<std::uint8_t>& png);
 
-/// Whether a file that begins with these bytes was made by EncodePng; kMarkedPngBytes are enough.
+/// Returns whether a file that begins with these bytes was made by EncodePng. kMarkedPngBytes bytes are
+/// enough.
 bool IsMarkedPng(std::string_view beginning);
 inline constexpr std::size_t kMarkedPngBytes = 61;
 

@@ -1,4 +1,4 @@
-// What the program asks its worker process (worker.h).
+// The questions that the program sends to its worker process (worker.h).
 #pragma once
 
 #include <cstdint>
@@ -6,8 +6,8 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// To load the DLL, about a file, what the shell shows of it, and whether objects of a registered class can
-/// be created.
+/// Whether the DLL can be loaded, the answers about a file, what the shell shows of it, and whether objects
+/// of a registered class can be created.
 enum class Subject : std::int32_t {
   kLoading,
   kDiagnosis,
@@ -22,8 +22,8 @@ enum class Subject : std::int32_t {
 
 struct Question {
   Subject subject = Subject::kDiagnosis;
-  std::wstring path;      // of the DLL or the file; for kCreation the class identifier
-  std::int32_t size = 0;  // of a thumbnail
+  std::wstring path;      // the path of the DLL or the file; for kCreation the class identifier
+  std::int32_t size = 0;  // the edge of the requested thumbnail
 };
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -16,7 +16,7 @@ namespace {
 struct ShellHandler {
   const wchar_t* role;
   const wchar_t* key;    // below ShellEx
-  const wchar_t* rival;  // below ShellEx: a newer interface for the same, which the shell prefers
+  const wchar_t* rival;  // below ShellEx: a newer interface for the same purpose, which the shell prefers
 };
 
 constexpr ShellHandler kShellHandlers[] = {
@@ -25,17 +25,19 @@ constexpr ShellHandler kShellHandlers[] = {
     {L"properties", L"PropertyHandler", nullptr},
 };
 
-constexpr std::size_t kMaxKeyCharacters = 255;  // of the name of a key, which is Windows' own limit
+constexpr std::size_t kMaxKeyCharacters = 255;  // the limit of Windows for the name of a key
 
 constexpr const wchar_t* kPropertyHandlers =
     LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
 
-/// A path without detours; a bare file name, which the system looks for in its folders, and no text stay.
+/// Returns the absolute path, but leaves a bare file name, which the system searches in its folders, and an
+/// empty string unchanged.
 std::wstring FullPath(const std::wstring& path) {
   return path.find(L'\\') == std::wstring::npos ? path : AbsolutePath(path);
 }
 
-/// The key by which an administrator, the user or a tool of theirs has disabled the class; empty without one.
+/// Returns the key by which an administrator, the user or a tool has disabled the class; an empty string if
+/// there is none.
 std::wstring BlockingKey(const std::wstring& clsid) {
   constexpr const wchar_t* kBlocked =
       LR"(Software\Microsoft\Windows\CurrentVersion\Shell Extensions\Blocked)";
@@ -44,7 +46,8 @@ std::wstring BlockingKey(const std::wstring& clsid) {
   return {};
 }
 
-/// Whether a policy keeps the shell from using the class because it is not in a list of approved ones.
+/// Returns whether a policy prevents the shell from using the class because it is not in the list of approved
+/// ones.
 bool IsUnapproved(const std::wstring& clsid) {
   constexpr const wchar_t* kPolicies = LR"(Software\Microsoft\Windows\CurrentVersion\Policies\Explorer)";
   constexpr const wchar_t* kEnforced = L"EnforceShellExtensionSecurity";
@@ -56,8 +59,9 @@ bool IsUnapproved(const std::wstring& clsid) {
          !HasValue(HKEY_CURRENT_USER, kApproved, clsid);
 }
 
-/// The keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, the one that counts most first:
-/// that of the type to which the user, or else a program, has assigned the extension, then its own.
+/// Returns the keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, in the order of
+/// precedence: the key of the type that the user, or else a program, has assigned to the file-name extension,
+/// then the key of that extension.
 std::vector<std::wstring> PlacesOfHandlers(const std::wstring& extension) {
   std::wstring type = TextValue(
       HKEY_CURRENT_USER,

@@ -1,5 +1,5 @@
-// What the registry says of the extension: the handlers of each kind of file, and the classes behind them.
-// Read as the shell reads it, and not judged here (installation.h does that).
+// Reads what the registry contains about the extension: the handlers of each file kind, and their classes. It
+// is read as the shell reads it; installation.h judges it.
 #pragma once
 
 #include <windows.h>
@@ -11,13 +11,13 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// One of the ways on which the shell comes from a kind of file to a class.
+/// One of the registry entries that lead the shell from a file kind to a class.
 struct Handler {
   std::wstring role;        // for instance "thumbnail"
   CLSID expected{};         // the extension's class for it
-  OptionalText registered;  // identifier of the class that the shell takes
-  std::wstring key;         // where it is registered; where the extension's own is to be, without one
-  bool isOwnKey = true;     // whether that is the key which registering the extension writes
+  OptionalText registered;  // identifier of the class that the shell uses
+  std::wstring key;         // where it is registered; without one, where the extension's own belongs
+  bool isOwnKey = true;     // whether registering the extension writes this key
 };
 
 struct KindOfFile {
@@ -25,26 +25,26 @@ struct KindOfFile {
   std::vector<Handler> handlers;
 };
 
-/// Every kind of file with the handlers that the extension has for it.
+/// Returns every file kind with the handlers that the extension has for it.
 std::vector<KindOfFile> ReadHandlers();
 
-/// A registered class; empty texts for what is not registered.
+/// A registered class. Strings are empty for what is not registered.
 struct RegisteredClass {
   bool exists = false;
   std::wstring title;
   OptionalText dll;  // path
   std::wstring threadingModel;
-  std::wstring blocked;       // the key, if any, that keeps the shell from using the class
-  bool isUnapproved = false;  // a policy demands that it is in a list, and it is not
+  std::wstring blocked;       // the key, if any, that prevents the shell from using the class
+  bool isUnapproved = false;  // it is not in the list that a policy requires
 };
 
 RegisteredClass ReadClass(const std::wstring& clsid);
 
-/// The product code under which Windows Installer has installed the extension, with its braces; empty
-/// without.
+/// Returns the product code under which Windows Installer has installed the extension, with its braces; an
+/// empty string if it has not.
 std::wstring InstalledProduct();
 
-/// The version of a program or DLL, for instance "1.0.0"; empty for a file without one.
+/// Returns the version of a program or DLL, for instance "1.0.0"; an empty string if it has none.
 std::wstring FileVersion(const std::wstring& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,4 +1,4 @@
-// Single values of the registry.
+// Reads single values of the registry.
 #pragma once
 
 #include <windows.h>
@@ -7,13 +7,14 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// A text, with environment variables replaced; empty without one. Without `name` it is the default value.
+/// Returns a string value with its environment variables expanded, or an empty string if there is none.
+/// Without `name` it is the default value.
 std::wstring TextValue(HKEY root, const std::wstring& key, const wchar_t* name = nullptr);
 
-/// A number; 0 without one.
+/// Returns a number, or 0 if there is none.
 DWORD NumberValue(HKEY root, const std::wstring& key, const wchar_t* name);
 
-/// Whether there is such a value, of any type.
+/// Returns whether the value exists, with any type.
 bool HasValue(HKEY root, const std::wstring& key, const std::wstring& name);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

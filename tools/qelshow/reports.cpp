@@ -18,7 +18,7 @@ std::wstring Dimensions(std::int32_t width, std::int32_t height) {
   return std::to_wstring(width) + L" x " + std::to_wstring(height);
 }
 
-/// `text` with every line after the first moved to the right.
+/// Returns `text` with every line after the first indented by `columns`.
 std::wstring Indented(std::wstring_view text, std::size_t columns) {
   std::wstring indented;
   for (const wchar_t c : text) {

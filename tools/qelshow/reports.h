@@ -1,5 +1,5 @@
-// The facts of a file as text for a reader and as a row of a table. As JSON they are written by
-// json_records.h.
+// Formats the facts about a file as text for a reader, and as a row of a table. json_records.h formats them
+// as JSON.
 #pragma once
 
 #include <cstddef>
@@ -10,10 +10,10 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Everything about a file that was read, as lines, but for its problem.
+/// Returns everything about a file that was read, as lines, except its problem.
 std::wstring TextReport(const FileFacts& facts);
 
-/// Rows of a table of which every file is one; `nameWidth` is the number of characters of the first column.
+/// Return rows of the table of files. `nameWidth` is the width of the first column in characters.
 std::wstring TableHeading(std::size_t nameWidth);
 std::wstring TableRow(const FileFacts& facts, std::size_t nameWidth);
 

@@ -16,7 +16,7 @@ constexpr const wchar_t* kFolderOptions = LR"(Software\Microsoft\Windows\Current
 
 /// A number in the registry that hides thumbnails unless it is 0.
 struct HidingSetting {
-  const wchar_t* name;  // as Windows calls it
+  const wchar_t* name;  // its name in Windows
   const wchar_t* value;
   bool isPolicy;
   bool isForNetworkFolders;
@@ -33,7 +33,7 @@ std::wstring NameOf(const HidingSetting& setting) {
   return std::wstring(L"the ") + (setting.isPolicy ? L"policy " : L"setting ") + setting.name;
 }
 
-/// Returns the keys in which it is on. A policy can be for the computer or for the user.
+/// Returns the keys in which it is on. A policy can apply to the computer or to the user.
 std::vector<std::wstring> KeysThatTurnOn(const HidingSetting& setting) {
   const std::wstring key = setting.isPolicy ? kPolicies : kFolderOptions;
   std::vector<std::wstring> keys;
@@ -43,7 +43,7 @@ std::vector<std::wstring> KeysThatTurnOn(const HidingSetting& setting) {
   return keys;
 }
 
-/// Whether the contents of the file are somewhere else, as with cloud storage.
+/// Returns whether the contents of the file are elsewhere, as with cloud storage.
 bool IsPlaceholder(const std::wstring& path) {
   constexpr DWORD kRecallOnDataAccess = 0x400000;
   const DWORD attributes = GetFileAttributesW(path.c_str());

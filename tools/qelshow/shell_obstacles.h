@@ -1,5 +1,6 @@
-// What keeps the Windows shell from showing what the extension returns: settings, policies, and the state of
-// a file. The doctor names each setting; a comparison with the shell (shell_view.h) names the likely cause.
+// Finds what prevents the Windows shell from showing what the extension returns: settings, policies, and the
+// state of a file. The doctor names each setting; a comparison with the shell (shell_view.h) names the likely
+// cause.
 #pragma once
 
 #include <string>
@@ -10,7 +11,7 @@ namespace Qel::Lumetra::ShellExt::Show {
 /// Returns a sentence for each setting and policy that hides thumbnails, with what to do about it.
 std::vector<std::wstring> FindSettingsThatHideThumbnails();
 
-/// Each returns the most likely cause, to follow "the likely cause is".
+/// Return the most likely cause, as the end of a sentence after "the likely cause is".
 std::wstring CauseOfNoThumbnail(const std::wstring& path);
 std::wstring CauseOfAnotherThumbnail();
 std::wstring CauseOfOtherProperties();

@@ -22,10 +22,10 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-/// The bound of a list that the extension ends itself.
+/// The limit for lists whose end the extension reports.
 constexpr DWORD kMaxItems = 64;
 
-/// A PROPVARIANT or VARIANT that is cleared.
+/// Owns a PROPVARIANT or VARIANT, and clears it.
 template <class Variant, auto init, auto clear>
 struct OwnedVariant : Variant {
   OwnedVariant() { init(this); }
@@ -41,7 +41,7 @@ std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
   return std::wstring(L"The extension returns no ") + what + L": " + ResultText(result) + L".";
 }
 
-/// Runs `request`; an exception that leaves the extension becomes the problem.
+/// Runs `request`. An exception that leaves the extension becomes the problem.
 template <class Request>
 void Guard(std::wstring& problem, Request request) {
   try {
@@ -58,7 +58,7 @@ HRESULT QueryFor(const ComPtr<Object>& object, ComPtr<Interface>& answer) {
   return object->QueryInterface(Com::kInterfaceId<Interface>, reinterpret_cast<void**>(answer.Put()));
 }
 
-/// A fresh object that was given the path, as the shell prepares it.
+/// Creates a new object and passes it the path, as the shell does. Returns the first failure.
 template <class Interface>
 HRESULT LoadFile(const ExtensionClient& client, const std::wstring& path, ComPtr<Interface>& object) {
   ComPtr<IPersistFile> file;
@@ -70,7 +70,7 @@ HRESULT LoadFile(const ExtensionClient& client, const std::wstring& path, ComPtr
   return result;
 }
 
-/// The value of a column, or why there is none.
+/// Fills the value of a column, or the reason why there is none.
 void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDATA& file, Column& column) {
   ColumnValue value;
   const HRESULT result = provider.GetItemData(&id, &file, &value);
@@ -119,7 +119,7 @@ const CLSID* StoreClassOf(const std::wstring& path) {
   const std::wstring extension = GetExtension(path);
   if (IsEbnExtension(extension)) return &CLSID_QelShellExtVistaEbn;
   if (IsRawExtension(extension)) return &CLSID_QelShellExtVistaRaw;
-  // .ali and .rec are of the same format as .mrc, but the property system has no class for them.
+  // .ali and .rec have the format of .mrc, but no class is registered for them with the property system.
   return SameIgnoringCase(extension, L"mrc") ? &CLSID_QelShellExtVistaMrc : nullptr;
 }
 
@@ -223,7 +223,7 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
       answer.problem = NoAnswer(L"property store", result);
       return;
     }
-    // GetCount answers 0 by design, so the keys are asked for until there are no more.
+    // GetCount returns 0 by design, so the keys are requested until there are no more.
     PROPERTYKEY key{};
     for (DWORD index = 0; index < kMaxItems && store->GetAt(index, &key) == S_OK; ++index) {
       Property property;

@@ -19,10 +19,10 @@ namespace {
 
 using Com::ComPtr;
 
-/// The shell is still making the thumbnail.
+/// The shell's result while it is still making the thumbnail.
 constexpr auto kExtractionPending = static_cast<HRESULT>(0x8004B205);
 
-/// Rows of pixels from the top, each of four bytes: blue, green, red and one that says nothing.
+/// Rows of pixels from the top. A pixel has four bytes: blue, green, red and an unused one.
 struct Pixels {
   std::int32_t width = 0;
   std::int32_t height = 0;
@@ -36,7 +36,7 @@ HRESULT QueryFor(const ComPtr<Object>& object, const IID& iid, ComPtr<Interface>
   return object->QueryInterface(iid, reinterpret_cast<void**>(answer.Put()));
 }
 
-/// Empty on failure.
+/// Returns the pixels of a bitmap; an empty result on failure.
 Pixels PixelsOf(HBITMAP bitmap) {
   BITMAP facts{};
   if (GetObjectW(bitmap, sizeof facts, &facts) == 0) return {};
@@ -58,7 +58,7 @@ Pixels PixelsOf(HBITMAP bitmap) {
   return rows == pixels.height ? pixels : Pixels();
 }
 
-/// The pixels of a PNG file; empty on failure, and for no file.
+/// Returns the pixels of a PNG file; an empty result on failure, and if `png` is empty.
 Pixels PixelsOf(const std::vector<std::uint8_t>& png) {
   ComPtr<IStream> stream;
   *stream.Put() = SHCreateMemStream(png.data(), static_cast<UINT>(png.size()));
@@ -89,7 +89,7 @@ Pixels PixelsOf(const std::vector<std::uint8_t>& png) {
   return SUCCEEDED(result) ? pixels : Pixels();
 }
 
-/// Of two pictures of the same size, in the levels of a colour.
+/// Returns the largest difference, in levels of a colour channel, between two pictures of the same size.
 int LargestDifference(const Pixels& a, const Pixels& b) {
   int largest = 0;
   for (std::size_t i = 0; i < a.bytes.size(); ++i) {
@@ -102,7 +102,7 @@ std::wstring Shape(const Pixels& pixels) {
   return std::to_wstring(pixels.width) + L" x " + std::to_wstring(pixels.height) + L" pixels";
 }
 
-/// Whether the shell has shrunk a picture to the request, but for the rounding of a side.
+/// Returns whether `shown` is `own` reduced to the request, apart from the rounding of a side.
 bool IsReducedFrom(const Pixels& own, const Pixels& shown, std::int32_t size) {
   const std::int32_t longer = std::max(own.width, own.height);
   const auto isReduced = [&](std::int32_t ownSide, std::int32_t shownSide) {
@@ -125,12 +125,12 @@ ShellAnswer Compare(const Pixels& own, const Pixels& shown, std::int32_t size) {
           L"whose pixels differ by up to " + std::to_wstring(difference) + L" of 255 levels"};
 }
 
-/// Wine's shell gives the same picture of one pixel for every file.
+/// Returns whether this is Wine, whose shell gives the same picture of one pixel for every file.
 bool IsWine() {
   return GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "wine_get_version") != nullptr;
 }
 
-/// The thumbnail that the shell has or makes; no icon in its place.
+/// Gets the thumbnail that the shell has or makes, and no icon in its place. Returns the shell's failure.
 HRESULT GetThumbnail(IShellItemImageFactory& factory, std::int32_t size, HBITMAP& bitmap) {
   constexpr int kMostTries = 100;
   HRESULT result = E_PENDING;
@@ -184,7 +184,7 @@ ShellAnswer CompareProperties(const ComPtr<IShellItem2>& item, const ListAnswer<
                 : ShellAnswer{Agreement::kNothing, L"all values are empty"};
 }
 
-/// What the shell shows, to follow "shows".
+/// Returns what the shell shows, as the end of a sentence after "shows".
 std::wstring Phrase(const ShellAnswer& answer, const std::wstring& what) {
   switch (answer.agreement) {
     case Agreement::kSame: return L"the " + what + L" of QelShellExt";
@@ -204,7 +204,7 @@ bool IsInOrder(const ShellAnswer& answer) {
 
 ShellView RequestShellView(const ExtensionClient& client, const std::wstring& path, std::int32_t size) {
   if (IsWine()) return {};
-  // The extension first: where it ends the process, the shell is not asked.
+  // The extension is asked first. If it ends the process, the shell is not asked.
   const ThumbnailAnswer thumbnail = RequestThumbnail(client, path, size);
   const ListAnswer<Property> properties = RequestPropertyStore(client, path);
   ComPtr<IShellItem2> item;

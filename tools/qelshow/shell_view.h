@@ -1,4 +1,4 @@
-// What Windows itself shows of a file, compared with what the extension answers when it is asked directly.
+// Compares what Windows itself shows for a file with the direct answers of the extension.
 #pragma once
 
 #include <windows.h>
@@ -14,18 +14,18 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// How an answer of the shell compares with the extension's own.
+/// How an answer of the shell compares with the extension's.
 enum class Agreement : std::int32_t {
   kSame,
-  kReduced,  // the extension's picture exceeds the request, and the shell's has the shape to which it shrinks
+  kReduced,  // the extension's picture exceeds the request, and the shell's has its proportions
   kDiffers,
-  kNothing,    // the shell has no answer where the extension has one
-  kUnanswered  // the shell of this system answers no such questions
+  kNothing,    // the shell has no answer, but the extension has one
+  kUnanswered  // the shell of this system does not answer such questions
 };
 
 struct ShellAnswer {
   Agreement agreement = Agreement::kUnanswered;
-  std::wstring detail;  // what differs, or the code of the failure
+  std::wstring detail;  // the difference, or the code of the failure
 };
 
 struct ShellView {
@@ -36,19 +36,19 @@ struct ShellView {
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(ShellAnswer, agreement, detail)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(ShellView, thumbnail, properties)
 
-/// Asks the shell and the extension for the thumbnail of `size` by `size` pixels and for the properties of
-/// the property store. Runs in the worker process. `path` is absolute.
+/// Requests the thumbnail of `size` by `size` pixels and the properties of the property store from the shell
+/// and from the extension, and compares them. Runs in the worker process. `path` is absolute.
 ShellView RequestShellView(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
 
-/// Compares what the shell's item of a file answers with what the extension has answered.
+/// Compares the answers of the shell's item of a file with those of the extension.
 ShellView CompareWithShell(const Com::ComPtr<IShellItem2>& item, const ThumbnailAnswer& thumbnail,
                            const ListAnswer<Property>& properties);
 
-/// Whether the shell shows what it should, or cannot be asked.
+/// Returns whether the shell shows what it should, or does not answer.
 bool IsInOrder(const ShellView& view);
 
-/// Says in one sentence what the shell shows and, where that is not what the extension answers, the likely
-/// cause.
+/// Returns a sentence that says what the shell shows and, if that differs from the extension's answers, the
+/// likely cause.
 std::wstring ShellSentence(const ShellView& view, const std::wstring& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

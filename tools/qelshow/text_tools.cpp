@@ -59,7 +59,7 @@ std::wstring HexCode(std::uint32_t code) {
 
 namespace {
 
-/// What the system says about a code, without a full stop; empty if it knows nothing.
+/// Returns the system's text for a code, without a full stop; an empty string if it has none.
 std::wstring SystemMessage(DWORD code) {
   std::array<wchar_t, 512> text{};
   const DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,

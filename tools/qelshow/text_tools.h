@@ -1,4 +1,4 @@
-// Small texts: conversions to and from UTF-8, the way in which codes and identifiers are written, tables.
+// String helpers: conversions to and from UTF-8, the text of codes and identifiers, and tables.
 #pragma once
 
 #include <windows.h>
@@ -13,7 +13,7 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 std::string Utf8(std::wstring_view text);
 
-/// Bytes that are not UTF-8 become U+FFFD.
+/// Converts from UTF-8. Invalid bytes become U+FFFD.
 std::wstring Wide(std::string_view utf8);
 
 /// A text of a file, as far as its first zero byte: UTF-8, or else the code page of western Windows.
@@ -21,37 +21,37 @@ std::wstring TextOfFile(std::string_view bytes);
 
 std::wstring Lowered(std::wstring_view text);
 
-/// For instance 0x80004005.
+/// Returns for instance "0x80004005".
 std::wstring HexCode(std::uint32_t code);
 
-/// What this program or the system says about an HRESULT, without a full stop.
+/// Returns this program's or the system's text for an HRESULT, without a full stop.
 std::wstring ResultText(HRESULT result);
 
-/// What the system says about an error code of GetLastError, without a full stop.
+/// Returns the system's text for a code of GetLastError, without a full stop.
 std::wstring SystemErrorText(DWORD error);
 
-/// The same of an error of the standard library, which has numbers of its own for some.
+/// Returns the text for an error of the standard library, which has its own numbers for some errors.
 std::wstring SystemErrorText(const std::error_code& error);
 
-/// The code with which a process ended, and its meaning where it is a known fault.
+/// Returns the exit code of a process, with its meaning if it is a known fault.
 std::wstring ProcessEndText(DWORD exitCode);
 
-/// For instance {6444048F-4C8B-11D1-8B70-080036B11A03}.
+/// Returns for instance "{6444048F-4C8B-11D1-8B70-080036B11A03}".
 std::wstring GuidText(const GUID& guid);
 
-/// A class identifier in the spelling of GuidText; the text itself if it is none.
+/// Returns a class identifier in the spelling of GuidText; `text` itself if it is not an identifier.
 std::wstring SpelledGuid(const std::wstring& text);
 
-/// The full path of what `path` names.
+/// Returns the absolute path of `path`.
 std::wstring AbsolutePath(const std::wstring& path);
 
-/// The path of this program.
+/// Returns the path of this program.
 std::wstring OwnPath();
 
-/// `text` with blanks behind it, at least `width` characters in all.
+/// Returns `text`, padded with blanks at its end to at least `width` characters.
 std::wstring Padded(std::wstring_view text, std::size_t width);
 
-/// Rows of cells in columns as wide as their widest cell, each line indented.
+/// Returns a table of indented lines. Each column is as wide as its widest cell.
 std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

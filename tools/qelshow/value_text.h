@@ -1,4 +1,4 @@
-// Values as the extension delivers them.
+// Converts the values of the extension.
 #pragma once
 
 #include <windows.h>
@@ -13,14 +13,14 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// For instance "VT_UI4"; the number of a type that this program does not know.
+/// Returns for instance "VT_UI4"; for a type that this program does not know, its number.
 std::wstring TypeName(VARTYPE type);
 
-/// Returns nothing for VT_EMPTY and for a type that this program does not know.
+/// Returns the value; nothing for VT_EMPTY and for a type that this program does not know.
 Value ValueOf(const PROPVARIANT& value);
 Value ValueOf(const VARIANT& value);
 
-/// The number in decimal, with an exponent only if that is shorter, the text, or an empty text.
+/// Returns the number in decimal, with an exponent only if that is shorter; the string; or an empty string.
 std::wstring ValueText(const Value& value);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -31,7 +31,7 @@ bool ReadAll(HANDLE pipe, void* bytes, std::size_t size) {
   return true;
 }
 
-/// A message is preceded by its length.
+/// Sends the length of a message, then the message. Returns whether it has been sent.
 bool Send(HANDLE pipe, const Json& message) {
   const std::vector<std::uint8_t> bytes = Json::to_cbor(message);
   const std::uint64_t size = bytes.size();
@@ -62,13 +62,13 @@ Json AnswerTo(const Question& question, ExtensionClient& client) {
   return {};
 }
 
-/// Ends the process at once and without a dialog; the parent process reads the code and reports it.
+/// Ends the process at once and without a dialog. The parent process reports the exit code.
 LONG WINAPI EndProcess(EXCEPTION_POINTERS* fault) {
   TerminateProcess(GetCurrentProcess(), fault->ExceptionRecord->ExceptionCode);
   return EXCEPTION_EXECUTE_HANDLER;
 }
 
-/// A pipe of which the child process inherits one end.
+/// Makes a pipe of which the child process inherits the end that is not `kept`. Returns whether it could.
 bool MakePipe(OwnedHandle& readEnd, OwnedHandle& writeEnd, const OwnedHandle& kept) {
   SECURITY_ATTRIBUTES inheritable = {sizeof inheritable, nullptr, TRUE};
   return CreatePipe(readEnd.Put(), writeEnd.Put(), &inheritable, 0) &&
@@ -82,7 +82,7 @@ int RunWorker() {
   SetUnhandledExceptionFilter(&EndProcess);
   const HANDLE input = GetStdHandle(STD_INPUT_HANDLE);
   const HANDLE output = GetStdHandle(STD_OUTPUT_HANDLE);
-  // The shell asks from a single-threaded apartment.
+  // The shell uses the extension in a single-threaded apartment.
   if (FAILED(CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED))) return 1;
 
   ExtensionClient client;

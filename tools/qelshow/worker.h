@@ -1,9 +1,9 @@
 // The process in which the extension runs.
 //
-// Some requests end the process that makes them by design (a colour picture smaller than the request divides
-// by zero), and any file may show a fault that nobody knows yet. So the program asks from a second process,
-// which is the same program started again: when that one ends, the file at hand is reported and the next
-// question gets a new process. The extension is never loaded into the first one.
+// Some requests end their process by design (a colour frame smaller than the request causes a division by
+// zero), and any file may reveal an unknown fault. So the program runs the extension in a second process,
+// which is the same program started again. If that process ends, its file is reported, and a new process
+// answers the next question. The first process never loads the extension.
 #pragma once
 
 #include <windows.h>
@@ -18,20 +18,21 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// The argument with which the program starts itself as a worker; not for users.
+/// The argument that makes the program a worker process. It is not for users.
 inline constexpr const wchar_t* kWorkerArgument = L"--worker";
 
-/// The main function of the worker process: answers questions from standard input until it is closed.
+/// Runs the worker process: answers questions from standard input until it is closed. Returns the exit
+/// status.
 int RunWorker();
 
 class Worker {
  public:
   /// Starts a process that loads the DLL at `dllPath`, or the registered one if that is empty. Throws Failure
-  /// if the process cannot start or the DLL does not load.
+  /// if the process cannot start or the DLL cannot be loaded.
   explicit Worker(std::wstring dllPath) : dllPath_(std::move(dllPath)) { Start(); }
 
-  /// Fills `answer`, or answers the code with which the process ended instead; then a new process has been
-  /// started for the next question.
+  /// Fills `answer` and returns nothing. If the process ends instead, returns its exit code and starts a new
+  /// process for the next question.
   template <class Answer>
   std::optional<DWORD> Ask(const Question& question, Answer& answer) {
     Json reply;
@@ -48,7 +49,7 @@ class Worker {
 
   std::optional<DWORD> Transmit(const Question& question, Json& reply);
 
-  /// Waits for the end of the process, whose pipes are broken, and answers its exit code.
+  /// Waits for the end of the process, whose pipes are broken. Returns its exit code.
   DWORD Finish();
 
   std::wstring dllPath_;
