@@ -108,7 +108,7 @@ TEST(Ebn, HugeFramesHaveNoThumbnail) {
   }
 }
 
-TEST(Ebn, PictureWhosePixelsWrapHasNoThumbnailThoughItsBytesAreThere) {
+TEST(Ebn, FrameWhosePixelCountWrapsHasNoThumbnailAlthoughItsBytesExist) {
   EbnFile file;
   file.width = 0x10000;
   file.height = 0x10001;
@@ -139,9 +139,8 @@ TEST(EbnComment, AlwaysHasTheVoltage) {
   EXPECT_EQ(CommentOf({}), L" 0.0 kV");
 }
 
-/// Returns what the comment has before the voltage when `field` holds `stored`. A code n is stored as n, a
-/// code -n as
-/// -(n + 0.5) or a little less.
+/// Returns what the comment has before the voltage when `field` holds `stored`. A code n is stored as n; a
+/// code -n is stored as -(n + 0.5) or a little less.
 std::wstring TextOf(double EbnFile::* field, double stored) {
   EbnFile file;
   file.*field = stored;

@@ -34,7 +34,7 @@ TEST(EmiObjectPath, OtherIndexesCountFromTheOutermostItem) {
   EXPECT_EQ(path.At(2), kInner);
 }
 
-TEST(EmiObjectPath, AnIndexOutsideIsAnInvalidArgument) {
+TEST(EmiObjectPath, AnIndexOutsideThePathIsAnInvalidArgument) {
   constexpr auto kMin = std::numeric_limits<std::ptrdiff_t>::min();
   constexpr auto kMax = std::numeric_limits<std::ptrdiff_t>::max();
   const EmiObjectPath path = ThreeItems();
@@ -50,7 +50,7 @@ TEST(EmiObjectPath, AnIndexOutsideIsAnInvalidArgument) {
   EXPECT_THROW(EmiObjectPath().At(-1), std::invalid_argument);
 }
 
-TEST(EmiObjectPath, FollowsWhatIsOpenedAndClosed) {
+TEST(EmiObjectPath, FollowsOpenedAndClosedItems) {
   EmiObjectPath path = ThreeItems();
   path.CloseInnermost();
   EXPECT_EQ(path.At(-1), kMiddle);

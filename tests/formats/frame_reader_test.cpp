@@ -294,8 +294,8 @@ TEST(FrameReader, BandsAreReadInTheOrderOfTheFile) {
   }
 }
 
-TEST(FrameReader, RowsThatOverlapAreReadOneByOneUpToEightTimesTheBlock) {
-  // Each row spans nearly as much as a band, and begins an eighth of it after the one above.
+TEST(FrameReader, OverlappingRowsAreReadOneByOneUpToEightTimesTheBlock) {
+  // Each row is nearly as long as a band, and begins an eighth of a band after the row above.
   FrameLayout layout = LayoutOfSteps(kUInt8, {250'000, 250}, 1, 31'000);
   EXPECT_EQ(CostOf(layout, {1000, 1}).bytesRead, 250 * 250'000);
   layout = LayoutOfSteps(kUInt8, {250'000, 250}, 1, 30'000);
@@ -304,19 +304,19 @@ TEST(FrameReader, RowsThatOverlapAreReadOneByOneUpToEightTimesTheBlock) {
   EXPECT_LT(cost.bytesRead, 50'000'000);
 }
 
-TEST(FrameReader, PixelsFurtherApartThanAShortReadTakesAreReadOneByOne) {
-  // As many pixels as fit are eight by eight, and one pixel for every 4091 bytes.
+TEST(FrameReader, PixelsFartherApartThanAShortReadAreReadOneByOne) {
+  // Eight by eight pixels fit into the band, which is one pixel for every 4091 bytes.
   Cost cost = CostOf(InterleavedLayout(kUInt8, 512, 18'700), {512, 512});
   EXPECT_EQ(cost.reads, 64 * 64);
   EXPECT_EQ(cost.bytesRead, 64 * 64 * (14 * 18'700 + 1));
-  // Eight by four, and one for every 6250 bytes.
+  // Only eight by four pixels fit, which is one pixel for every 6250 bytes.
   cost = CostOf(InterleavedLayout(kUInt8, 512, 20'000), {512, 512});
   EXPECT_EQ(cost.reads, 512 * 512);
   EXPECT_EQ(cost.bytesRead, 512 * 512);
 }
 
 TEST(FrameReader, ReadsOfScatteredPixelsAreLimited) {
-  // A read of one pixel counts as 4 KiB, and 16 GiB are the limit.
+  // The limit is 16 GiB, and a read of one pixel counts as 4 KiB.
   FrameLayout layout = LayoutOfSteps(kUInt8, {2048, 2048}, 20'000, 20'000);
   EXPECT_EQ(CostOf(layout, {2048, 2048}).reads, 2048 * 2048);
   layout = LayoutOfSteps(kUInt8, {2048, 2560}, 20'000, 20'000);
@@ -431,7 +431,7 @@ TEST(FrameReader, ANegativePositionFailsTheStream) {
   }
 }
 
-TEST(FrameReader, PixelsThatShareTheirBytesAreShown) {
+TEST(FrameReader, OverlappingPixelsAreShown) {
   Random random(6);
   CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {512, 512}, 1, 511), 256, 256);
   CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {1024, 1024}, 1, 0), 96, 96);
@@ -439,7 +439,7 @@ TEST(FrameReader, PixelsThatShareTheirBytesAreShown) {
   CompareWithTheNaivePicture(random, LayoutOfSteps(kUInt8, {4000, 3000}, 1, 1), 256, 256);
 }
 
-TEST(FrameReader, APictureMayHaveSixtyFourMebipixelsMoreThanBytes) {
+TEST(FrameReader, AFrameMayHaveSixtyFourMebipixelsMoreThanBytes) {
   FrameLayout layout{.type = kUInt8, .size = {8192, 8193}, .blockPosition = 0, .blockBytes = 8192};
   EXPECT_TRUE(CostOf(layout, {96, 96}).shown);
   --layout.blockBytes;

@@ -12,7 +12,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// For the messages of failed tests.
+/// Prints a fact in the message of a failed test.
 void PrintTo(const HeaderFact& fact, std::ostream* stream) {
   *stream << fact.name << " = ";
   std::visit([stream](const auto& value) { *stream << value; }, fact.value);
@@ -30,7 +30,7 @@ Facts FactsOf(const std::string& bytes, const std::wstring& extension) {
   return HeaderFacts(stream, extension);
 }
 
-/// Expects no facts of a file that is cut to any length below `headerBytes`.
+/// Expects no facts of a file that is truncated to any length below `headerBytes`.
 void ExpectNoneOfAShorterHeader(const std::string& bytes, std::size_t headerBytes,
                                 const std::wstring& extension) {
   for (std::size_t length = 0; length < headerBytes; ++length) {

@@ -299,11 +299,11 @@ TEST(MrcThumbnail, SectionFarIntoAStackCostsNoMoreThanTheFirst) {
 
 TEST(MrcThumbnail, SectionFrom2GiBOnIsNotReached) {
   EXPECT_EQ(SparseStack(2 * 0x7FFF).Thumbnail().width, 256);  // begins 64 KiB before 2 GiB
-  SparseStack behind(2 * 0x8000);                             // begins at 2 GiB, which is negative in 32 bits
-  EXPECT_TRUE(behind.reader.IsValid());
-  EXPECT_EQ(behind.Thumbnail().width, 0);
-  EXPECT_TRUE(behind.stream.fail());
-  EXPECT_EQ(behind.buffer.bytesRead, 1024);
+  SparseStack beyond(2 * 0x8000);                             // begins at 2 GiB, which is negative in 32 bits
+  EXPECT_TRUE(beyond.reader.IsValid());
+  EXPECT_EQ(beyond.Thumbnail().width, 0);
+  EXPECT_TRUE(beyond.stream.fail());
+  EXPECT_EQ(beyond.buffer.bytesRead, 1024);
 }
 
 TEST(MrcThumbnail, PositionOfASectionWrapsAt32Bits) {
@@ -318,7 +318,7 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
     const MrcFile file{.nx = nx, .ny = ny, .mode = mode, .pixels = std::string(256, 'x')};
     const OpenMrc mrc(file);
     const int result = mrc.Thumbnail({256, 256}).width;
-    EXPECT_EQ(mrc->IsValid(), result > 0);  // as after any picture that is not there
+    EXPECT_EQ(mrc->IsValid(), result > 0);  // as after any missing picture
     return result;
   };
   EXPECT_EQ(width(0, 1, 256), 1);
@@ -326,7 +326,7 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
   EXPECT_EQ(width(2, 0x1000001, 64), 0);   // 2^30 + 64 pixels, 2^32 + 256 bytes
 }
 
-TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneThoughItsBytesAreThere) {
+TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneAlthoughItsBytesExist) {
   const std::string head = MrcFile{.nx = 0x1000001, .ny = 256}.Bytes();
   Testing::MemoryBuffer buffer(head);
   buffer.trailingZeros = std::int64_t{6} << 30;
@@ -365,7 +365,7 @@ TEST(MrcThumbnail, HugeSectionsHaveNone) {
 }
 
 TEST(MrcThumbnail, SectionsWhoseBytesExceed64BitsHaveNone) {
-  // Only a swapped header can have both sizes this large.
+  // Both edges can be this large only in a swapped header.
   const MrcFile file{.nx = kMax, .ny = kMax, .mode = 4, .order = ByteOrder::kBigEndian, .pixels = "x"};
   EXPECT_TRUE(IsValid(file));
   EXPECT_EQ(OpenMrc(file).Thumbnail({256, 256}).width, 0);

@@ -122,7 +122,7 @@ TEST(Raw, AcceptsAnySize) {
   }
 }
 
-TEST(Raw, AColourPictureWithoutPixelsIsNoFault) {
+TEST(Raw, AColourFrameWithoutPixelsIsNoFault) {
   for (const DataType type : {DataType::kRgb24, DataType::kBgr24}) {
     for (const Size2 size : {Size2{0, 0}, Size2{0, 2}, Size2{2, 0}, Size2{-2, 2}, Size2{-2, -2}}) {
       RawFile file = PackedRawFile(type, 2, 2, std::string(12, 'x'));
@@ -196,20 +196,20 @@ TEST(Raw, PixelBeforeTheBlockCannotBeRead) {
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 0);
 }
 
-TEST(Raw, PixelsThatAreNotThereFailTheFile) {
+TEST(Raw, MissingPixelsFailTheFile) {
   const auto isValidAfterwards = [](const RawFile& file) {
     const OpenRaw raw(file);
     EXPECT_EQ(raw.Thumbnail(kWholeSize).width, 0);
     return raw->IsValid();
   };
   RawFile file = PackedRawFile(DataType::kUInt8, 2, 2, "0123");
-  file.offset = -1;  // in front of the block
+  file.offset = -1;  // before the block
   EXPECT_FALSE(isValidAfterwards(file));
-  file.offset = 1;  // behind the file
+  file.offset = 1;  // beyond the file
   EXPECT_FALSE(isValidAfterwards(file));
   file.offset = 0;
   file.pixelStride = file.rowStride = 0;
-  file.width = file.height = 10'000;  // too many for four bytes
+  file.width = file.height = 10'000;  // too many pixels for four bytes
   EXPECT_FALSE(isValidAfterwards(file));
 }
 
@@ -221,18 +221,18 @@ TEST(Raw, ExtentThatWrapsCannotBeRead) {
   EXPECT_EQ(OpenRaw(file).Thumbnail({0x10001, 1}).width, 0);
 }
 
-TEST(Raw, ExtentThatWrapsCannotBeReadThoughItsBytesAreThere) {
+TEST(Raw, ExtentThatWrapsCannotBeReadAlthoughItsBytesExist) {
   struct Row {
     std::int32_t width, height, offset, pixelStride, rowStride;
   };
   constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
   constexpr Row kRows[] = {
-      {0x10001, 1, 0, 0x10000, 0},        // across a row
-      {1, 0x10001, 0, 0, 0x10000},        // down a column
-      {2, 1, 0x40000000, 0x40000000, 0},  // with the offset
+      {0x10001, 1, 0, 0x10000, 0},        // wraps along a row
+      {1, 0x10001, 0, 0, 0x10000},        // wraps along a column
+      {2, 1, 0x40000000, 0x40000000, 0},  // wraps with the offset
       {1, 2, 0x40000000, 0, 0x40000000},  //
-      {2, 2, 0, 0x40000000, 0x40000000},  // both ways
-      {1, 1, kMax, 0, 0},                 // with the bytes of the pixel
+      {2, 2, 0, 0x40000000, 0x40000000},  // wraps with both strides
+      {1, 1, kMax, 0, 0},                 // wraps with the bytes of the pixel
   };
   for (const Row& row : kRows) {
     RawFile file = PackedRawFile(DataType::kUInt8, row.width, row.height, "");

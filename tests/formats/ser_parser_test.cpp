@@ -131,7 +131,7 @@ TEST(Ser, RejectsUnknownKindsOfDataAndTags) {
 }
 
 TEST(Ser, AnUnknownKindOfTagsIsAFaultOfTheStreamAlone) {
-  // What the elements are is known by then.
+  // The kind of the elements is known before the kind of the tags is checked.
   SerFile file = OneImage();
   file.tagTypeId = 0x4143;
   OpenSer tags(file);
@@ -321,8 +321,8 @@ TEST(Ser, MissingElementsFailTheFile) {
   }
 }
 
-/// A series of 2000 elements whose offsets, all 0, begin just below 4 GiB. The header is an element too. What
-/// lies a little after it is no offset and no element.
+/// The offsets of this series of 2000 elements begin just below 4 GiB. All are 0, so the header also serves
+/// as the element. The bytes shortly after the header are neither an offset nor an element.
 TEST(Ser, OffsetArraysCanPass4GiB) {
   constexpr std::uint32_t kArrays = 0xFFFFFFF0;
   constexpr std::uint32_t kCount = 2000;

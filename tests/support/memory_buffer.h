@@ -27,7 +27,7 @@ class MemoryBuffer : public std::streambuf {
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
   std::int64_t largestRead = 0;
-  std::int64_t readsBackward = 0;  // those that begin before the end of the read before them
+  std::int64_t readsBackward = 0;  // the reads that begin before the end of the previous read
 
  protected:
   std::streamsize xsgetn(char* target, std::streamsize count) override {

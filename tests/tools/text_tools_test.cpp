@@ -1,4 +1,4 @@
-// Texts that come out of files.
+// Tests the conversion of strings that files contain.
 #include "text_tools.h"
 
 #include <gtest/gtest.h>

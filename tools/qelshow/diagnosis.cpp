@@ -19,7 +19,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-/// A number that JSON does not have is a text.
+/// Returns the number, or its text if JSON cannot represent it.
 Value RecordValue(double number) {
   if (std::isfinite(number)) return number;
   return ValueText(number);

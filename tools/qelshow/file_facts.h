@@ -108,7 +108,7 @@ struct FileFacts {
   OptionalText remark;   // one more sentence about a file, good or not
   OptionalText shell;    // one sentence on what Windows itself shows, if it was asked
 
-  // From the property sets and the tip; 0 or empty where they are missing.
+  // From the property sets and the tip; 0 or empty if they are missing.
   std::int32_t width = 0;
   std::int32_t height = 0;
   std::int32_t frames = 0;

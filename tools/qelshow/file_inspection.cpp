@@ -39,7 +39,7 @@ void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar
   }
 }
 
-/// Returns the value of a property, 0 without one.
+/// Returns the value of a property, or 0 if it is missing.
 std::int32_t Number(const ListAnswer<Property>& properties, std::uint32_t id) {
   const auto property = std::ranges::find(properties.items, id, &Property::id);
   const auto* const number =

@@ -46,7 +46,7 @@ void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
             });
 }
 
-/// Returns what both folders begin with, up to a backslash. Letters in small and capitals are the same.
+/// Returns the common beginning of both folders, up to and including a backslash. Ignores case.
 std::wstring SharedFolder(const std::wstring& a, const std::wstring& b) {
   std::size_t length = 0;
   for (std::size_t i = 0; i < std::min(a.size(), b.size()); ++i) {
@@ -56,8 +56,8 @@ std::wstring SharedFolder(const std::wstring& a, const std::wstring& b) {
   return a.substr(0, length);
 }
 
-/// Returns the full path of the folder that holds all of these files and folders, with a backslash at its
-/// end.
+/// Returns the absolute path of the deepest folder that contains all of these files and folders, with a
+/// backslash at its end; an empty string if there is none.
 std::wstring FolderOfAll(const std::vector<std::wstring>& paths) {
   std::optional<std::wstring> shared;
   for (const std::wstring& path : paths) {
@@ -128,7 +128,7 @@ FileList ListFiles(const std::vector<std::wstring>& paths) {
   if (std::ranges::none_of(files, canBeShown)) NothingToShow(paths);
   std::wstring folder = FolderOfAll(paths);
   for (ListedFile& file : files) file.name = AbsolutePath(file.path).substr(folder.size());
-  if (folder.size() > 3) folder.pop_back();  // not of C:\, which names another folder without
+  if (folder.size() > 3) folder.pop_back();  // C:\ keeps its backslash, because C: is another folder
   return {std::move(folder), std::move(files)};
 }
 

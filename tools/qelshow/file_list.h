@@ -13,8 +13,9 @@ struct ListedFile {
 };
 
 struct FileList {
-  std::wstring folder;  // absolute path of the deepest folder that contains all files; empty if they are on
-                        // several drives
+  /// The absolute path of the deepest folder that contains all files; empty if they are on several drives.
+  std::wstring folder;
+
   std::vector<ListedFile> files;
 };
 

@@ -19,9 +19,9 @@ bool FileExists(const std::wstring& path) {
   return !path.empty() && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES;
 }
 
-/// Returns the command that registers the extension: the registered DLL, or else the one beside this program.
-/// If Windows Installer has installed the extension, it must also repair it: regsvr32 would register the
-/// kinds that were left out too, and the installer would not remove those.
+/// Returns the command that registers the extension, with the registered DLL or else with the one beside this
+/// program. If Windows Installer has installed the extension, it must also repair it: regsvr32 would register
+/// the kinds that were left out too, and the installer would not remove those.
 std::wstring RegisterAdvice(const std::wstring& registeredDll) {
   const std::wstring product = InstalledProduct();
   if (!product.empty()) return L"run msiexec /i " + product + L" REINSTALL=ALL as administrator";

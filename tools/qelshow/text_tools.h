@@ -16,7 +16,8 @@ std::string Utf8(std::wstring_view text);
 /// Converts from UTF-8. Invalid bytes become U+FFFD.
 std::wstring Wide(std::string_view utf8);
 
-/// A text of a file, as far as its first zero byte: UTF-8, or else the code page of western Windows.
+/// Converts a string of a file, up to its first zero byte, from UTF-8 if it is valid, and from code page 1252
+/// otherwise.
 std::wstring TextOfFile(std::string_view bytes);
 
 std::wstring Lowered(std::wstring_view text);

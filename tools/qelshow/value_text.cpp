@@ -11,7 +11,7 @@ std::wstring TextOrEmpty(const wchar_t* text) {
   return text == nullptr ? std::wstring() : std::wstring(text);
 }
 
-/// The shortest text that is read as the same number.
+/// Returns the shortest text that reads back as the same number.
 std::wstring ShortestText(double number) {
   std::array<char, 32> text;
   const auto end = std::to_chars(text.data(), text.data() + text.size(), number);
