@@ -76,7 +76,7 @@ class Tab:
         return self._driver.get_screenshot_as_png()
 
     def load(self, path):
-        """Runs a JavaScript file in the page, past the page's security policy."""
+        """Runs a JavaScript file in the page, even if the page's security policy forbids scripts."""
         self._driver.execute_script(path.read_text("utf-8"))
 
     def press(self, *keys):

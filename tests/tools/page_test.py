@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Opens pages that qelshow writes in a browser and uses them as a reader does, with the keyboard alone.
+"""Opens the pages that qelshow writes in a browser, and uses them as a reader does, with the keyboard only.
 
 usage: page_test.py EMULATOR QELSHOW SAMPLES_PROGRAM SERVER [unittest arguments]
 """
@@ -30,15 +30,15 @@ SEEN = "[...document.querySelectorAll('.cards .name')].map(name => name.textCont
 FOCUSED = "document.activeElement.querySelector?.('.name')?.textContent ?? document.activeElement.tagName"
 PRESSED = "[...document.querySelectorAll('.kinds [aria-pressed=true]')].map(button => button.firstChild.data)"
 COUNT = "document.querySelector('.count').textContent"
-DATA = re.compile(r'(?<=application/json">)(.*?)(?=</script>)', re.DOTALL)  # in the page's text
+DATA = re.compile(r'(?<=application/json">)(.*?)(?=</script>)', re.DOTALL)  # the data in the page's source
 DIALOG = "document.querySelector('dialog')"
 DIALOG_NAME = DIALOG + ".open && " + DIALOG + ".querySelector('h2').textContent"
 
-# The facts of the dialog as pairs of name and text.
+# The facts in the dialog, as pairs of name and text.
 FACTS = "[...document.querySelectorAll('dt')].map(name => [name.innerText, name.nextElementSibling.innerText])"
 
-# The words of a page that are parted by the end of a line although a line could hold them. A line may end at a blank,
-# after a hyphen and after the backslash of a path. In a table no word is parted, however long it is.
+# The words of a page that a line break divides although a whole line could hold them. A line may break at a blank,
+# after a hyphen and after the backslash of a path. In a table no word may be divided, however long it is.
 BROKEN_WORDS = r"""(() => {
   const broken = [];
   const context = document.createElement('canvas').getContext('2d');
@@ -61,14 +61,16 @@ BROKEN_WORDS = r"""(() => {
   return broken;
 })()"""
 
-# Where the focus is, from the lower edge of the bar (or the upper one of the window) to the lower one of the window.
+# Whether the focused element is entirely visible, between the lower edge of the bar, or the upper edge of the window,
+# and the lower edge of the window.
 IN_SIGHT = """(() => {
   const box = document.activeElement.getBoundingClientRect();
   const top = Math.max(0, document.querySelector('.bar').getBoundingClientRect().bottom);
   return box.height > 0 && box.top >= top && box.bottom <= innerHeight;
 })()"""
 
-# What axe-core finds, and whose contrast it cannot tell. It does not judge signs that are not letters.
+# The problems that axe-core finds, and the texts whose contrast it cannot determine, except symbols that are not
+# letters, which it never judges.
 FINDINGS = """axe.run().then(({violations, incomplete, passes}) => {
   const list = (results) => results.flatMap(({id, nodes}) =>
       nodes.map(({html, any}) => [id, html.slice(0, 120), any[0]?.message, any[0]?.data?.messageKey]));
@@ -79,7 +81,7 @@ FINDINGS = """axe.run().then(({violations, incomplete, passes}) => {
   };
 })"""
 
-# The contrast of the edge of each control that has text or takes it, to what is around it.
+# The contrast between the edge of each control that shows or accepts text and the background of the page.
 EDGES = """[...document.querySelectorAll('input, select, .bar button')].map(control => {
   const light = (colour) => {
     const [r, g, b] = colour.match(/[\\d.]+/g).map(value => value / 255)
@@ -93,7 +95,7 @@ EDGES = """[...document.querySelectorAll('input, select, .bar button')].map(cont
 
 
 def comment_of(file):
-    """The comment among the columns of a file."""
+    """Returns the comment from the columns of a file."""
     return next((column["value"] or "" for column in file["columns"]["items"]
                  if column["set"].startswith("{F29F85E0") and column["id"] == 6), "")
 
@@ -133,7 +135,7 @@ class PageTest(unittest.TestCase):
         return tab
 
     def assertBecomes(self, tab, expression, expected):
-        """What a key brings about may come a little after the key."""
+        """Waits until the expression has this value. The effect of a key may come a little later."""
         wanted = json.dumps(expected)
         tab.run("""new Promise(done => {
             const giveUp = Date.now() + 60000;
@@ -144,7 +146,7 @@ class PageTest(unittest.TestCase):
         self.assertEqual(tab.run(expression), expected, expression)
 
     def tab_to(self, tab, selector):
-        """Moves the focus with the tab key to what the selector names."""
+        """Moves the focus with the tab key to the element that the selector matches."""
         for _ in range(60):
             if tab.run(f"document.activeElement.matches({json.dumps(selector)})"):
                 return
@@ -155,20 +157,20 @@ class PageTest(unittest.TestCase):
         tab.run(f"show(files.find(file => file.name === {json.dumps(name)}))")
 
     def assertQuiet(self, tab):
-        """No complaint, and nothing asked for but the page and its pictures."""
+        """Checks that the page had no errors and requested nothing except itself and its pictures."""
         self.assertEqual(tab.complaints, [])
         for url in tab.requests:
             self.assertRegex(url, "^(data:|" + re.escape(self.folder.as_uri()) + "/)")
 
     def edited(self, name, **members):
-        """The page with other facts, as a file of this name."""
+        """Writes the page with other facts to a file of this name. Returns its path."""
         data = json.dumps(self.document | members).replace("<", "\\u003c")
         page = self.page.with_name(name)
         page.write_text(DATA.sub(lambda _: data, self.page.read_text("utf-8"), count=1), "utf-8")
         return page
 
     def many(self, count):
-        """The page with `count` files: its own files over and over, under other names and with other pictures."""
+        """Makes a page of `count` files by repeating the samples with other names and pictures. Returns its path."""
         files = []
         for i, own in zip(range(count), itertools.cycle(self.files.values())):
             picture = own["thumbnail"]["picture"]
@@ -179,8 +181,8 @@ class PageTest(unittest.TestCase):
 
 
 class Page(PageTest):
-    def test_shows_every_picture_and_asks_no_network(self):
-        tab = self.open(height=6000)  # high enough for all pictures to be in sight
+    def test_shows_every_picture_and_needs_no_network(self):
+        tab = self.open(height=6000)  # high enough to show all pictures
         tab.run("Promise.all([...document.images].map(image => image.decode()))")
         self.assertEqual(sorted(tab.run(SEEN)), sorted(pathlib.PureWindowsPath(name).name for name in self.names))
         facts = tab.run("[...document.images].map(image => [image.naturalWidth, image.naturalHeight, image.alt])")
@@ -226,7 +228,7 @@ class Page(PageTest):
                     self.assertEqual(tab.run(BROKEN_WORDS), [], name)
                     self.assertGreater(tab.run("document.querySelectorAll('dialog td').length"), 10)
 
-    def test_is_searched_with_the_keyboard(self):
+    def test_can_be_searched_with_the_keyboard(self):
         tab = self.open()
         tab.press("/")
         tab.type("TrUnC")
@@ -238,7 +240,7 @@ class Page(PageTest):
         self.assertBecomes(tab, NAMES + ".length", len(self.names))
         self.assertQuiet(tab)
 
-    def test_is_searched_by_comment_pixel_type_and_folder(self):
+    def test_can_be_searched_by_comment_pixel_type_and_folder(self):
         tab = self.open()
         tab.press("/")
         for text, matches in (
@@ -281,7 +283,7 @@ class Page(PageTest):
         choose("no thumbnail", "Enter", ["all kinds"], self.names)
         self.assertQuiet(tab)
 
-    def test_is_sorted_with_the_keyboard_in_both_directions(self):
+    def test_can_be_sorted_with_the_keyboard_in_both_directions(self):
         tab = self.open()
         names = tab.run("files.map(file => file.name)")
         self.assertEqual(names, sorted(names))
@@ -298,7 +300,7 @@ class Page(PageTest):
                 tab.press("ArrowDown")
             for label in (first, second):
                 self.assertBecomes(tab, "[order.value, direction.textContent.slice(2)]", [order, label])
-                # Equal ones keep the order of their names, and those without a value come last.
+                # Files with equal values keep the order of their names. Files without a value come last.
                 known = [name for name in names if key(self.files[name]) is not None]
                 known.sort(key=lambda name: key(self.files[name]),
                            reverse=label in ("Z to A", "largest first", "most first", "newest first"))
@@ -307,7 +309,7 @@ class Page(PageTest):
         self.assertEqual(len({file["modified"] for file in self.files.values()}), len(names))
         self.assertQuiet(tab)
 
-    def test_tells_files_of_the_same_name_apart(self):
+    def test_distinguishes_files_of_the_same_name(self):
         tab = self.open()
         tab.press("/")
         tab.type("atlas.mrc")
@@ -321,7 +323,7 @@ class Page(PageTest):
             self.assertBecomes(tab, f"Object.fromEntries({FACTS}).Path.includes({json.dumps(part)})", True)
         self.assertQuiet(tab)
 
-    def test_keeps_the_focus_in_sight(self):
+    def test_keeps_the_focus_visible(self):
         for width, height in ((1200, 900), (1000, 704), (640, 704), (900, 520), (360, 640)):
             with self.subTest(width=width, height=height):
                 tab = self.open(self.many(200), width=width, height=height)
@@ -331,7 +333,7 @@ class Page(PageTest):
                     for _ in range(times):
                         tab.press(key)
                         self.assertBecomes(tab, IN_SIGHT, True)
-                # The tab key comes to a card that was left above or below.
+                # The tab key returns to a card that has been scrolled out of the window.
                 tab.press("Tab")
                 tab.run("scrollTo(0, document.documentElement.scrollHeight)")
                 tab.press("Shift+Tab")
@@ -368,7 +370,7 @@ class Page(PageTest):
         self.assertEqual(tab.run("document.querySelector('dialog time').dateTime"), file["modified"])
         self.assertRegex(facts["Date modified"], r"^March \d+, 2021 at \d+:\d\d\s[AP]M$")
         self.assertTrue(facts["Path"].startswith(file["path"]))
-        # Above the developers' tables, which are folded.
+        # They are above the developers' tables, which are closed.
         above = "document.querySelector('dialog details').getBoundingClientRect().top"
         self.assertLess(tab.run("Math.max(...[...document.querySelectorAll('dd')].map(fact => fact.getBoundingClientRect().bottom))"),
                         tab.run(above))
@@ -438,7 +440,7 @@ class Page(PageTest):
         tab.press("Enter")
         self.assertBecomes(tab, DIALOG_NAME, "truncated.mrc")
         self.assertEqual((tab.run(disabled), tab.run(position)), ([False, True], "2 of 2"))
-        # The keys still belong to the dialog.
+        # The dialog still receives the keys.
         self.assertTrue(tab.run(DIALOG + ".contains(document.activeElement)"))
         tab.press("ArrowRight", "ArrowLeft")
         self.assertBecomes(tab, DIALOG_NAME, "truncated.ebn")
@@ -475,7 +477,7 @@ class Page(PageTest):
         self.assertBecomes(tab, FOCUSED, names[1])
         self.assertQuiet(tab)
 
-    def test_takes_names_and_texts_as_text(self):
+    def test_shows_names_and_strings_as_plain_text(self):
         text = self.page.read_text("utf-8")
         bad = "<img src=x onerror='document.title=1'>"
         page = self.page.with_name("bad.html")
@@ -490,7 +492,7 @@ class Page(PageTest):
 
 class Accessibility(PageTest):
     def assertAccessible(self, tab, least_contrasts):
-        """Nothing that axe-core objects to, and no text whose contrast it cannot tell."""
+        """Checks that axe-core finds no problem and can determine the contrast of all text."""
         tab.load(AXE)
         findings = tab.run(FINDINGS)
         self.assertEqual(findings["problems"], [])
@@ -515,7 +517,7 @@ class Accessibility(PageTest):
             for name in ("exposure.ebn", "truncated.mrc", "damaged.emi"):
                 with self.subTest(dark=dark, width=width, name=name):
                     self.show(tab, name)
-                    if width > 1000:  # where nothing of the tables is scrolled out of sight
+                    if width > 1000:  # wide enough to show the tables without scrolling
                         tab.run("document.querySelectorAll('details').forEach(section => { section.open = true; })")
                     self.assertAccessible(tab, 15)
 
@@ -529,7 +531,7 @@ class Accessibility(PageTest):
 class ManyFiles(PageTest):
     FILES = 2000
 
-    def test_take_time_only_for_the_cards_in_sight(self):
+    def test_cost_time_only_for_the_visible_cards(self):
         tab = self.open(self.many(self.FILES))
         self.assertEqual(tab.run(SEEN + ".length"), self.FILES)
         in_sight = """[...document.images].filter(image => image.checkVisibility({contentVisibilityAuto: true})
@@ -538,15 +540,15 @@ class ManyFiles(PageTest):
                            + ".every(image => image.complete && image.naturalWidth > 0)", True)
         self.assertLess(len(tab.requests), 200)
         before = tab.counters()
-        # A card in sight is made of some twenty boxes, one out of sight of its own only.
+        # A visible card has some twenty boxes, a hidden one only its own.
         self.assertLess(before["LayoutObjects"], 2 * self.FILES)
-        # Not a layout for each of the files.
+        # There is not one layout per file.
         tab.press("/", *"0199")
         self.assertBecomes(tab, SEEN + ".length", sum("0199" in f"{i:05}" for i in range(self.FILES)))
         self.assertLess(tab.counters()["LayoutCount"] - before["LayoutCount"], 50)
         self.assertQuiet(tab)
 
-    def test_are_searched_filtered_and_reached(self):
+    def test_can_be_searched_filtered_and_reached(self):
         tab = self.open(self.many(self.FILES))
         tab.press("/")
         tab.type(f"{self.FILES - 1:05}")

@@ -1,4 +1,4 @@
-// qelshow: shows what the extension shows to the shell.
+// qelshow: shows what the extension gives the shell.
 #include <exception>
 #include <string>
 #include <vector>
@@ -41,8 +41,8 @@ int Main(const std::vector<std::wstring>& arguments) {
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt::Show
 
-/// Tells the C runtime of mingw-w64 to replace patterns on the command line by the files that they match, as
-/// shells of Windows leave that to the programs.
+/// Makes the C runtime of mingw-w64 replace patterns on the command line by the files that they match. The
+/// command interpreters of Windows leave this to the programs.
 int _dowildcard = -1;  // NOLINT(misc-use-internal-linkage)
 
 int wmain(int count, wchar_t** arguments) {  // NOLINT(misc-use-internal-linkage)
