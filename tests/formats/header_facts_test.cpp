@@ -69,7 +69,7 @@ TEST(HeaderFacts, OfAnEbnFileAreTheNumbersOfItsInstrument) {
   EXPECT_EQ(FactsOf(file.Bytes(), L"ebn"), Facts{});
 }
 
-/// Two images, of which only the first counts.
+/// Returns a series of two images. Only the first one gives facts.
 SerFile Series() {
   SerFile file;
   file.tagTypeId = 0x4142;
@@ -114,7 +114,7 @@ TEST(HeaderFacts, OfASeriesAreItsTagsItsDimensionsAndTheCalibrationsOfItsFirstIm
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
   file.version = 0x0220;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
-  // A series of lines has no picture, and yet a header.
+  // A series of lines has no picture, but its header gives facts.
   file.dataTypeId = 0x4120;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
   file.tagTypeId = 0x4152;
@@ -130,7 +130,7 @@ TEST(HeaderFacts, OfADamagedSeriesAreThoseBeforeTheFault) {
   file.validElements = 0;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Facts{});
 
-  // A dimension, and the header of the image, count when their last byte is there.
+  // A dimension gives facts once its last byte exists, and so does the header of the image.
   file = Series();
   const std::string bytes = file.Bytes();
   const std::size_t first = 30 + 24 + 4 + 7 + 4 + 2;
@@ -152,7 +152,7 @@ TEST(HeaderFacts, OfADamagedSeriesAreThoseBeforeTheFault) {
   EXPECT_EQ(FactsOf(element.substr(0, element.size() - 1), L"ser").size(), 8u);
 }
 
-TEST(HeaderFacts, OfASeriesAreNoMoreThan16DimensionsAnd512BytesOfAText) {
+TEST(HeaderFacts, OfASeriesAreAtMost16DimensionsAnd512BytesOfAString) {
   SerFile file = Series();
   file.dimensions.assign(1000, file.dimensions[0]);
   file.dimensions[15].description = std::string(512, 'd') + std::string(1, 'e');
@@ -171,7 +171,7 @@ TEST(HeaderFacts, OfASeriesThatCannotBeFollowedAreNone) {
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Facts{});
 }
 
-/// The values of an image or a line, which lie in other items for each.
+/// Returns the extra values of an image or a line. The two use different items for them.
 std::string EmiExtraValues(std::uint16_t type, std::uint16_t tag1, double value1, std::uint16_t tag2,
                            double value2) {
   return EmiStructure(type, 0x0300, EmiDouble(tag1, value1) + EmiDouble(tag2, value2));
@@ -235,7 +235,7 @@ TEST(HeaderFacts, OfAnEmiFileAreOnlyThoseThatItHas) {
 
 TEST(HeaderFacts, OfAnEmiFileLieDirectlyInTheirObjects) {
   const std::string labels = EmiText(0x0100, "one");
-  // One level too deep, or in the object of the other kind, or in another structure.
+  // These are one level too deep, in the object of the other kind, or in another structure.
   EXPECT_EQ(FactsOfItems(EmiImageObject(EmiStructure(0x4000, 1, labels))), Facts{});
   EXPECT_EQ(FactsOfItems(EmiImageObject(
                 EmiExtraValues(0x4100, 0x0100, 1, 0x0120, 2) + EmiExtraValues(0x4102, 0x0100, 1, 0x0131, 2) +
@@ -251,14 +251,14 @@ TEST(HeaderFacts, OfAnEmiFileLieDirectlyInTheirObjects) {
   EXPECT_EQ(FactsOfItems(EmiImageObject(EmiArray(0x2112, 0x0202, std::string(8, 'x')))), Facts{});
 }
 
-TEST(HeaderFacts, OfAnEmiFileHaveAtMost512BytesOfAText) {
+TEST(HeaderFacts, OfAnEmiFileHaveAtMost512BytesOfAString) {
   const std::string image =
       EmiImageObject(EmiText(0x0100, std::string(512, 'a') + "b") + EmiText(0x0419, "two"));
   EXPECT_EQ(FactsOfItems(image),
             (Facts{{"Image label 100", std::string(512, 'a')}, {"Image label 419", "two"}}));
 }
 
-TEST(HeaderFacts, OfATruncatedEmiFileAreThoseThatAreWhole) {
+TEST(HeaderFacts, OfATruncatedEmiFileAreTheCompleteOnes) {
   const std::string bytes = EmiFile{.items = EmiImage()}.Bytes();
   std::size_t most = 0;
   for (std::size_t length = 0; length <= bytes.size(); ++length) {

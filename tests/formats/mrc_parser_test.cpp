@@ -343,7 +343,7 @@ TEST(MrcThumbnail, ExtendedHeaderThatLeadsBehind2GiBLeadsNowhere) {
   file.next = kMax - 1024;
   const std::string head = file.Bytes();
   Testing::MemoryBuffer buffer(head);
-  buffer.zerosBehind = std::int64_t{6} << 30;
+  buffer.trailingZeros = std::int64_t{6} << 30;
   std::istream stream(&buffer);
   EXPECT_EQ(Testing::TakeBitmap(MrcFileInfo(stream, L"mrc").CreateThumbnail({256, 256})).width, 0);
   EXPECT_EQ(buffer.bytesRead, 1024);

@@ -1,6 +1,5 @@
 // A server that misbehaves on purpose, in place of the extension. The name of the file decides how. It also
-// has fewer
-// interfaces and classes than the extension.
+// has fewer interfaces and classes than the extension.
 #include <windows.h>
 
 #include <stdexcept>

@@ -1,6 +1,5 @@
 // Compares what the shell of this computer shows for the sample files with what the extension answers
-// directly. The
-// extension is registered while a test runs.
+// directly. The extension is registered while a test runs.
 #include <gtest/gtest.h>
 #include <windows.h>
 
