@@ -7,7 +7,8 @@ export WINEPREFIX=${QEL_WINEPREFIX-$root/build/wine}
 export WINEARCH=win64
 export LC_ALL=C.UTF-8 # in another character set Wine mangles the letters of paths
 export WINEDEBUG=-all
-# No .NET, no HTML engine, no debugger window on a fault, no menu entries for registered file types, no Wayland.
+# Turns off .NET, the HTML engine, the debugger window on a fault, menu entries for registered file types, and
+# Wayland.
 export WINEDLLOVERRIDES="mscoree,mshtml,winedbg.exe,winemenubuilder.exe,winewayland.drv="
 
 # Wine's services inherit standard input and output, so these are not pipes: a reader would wait as long as they run.
