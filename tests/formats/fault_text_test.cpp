@@ -86,6 +86,8 @@ TEST(FaultText, ReportsAFileWithoutAPicture) {
   EXPECT_EQ(TextOf(EmiFile{}.Bytes(), L"emi"), "The file holds no image object.");
   EXPECT_EQ(TextOf(EmiFile{.items = EmiImageObject("")}.Bytes(), L"emi"),
             "The picture has no pixels: it is 0 x 0.");
+  EXPECT_EQ(TextOf(RawFile{.width = 0, .height = 5}.Bytes(), L"raw"),
+            "The picture has no pixels: it is 0 x 5.");
   SerFile lines = OneImageSeries();
   lines.dataTypeId = 0x4120;
   EXPECT_EQ(TextOf(lines.Bytes(), L"ser"),
@@ -93,8 +95,10 @@ TEST(FaultText, ReportsAFileWithoutAPicture) {
 }
 
 TEST(FaultText, ReportsAPictureThatIsTooFarAway) {
-  EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"),
-            "The picture lies beyond the first 2 GiB of the file, where this format is not read.");
+  const std::string text =
+      "The picture lies beyond the first 2 GiB of the file, where this format is not read.";
+  EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"), text);
+  EXPECT_EQ(TextOf(MrcFile{.nx = 1024, .ny = 1024, .nz = 4096}.Bytes(), L"mrc"), text);
 }
 
 std::string AdviceFor(const std::string& bytes, const std::wstring& extension) {
