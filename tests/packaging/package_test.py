@@ -98,7 +98,7 @@ class Contents(Test):
         folder = tempfile.TemporaryDirectory()
         cls.addClassCleanup(folder.cleanup)
         cls.out = pathlib.Path(folder.name)
-        cls.told = make_packages(cls.out).stderr
+        cls.reported = make_packages(cls.out).stderr
 
     def test_are_identical_whoever_makes_them_wherever_and_whenever(self):
         first, second = self.out, self.folder / "second"
@@ -147,8 +147,8 @@ class Contents(Test):
         for build, out, name in ((BUILD, file, file), (BUILD, file / "below", file), (file, self.folder / "out", file)):
             with self.subTest(build=build, out=out), self.assertRaises(subprocess.CalledProcessError) as caught:
                 make_packages(out, build)
-            told = caught.exception.stderr.replace(self.told, "")
-            self.assertRegex(told, rf"\Apackage: {re.escape(str(name))}.*: .+\n\Z")
+            reported = caught.exception.stderr.replace(self.reported, "")
+            self.assertRegex(reported, rf"\Apackage: {re.escape(str(name))}.*: .+\n\Z")
 
     def test_contain_resources_that_are_rebuilt_when_anything_in_them_changes(self):
         def ninja(*arguments):
@@ -180,7 +180,7 @@ class Contents(Test):
         self.assertNotIn(str(SOURCES), line)
 
     def test_are_signed_when_there_is_a_certificate(self):
-        self.assertIn("Not signing", self.told)
+        self.assertIn("Not signing", self.reported)
         key, certificate, both, password = (self.folder / name for name in ("key", "certificate", "both", "password"))
         password.write_text("open sesame")
         for command in (
@@ -555,10 +555,10 @@ class Installation(Test):
                                         stdout=out, stderr=out).returncode
                 out.seek(0)
                 results.append((status, out.read().decode()))
-        (installed, _), (found, told), (removed, _) = results
+        (installed, _), (found, reported), (removed, _) = results
         self.assertEqual((installed, found, removed), (DONE, 4, DONE), results)
-        self.assertIn(f"{self.image}: has no thumbnail. The header is not acceptable: mode is 99", told)
-        self.assertIn("QelShellExt is registered and works.", told)
+        self.assertIn(f"{self.image}: has no thumbnail. The header is not acceptable: mode is 99", reported)
+        self.assertIn("QelShellExt is registered and works.", reported)
         self.assertRemoved()
 
     def test_an_upgrade_replaces_a_dll_that_is_in_use(self):

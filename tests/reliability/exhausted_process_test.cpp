@@ -44,7 +44,7 @@ class ExhaustedProcess : public testing::Test {
   ExhaustedProcess() {
     // A pixel array outside every image, for which the reader throws an exception.
     EmiFile emi;
-    emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside of any image");
+    emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside any image");
     path_ = folder_.Write("throwing.emi", emi.Bytes());
     // After its first exception, this program's own runtime needs no further slot.
     EXPECT_THROW(throw std::runtime_error("first"), std::runtime_error);

@@ -52,7 +52,7 @@ class Image {
   Struct AtOffset(std::size_t offset) const {
     Struct value;
     if (offset > bytes_.size() || bytes_.size() - offset < sizeof value) {
-      throw std::out_of_range("outside of the module");
+      throw std::out_of_range("outside the module");
     }
     std::memcpy(&value, bytes_.data() + offset, sizeof value);
     return value;

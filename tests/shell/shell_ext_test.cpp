@@ -338,7 +338,7 @@ TEST_F(ShellExtObject, ImplementsNothingElseOfIPersistFile) {
 TEST_F(ShellExtObject, LetsTheExceptionsOfReadersThrough) {
   const ShellExt object(dll_);
   EmiFile emi;
-  emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside of any image");
+  emi.items = EmiArray(0x2202, 0x0202, "a pixel array outside any image");
   EXPECT_THROW(object.Load(folder_.Write("bad.emi", emi.Bytes())), std::invalid_argument);
 
   SerFile ser;

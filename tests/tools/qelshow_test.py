@@ -292,9 +292,9 @@ class ExitStatus(Test):
             files.append((self.write(name, contents), parts))
         result = run("info", *(path for path, _ in files))
         self.assertEqual(result.returncode, DAMAGED)
-        told = result.stderr.splitlines()
-        self.assertEqual(len(told), len(files))
-        for line, (path, parts) in zip(told, files):
+        reported = result.stderr.splitlines()
+        self.assertEqual(len(reported), len(files))
+        for line, (path, parts) in zip(reported, files):
             with self.subTest(path.name):
                 self.assertOneSentence(line, path, *parts)
 
@@ -646,19 +646,19 @@ class Answers(Test):
             self.assertIn(line, text)
 
         # A text in UTF-8, one in the code page of western Windows, and one of two lines.
-        for units, told in ((b"\xc2\xb5m", "µm"), (b"\xb5m", "µm"), (b"n\r\nm", "n\r\nm")):
+        for units, decoded in ((b"\xc2\xb5m", "µm"), (b"\xb5m", "µm"), (b"n\r\nm", "n\r\nm")):
             path = self.write("a.ser", ser(units))
             file, = self.info(path)
             self.assertEqual(
                 [(fact["name"], fact["value"], fact["unit"]) for fact in file["header"]],
                 [("Tags", "times", None), ("Dimensions of the series", 1, None), ("Dimension 1 size", 3, None),
-                 ("Dimension 1 calibration offset", -1.5, told), ("Dimension 1 calibration delta", 0.25, told),
+                 ("Dimension 1 calibration offset", -1.5, decoded), ("Dimension 1 calibration delta", 0.25, decoded),
                  ("Dimension 1 calibration element", 2, None), ("Dimension 1 description", "Defocus", None),
-                 ("Dimension 1 units", told, None), ("X calibration offset", 0, None),
+                 ("Dimension 1 units", decoded, None), ("X calibration offset", 0, None),
                  ("X calibration delta", 1.2e-9, None), ("X calibration element", 4, None),
                  ("Y calibration offset", 0, None), ("Y calibration delta", 1.2e-9, None),
                  ("Y calibration element", 4, None)])
-            self.assertIn("    Dimension 1 calibration delta    0.25 " + told.replace("\r\n", " ") + "\n",
+            self.assertIn("    Dimension 1 calibration delta    0.25 " + decoded.replace("\r\n", " ") + "\n",
                           run("info", path).stdout)
 
         path = self.write("a.mrc", mrc())
@@ -1105,13 +1105,13 @@ class Doctor(Test):
         self.leave_out("ser")
         result, document = self.doctor()
         self.assertEqual((result.returncode, document["problems"]), (DONE, []))
-        told = self.left_out(document)
-        self.assertEqual(list(told), [".ser", ".raw"])
-        for kind, sentence in told.items():
+        left_out = self.left_out(document)
+        self.assertEqual(list(left_out), [".ser", ".raw"])
+        for kind, sentence in left_out.items():
             self.assertOneSentence(sentence, f"QelShellExt is not registered for {kind} files",
                                    f'run regsvr32 "Z:{SERVER}"'.replace("/", "\\"))
         missing = [".raw property store", (".raw", "property store")] + [
-            (kind, role) for kind in told for role in ("thumbnail", "info tip", "properties")]
+            (kind, role) for kind in left_out for role in ("thumbnail", "info tip", "properties")]
         self.assertWorksBut(document, dict.fromkeys(missing, "not registered"))
 
     def test_reports_a_missing_dll_even_if_a_kind_was_left_out(self):
@@ -1260,8 +1260,8 @@ class Doctor(Test):
         self.set_registry({foreign: "Stack Peeker", foreign + "\\InprocServer32": 'C:\\peek "er".dll',
                            self.CLASSES + ".ser\\" + self.THUMBNAIL: self.FOREIGN,
                            self.PROPERTY_STORES + ".ebn": self.FOREIGN})
-        told = ("Stack Peeker", self.FOREIGN, 'C:\\peek "er".dll', "run regsvr32")
-        document = self.assertProblems((".ser", "thumbnail", *told), (".ebn", "property store", *told))
+        parts = ("Stack Peeker", self.FOREIGN, 'C:\\peek "er".dll', "run regsvr32")
+        document = self.assertProblems((".ser", "thumbnail", *parts), (".ebn", "property store", *parts))
         self.assertWorksBut(document, {(".ser", "thumbnail"): "another program",
                                        (".ebn", "property store"): "another program"})
 
@@ -1277,12 +1277,12 @@ class Doctor(Test):
                            choice + "@ProgId": "Peeker.Chosen", types[0] + "\\" + self.INFO_TIP: self.FOREIGN,
                            self.CLASSES + ".emi": "Peeker.Newer", types[1] + "\\" + self.NEWER_THUMBNAIL: self.FOREIGN,
                            self.CLASSES + ".raw": "Peeker.Plain", types[2] + "\\" + self.THUMBNAIL: self.FOREIGN})
-        told = (self.FOREIGN, "takes precedence", "remove that key")
+        parts = (self.FOREIGN, "takes precedence", "remove that key")
         document = self.assertProblems(
-            (".mrc", r"HKEY_CLASSES_ROOT\.mrc" + "\\" + self.NEWER_THUMBNAIL, *told),
-            (".ser", r"HKEY_CLASSES_ROOT\Peeker.Chosen" + "\\" + self.INFO_TIP, *told),
-            (".emi", r"HKEY_CLASSES_ROOT\Peeker.Newer" + "\\" + self.NEWER_THUMBNAIL, *told),
-            (".raw", r"HKEY_CLASSES_ROOT\Peeker.Plain" + "\\" + self.THUMBNAIL, *told))
+            (".mrc", r"HKEY_CLASSES_ROOT\.mrc" + "\\" + self.NEWER_THUMBNAIL, *parts),
+            (".ser", r"HKEY_CLASSES_ROOT\Peeker.Chosen" + "\\" + self.INFO_TIP, *parts),
+            (".emi", r"HKEY_CLASSES_ROOT\Peeker.Newer" + "\\" + self.NEWER_THUMBNAIL, *parts),
+            (".raw", r"HKEY_CLASSES_ROOT\Peeker.Plain" + "\\" + self.THUMBNAIL, *parts))
         self.assertWorksBut(document, dict.fromkeys(
             ((".mrc", "thumbnail"), (".ser", "info tip"), (".emi", "thumbnail"), (".raw", "thumbnail")),
             "another program"))
