@@ -205,7 +205,7 @@ class Contents(Test):
                            check=True, capture_output=True)
 
 
-# Windows Installer recognises components by these codes, whatever the version. A new component adds its own.
+# Windows Installer recognises components by these codes in all versions. A new component adds its own code.
 COMPONENT_CODES = {
     "Server": "{F8215D5A-6F96-4564-BD55-BB9B40A76325}",
     "Qelshow": "{AB40842A-41B6-4C7F-892D-800CB74FE713}",
@@ -242,7 +242,7 @@ class Database:
 
 
 class InstallerPackage(Test):
-    """Checks tables of the package, because Wine ignores much of them."""
+    """Checks the tables of the package, because Wine ignores much of their contents."""
 
     @classmethod
     def setUpClass(cls):
@@ -256,7 +256,7 @@ class InstallerPackage(Test):
         codes = {row[0]: row[1] for row in self.database.rows("Component")}
         self.assertEqual(codes | COMPONENT_CODES, codes)
         self.assertEqual(len(set(codes.values())), len(codes))
-        self.assertEqual(component_code("abc"), "{F678095A-EDEF-5557-B64D-F8448E982C9C}")  # of an extension that is added later
+        self.assertEqual(component_code("abc"), "{F678095A-EDEF-5557-B64D-F8448E982C9C}")  # an extension that could be added later
         self.assertEqual(self.database.properties["UpgradeCode"], UPGRADE_CODE)
         self.assertEqual({row[0] for row in self.database.rows("Upgrade")}, {UPGRADE_CODE})
 
@@ -307,7 +307,7 @@ class InstallerPackage(Test):
                  "RemoveFiles", "InstallFiles", "WriteRegistryValues", "RegisterProduct", "InstallFinalize")
         self.assertEqual(sorted(order, key=actions.get), list(order))
 
-    def test_carries_the_given_time(self):
+    def test_has_the_given_time(self):
         self.assertEqual(self.database.times, {(int(EPOCH) + 11644473600) * 10**7})
 
 

@@ -622,7 +622,7 @@ class Answers(Test):
                      "    Line one\n", "VT_UI4     VT_I4      16", "System.Media.FrameCount"):
             self.assertIn(part, text)
 
-    def test_have_what_the_header_says(self):
+    def test_contain_the_facts_of_the_header(self):
         path = self.write("a.raw", raw(4, 3, 0, 8, bytes(12)))
         file, = self.info(path)
         facts = [("Offset of the first pixel", 0, "B"), ("Pixel stride", 1, "B"), ("Row stride", 4, "B")]
@@ -645,7 +645,7 @@ class Answers(Test):
                      "D number               1.2e-09\n", "Accelerating voltage   300 kV\n"):
             self.assertIn(line, text)
 
-        # A text in UTF-8, one in the code page of western Windows, and one of two lines.
+        # A string in UTF-8, one in code page 1252, and one with two lines.
         for units, decoded in ((b"\xc2\xb5m", "µm"), (b"\xb5m", "µm"), (b"n\r\nm", "n\r\nm")):
             path = self.write("a.ser", ser(units))
             file, = self.info(path)
@@ -753,7 +753,7 @@ class Page(Test):
         self.assertEqual([file["name"] for file in self.files_of(out / "index.html")],
                          [r"2\d 9.mrc", r"2\d 10.mrc", r"1\a.mrc", r"1\b.mrc"])
 
-    def test_names_the_files_relative_to_the_folder_that_holds_them_all(self):
+    def test_names_the_files_relative_to_the_folder_that_contains_them_all(self):
         for name in ("in/one/a.mrc", "in/ONE more/a.mrc"):
             self.write(name, mrc())
         out = self.folder / "page"
@@ -1228,7 +1228,7 @@ class Doctor(Test):
         self.set_registry(dict.fromkeys(values, 0))
         self.assertEqual(self.doctor()[0].returncode, DONE)
 
-    def test_sees_that_a_class_is_not_in_the_list_that_a_policy_demands(self):
+    def test_sees_that_a_class_is_not_in_the_list_that_a_policy_requires(self):
         windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
         enforced = "HKEY_CURRENT_USER" + windows + "Policies\\Explorer@EnforceShellExtensionSecurity"
         approved = "HKEY_LOCAL_MACHINE" + windows + "Shell Extensions\\Approved"
