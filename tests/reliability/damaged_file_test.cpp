@@ -1,5 +1,5 @@
 // Files whose contents are false. Whatever a header says, the reader must answer or refuse, without a fault
-// and without exceeding the memory limit. The sanitizers of the native build find accesses outside of bounds.
+// and without exceeding the memory limit. The sanitizers of the native build find out-of-bounds accesses.
 #include <gtest/gtest.h>
 
 #include <algorithm>
