@@ -1,4 +1,4 @@
-// Texts of a file whose length is in the file.
+// Reads strings whose lengths are in the file.
 #pragma once
 
 #include <cstddef>
@@ -8,11 +8,12 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Longer texts are cut: they are for one line on a screen, and a length out of a file may be anything.
+/// The maximum of bytes that ReadText returns, because the strings are shown in one line and a damaged file
+/// may state any length.
 inline constexpr std::size_t kMaxTextBytes = 512;
 
-/// Moves `stream` on by the `length` bytes of a text and returns the first kMaxTextBytes of them. Fails the
-/// stream if it does not hold them all.
+/// Advances `stream` by the `length` bytes of a string and returns the first kMaxTextBytes of them. Fails the
+/// stream if it has fewer than `length`.
 std::string ReadText(std::istream& stream, std::uint32_t length);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -10,9 +10,9 @@ namespace Qel::Lumetra::ShellExt {
 /// is not in the table. string_ids.h lists the identifiers that this code uses.
 std::wstring LoadResourceString(std::uint32_t id);
 
-/// Widens each byte from `first` up to `last`, which is not included, with sign extension to 16 bits:
-/// 0x00..0x7F keep their values, 0x80..0xFF become U+FF80..U+FFFF. No code page is applied, because a file
-/// does not name the code page of its writer.
+/// Widens each byte from `first` up to, but not including, `last` with sign extension to 16 bits: 0x00..0x7F
+/// keep their values, 0x80..0xFF become U+FF80..U+FFFF. No code page is applied, because a file does not name
+/// the code page of its writer.
 std::wstring WidenComment(const char* first, const char* last);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -16,15 +16,15 @@ namespace {
 constexpr std::int32_t kHeaderBytes = 54;
 constexpr std::int32_t kMaxTypeCode = 8;  // the format has no complex types
 
-constexpr double kMaxCode = 4;  // of the texts below
+constexpr double kMaxCode = 4;  // the largest code, positive or negative, with a string below
 
-/// Returns the integer that a double stands for: the double plus half, truncated toward zero. Intentionally,
-/// that is not the nearest integer below 0: a stored -2.0 is -1.
+/// Returns the integer that a double represents: adds 0.5 and truncates toward zero. Below 0 the result is
+/// not the nearest integer: a stored -2.0 is -1. Intentional.
 double WholeNumber(double stored) {
   return std::trunc(stored + 0.5);
 }
 
-/// Returns a code without a text as 0.
+/// Returns the code that a double represents, or 0 if its magnitude is above kMaxCode.
 std::int32_t CodeOf(double stored) {
   const double code = WholeNumber(stored);
   return std::abs(code) <= kMaxCode ? static_cast<std::int32_t>(code) : 0;
@@ -62,9 +62,9 @@ std::string_view LensText(std::int32_t code) {
   }
 }
 
-/// Returns a number with `decimals` digits after the point, at most 1, in any locale of the host.
+/// Returns a number with `decimals` digits after the point, at most 1, whatever the locale.
 std::string Decimal(double number, int decimals) {
-  // The digits of the largest double, a sign, the point and the digit after it.
+  // Room for the digits of the largest double, a sign, the point and the digit after it.
   std::array<char, std::numeric_limits<double>::max_exponent10 + 4> text;
   const auto end =
       std::to_chars(text.data(), text.data() + text.size(), number, std::chars_format::fixed, decimals);

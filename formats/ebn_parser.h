@@ -1,4 +1,4 @@
-// .ebn files: one image behind a header that also describes the microscope in five numbers.
+// .ebn files: one image after a header that also describes the microscope in five numbers.
 #pragma once
 
 #include <istream>
@@ -8,7 +8,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// What the header says of the microscope, in the order of the file. All but the voltage are codes.
+/// The fields of the header that describe the microscope, in the order of the file. All but the voltage are
+/// codes.
 struct EbnInstrument {
   double model = 0;
   double source = 0;
@@ -23,7 +24,7 @@ class EbnParser final : public FileParser {
 
   const EbnInstrument& instrument() const { return instrument_; }
 
-  /// The microscope in one line, for instance "Halden 20 FEG 200.0 kV".
+  /// Returns the microscope in one line, for instance "Halden 20 FEG 200.0 kV".
   const std::string& comment() const { return comment_; }
 
  private:

@@ -1,4 +1,4 @@
-// The open items of an .emi file's tree, from the top level to the innermost one.
+// The open items of an .emi file's tree, from the top level to the innermost item.
 #pragma once
 
 #include <cstddef>
@@ -7,7 +7,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// What every item begins with. The type says how the value is stored, type and tag together what it means.
+/// The beginning of every item. The type determines how the value is stored; type and tag together determine
+/// its meaning.
 struct EmiItemId {
   std::uint16_t type = 0;
   std::uint16_t tag = 0;

@@ -17,9 +17,9 @@ constexpr std::int16_t kMaxVersion = 0x0200;
 
 constexpr EmiItemId kImageObject = {0x49B0, 0x0610};
 constexpr EmiItemId kLineDataObject = {0x4700, 0x0610};
-constexpr std::uint16_t kDataTag = 0x0202;  // of the one array of an object that holds its pixels or values
+constexpr std::uint16_t kDataTag = 0x0202;  // the array with the pixels or values of an object
 
-/// Where an object has its extra values: directly in `structure`, which lies directly in the object.
+/// The position of an object's extra values: directly in `structure`, which is directly in the object.
 struct ExtraValues {
   EmiItemId object;
   EmiItemId structure;
@@ -34,7 +34,8 @@ constexpr std::uint16_t kDouble = 0x0041;
 constexpr std::uint16_t kText = 0x0060;
 constexpr std::uint16_t kArrayBit = 0x2000;
 
-/// Bytes of the value of an item that is one number of no meaning; none for another item.
+/// Returns the bytes of an item's value if the item is a single number that the parser ignores; nothing for
+/// another item.
 std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
   switch (type) {
     case 0x0010:
@@ -50,19 +51,21 @@ std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
   }
 }
 
-/// Data arrays have the even types from 0x2100 (of lines) and from 0x2200 (of images) to 0x14 further.
+/// Returns whether `type` is a data array: an even number from 0x2100 to 0x2114 (lines) or from 0x2200 to
+/// 0x2214 (images).
 bool IsDataArray(std::uint16_t type) {
   const int series = type & 0xFF00;
   const int elementType = type & 0x00FF;
   return (series == 0x2100 || series == 0x2200) && elementType <= 0x14 && elementType % 2 == 0;
 }
 
-/// `series` is 0x2100 for the values of a line, 0x2200 for the pixels of an image.
+/// Returns whether an item is the array with the values of a line (`series` 0x2100) or the pixels of an image
+/// (0x2200).
 bool IsArrayOf(EmiItemId id, int series) {
   return IsDataArray(id.type) && (id.type & 0xFF00) == series && id.tag == kDataTag;
 }
 
-/// The text of an object with the tag `tag`; null for a text that is not kept.
+/// Returns the string of an object for the tag `tag`; null for a tag that is not kept.
 std::string* LabelOf(EmiDataObject& object, std::uint16_t tag) {
   switch (tag) {
     case 0x0100: return &object.label100;
@@ -73,7 +76,8 @@ std::string* LabelOf(EmiDataObject& object, std::uint16_t tag) {
   }
 }
 
-/// The elements of a data array. The larger of the complex types has the smaller number.
+/// Returns the type of a data array's elements; nothing for an unknown type. The larger of the two complex
+/// types has the smaller number.
 std::optional<DataType> ElementType(std::uint16_t arrayType) {
   switch (arrayType & 0x00FF) {
     case 0x00: return DataType::kInt8;
@@ -93,16 +97,16 @@ std::optional<DataType> ElementType(std::uint16_t arrayType) {
 }  // namespace
 
 EmiParser::EmiParser(std::istream& stream) : FileParser(stream) {
-  // What the first image is until a pixel array of a known type is found in it.
+  // The default for a first image in which no pixel array of a known type is found.
   frame_ = PackedLayout(PixelTypeOf(DataType::kUInt8), {}, 0);
   const auto magic = ReadLittleEndian<std::uint16_t>(stream);
   const auto version = ReadLittleEndian<std::int16_t>(stream);
-  ReadLittleEndian<std::uint32_t>(stream);  // nothing that is known
+  ReadLittleEndian<std::uint32_t>(stream);  // unknown purpose
   Require(magic == kMagic, "magic", magic, "0x4B4A");
   Require(version <= kMaxVersion, "version", version, "0x0200 or below");
   if (stream.good() && !fault()) {
     Walk();
-    // A walk may well end with the file; what it found is usable all the same.
+    // A traversal that ends at the end of the file is a success, because what it found is usable.
     stream.clear();
   }
   frameCount_ = WrapToInt32(imageCount_);
@@ -154,7 +158,7 @@ bool EmiParser::ReadValue() {
 }
 
 void EmiParser::ReadDoubleValue() {
-  const EmiItemId object = objectPath_.At(-3);  // a double belongs to an object of an object
+  const EmiItemId object = objectPath_.At(-3);  // throws unless the double is in a structure of an object
   const auto number = ReadLittleEndian<double>(stream());
   if (!stream().good()) return;
   for (const ExtraValues& values : kExtraValues) {
@@ -168,7 +172,7 @@ void EmiParser::ReadDoubleValue() {
 }
 
 void EmiParser::ReadTextValue() {
-  EmiDataObject* const kept = KeptObject(objectPath_.At(-2));  // a text belongs to an object
+  EmiDataObject* const kept = KeptObject(objectPath_.At(-2));  // throws unless the string is in an object
   std::string* const label = kept == nullptr ? nullptr : LabelOf(*kept, objectPath_.At(-1).tag);
   const auto length = ReadLittleEndian<std::uint32_t>(stream());
   if (label == nullptr) {
@@ -187,7 +191,8 @@ void EmiParser::ReadArray() {
     if (parent == kImageObject && IsArrayOf(id, 0x2200)) ReadPixelArray();
     if (parent == kLineDataObject && IsArrayOf(id, 0x2100)) ReadLineArray();
   }
-  // The byte count says where the next item is, whatever the array's width and height come to.
+  // The byte count alone determines the position of the next item, even if it contradicts the array's width
+  // and height.
   SkipBytes(stream(), byteCount);
 }
 
@@ -195,7 +200,7 @@ void EmiParser::ReadPixelArray() {
   const std::int64_t start = stream().tellg();
   const auto width = ReadLittleEndian<std::int32_t>(stream());
   const auto height = ReadLittleEndian<std::int32_t>(stream());
-  // The array belongs to the image that was opened last.
+  // The array belongs to the most recently opened image.
   if (const auto type = ElementType(objectPath_.At(-1).type); type && imageCount_ == 1) {
     frame_ = PackedLayout(PixelTypeOf(*type), {width, height}, stream().tellg());
   }

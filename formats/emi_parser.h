@@ -1,4 +1,4 @@
-// .emi files: a tree of tagged items, some of which are image objects. The first image stands for the file.
+// .emi files: a tree of tagged items, some of which are image objects. The first image represents the file.
 #pragma once
 
 #include <cstdint>
@@ -13,8 +13,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// What an image object and a line-data object have in common. Texts that the file does not have are empty;
-/// they are as ReadText keeps them.
+/// The values that image objects and line-data objects share. Strings are empty if the file has none;
+/// ReadText limits their length.
 struct EmiDataObject {
   std::string label100;
   std::string label419;
@@ -24,27 +24,27 @@ struct EmiDataObject {
   std::optional<double> extraValue2;
 };
 
-/// A line of values. What it has none of is 0 or none.
+/// A line of values. Values that the file lacks are 0 or none.
 struct EmiLineData : EmiDataObject {
   std::uint32_t length = 0;  // number of values
   std::optional<DataType> dataType;
 };
 
-/// Walks once through the whole tree, from the stream's position, counts its images and keeps the first.
-/// The tree may be of any depth: the open items are kept on the heap, four bytes each as in the file.
+/// Traverses the whole tree once from the stream's position, counts its images and keeps the first one. The
+/// tree may have any depth: the open items are on the heap, four bytes each, as many as in the file.
 class EmiParser final : public FileParser {
  public:
-  /// A file with another header is not walked. A walk ends at the end of the tree or of the file, and leaves
-  /// the stream good. Throws std::invalid_argument ("bad EMI object index") for an item that is not as deep
-  /// in the tree as its meaning asks for.
+  /// Does not traverse a file with another header. A traversal ends at the end of the tree or of the file,
+  /// and leaves the stream good. Throws std::invalid_argument ("bad EMI object index") for an item that is
+  /// not as deep in the tree as its type requires.
   explicit EmiParser(std::istream& stream);
 
-  /// The stream may be at its end or have failed in a read.
+  /// Returns whether the file has an image. The stream may be at its end or have failed in a read.
   bool IsValid() const { return !stream().bad() && imageCount_ > 0; }
 
   static std::string_view comment() { return "VRA EMI File"; }
 
-  /// The first of each, without the size and the pixels of the image, which are those of the frame.
+  /// Return the first image and the first line. The size and the pixels of the image are in the frame.
   const EmiDataObject& image() const { return image_; }
   const EmiLineData& lineData() const { return lineData_; }
 
@@ -54,7 +54,8 @@ class EmiParser final : public FileParser {
   EmiItemId ReadItemId();
   void Walk();
 
-  /// Goes past the value of the innermost open item. False for a structure, whose value is a list of items.
+  /// Reads or skips the value of the innermost open item. Returns false for a structure, whose value is a
+  /// list of items.
   bool ReadValue();
   void ReadDoubleValue();
   void ReadTextValue();
@@ -62,7 +63,8 @@ class EmiParser final : public FileParser {
   void ReadPixelArray();
   void ReadLineArray();
 
-  /// Where the values of the object `id`, which was opened last, are kept; null for any but a first one.
+  /// Returns the place for the values of the object `id`, which is the most recently opened one; null for any
+  /// but the first image and the first line.
   EmiDataObject* KeptObject(const EmiItemId& id);
 
   EmiObjectPath objectPath_;

@@ -11,7 +11,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Written as the rule writes numbers: a rule with hexadecimal numbers is about a code, not a quantity.
+/// Formats a number as `rule` does: a rule with hexadecimal numbers is about a code, not a quantity.
 std::string NumberText(std::int64_t value, std::string_view rule) {
   if (rule.find("0x") == std::string_view::npos) return std::to_string(value);
   std::ostringstream text;
@@ -36,7 +36,7 @@ std::string Bytes(std::int64_t count) {
   return std::to_string(count) + (count == 1 ? " byte" : " bytes");
 }
 
-/// Whether the file, whose size is `end`, holds the frame.
+/// Returns what is wrong if the file, which has `end` bytes, does not contain the frame.
 FaultText FrameText(const FrameLayout& frame, std::int64_t end) {
   if (frame.size.width < 1 || frame.size.height < 1) {
     return {"The picture has no pixels: it is " + std::to_string(frame.size.width) + " x " +

@@ -1,4 +1,4 @@
-// Why a file has no picture, in words for its user. The shell extension itself does not use this.
+// Explains to users why a file has no picture. The shell extension itself does not use this.
 #pragma once
 
 #include <istream>
@@ -7,15 +7,15 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Two sentences in English: what is wrong with a file, and what its user can do. Both are empty if nothing
+/// Two sentences in English: what is wrong with a file, and what the user can do. Both are empty if nothing
 /// is wrong.
 struct FaultText {
   std::string fault;
   std::string advice;
 };
 
-/// Parses the whole stream as a file with `extension` (without the dot) and returns what is wrong, as far as
-/// the parser can tell; nothing for an unknown extension.
+/// Parses the whole stream as a file with `extension` (without the dot). Returns the first fault that the
+/// parser finds; nothing for an unknown extension.
 std::optional<FaultText> ExplainFault(std::istream& stream, const std::wstring& extension);
 
 }  // namespace Qel::Lumetra::ShellExt

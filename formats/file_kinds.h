@@ -1,5 +1,5 @@
-// The list of file kinds. What depends on the kinds is derived from it or compared with it by a test, see
-// docs/adding-a-format.md.
+// The list of file kinds. Everything that depends on the kinds is derived from this list or compared with it
+// by a test; see docs/adding-a-format.md.
 #pragma once
 
 #include <array>
@@ -21,12 +21,12 @@ namespace Qel::Lumetra::ShellExt {
 template <Parser KindParser>
 struct FileKind {
   std::wstring_view extension;  // without the dot, in lower case
-  std::uint32_t descriptionId;  // of a text that the string table does not have
+  std::uint32_t descriptionId;  // of a string that the string table intentionally lacks
 };
 
-/// One row for each extension, in the order of registration. The first extension of a parser names its kind,
-/// and its description is that of a file without a row of its own. CMake and Python read the rows as well
-/// (cmake/file_kinds.cmake, file_kinds.py).
+/// One row for each file-name extension, in the order of registration. The first extension of a parser names
+/// its kind, and its description is the one for a file with another extension. CMake and Python read these
+/// rows, too (cmake/file_kinds.cmake, file_kinds.py).
 inline constexpr std::tuple kFileKinds = {
     FileKind<MrcParser>{L"mrc", 212},  // images and volumes
     FileKind<MrcParser>{L"ali", 210},  // aligned tilt series
@@ -37,12 +37,12 @@ inline constexpr std::tuple kFileKinds = {
     FileKind<RawParser>{L"raw", 215},  // pixels in any order
 };
 
-/// Their extensions.
+/// The extensions of all rows, in the same order.
 inline constexpr auto kExtensions =
     std::apply([](const auto&... kinds) { return std::array{kinds.extension...}; }, kFileKinds);
 
-/// Calls `action` with the FileKind of an extension, compared without regard to case. Returns whether there
-/// is one.
+/// Calls `action` with the FileKind of an extension, compared without regard to case. Returns whether the
+/// extension is known.
 template <class Action>
 bool WithKindOf(std::wstring_view extension, Action action) {
   const auto isKind = [&](const auto& kind) {
@@ -53,8 +53,8 @@ bool WithKindOf(std::wstring_view extension, Action action) {
   return std::apply([&](const auto&... kinds) { return (isKind(kinds) || ...); }, kFileKinds);
 }
 
-/// The id of the description of a kind's file: that of the row with its extension, or else of the kind's
-/// first.
+/// Returns the string identifier of the description of a kind's file: that of the row with its extension, or
+/// else that of the kind's first row.
 template <Parser KindParser>
 std::uint32_t DescriptionId(std::wstring_view extension) {
   std::optional<std::uint32_t> id;

@@ -1,4 +1,4 @@
-// What the parsers of all file kinds have in common.
+// The base class of the parsers of all file kinds.
 #pragma once
 
 #include <concepts>
@@ -11,38 +11,37 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Why a file is not valid, for whoever explains it to its user (fault_text.h).
+/// The reason why a file is not valid, which fault_text.h explains to users.
 struct Fault {
-  const char* field;                  // of the header; null for a fault of the whole file
+  const char* field;                  // name of a header field; null for a fault of the whole file
   std::optional<std::int64_t> value;  // none for a field that is not a number
-  const char* rule;                   // completes "FIELD must be"; a sentence if there is no field
+  const char* rule;                   // completes "FIELD must be"; a whole sentence without a field
 };
 
-/// The base of all parsers. A parser reads the header once, in its constructor, from the stream's position,
-/// and fills in what is protected here. It sets failbit or badbit on the stream of a file that it does not
-/// accept.
+/// A parser reads the header once, in its constructor, from the stream's position, and sets the protected
+/// members. If it does not accept the file, it sets failbit or badbit on the stream.
 ///
-/// Nothing is virtual, because every user knows the parser's type: IsValid and comment are the answers of
-/// most kinds, and a parser that differs declares its own.
+/// Nothing is virtual, because every user knows the parser's type: IsValid and comment are right for most
+/// kinds, and a parser hides them with its own if it differs.
 class FileParser {
  public:
   std::istream& stream() const { return *stream_; }
 
-  /// The first requirement that is not met; none for a valid file. Bytes that the file does not have count as
-  /// 0.
+  /// Returns the first requirement that is not met; nothing for a valid file. Bytes after the end of the file
+  /// count as 0.
   const std::optional<Fault>& fault() const { return fault_; }
 
   bool IsValid() const { return stream_->good(); }
 
-  /// Whether the header is read as one that a big-endian machine wrote.
+  /// Returns whether the header was written in big-endian byte order, as far as the parser can tell.
   bool isSwapped() const { return isSwapped_; }
 
-  /// The frame that stands for the file. Its size and pixel type are those of the file.
+  /// Returns the frame that represents the file. Its size and pixel type are those of the file.
   const FrameLayout& frame() const { return frame_; }
 
   std::int32_t frameCount() const { return frameCount_; }
 
-  /// Free text, as the bytes of the file.
+  /// Returns the file's comment as bytes.
   static std::string_view comment() { return {}; }
 
  protected:
@@ -52,7 +51,7 @@ class FileParser {
     if (!isMet && !fault_) fault_ = {field, value, rule};
   }
 
-  /// `sentence` says what is wrong with the whole file.
+  /// Records `sentence`, which describes a fault of the whole file.
   void Require(bool isMet, const char* sentence) { Require(isMet, nullptr, {}, sentence); }
 
   FrameLayout frame_;

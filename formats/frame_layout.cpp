@@ -6,7 +6,7 @@ namespace Qel::Lumetra::ShellExt {
 
 FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t position) {
   const std::int64_t pixelBytes = type.bytes();
-  // The formats count a frame's pixels in 32 bits. A count that wraps leaves pixels outside of the block.
+  // The formats count a frame's pixels in 32 bits. A count that wraps leaves pixels outside the block.
   const std::int64_t pixels = WrappingProduct(size.width, size.height);
   return {.type = type,
           .size = size,

@@ -1,4 +1,4 @@
-// Where the pixels of one frame are in a file: all that a thumbnail needs from a file kind.
+// Where the pixels of one frame are in a file: everything that a thumbnail needs from a file kind.
 #pragma once
 
 #include <cstdint>
@@ -22,10 +22,11 @@ struct FrameLayout {
   bool swapBytes = false;  // 16-bit pixels with the high byte first
 };
 
-/// Returns the layout of rows without padding, from the top, that begin at file offset `position`.
+/// Returns the layout of a frame without padding, whose rows begin at file offset `position`, top row first.
 FrameLayout PackedLayout(const PixelType& type, Size2 size, std::int64_t position);
 
-/// Returns the layout of the same packed rows with the first one at the bottom of the picture.
+/// Returns the layout of the same packed rows in reverse order: the first stored row is at the bottom of the
+/// frame.
 FrameLayout FlippedVertically(const FrameLayout& layout);
 
 }  // namespace Qel::Lumetra::ShellExt

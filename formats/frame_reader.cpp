@@ -18,18 +18,18 @@ namespace {
 constexpr std::int64_t kBandBytes = 256LL * 1024;
 
 // Strides can make pixels share their bytes, so that a small file claims a picture of any size. A picture may
-// have this many more pixels than bytes, which bounds the time that a file of a few bytes can take.
+// have this many more pixels than bytes. The maximum limits the time for a file of a few bytes.
 constexpr std::int64_t kMaxSharedPixels = 1LL << 26;
 
-// Bands are given up for tiles if they would read the block more often than this.
+// If bands would read the block more often than this, tiles are read instead.
 constexpr std::int64_t kMaxPasses = 8;
 
-// A shorter read takes as long as one of this many bytes.
+// Reading fewer bytes than this takes the same time.
 constexpr std::int64_t kMinReadBytes = 4096;
 
-// Strides can scatter a picture so widely that each read brings only a few of its pixels. No program writes
-// such a picture, but a few bytes of header can claim one. It is refused if it takes more bytes of reads than
-// this, which bounds its time to a few seconds.
+// Strides can scatter a picture so widely that each read delivers only a few of its pixels. No program writes
+// such a picture, but a few bytes of header can claim one. It is rejected if its reads have more bytes in
+// total than this, which limits its time to a few seconds.
 constexpr std::int64_t kMaxTileReadBytes = 1LL << 34;
 
 /// Returns whether all pixels of the layout are inside its block and not too many for its bytes.
@@ -45,8 +45,8 @@ bool IsReadable(const FrameLayout& layout) {
   return layout.blockPosition >= 0 && first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
 }
 
-/// Returns whether the stream has the layout's whole block, so that a truncated file is refused before any
-/// work. If not, leaves the stream as a short read does.
+/// Returns whether the stream contains the layout's whole block, so that a truncated file is rejected before
+/// any work. If not, the stream is left failed, as after a short read.
 bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
   stream.seekg(0, std::ios_base::end);
   const std::int64_t size = stream.tellg();
@@ -56,7 +56,7 @@ bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
   return false;
 }
 
-/// Reads the pixels that a renderer takes, through one buffer, and passes them on in pieces.
+/// Reads the pixels that a renderer needs, through one buffer, and passes them on in pieces.
 class BandReader {
  public:
   BandReader(std::istream& stream, const FrameLayout& layout, FrameRenderer& renderer)
@@ -93,12 +93,12 @@ class BandReader {
 
   static std::int64_t Pieces(std::int64_t count, std::int64_t max) { return (count + max - 1) / max; }
 
-  /// Bytes from the first to the last byte of a rectangle of pixels.
+  /// Returns the number of bytes from the first to the last byte of a rectangle of pixels.
   std::int64_t Span(std::int64_t columns, std::int64_t rows) const {
     return (columns - 1) * pixelStep_ + (rows - 1) * rowStep_ + pixelBytes_;
   }
 
-  /// How many rows or columns, `step` bytes apart, begin within `bytes` bytes; at most `max`.
+  /// Returns how many rows or columns, `step` bytes apart, begin within `bytes` bytes; at most `max`.
   static std::int32_t StepsThatFit(std::int64_t bytes, std::int64_t step, std::int32_t max) {
     if (bytes < 0) return 0;
     return step == 0 ? max : static_cast<std::int32_t>(std::min<std::int64_t>(max, bytes / step + 1));
@@ -108,8 +108,8 @@ class BandReader {
     return StepsThatFit(bufferBytes_ - Span(columns, 1), rowStep_, height_);
   }
 
-  /// Reads bands of whole rows in the order of the file, from the bottom for a bottom-up frame. A row of
-  /// blocks larger than the buffer is read in parts from its top, because that is the order of its sums.
+  /// Reads bands of whole rows in file order, so a bottom-up frame is read from its bottom. A row of blocks
+  /// larger than the buffer is read in parts from its top, because its sums require that order.
   bool ReadBands(std::int32_t rowsThatFit) {
     const std::int32_t bandRows = std::max(rowsThatFit / factor_, 1) * factor_;
     const std::int32_t bands = (height_ + bandRows - 1) / bandRows;
@@ -134,9 +134,9 @@ class BandReader {
     return true;
   }
 
-  /// Reads a frame of which no whole rows lie together, in tiles whose pixels are collected from as many
-  /// reads as it takes. A tile is as wide as whole blocks, and those that lie below each other come one after
-  /// the other, so that every block gets its rows from the top.
+  /// Reads a frame whose rows are not contiguous, in tiles. The pixels of a tile are collected from as many
+  /// reads as necessary. A tile has the width of whole blocks, and the tiles of a column are read from the
+  /// top down, so that every block gets its rows from the top.
   bool ReadTiles() {
     const std::int64_t maxPixels = kBandBytes / pixelBytes_;
     if (factor_ > maxPixels) return false;
@@ -160,8 +160,8 @@ class BandReader {
     return true;
   }
 
-  /// Returns the size of a tile that takes few reads: one that spans about as many bytes from left to right
-  /// as from top to bottom.
+  /// Returns a tile of a size that needs few reads: it spans about as many bytes from left to right as from
+  /// top to bottom.
   Rectangle FirstTile(std::int64_t maxPixels) const {
     const double ratio =
         static_cast<double>(rowStep_) / static_cast<double>(std::max<std::int64_t>(pixelStep_, 1));
@@ -173,8 +173,8 @@ class BandReader {
     return {0, 0, columns / factor_ * factor_, rows};
   }
 
-  /// Calls `read` with rectangles that together are `whole`, each small enough for the buffer and dense
-  /// enough to be one read, until it returns false. Returns whether all calls returned true.
+  /// Splits `whole` into rectangles that are small enough for the buffer and dense enough for one read, and
+  /// calls `read` with each until it returns false. Returns whether all calls returned true.
   template <class Read>
   bool SplitIntoReads(const Rectangle& whole, const Read& read) const {
     const std::int64_t span = Span(whole.columns, whole.rows);
@@ -210,7 +210,7 @@ class BandReader {
     return true;
   }
 
-  /// Copies pixels of a row to where they have no gaps.
+  /// Copies pixels of a row without the gaps between them.
   void CopyPixels(const std::byte* source, std::int32_t count, std::byte* target) const {
     switch (pixelBytes_) {
       case 1: return CopyPixelsOf<1>(source, count, target);
@@ -269,14 +269,14 @@ class BandReader {
   const FrameLayout& layout_;
   FrameRenderer& renderer_;
   std::int32_t factor_;
-  std::int32_t width_;  // of the whole blocks
+  std::int32_t width_;  // of all whole blocks
   std::int32_t height_;
   std::int64_t pixelBytes_;
   std::int64_t pixelStep_;
   std::int64_t rowStep_;
   std::int64_t bufferBytes_ = 0;
   std::unique_ptr<std::byte[]> buffer_;
-  std::unique_ptr<std::byte[]> tile_;  // its pixels without gaps
+  std::unique_ptr<std::byte[]> tile_;  // the pixels of a tile, without gaps
   std::int64_t position_ = -1;         // of the stream; -1 if unknown
 };
 

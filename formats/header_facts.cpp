@@ -10,7 +10,7 @@ namespace {
 
 using Facts = std::vector<HeaderFact>;
 
-/// All that its users look for is in the answers that every file has.
+/// Every value of interest is already in the reader's interface (FileTypeInfo).
 Facts FactsOf(const MrcParser&) {
   return {};
 }
@@ -104,7 +104,7 @@ std::vector<HeaderFact> HeaderFacts(std::istream& stream, const std::wstring& ex
     try {
       facts = FactsOf(KindParser(stream));
     } catch (const std::exception&) {  // NOLINT(bugprone-empty-catch)
-      // Why the contents cannot be followed is explained by ExplainFault.
+      // ExplainFault explains why the contents cannot be read.
     }
   });
   return facts;

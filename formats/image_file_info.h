@@ -1,4 +1,4 @@
-// The reader of every file kind: FileTypeInfo, answered by the kind's parser.
+// The reader of every file kind, which implements FileTypeInfo with the kind's parser.
 #pragma once
 
 #include <windows.h>
@@ -17,7 +17,7 @@ namespace Qel::Lumetra::ShellExt {
 template <Parser KindParser>
 class ImageFileInfo final : public FileTypeInfo {
  public:
-  /// Parses the header. `extension` (without the dot) only chooses the description.
+  /// Parses the header. `extension` (without the dot) selects only the description.
   explicit ImageFileInfo(std::istream& stream, const std::wstring& extension = {})
       : parser_(stream), descriptionId_(DescriptionId<KindParser>(extension)) {}
 

@@ -34,8 +34,8 @@ void SwapWords(unsigned char* bytes, std::size_t wordBytes, std::size_t count) {
   for (std::size_t i = 0; i < count; ++i) std::reverse(bytes + i * wordBytes, bytes + (i + 1) * wordBytes);
 }
 
-/// Swaps the header words that are integers in every variant of the format. Floats stay as they are: none
-/// of them is used.
+/// Swaps the header words that are integers in every variant of the format. The floats remain unswapped,
+/// because none of them is used.
 void SwapHeader(unsigned char* bytes) {
   struct Words {
     std::size_t offset, wordBytes, count;
@@ -54,7 +54,7 @@ void SwapHeader(unsigned char* bytes) {
 
 MrcParser::MrcParser(std::istream& stream) : FileParser(stream) {
   stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
-  // No frame is that large in both directions, so the bytes must be in the other order.
+  // No frame is this large in both directions, so such a header has the other byte order.
   constexpr std::uint32_t kTooLarge = 65536;
   isSwapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
                static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;
@@ -83,7 +83,7 @@ MrcPixelType MrcParser::PixelTypeOfMode() const {
     case 4: return MrcPixelType::kComplexFloat32;
     case 6: return MrcPixelType::kUInt16;
     case 16: return MrcPixelType::kRgb24;
-    default: return MrcPixelType::kUInt8;  // mode 0, and every mode that is not known here
+    default: return MrcPixelType::kUInt8;  // mode 0 and every unknown mode
   }
 }
 
@@ -105,14 +105,14 @@ std::string MrcParser::comment() const {
 FrameLayout MrcParser::Section(std::int32_t section) const {
   const PixelType type = PixelTypeOf(PixelTypeOfMode());
   const Size2 size = {Word(kNx), Word(kNy)};
-  // Sizes and positions are 32-bit and wrap: a section beyond 2 GiB is not reached.
+  // Sizes and positions wrap at 32 bits, so a section beyond 2 GiB cannot be read. Intentional.
   const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size.width, size.height), type.bytes());
   const std::int32_t position =
       WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
   FrameLayout layout = FlippedVertically(PackedLayout(type, size, position));
   layout.blockBytes = frameBytes;
-  // Only 16-bit pixels are swapped; floats, complex numbers and colours of a swapped file are read as they
-  // are.
+  // Only 16-bit pixels are swapped. Floats, complex numbers and colours of a swapped file are not.
+  // Intentional.
   layout.swapBytes = isSwapped_ && type.bits == 16;
   return layout;
 }

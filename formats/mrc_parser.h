@@ -1,5 +1,5 @@
-// The MRC family: .mrc, .ali and .rec are one format, a 1024-byte header and a stack of sections, the middle
-// one of which stands for the file.
+// The MRC family: .mrc, .ali and .rec are one format, a 1024-byte header and a stack of sections. The middle
+// section represents the file.
 #pragma once
 
 #include <array>
@@ -11,7 +11,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Pixel types as this reader numbers them; not the modes of the file, and not DataType.
+/// The parser's own numbers of pixel types, which are neither the modes of the file nor those of DataType.
 enum class MrcPixelType : std::uint32_t {
   kUInt8 = 0,
   kInt16 = 1,
@@ -22,17 +22,17 @@ enum class MrcPixelType : std::uint32_t {
   kRgb24 = 6,
 };
 
-/// Field offsets are those of the MRC2014 format note.
+/// The offsets of fields are from the MRC2014 format note.
 class MrcParser final : public FileParser {
  public:
   explicit MrcParser(std::istream& stream);
 
-  /// The labels in use, trimmed at their end, those that are not empty one per line.
+  /// Returns the labels in use, without trailing spaces and without empty ones, one per line.
   std::string comment() const;
 
  private:
   static constexpr std::size_t kBytes = 1024;
-  // Offsets in bytes of the words that are used.
+  // Offsets in bytes of the fields that are used.
   static constexpr std::size_t kNx = 0;
   static constexpr std::size_t kNy = 4;
   static constexpr std::size_t kNz = 8;
@@ -44,7 +44,7 @@ class MrcParser final : public FileParser {
   std::int32_t Word(std::size_t offset) const;
   MrcPixelType PixelTypeOfMode() const;
 
-  /// Where the pixels of a section lie, the first stored row at the bottom of the picture.
+  /// Returns the layout of a section. The first stored row is at the bottom of the picture.
   FrameLayout Section(std::int32_t section) const;
 
   std::array<unsigned char, kBytes> bytes_{};

@@ -14,7 +14,8 @@ namespace {
 constexpr std::int64_t kHeaderBytes = 49;
 constexpr std::array kMagic = std::to_array("QEL RawImage");  // with its terminating zero
 
-/// The kind of value is in the upper half of the code, the number of bits in the lower.
+/// Returns the type for a code with the value class in its upper and the bits per pixel in its lower 16 bits;
+/// nothing for an unknown code.
 std::optional<DataType> TypeOf(std::int32_t code) {
   switch (code) {
     case 0x00008: return DataType::kUInt8;
@@ -59,8 +60,8 @@ RawParser::RawParser(std::istream& stream) : FileParser(stream) {
     stream.setstate(std::ios_base::badbit);
     return;
   }
-  // The bytes from the end of the header to the end of the furthest pixel after it. The sums are 32-bit and
-  // wrap, which leaves pixels outside of the block: such an image cannot be read.
+  // The block reaches from the end of the header to the end of the furthest pixel. The sums wrap at 32 bits.
+  // A wrap leaves pixels outside the block, and then the image cannot be read. Intentional.
   const std::int64_t right = WrapToInt32((width - std::int64_t{1}) * pixelStride);
   const std::int64_t down = WrapToInt32((height - std::int64_t{1}) * rowStride);
   const std::int32_t furthest = std::max(

@@ -1,6 +1,6 @@
-// .raw files: one image behind a header of 49 bytes that begins with "QEL RawImage" and gives the place of
-// the first pixel and the steps to the next pixel and the next row, so that packed, padded, interleaved and
-// bottom-up images are all alike.
+// .raw files: one image after a header of 49 bytes. The header begins with "QEL RawImage" and has the
+// position of the first pixel and the steps to the next pixel and to the next row. Packed, padded,
+// interleaved and bottom-up images therefore need no separate code.
 #pragma once
 
 #include <istream>

@@ -17,7 +17,7 @@ namespace {
 constexpr std::uint16_t kByteOrder = 0x4949;
 constexpr std::uint16_t kSeriesId = 0x0197;
 constexpr std::uint16_t kFirstVersion = 0x0210;
-constexpr std::uint16_t kFirstWideVersion = 0x0220;  // gives the place of the offset arrays in 64 bits
+constexpr std::uint16_t kFirstWideVersion = 0x0220;  // has the position of the offset arrays in 64 bits
 constexpr std::uint32_t kLines = 0x4120;
 constexpr std::uint32_t kImages = 0x4122;
 constexpr std::uint32_t kTimeTags = 0x4152;
@@ -58,7 +58,8 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   const auto tagTypeId = ReadLittleEndian<std::uint32_t>(stream);
   const auto totalElements = ReadLittleEndian<std::uint32_t>(stream);
   const auto validElements = ReadLittleEndian<std::uint32_t>(stream);
-  // Of a wide offset only the low half counts, on purpose: all other offsets have 32 bits in any version.
+  // Only the low half of a wide offset is used, because all other offsets have 32 bits in every version.
+  // Intentional.
   const auto arrayOffset = seriesVersion >= kFirstWideVersion
                                ? static_cast<std::uint32_t>(ReadLittleEndian<std::uint64_t>(stream))
                                : ReadLittleEndian<std::uint32_t>(stream);
@@ -70,7 +71,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   Require(validElements >= 1, "valid elements", validElements, "at least 1");
   Require(totalElements >= validElements, "total elements", totalElements,
           "at least the number of valid elements");
-  // What the elements are is known before the kind of their tags.
+  // The kind of the elements is decided without the kind of their tags.
   isImageSeries_ = !fault() && dataTypeId == kImages;
   Require(dataTypeId == kLines || dataTypeId == kImages, "data type id", dataTypeId,
           "0x4122 (images) or 0x4120 (lines)");
@@ -88,7 +89,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   Require(isImageSeries_, "This is a series of lines (data type id 0x4120), which have no picture.");
 }
 
-/// A series that ends within its dimensions is not a valid one.
+/// Reads the dimensions. A series that ends within them is not valid.
 void SerParser::ReadDimensions() {
   for (std::uint32_t i = 0; i < series_->dimensionCount && stream().good(); ++i) {
     SerDimension dimension = ReadDimension(stream());
@@ -98,11 +99,11 @@ void SerParser::ReadDimensions() {
 
 void SerParser::ReadElements(std::uint32_t arrayOffset, std::uint32_t count) {
   constexpr std::size_t kEntryBytes = sizeof(std::uint32_t);
-  constexpr std::uint32_t kMaxEntries = 1024;  // that are held at a time
+  constexpr std::uint32_t kMaxEntries = 1024;  // in memory at a time
 
-  // The offsets of the elements are followed by as many of their tags, on purpose even where the header
-  // has room for more elements than are valid. Nothing is done with the tags, but their offsets must be
-  // there, and they are if their last byte is.
+  // The offsets of the elements are followed by the same number of offsets of their tags, even if the header
+  // has room for more elements than are valid. Intentional. The tags are not used, but their offsets must
+  // exist, and reading their last byte proves that they do.
   stream().seekg(std::int64_t{arrayOffset} + 2 * std::int64_t{kEntryBytes} * count - 1);
   stream().get();
 

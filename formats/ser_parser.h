@@ -1,4 +1,4 @@
-// .ser files: a series of images, found through an array of offsets. The first image stands for the file.
+// .ser files: a series of images, found through an array of offsets. The first image represents the file.
 #pragma once
 
 #include <cstdint>
@@ -11,59 +11,61 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Element number `element` of an axis has the value `offset`; the step from element to element is `delta`.
+/// The values of an axis: element number `element` has the value `offset`, and neighbouring elements differ
+/// by `delta`.
 struct SerCalibration {
   double offset = 0;
   double delta = 0;
   std::int32_t element = 0;
 };
 
-/// One of the directions in which the images of a series follow each other.
+/// A dimension of the series, along which its images follow each other.
 struct SerDimension {
   std::uint32_t dimensionSize = 0;
   SerCalibration calibration;
-  std::string description;  // this and `units` as far as ReadText keeps them
+  std::string description;  // ReadText limits the length of this and of `units`
   std::string units;
 };
 
-/// What the header says of the series as a whole.
+/// The part of the header that describes the series as a whole.
 struct SerSeries {
-  bool hasPositionTags = false;  // otherwise the tags of the images are times
+  bool hasPositionTags = false;  // otherwise the images have time tags
   std::uint32_t dimensionCount = 0;
-  std::vector<SerDimension> dimensions;  // the first ones, at most kMaxDimensions
+  std::vector<SerDimension> dimensions;  // the first kMaxDimensions at most
 };
 
-/// The axes of an image.
+/// The calibrations of an image's axes.
 struct SerElement {
   SerCalibration calibrationX;
   SerCalibration calibrationY;
 };
 
-/// Goes once through the whole index, from the stream's position, and keeps the first element of it. Takes
-/// neither memory nor time for more than what the file really holds.
+/// Reads the whole index once from the stream's position and keeps its first element. Memory and time follow
+/// the bytes of the file, not the counts in its header.
 class SerParser final : public FileParser {
  public:
-  /// Throws std::length_error for a text of negative length.
+  /// Throws std::length_error for a string of negative length.
   explicit SerParser(std::istream& stream);
 
-  /// A series of lines is parsed too, but is not valid.
+  /// Returns whether the file is a complete series of images. A series of lines is parsed too, but is not
+  /// valid.
   bool IsValid() const { return stream().good() && isImageSeries_; }
 
-  /// A series has one or two dimensions; more than these are not kept.
+  /// The maximum number of dimensions to keep. A real series has one or two.
   static constexpr std::size_t kMaxDimensions = 16;
 
-  /// None if the header is not acceptable. The dimensions are those that were read before a fault.
+  /// Returns the series, with the dimensions before any fault; nothing if the header is not acceptable.
   const std::optional<SerSeries>& series() const { return series_; }
 
-  /// Of the first image; none if its header could not be read.
+  /// Returns the first image; nothing if its header could not be read.
   const std::optional<SerElement>& element() const { return element_; }
 
  private:
   void ReadDimensions();
   void ReadElements(std::uint32_t arrayOffset, std::uint32_t count);
 
-  /// Reads the header of an image, and keeps the calibrations of the first one. Fails the stream for an
-  /// element that is not there or of an unknown type.
+  /// Reads the header of the element at `position`, keeps the calibrations of the first one, and returns the
+  /// element's layout. Fails the stream if the element is not in the file or has an unknown type.
   FrameLayout ReadElement(std::uint32_t position);
 
   bool isImageSeries_ = false;

@@ -1,4 +1,4 @@
-// The numbering of pixel types that .ser and .ebn files share.
+// The numbers of pixel types that .ser and .ebn files share.
 #pragma once
 
 #include <cstdint>
@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns the type with the number `code`, counted from 1; none for an unused number.
+/// Returns the type with the number `code`, from 1 on; nothing for an unused number.
 std::optional<DataType> DataTypeOfCode(std::int32_t code);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -18,7 +18,7 @@ struct EbnFile {
   double lens = 0;
   double dNumber = 0;
   double kilovolts = 0;
-  std::string afterHeader{};  // the pixels, after whatever lies between the header and `dataOffset`
+  std::string afterHeader{};  // the pixels, and any bytes between the header and `dataOffset`
 
   std::string Bytes() const;
 };

@@ -1,5 +1,4 @@
-// Writes .emi files: every function makes the bytes of an item, of which lists are made by putting them one
-// after the other.
+// Writes .emi files. Every function returns the bytes of an item; concatenated items are a list.
 #pragma once
 
 #include <cstdint>
@@ -11,30 +10,29 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Type and tag of an item, which is also all there is of the opening of a structure.
+/// Returns the type and the tag of an item, which are also the whole beginning of a structure.
 std::string EmiOpening(std::uint16_t type, std::uint16_t tag);
 
-/// The end marker of a list.
+/// Returns the end marker of a list.
 std::string EmiEnd();
 
-/// An item of a fixed size: one of the types 0x0010 to 0x0041. `value` is its bytes.
+/// Returns an item of a fixed size: one of the types 0x0010 to 0x0041. `value` is its bytes.
 std::string EmiScalar(std::uint16_t type, std::uint16_t tag, std::string_view value);
 
 std::string EmiDouble(std::uint16_t tag, double value);
 
-/// `length` is what the item says of its text's length, where it shall lie.
+/// Returns a string item. `length` overrides the length that the item states, for a wrong one.
 std::string EmiText(std::uint16_t tag, std::string_view text, std::optional<std::uint32_t> length = {});
 
-/// `byteCount` is what the item says of its payload's length, where it shall lie.
+/// Returns an array. `byteCount` overrides the size in bytes that the item states, for a wrong one.
 std::string EmiArray(std::uint16_t type, std::uint16_t tag, std::string_view payload,
                      std::optional<std::uint32_t> byteCount = {});
 
-/// A structure of the items in `items`, with its end marker.
+/// Returns a structure of the items in `items`, with its end marker.
 std::string EmiStructure(std::uint16_t type, std::uint16_t tag, std::string_view items);
 
-/// A pixel array as it stands in an image object. The even types from 0x2200 to 0x2214 are signed and
-/// unsigned integers of 8, 16 and 32 bits, float, double, (0x2210: nothing), complex of doubles and complex
-/// of floats.
+/// Returns a pixel array of an image object. The even types from 0x2200 to 0x2214 are signed and unsigned
+/// integers of 8, 16 and 32 bits, float, double, (0x2210: unused), complex of doubles and complex of floats.
 std::string EmiPixelArray(std::uint16_t type, std::uint32_t width, std::uint32_t height,
                           std::string_view pixels);
 
@@ -45,12 +43,12 @@ struct EmiFile {
   std::uint16_t magic = 0x4B4A;
   std::uint16_t version = 0x0200;
   std::uint32_t ignored = 0;
-  std::string items{};  // of the top-level list, with or without its end marker
+  std::string items{};  // the top-level list, with or without its end marker
 
   std::string Bytes() const;
 };
 
-/// A file of one image object.
+/// Returns a file with one image object.
 EmiFile OneImageEmiFile(std::uint16_t arrayType, std::uint32_t width, std::uint32_t height,
                         std::string_view pixels);
 

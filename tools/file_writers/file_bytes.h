@@ -1,5 +1,5 @@
-// The bytes of a file under construction. The writers of the single file kinds (mrc_file.h and its
-// neighbours) put their fields here one by one, so that a test can set any of them to anything.
+// The bytes of a file under construction. The writers of the file kinds (mrc_file.h and others) append their
+// fields one by one, so that a test can give any field any value.
 #pragma once
 
 #include <bit>
@@ -19,7 +19,7 @@ class FileBytes {
  public:
   explicit FileBytes(ByteOrder order = ByteOrder::kLittleEndian) : order_(order) {}
 
-  /// An integer, or a float or double as its IEEE bits.
+  /// Appends an integer, or a float or double as its IEEE bits.
   template <class Number>
     requires std::is_arithmetic_v<Number>
   FileBytes& Put(Number number) {
@@ -40,7 +40,7 @@ class FileBytes {
     return *this;
   }
 
-  /// Zero bytes as far as file offset `offset`; none if that is passed already.
+  /// Appends zero bytes up to file offset `offset`; nothing if the file is already longer.
   FileBytes& PadTo(std::size_t offset) {
     if (bytes_.size() < offset) bytes_.resize(offset);
     return *this;
@@ -54,7 +54,7 @@ class FileBytes {
   std::string bytes_;
 };
 
-/// The bytes of numbers of one type, one after the other, for instance the pixels of a frame.
+/// Returns the bytes of numbers of one type, for instance of the pixels of a frame.
 template <class Number>
 std::string BytesOf(std::initializer_list<Number> numbers, ByteOrder order = ByteOrder::kLittleEndian) {
   FileBytes bytes(order);

@@ -15,12 +15,12 @@ struct MrcFile {
   std::int32_t ny = 1;
   std::int32_t nz = 1;
   std::int32_t mode = 0;
-  std::optional<std::int32_t> next{};          // the length of `extendedHeader`, unless it shall lie
-  std::optional<std::int32_t> nlabl{};         // the number of `labels`, unless it shall lie
-  std::vector<std::string> labels{};           // of at most 80 bytes each, filled up with zeros
+  std::optional<std::int32_t> next{};          // default: the bytes of `extendedHeader`
+  std::optional<std::int32_t> nlabl{};         // default: the number of `labels`
+  std::vector<std::string> labels{};           // of at most 80 bytes each, padded with zeros
   ByteOrder order = ByteOrder::kLittleEndian;  // of the header
   std::string extendedHeader{};
-  std::string pixels{};  // as they lie in the file: the bottom row of section 0 first
+  std::string pixels{};  // in file order: the bottom row of section 0 first
 
   std::string Bytes() const;
 };

@@ -20,12 +20,12 @@ struct RawFile {
   std::int32_t offset = 0;
   std::int32_t pixelStride = 1;
   std::int32_t rowStride = 1;
-  std::string pixels{};  // the block of bytes that follows the header
+  std::string pixels{};  // the bytes after the header
 
   std::string Bytes() const;
 };
 
-/// A file whose rows lie one after the other without padding. `type` must be a known one.
+/// Returns a file whose rows are contiguous, without padding. `type` must be a listed type.
 RawFile PackedRawFile(DataType type, std::int32_t width, std::int32_t height, std::string pixels);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

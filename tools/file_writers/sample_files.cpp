@@ -13,20 +13,20 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
-// The frame of most samples: not square, no round numbers, and small, as every file is read thousands of
+// The frame of most samples: not square, no powers of two, and small, because every file is read thousands of
 // times.
 constexpr std::int32_t kWidth = 7;
 constexpr std::int32_t kHeight = 5;
 constexpr std::int32_t kPixels = kWidth * kHeight;
 
-/// `count` bytes of which no neighbours are equal.
+/// Returns `count` bytes, of which no two neighbours are equal.
 std::string Pattern(std::int32_t count) {
   std::string bytes;
   for (std::int32_t i = 0; i < count; ++i) bytes += static_cast<char>(i * 37 % 251);
   return bytes;
 }
 
-/// Bytes of a pixel by the type codes that .ebn and .ser files have in common, from 1 on.
+/// Bytes per pixel by the type codes of .ebn and .ser files, which count from 1.
 constexpr std::int32_t kBytesOfTypeCode[] = {0, 1, 2, 4, 1, 2, 4, 4, 8, 8, 16};
 
 class Samples {
@@ -57,7 +57,7 @@ std::vector<SampleFile> MrcSamples() {
     std::int32_t mode;
     std::int32_t pixelBytes;
   };
-  // Modes that are not known here are read as bytes.
+  // Unknown modes are read as bytes.
   constexpr Mode kModes[] = {{0, 1}, {1, 2}, {2, 4}, {3, 4}, {4, 8}, {6, 2}, {16, 3}, {5, 1}, {7, 1}};
 
   Samples samples;
@@ -90,7 +90,7 @@ constexpr DataType kDataTypes[] = {DataType::kUInt8,          DataType::kUInt16,
                                    DataType::kFloat32,        DataType::kFloat64, DataType::kComplexFloat32,
                                    DataType::kComplexFloat64, DataType::kRgb24,   DataType::kBgr24};
 
-/// The same picture with its rows stored from the bottom.
+/// Returns the same file with strides for rows that are stored from the bottom.
 RawFile BottomUp(RawFile file) {
   file.offset = (file.height - 1) * file.rowStride;
   file.rowStride = -file.rowStride;
@@ -131,7 +131,7 @@ std::vector<SampleFile> RawSamples() {
   return samples.Take();
 }
 
-/// The pixels at once behind the header.
+/// Returns a file whose pixels directly follow the header.
 EbnFile Ebn(std::uint16_t typeCode, std::int32_t width, std::int32_t height) {
   EbnFile file;
   file.typeCode = typeCode;

@@ -1,5 +1,5 @@
-// Valid files of every kind, small and different from each other: every pixel type, byte order, stride form
-// and version. They are the seeds of the fuzzers and what the reliability tests damage.
+// Small, valid and varied files of every kind, which cover every pixel type, byte order, form of strides and
+// version. They are the seeds of the fuzzers, and the files that the reliability tests damage.
 #pragma once
 
 #include <string>
@@ -11,12 +11,12 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct SampleFile {
-  std::string name;  // of characters that a file name can have
+  std::string name;  // valid as a file name
   std::string bytes;
 };
 
-/// At least 20 files of `kind`, one of kSampleKinds. Every one of them has a thumbnail; the first is the
-/// smallest that has all parts of its kind.
+/// Returns at least 20 files of `kind`, one of kSampleKinds. All of them have a thumbnail. The first is the
+/// smallest with all parts of its kind. Throws std::invalid_argument for an unknown kind.
 std::vector<SampleFile> SampleFiles(std::string_view kind);
 
 }  // namespace Qel::Lumetra::ShellExt::Testing

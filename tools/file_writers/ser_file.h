@@ -21,8 +21,8 @@ struct SerDimension {
   SerCalibration calibration{};
   std::string description = "Number";
   std::string units{};
-  std::optional<std::int32_t> descriptionLength{};  // unless it shall lie
-  std::optional<std::int32_t> unitsLength{};        // unless it shall lie
+  std::optional<std::int32_t> descriptionLength{};  // default: the length of `description`
+  std::optional<std::int32_t> unitsLength{};        // default: the length of `units`
 };
 
 struct SerElement {
@@ -37,22 +37,22 @@ struct SerElement {
   std::string Bytes() const;
 };
 
-/// The header, the dimensions, the elements, the data offsets and the tag offsets, in this order.
+/// A file with the header, the dimensions, the elements, the data offsets and the tag offsets, in this order.
 struct SerFile {
   std::uint16_t byteOrder = 0x4949;
   std::uint16_t seriesId = 0x0197;
-  std::uint16_t version = 0x0210;     // from 0x0220 on the header gives its offset in 64 bits
+  std::uint16_t version = 0x0210;     // from 0x0220 on, offsetArrayOffset has 64 bits
   std::uint32_t dataTypeId = 0x4122;  // images; 0x4120: lines
   std::uint32_t tagTypeId = 0x4152;   // times; 0x4142: times and positions
   std::vector<SerDimension> dimensions = std::vector<SerDimension>(1);
   std::vector<SerElement> elements{};
 
-  // What the file says, where it shall lie.
+  // Override the values that follow from the fields above, for a file with wrong ones.
   std::optional<std::uint32_t> totalElements{};
   std::optional<std::uint32_t> validElements{};
   std::optional<std::uint64_t> offsetArrayOffset{};
   std::optional<std::uint32_t> dimensionCount{};
-  std::optional<std::string> offsetArrays{};  // the bytes of both
+  std::optional<std::string> offsetArrays{};  // the bytes of both arrays
 
   std::string Bytes() const;
 };

@@ -1,4 +1,4 @@
-// qelsamples: writes the sample files into a folder.
+// qelsamples, the program that writes the sample files into a folder.
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
@@ -7,7 +7,7 @@
 
 namespace {
 
-/// Takes the characters in which the system has its paths.
+/// Runs the program; the arguments have the character type of the system's paths. Returns the exit status.
 int Run(int count, const std::filesystem::path::value_type* const* arguments) {
   namespace fs = std::filesystem;
   if (count != 2 || arguments[1][0] == '-') {

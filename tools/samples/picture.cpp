@@ -15,7 +15,7 @@ double Random::Uniform() {
 }
 
 double Random::Normal() {
-  // The sum of four uniform numbers, brought to the right spread.
+  // The sum of four uniform numbers, scaled to a standard deviation of 1.
   double sum = 0;
   for (int i = 0; i < 4; ++i) sum += Uniform();
   return (sum - 2) * std::sqrt(3.0);
@@ -24,7 +24,7 @@ double Random::Normal() {
 int Random::Count(double mean) {
   if (mean <= 0) return 0;
   if (mean > 30) return static_cast<int>(std::max(0.0, mean + Normal() * std::sqrt(mean) + 0.5));
-  // Binomial with many trials of small probability.
+  // A binomial distribution of many trials with small probability approximates a Poisson distribution.
   constexpr int kTrials = 64;
   int count = 0;
   for (int i = 0; i < kTrials; ++i) count += Uniform() * kTrials < mean ? 1 : 0;
@@ -63,7 +63,7 @@ void Picture::AddNoise(Random& random, double deviation) {
 }
 
 void Picture::AddClouds(Random& random, double grain, double strength) {
-  // Random values at the corners of a coarse grid, with soft steps between them.
+  // Interpolates smoothly between random values at the corners of a coarse grid.
   const int columns = static_cast<int>(width_ / grain) + 2;
   const int rows = static_cast<int>(height_ / grain) + 2;
   Picture corners(columns, rows);

@@ -1,8 +1,8 @@
 // The grey picture in which a sample is drawn before it becomes the pixels of a file.
 //
-// Samples shall have the same bytes on every machine. So drawing uses nothing but additions, multiplications,
-// divisions and square roots, which IEEE arithmetic rounds in one way only; the sines and bell curves of the
-// standard library differ from one platform to the next.
+// Samples have the same bytes on every machine. Drawing therefore uses only additions, multiplications,
+// divisions and square roots, whose results IEEE arithmetic defines exactly. The sines and exponentials of
+// standard libraries differ between platforms.
 #pragma once
 
 #include <algorithm>
@@ -13,44 +13,44 @@
 
 namespace Qel::Lumetra::ShellExt::Samples {
 
-/// Numbers that are the same for the same seed (SplitMix64).
+/// A random number generator with the same numbers for the same seed (SplitMix64).
 class Random {
  public:
   explicit Random(std::uint64_t seed) : state_(seed) {}
 
   std::uint64_t Next();
 
-  /// From 0 up to, not including, 1.
+  /// Returns a number from 0 up to, but not including, 1.
   double Uniform();
   double Uniform(double low, double high) { return low + (high - low) * Uniform(); }
 
-  /// Of mean 0 and standard deviation 1, and never further than 3.5 from 0.
+  /// Returns a number with mean 0 and standard deviation 1, between -3.5 and 3.5.
   double Normal();
 
-  /// A count whose mean is `mean`, as quanta arrive at a detector.
+  /// Returns a random count with the mean `mean`, like that of quanta at a detector.
   int Count(double mean);
 
  private:
   std::uint64_t state_;
 };
 
-/// The sine of `turns` full turns, to about 1e-6.
+/// Returns the sine of `turns` full turns, to about 1e-6.
 double Sine(double turns);
 inline double Cosine(double turns) {
   return Sine(turns + 0.25);
 }
 
-/// A bell of height 1 around 0 that has faded to 0 at 1 and beyond.
+/// Returns the height of a bell curve, which is 1 at 0 and 0 from 1 on.
 double Bell(double distance);
 
 inline double Distance(double dx, double dy) {
   return std::sqrt(dx * dx + dy * dy);
 }
 
-/// From 0 below `low` to 1 above `high` without a corner.
+/// Rises smoothly from 0 at `low` to 1 at `high`.
 double SmoothStep(double low, double high, double x);
 
-/// Values without a scale of their own; most scenes stay near 0 to 1. Row 0 is the top.
+/// Pixel values of no particular unit; those of most scenes are near 0 to 1. Row 0 is the top.
 class Picture {
  public:
   Picture(int width, int height, double value = 0);
@@ -62,7 +62,7 @@ class Picture {
   double& At(int x, int y) { return values_[Index(x, y)]; }
   double At(int x, int y) const { return values_[Index(x, y)]; }
 
-  /// Sets every pixel to `value(x, y)`, from the top left, row by row.
+  /// Sets every pixel to `value(x, y)`, row by row from the top left.
   template <class Value>
   void Fill(Value value) {
     for (int y = 0; y < height_; ++y) {
@@ -88,7 +88,7 @@ class Picture {
   /// Adds noise with the standard deviation `deviation` to every pixel.
   void AddNoise(Random& random, double deviation);
 
-  /// Adds soft unevenness: noise whose grain is `grain` pixels wide, between -strength and strength.
+  /// Adds smooth noise between -strength and strength, whose grain is `grain` pixels wide.
   void AddClouds(Random& random, double grain, double strength);
 
  private:

@@ -19,7 +19,7 @@ namespace {
 
 using namespace Testing;
 
-/// The value v of a pixel as the number offset + scale * v of a type; integers are rounded and stay within
+/// Converts the value v of a pixel to offset + scale * v in another type. Integers are rounded and clamped to
 /// their range.
 template <class Number>
 Number AsNumber(double v, double scale, double offset) {
@@ -33,7 +33,7 @@ Number AsNumber(double v, double scale, double offset) {
   }
 }
 
-/// The rows from the top, without padding.
+/// Returns the rows without padding, top row first.
 template <class Number>
 std::string Pixels(const Picture& picture, double scale, double offset = 0) {
   FileBytes bytes;
@@ -41,7 +41,8 @@ std::string Pixels(const Picture& picture, double scale, double offset = 0) {
   return bytes.bytes();
 }
 
-/// No pixel is 0: the logarithm of a single one would make the whole thumbnail black.
+/// Returns the pixels, with 1 instead of a real part of 0: the logarithm of a single 0 would make the whole
+/// thumbnail black.
 template <class Number>
 std::string ComplexPixels(const ComplexPicture& picture) {
   FileBytes bytes;
@@ -53,7 +54,7 @@ std::string ComplexPixels(const ComplexPicture& picture) {
   return bytes.bytes();
 }
 
-/// Three bytes for each pixel, in the order in which the maps are given.
+/// Returns three bytes for each pixel, in the order of the arguments.
 std::string ColourPixels(const Picture& first, const Picture& second, const Picture& third) {
   FileBytes bytes;
   for (std::size_t i = 0; i < first.values().size(); ++i) {
@@ -64,7 +65,7 @@ std::string ColourPixels(const Picture& first, const Picture& second, const Pict
   return bytes.bytes();
 }
 
-/// The files of this family have their bottom row first.
+/// Returns the picture with its rows in reverse order, because MRC files store the bottom row first.
 Picture BottomUp(const Picture& picture) {
   Picture flipped(picture.width(), picture.height());
   flipped.Fill([&](int x, int y) { return picture.At(x, picture.height() - 1 - y); });
@@ -262,7 +263,7 @@ std::string EbnGainReference() {
   picture.AddClouds(random, 90, 0.03);
   picture.AddClouds(random, 8, 0.01);
   picture.Fill([&](int x, int y) {
-    const bool seam = x % 48 == 0 || y % 96 == 0;  // the detector is made of tiles
+    const bool seam = x % 48 == 0 || y % 96 == 0;  // the detector consists of tiles
     return picture.At(x, y) + (seam ? 0.03 : 0) + 0.01 * ((x / 48 + y / 96) % 2);
   });
   EbnFile file = EbnOf(picture, 8, Pixels<double>(picture, 1));
@@ -306,7 +307,7 @@ std::string RawPadded() {
 }
 
 std::string RawInterleaved() {
-  // Two detectors take turns: the first of each pair of values belongs to the picture that the header shows.
+  // The pixels of two detectors alternate. The header describes the image of the first one.
   const Picture shown = GridAtlas(256, 256, 21);
   const Picture other = Nanoparticles(256, 256, 22);
   RawFile file = PackedRawFile(DataType::kUInt32, 256, 256, {});

@@ -1,6 +1,5 @@
-// A small collection of files of every supported kind and pixel type, with pictures that look like what a
-// microscope delivers, and a few files that cannot be shown. The bytes are the same in every run and on every
-// machine.
+// A small collection of files of every supported kind and pixel type, with pictures like a microscope's, and
+// a few files that cannot be shown. The bytes are the same in every run and on every machine.
 #pragma once
 
 #include <string>
@@ -9,8 +8,8 @@
 namespace Qel::Lumetra::ShellExt::Samples {
 
 struct Sample {
-  const char* name;       // of the file
-  std::string (*make)();  // its bytes
+  const char* name;       // the file name
+  std::string (*make)();  // returns the bytes
 };
 
 const std::vector<Sample>& AllSamples();

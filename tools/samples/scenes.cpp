@@ -12,7 +12,7 @@ struct Point {
   double y;
 };
 
-/// Places at least `apart` from each other, as many of `wanted` as fit.
+/// Returns random points at least `apart` from each other, as many of `wanted` as fit.
 std::vector<Point> Scatter(Random& random, int width, int height, double apart, int wanted) {
   std::vector<Point> points;
   for (int attempt = 0; attempt < wanted * 20 && static_cast<int>(points.size()) < wanted; ++attempt) {
@@ -25,7 +25,7 @@ std::vector<Point> Scatter(Random& random, int width, int height, double apart, 
   return points;
 }
 
-/// A complex of `units` subunits around a hole, seen along its axis; `weight` is negative for dark ones.
+/// Adds a complex of `units` subunits around a hole, seen along its axis. A negative `weight` makes it dark.
 void AddRingParticle(Picture& picture, Point centre, double radius, int units, double turn, double weight) {
   for (int i = 0; i < units; ++i) {
     const double angle = turn + static_cast<double>(i) / units;
@@ -36,7 +36,7 @@ void AddRingParticle(Picture& picture, Point centre, double radius, int units, d
   }
 }
 
-/// The same complex from the side: two short stacks of bars.
+/// Adds the same complex seen from the side: two short stacks of bars.
 void AddSideParticle(Picture& picture, Point centre, double radius, double turn, double weight) {
   for (int layer = -1; layer <= 1; layer += 2) {
     for (int i = -2; i <= 2; ++i) {
@@ -50,7 +50,7 @@ void AddSideParticle(Picture& picture, Point centre, double radius, double turn,
   }
 }
 
-/// A ring of a membrane's two leaflets.
+/// Adds the ring of a membrane with two leaflets.
 void AddMembrane(Picture& picture, Point centre, double radius, double thickness, double weight) {
   const double reach = radius + 2 * thickness;
   picture.AddDisc(centre.x, centre.y, reach, [&](double distance) {
@@ -77,7 +77,7 @@ Picture Micrograph(int width, int height, std::uint64_t seed) {
       AddSideParticle(picture, point, radius, turn, weight);
     }
   }
-  // A few crystals of ice that fell on the specimen.
+  // A few crystals of ice on the specimen.
   for (const Point& point : Scatter(random, width, height, radius * 6, 4)) {
     const double size = random.Uniform(0.8, 1.6) * radius;
     picture.AddDisc(point.x, point.y, size,
@@ -95,13 +95,13 @@ Picture GridAtlas(int width, int height, std::uint64_t seed) {
   Picture brightness(kSquares + 2, kSquares + 2);
   brightness.Fill([&](int, int) {
     const double kind = random.Uniform();
-    if (kind < 0.08) return 0.98;                       // torn: nothing in the way
+    if (kind < 0.08) return 0.98;                       // torn: nothing absorbs the beam
     if (kind < 0.2) return random.Uniform(0.12, 0.25);  // thick ice
     return random.Uniform(0.45, 0.8);
   });
   Picture picture(width, height);
   picture.Fill([&](int x, int y) {
-    // The grid lies a little turned.
+    // The grid is slightly rotated.
     const double u = (x + 0.12 * y) / pitch;
     const double v = (y - 0.12 * x) / pitch + 1;
     const int column = static_cast<int>(std::floor(u));
@@ -151,7 +151,7 @@ Picture ClassAverage(int width, int height, std::uint64_t seed) {
 
 Picture TiltedView(int width, int height, double tilt, std::uint64_t seed) {
   Random random(seed);
-  // Tilting foreshortens the specimen across the axis, which stands upright.
+  // Tilting foreshortens the specimen perpendicular to the axis, which is vertical.
   const double squeeze = std::sqrt(1 - 0.75 * tilt * tilt);
   const double middle = width / 2.0;
   const auto seenAt = [&](Point point, double depth) {
@@ -210,7 +210,7 @@ Picture DiffractionPattern(int width, int height, std::uint64_t seed) {
   const Point centre = {width * 0.5, height * 0.5};
   const double unit = width / 22.0;
   Picture picture(width, height);
-  // Scattering without order around the beam, and rings of ice.
+  // Diffuse scattering around the beam, and rings of ice.
   picture.Fill([&](int x, int y) {
     const double distance = Distance(x - centre.x, y - centre.y) / unit;
     return 3.0 / (1 + 0.25 * distance * distance) + 0.35 * Bell(std::abs(distance - 5.5) / 0.5) +
@@ -305,7 +305,7 @@ Picture Nanoparticles(int width, int height, std::uint64_t seed) {
     picture.AddDisc(point.x, point.y, size, [&](double distance) {
       return weight * std::sqrt(std::max(0.0, 1 - distance * distance / (size * size)));
     });
-    // Facets of a crystal: a bright fringe across.
+    // A facet of the crystal: a bright fringe.
     picture.AddDisc(point.x + size * 0.2 * Cosine(turn), point.y + size * 0.2 * Sine(turn), size * 0.5,
                     [&](double distance) { return 0.06 * Bell(distance / (size * 0.5)); });
   }
@@ -321,7 +321,7 @@ ComplexPicture Transform(int width, int height, std::uint64_t seed) {
       const double kx = (x - width / 2.0) / (width / 2.0);
       const double ky = (y - height / 2.0) / (height / 2.0);
       const double square = kx * kx + ky * ky;
-      // Stronger defocus in one direction than in the other makes ellipses of the rings.
+      // Defocus that is stronger in one direction turns the rings into ellipses.
       const double astigmatism = 1 + 0.08 * (kx * kx - ky * ky) / (square + 1e-9);
       const double rings = Sine(5.5 * square * astigmatism + 0.02);
       const double envelope = 1 / (1 + 9 * square * square);
@@ -351,7 +351,7 @@ ElementMaps ElementMap(int width, int height, std::uint64_t seed) {
     maps.blue.AddDisc(point.x, point.y, size, [&](double distance) { return 0.8 * Bell(distance / size); });
     maps.green.AddDisc(point.x, point.y, size, [&](double distance) { return 0.3 * Bell(distance / size); });
   }
-  // Few quanta were counted for each pixel.
+  // Few quanta are counted per pixel.
   for (Picture* map : {&maps.red, &maps.green, &maps.blue}) {
     map->Fill([&](int x, int y) { return random.Count(40 * std::max(0.0, map->At(x, y))) / 40.0; });
   }
