@@ -90,7 +90,7 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
       Record(result);
       return Traits::eof();
     }
-    // A count above `wanted` would lie outside of the buffer, whatever the stream reports.
+    // A count above `wanted` would be outside the buffer, whatever the stream reports.
     this->setg(first - kept, first, first + std::min(read, wanted));
     return Traits::to_int_type(*first);
   }

@@ -31,7 +31,7 @@ PixelType PixelTypeOf(DataType type);
 /// Returns the display name, for instance "16 bit signed"; "Unknown" for a value that is not listed.
 std::wstring DataTypeName(DataType type);
 
-/// Returns the bits of one pixel; 0 for a value that is not listed.
+/// Returns the bits per pixel; 0 for a value that is not listed.
 std::int32_t BitsPerPixel(DataType type);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -30,7 +30,7 @@ class FileTypeInfo {
   /// Returns the number of frames (images or sections).
   virtual std::int32_t GetFrameCount() const = 0;
 
-  /// Returns the bits of one pixel.
+  /// Returns the bits per pixel.
   virtual std::int32_t GetBitDepth() const = 0;
 
   /// Returns the display name of the pixel type.

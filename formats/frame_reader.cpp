@@ -17,8 +17,8 @@ namespace {
 // the band is reduced.
 constexpr std::int64_t kBandBytes = 256LL * 1024;
 
-// Strides can make pixels share their bytes, so that a small file claims a picture of any size. A picture may
-// have this many more pixels than bytes. The maximum limits the time for a file of a few bytes.
+// Strides can make pixels overlap in the file, so that a small file claims a picture of any size. A picture
+// may have this many more pixels than bytes. The maximum limits the time for a file of a few bytes.
 constexpr std::int64_t kMaxSharedPixels = 1LL << 26;
 
 // If bands would read the block more often than this, tiles are read instead.
