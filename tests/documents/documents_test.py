@@ -6,6 +6,7 @@ usage: documents_test.py PROJECT_FOLDER VERSION
 
 import pathlib
 import re
+import subprocess
 import sys
 import unittest
 
@@ -53,6 +54,30 @@ class Documents(unittest.TestCase):
         self.assertEqual(versions[0], VERSION)
         packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / "README.md").read_text("utf-8"))
         self.assertEqual(set(packages), {VERSION})
+
+
+class Prose(unittest.TestCase):
+    """Each line of phrases_to_avoid.txt is a regular expression, a tab and what to write instead."""
+
+    phrases = [line.split("\t") for line in
+               (pathlib.Path(__file__).parent / "phrases_to_avoid.txt").read_text("utf-8").splitlines()]
+
+    def texts(self):
+        """Yields the name and the text of each file; a line break and the comment mark after it count as a space."""
+        listed = subprocess.run(["git", "ls-files", "-z"], cwd=PROJECT, stdout=subprocess.PIPE, check=True).stdout
+        for name in listed.decode().split("\0")[:-1]:
+            content = (PROJECT / name).read_bytes()
+            # The notices quote licences.
+            if b"\0" in content or name in ("packaging/NOTICES.txt", "tests/documents/phrases_to_avoid.txt"):
+                continue
+            yield name, re.sub(r"\s*\n\s*(?:(?:///?<?|#|\*|REM) )?\s*", " ", content.decode())
+
+    def test_avoids_the_phrases_that_stop_a_reader(self):
+        self.assertGreater(len(self.phrases), 10)
+        patterns = [(re.compile(rf"\b(?:{phrase})\b", re.IGNORECASE), better) for phrase, better in self.phrases]
+        found = [f"{name}: “{text[max(0, match.start() - 30):match.end() + 30]}”: write {better}"
+                 for name, text in self.texts() for pattern, better in patterns for match in pattern.finditer(text)]
+        self.assertEqual(found, [], "\n".join(found))
 
 
 class FileKinds(unittest.TestCase):

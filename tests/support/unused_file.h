@@ -1,4 +1,4 @@
-// Tells whether an object has closed its file.
+// Reports whether an object has closed its file.
 #pragma once
 
 #include <windows.h>

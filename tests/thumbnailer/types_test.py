@@ -53,7 +53,7 @@ def tarred():
     return data.getvalue()
 
 
-TEXT = b"These lines are aligned by hand.\nThey are no picture.\n" * 20
+TEXT = b"These lines are aligned by hand.\nThey are not a picture.\n" * 20
 FONT = struct.pack(">IHHHH", 0x00010000, 12, 128, 3, 64) + b"DSIG" + bytes(400)
 TIFF = b"II*\0" + struct.pack("<I", 8) + bytes(1000)
 JPEG = b"\xff\xd8\xff\xe0\0\x10JFIF\0\1\1\0\0\1\0\1\0\0" + bytes(1000)
