@@ -16,7 +16,7 @@
 // Frees the emergency memory that libstdc++ reserves for exceptions thrown when memory is exhausted. No
 // header of libstdc++ declares it.
 namespace __gnu_cxx {
-void __freeres();  // NOLINT(misc-use-internal-linkage)
+void __freeres();
 }
 
 // Laid out as the C++ ABI defines it: the stack of caught exceptions, and the number of uncaught ones.

@@ -43,8 +43,8 @@ int Main(const std::vector<std::wstring>& arguments) {
 
 /// Makes the C runtime of mingw-w64 replace patterns on the command line by the files that they match. The
 /// command interpreters of Windows leave this to the programs.
-int _dowildcard = -1;  // NOLINT(misc-use-internal-linkage)
+int _dowildcard = -1;
 
-int wmain(int count, wchar_t** arguments) {  // NOLINT(misc-use-internal-linkage)
+int wmain(int count, wchar_t** arguments) {
   return Qel::Lumetra::ShellExt::Show::Main({arguments + 1, arguments + count});
 }
