@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "file_kinds.h"
+#include "frame_reader.h"
 
 namespace Qel::Lumetra::ShellExt {
 namespace {
@@ -52,6 +53,11 @@ FaultText FrameText(const FrameLayout& frame, std::int64_t end) {
     return {"The file is cut short: the picture ends at byte " + std::to_string(frameEnd) +
                 ", and the file has " + Bytes(end) + ".",
             kIncomplete};
+  }
+  if (!IsReadable(frame)) {
+    return {
+        "The sizes and strides in the header do not fit the " + Bytes(frame.blockBytes) + " of the picture.",
+        kWrongKind};
   }
   return {};
 }

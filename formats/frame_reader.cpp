@@ -32,19 +32,6 @@ constexpr std::int64_t kMinReadBytes = 4096;
 // total than this, which limits its time to a few seconds.
 constexpr std::int64_t kMaxTileReadBytes = 1LL << 34;
 
-/// Returns whether all pixels of the layout are inside its block and not too many for its bytes.
-bool IsReadable(const FrameLayout& layout) {
-  const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
-  if (pixels - layout.blockBytes > kMaxSharedPixels) return false;
-  const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
-  const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
-  const std::int64_t first =
-      layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
-  const std::int64_t last =
-      layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
-  return layout.blockPosition >= 0 && first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
-}
-
 /// Returns whether the stream contains the layout's whole block, so that a truncated file is rejected before
 /// any work. If not, the stream is left failed, as after a short read.
 bool HoldsBlock(std::istream& stream, const FrameLayout& layout) {
@@ -281,6 +268,18 @@ class BandReader {
 };
 
 }  // namespace
+
+bool IsReadable(const FrameLayout& layout) {
+  const std::int64_t pixels = std::int64_t{layout.size.width} * layout.size.height;
+  if (pixels - layout.blockBytes > kMaxSharedPixels) return false;
+  const std::int64_t right = (layout.size.width - std::int64_t{1}) * layout.pixelStride;
+  const std::int64_t down = (layout.size.height - std::int64_t{1}) * layout.rowStride;
+  const std::int64_t first =
+      layout.firstPixel + std::min<std::int64_t>(right, 0) + std::min<std::int64_t>(down, 0);
+  const std::int64_t last =
+      layout.firstPixel + std::max<std::int64_t>(right, 0) + std::max<std::int64_t>(down, 0);
+  return layout.blockPosition >= 0 && first >= 0 && last + layout.type.bytes() <= layout.blockBytes;
+}
 
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request) {
   if (layout.size.width < 1 || layout.size.height < 1) return nullptr;

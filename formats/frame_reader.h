@@ -9,14 +9,16 @@
 
 namespace Qel::Lumetra::ShellExt {
 
+/// Returns whether all pixels of the layout are inside its block and not too many for its bytes.
+bool IsReadable(const FrameLayout& layout);
+
 /// Reads one frame and renders it (frame_renderer.h). Returns the bitmap, which the caller owns. Memory does
 /// not depend on the size of the frame, which is read in bands, in file order if the layout allows it, or
 /// else in tiles.
 ///
 /// Returns null for a frame without pixels or of an unknown pixel type. Returns null and leaves the stream
-/// failed, as after a short read, for a layout that places a pixel outside its block or would take too long
-/// (too many pixels that share bytes, or too scattered ones), and if the stream fails or does not contain the
-/// whole block.
+/// failed, as after a short read, for a layout that is not readable or whose pixels are too scattered, and if
+/// the stream fails or does not contain the whole block.
 HBITMAP ReadThumbnail(std::istream& stream, const FrameLayout& layout, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

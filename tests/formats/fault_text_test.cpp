@@ -101,6 +101,18 @@ TEST(FaultText, ReportsAPictureThatIsTooFarAway) {
   EXPECT_EQ(TextOf(MrcFile{.nx = 1024, .ny = 1024, .nz = 4096}.Bytes(), L"mrc"), text);
 }
 
+TEST(FaultText, ReportsSizesAndStridesThatDoNotFitTheBytes) {
+  // 10,000 x 10,000 pixels that share a few bytes.
+  const std::string shared =
+      RawFile{.width = 10000, .height = 10000, .pixelStride = 0, .rowStride = 0, .pixels = "x"}.Bytes();
+  EXPECT_EQ(TextOf(shared, L"raw"),
+            "The sizes and strides in the header do not fit the 1 byte of the picture.");
+  // 2^32 + 256 pixels, of which 32 bits keep 256.
+  const std::string wrapped = MrcFile{.nx = 0x1000001, .ny = 256, .pixels = std::string(256, 'x')}.Bytes();
+  EXPECT_EQ(TextOf(wrapped, L"mrc"),
+            "The sizes and strides in the header do not fit the 256 bytes of the picture.");
+}
+
 std::string AdviceFor(const std::string& bytes, const std::wstring& extension) {
   std::istringstream stream(bytes);
   return ExplainFault(stream, extension)->advice;
