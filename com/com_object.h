@@ -98,9 +98,9 @@ class CComAggObject final : public IUnknown {
 };
 
 /// Makes an `Object` (one of the templates above or CComObjectCached) from the constructor's `arguments`,
-/// with one reference, which `made` holds. Returns E_OUTOFMEMORY without memory for the object or for what
-/// its constructor allocates. If creating the object's lock or its final construction fails, destroys the
-/// object and returns that failure.
+/// with one reference, which `made` holds. Returns E_OUTOFMEMORY if there is no memory for the object or for
+/// what its constructor allocates. If creating the object's lock or its final construction fails, destroys
+/// the object and returns that failure.
 template <class Object, class... Arguments>
 HRESULT MakeObject(ComPtr<Object>& made, Arguments&&... arguments) {
   std::unique_ptr<Object> unreferenced;

@@ -1,4 +1,4 @@
-// A lock for the threads of the process. Its creation can fail, and reports that.
+// A lock for the threads of the process. Its creation can fail, which Create reports.
 #pragma once
 
 #include <windows.h>

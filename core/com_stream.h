@@ -16,7 +16,7 @@
 #include <vector>
 
 /// A stream buffer that owns one reference to the attached COM stream. Without a COM stream, or before
-/// Allocate, reading meets the end of the stream and writing fails. Failures of the COM stream never throw:
+/// Allocate, reading hits the end of the stream and writing fails. Failures of the COM stream never throw:
 /// they end the input or fail the output.
 ///
 /// One array serves both directions. The get area follows a reserve of four characters, which keeps the last
@@ -35,7 +35,7 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
   ~basic_combuf() override { Flush(); }
 
   /// Gives the buffer room for `size` characters and drops characters that were read ahead or are pending.
-  /// Reading needs more room than the put-back reserve. Without memory the buffer stays empty.
+  /// Reading needs more room than the put-back reserve. If there is no memory, the buffer stays empty.
   void Allocate(std::size_t size) {
     try {
       buffer_.assign(size, Char());

@@ -2,8 +2,8 @@
 //
 // A reader is created on an open stream (CreateFileTypeInfo), parses the header in its constructor and is
 // read-only afterwards. The caller owns the stream, which must outlive the reader; the reader never closes
-// it. An unacceptable file leaves the stream failed. For some contents the constructor throws instead
-// (emi_parser.h, ser_parser.h).
+// it. If the file is not acceptable, the stream is in a failed state afterwards. For some contents the
+// constructor throws instead (emi_parser.h, ser_parser.h).
 #pragma once
 
 #include <windows.h>
@@ -39,8 +39,8 @@ class FileTypeInfo {
   /// Returns the comment that the file contains; empty if it has none.
   virtual std::wstring GetComment() const = 0;
 
-  /// Returns one frame as a bitmap reduced towards `size` pixels, owned by the caller; null if the pixel type
-  /// cannot be rendered or the pixels cannot be read. Every call seeks in the stream.
+  /// Returns one frame as a bitmap, reduced to about `size` pixels and owned by the caller; null if the pixel
+  /// type cannot be rendered or the pixels cannot be read. Every call seeks in the stream.
   virtual HBITMAP CreateThumbnail(const SIZE& size) const = 0;
 
   virtual ~FileTypeInfo() = default;

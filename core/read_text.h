@@ -8,8 +8,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The maximum of bytes that ReadText returns, because the strings are shown in one line and a damaged file
-/// may state any length.
+/// The maximum number of bytes that ReadText returns. It is small because the strings are shown in one line
+/// and a damaged file may state any length.
 inline constexpr std::size_t kMaxTextBytes = 512;
 
 /// Advances `stream` by the `length` bytes of a string and returns the first kMaxTextBytes of them. Fails the

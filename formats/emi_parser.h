@@ -24,7 +24,7 @@ struct EmiDataObject {
   std::optional<double> extraValue2;
 };
 
-/// A line of values. Values that the file lacks are 0 or none.
+/// A line of values. Values that are missing from the file are 0 or empty.
 struct EmiLineData : EmiDataObject {
   std::uint32_t length = 0;  // number of values
   std::optional<DataType> dataType;
@@ -34,9 +34,9 @@ struct EmiLineData : EmiDataObject {
 /// tree may have any depth: the open items are on the heap, four bytes each, as many as in the file.
 class EmiParser final : public FileParser {
  public:
-  /// Does not traverse a file with another header. A traversal ends at the end of the tree or of the file,
-  /// and leaves the stream good. Throws std::invalid_argument ("bad EMI object index") for an item that is
-  /// not as deep in the tree as its type requires.
+  /// Does not traverse a file whose header is not acceptable. A traversal ends at the end of the tree or of
+  /// the file, and leaves the stream good. Throws std::invalid_argument ("bad EMI object index") for an item
+  /// that is not as deep in the tree as its type requires.
   explicit EmiParser(std::istream& stream);
 
   /// Returns whether the file has an image. The stream may be at its end or have failed in a read.

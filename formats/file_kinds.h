@@ -24,9 +24,9 @@ struct FileKind {
   std::uint32_t descriptionId;  // of a string that the string table intentionally lacks
 };
 
-/// One row for each file-name extension, in the order of registration. The first extension of a parser names
-/// its kind, and its description is the one for a file with another extension. CMake and Python read these
-/// rows, too (cmake/file_kinds.cmake, file_kinds.py).
+/// One row for each file-name extension, in the order of registration. The first row of a parser names its
+/// kind, and has the description for files whose extension is in none of its rows. CMake and Python read
+/// these rows, too (cmake/file_kinds.cmake, file_kinds.py).
 inline constexpr std::tuple kFileKinds = {
     FileKind<MrcParser>{L"mrc", 212},  // images and volumes
     FileKind<MrcParser>{L"ali", 210},  // aligned tilt series

@@ -21,8 +21,8 @@ struct Fault {
 /// A parser reads the header once, in its constructor, from the stream's position, and sets the protected
 /// members. If it does not accept the file, it sets failbit or badbit on the stream.
 ///
-/// Nothing is virtual, because every user knows the parser's type: IsValid and comment are right for most
-/// kinds, and a parser hides them with its own if it differs.
+/// Nothing is virtual, because every user knows the parser's type. IsValid and comment are right for most
+/// kinds; a parser that needs something else hides them with its own.
 class FileParser {
  public:
   std::istream& stream() const { return *stream_; }

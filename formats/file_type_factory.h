@@ -14,7 +14,7 @@ namespace Qel::Lumetra::ShellExt {
 /// folder has a dot, the result is the rest of the path, which is no known extension.
 std::wstring GetExtension(const std::wstring& path);
 
-/// Return whether the whole extension is one of the kind's, without regard to case.
+/// Return whether `extension` is one of the kind's extensions, without regard to case.
 bool IsSerExtension(const std::wstring& extension);
 bool IsMrcExtension(const std::wstring& extension);
 bool IsEbnExtension(const std::wstring& extension);

@@ -1,5 +1,5 @@
-// .raw files: one image after a header of 49 bytes. The header begins with "QEL RawImage" and has the
-// position of the first pixel and the steps to the next pixel and to the next row. Packed, padded,
+// .raw files: one image after a header of 49 bytes. The header begins with "QEL RawImage" and contains the
+// position of the first pixel and the strides to the next pixel and to the next row. Packed, padded,
 // interleaved and bottom-up images therefore need no separate code.
 #pragma once
 

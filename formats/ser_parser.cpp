@@ -17,7 +17,7 @@ namespace {
 constexpr std::uint16_t kByteOrder = 0x4949;
 constexpr std::uint16_t kSeriesId = 0x0197;
 constexpr std::uint16_t kFirstVersion = 0x0210;
-constexpr std::uint16_t kFirstWideVersion = 0x0220;  // has the position of the offset arrays in 64 bits
+constexpr std::uint16_t kFirstWideVersion = 0x0220;  // the offset of the arrays has 64 bits
 constexpr std::uint32_t kLines = 0x4120;
 constexpr std::uint32_t kImages = 0x4122;
 constexpr std::uint32_t kTimeTags = 0x4152;
@@ -71,7 +71,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   Require(validElements >= 1, "valid elements", validElements, "at least 1");
   Require(totalElements >= validElements, "total elements", totalElements,
           "at least the number of valid elements");
-  // The kind of the elements is decided without the kind of their tags.
+  // Set before the tag type is checked, because it does not depend on the tags.
   isImageSeries_ = !fault() && dataTypeId == kImages;
   Require(dataTypeId == kLines || dataTypeId == kImages, "data type id", dataTypeId,
           "0x4122 (images) or 0x4120 (lines)");

@@ -28,7 +28,8 @@ BOOL DeleteDC(HDC dc) {
   return 1;
 }
 
-// Returns null, and never throws, without memory or for more bytes than the header's 32 bits can count.
+// Returns null, and never throws, if there is no memory or if the number of bytes does not fit into the
+// header's 32 bits.
 HBITMAP CreateDIBSection(HDC, const BITMAPINFO* info, UINT, void** bits, HANDLE, DWORD) try {
   if (bits != nullptr) *bits = nullptr;
   const BITMAPINFOHEADER& header = info->bmiHeader;

@@ -5,8 +5,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Changes HKEY_CLASSES_ROOT and HKEY_LOCAL_MACHINE in the process's own view, so a path to the 32-bit view
-/// names Wow6432Node. Failures are the registry's errors as HRESULTs.
+/// Changes HKEY_CLASSES_ROOT and HKEY_LOCAL_MACHINE in the process's own view, so a path into the 32-bit view
+/// must contain Wow6432Node. Failures are the registry's errors as HRESULTs.
 class WindowsRegistry final : public RegistryStore {
  public:
   HRESULT CreateKey(RegistryRoot root, const std::wstring& path) override;

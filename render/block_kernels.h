@@ -29,7 +29,8 @@ double LoadAsDouble(const std::byte* bytes) {
 
 #ifdef __SSE2__
 
-/// Moves every second of 2 * `columns` sums to the front. Returns the number of columns that are done.
+/// Moves the sums with even indexes, of 2 * `columns` sums, to the front. Returns the number of columns that
+/// are done.
 inline std::size_t DropOddColumns(std::int32_t* sums, std::size_t columns) {
   std::size_t column = 0;
   for (; column + 4 < columns; column += 4) {

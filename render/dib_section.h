@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns the bytes from one row of a bitmap to the next.
+/// Returns the number of bytes from the start of one row of a bitmap to the start of the next.
 std::int64_t BitmapRowStride(std::int32_t width, std::int32_t bytesPerPixel);
 
 /// Returns the header of a top-down bitmap of 1 (grey) or 3 (colour) bytes per pixel, with rows padded to 4

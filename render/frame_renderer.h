@@ -1,8 +1,8 @@
-// Turns the pixels of a frame into a bitmap, a piece at a time.
+// Turns the pixels of a frame into a bitmap, one piece at a time.
 //
 // A FrameRenderer is made for one frame and one request. It receives the frame's pixels in pieces and keeps
 // only the reduced image. The frame reader (formats/frame_reader.h) streams frames of any size through it;
-// whole_frame.h gives it a frame that is in memory as a whole.
+// whole_frame.h gives it a whole frame that is already in memory.
 #pragma once
 
 #include <windows.h>
@@ -43,7 +43,7 @@ class FrameRenderer {
 
 /// Makes the renderer for a frame of this size and pixel type; returns null for pixels that cannot be
 /// rendered. A request that leads to a division by zero ends the process (reduction.h). Throws std::bad_alloc
-/// without memory for the reduced image.
+/// if there is no memory for the reduced image.
 std::unique_ptr<FrameRenderer> MakeFrameRenderer(PixelTag pixel, Size2 frame, const SIZE& request);
 
 }  // namespace Qel::Lumetra::ShellExt

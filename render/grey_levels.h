@@ -61,8 +61,9 @@ struct ValueRange {
     }
   }
 
-  /// Returns the grey levels per unit. A flat image gets a range of one, computed in T: the sum wraps at an
-  /// integer's maximum and equals a large float, and in both cases every pixel is black.
+  /// Returns the grey levels per unit. For a flat image the maximum is replaced by the minimum plus one,
+  /// computed in T. If the minimum is the largest integer, the sum wraps; if it is a large float, the sum
+  /// equals it. In both cases every pixel is black.
   double Scale() const {
     T upper = maximum;
     if (!(minimum < maximum || minimum > maximum)) {

@@ -13,8 +13,8 @@ struct Reduction {
   std::int32_t factor = 1;  // edge of the square block of pixels that becomes one
   Size2 size;               // of the reduced frame, without the remainder at the right and the bottom
 
-  /// Returns whether the frame has a whole block. It has none if it is too narrow or too low for the factor,
-  /// or if the request or the frame's own size is negative.
+  /// Returns whether the frame has a whole block. It has none if it is too narrow or too short for the
+  /// factor, or if the request or the frame's own size is negative.
   bool HasBlocks() const { return factor > 0 && size.width > 0 && size.height > 0; }
 
   /// Returns the columns and rows of the frame that lie in whole blocks, counted from its left and its top.

@@ -1,4 +1,4 @@
-// Renders a frame that is in memory as a whole, as a single piece. The file readers stream their frames
+// Renders a whole frame that is already in memory, as a single piece. The file readers stream their frames
 // (formats/frame_reader.h) and do not need these functions.
 #pragma once
 

@@ -1,5 +1,4 @@
-// Defines the functions of POSIX threads that the C++ runtime in the DLL needs, in place of mingw's
-// winpthreads.
+// Defines the POSIX thread functions that the C++ runtime in the DLL needs, in place of mingw's winpthreads.
 //
 // The DLL is a guest in its process. The process may load and unload it thousands of times, and unloading
 // must give back everything. The library allocates a thread-local slot, memory and event handles per thread

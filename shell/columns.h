@@ -15,7 +15,7 @@ HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info);
 /// file is opened for this call, by the path in `item` alone. Offline files are opened too.
 ///
 /// Returns S_FALSE, without writing `value`, for a key without a property, for a file that cannot be opened
-/// or is not valid, and for a file-name extension of no file kind. Returns E_POINTER for a null `item` if the
+/// or is not valid, and for an unsupported file-name extension. Returns E_POINTER for a null `item` if the
 /// column belongs to one of the two property sets, and for a null `value` if there is a value to store.
 /// Returns the failure of VariantClear if `value` cannot be cleared, and E_OUTOFMEMORY. After a failure
 /// `value` keeps its previous contents.

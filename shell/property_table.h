@@ -1,5 +1,5 @@
-// The properties of an image file that the shell knows, one row each: the only place for their keys and
-// names, for the form of their columns and for the functions that read their values.
+// The properties of an image file that the shell knows, one row each: the only place that defines their keys
+// and names, the form of their columns and the functions that read their values.
 //
 // The columns (columns.h), the property sets (property_sets.h) and the property stores (property_store.h)
 // return the same properties in different forms. Intentional: each form has clients that rely on it. Each of

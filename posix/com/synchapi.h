@@ -9,7 +9,7 @@ struct CRITICAL_SECTION {
   void* mutex;
 };
 
-/// Returns FALSE without memory.
+/// Returns FALSE if there is no memory.
 BOOL InitializeCriticalSectionAndSpinCount(CRITICAL_SECTION* section, DWORD spinCount);
 void EnterCriticalSection(CRITICAL_SECTION* section);
 void LeaveCriticalSection(CRITICAL_SECTION* section);

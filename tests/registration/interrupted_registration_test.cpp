@@ -1,4 +1,4 @@
-// Makes a registration fail or die at each of its changes of the registry, and checks that the next
+// Makes a registration fail or die at each of its changes to the registry, and checks that the next
 // registration or unregistration repairs the result.
 #include <gtest/gtest.h>
 #include <windows.h>

@@ -1,5 +1,5 @@
-// Files whose contents are false. Whatever a header says, the reader must answer or refuse, without a fault
-// and without exceeding the memory limit. The sanitizers of the native build find out-of-bounds accesses.
+// Files with damaged contents. Whatever a header says, the reader must answer or refuse, without a fault and
+// without exceeding the memory limit. The sanitizers of the native build find out-of-bounds accesses.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -127,7 +127,7 @@ TEST_P(DamagedFile, EveryLength) {
 }
 
 /// The strides of a RAW file can make pixels overlap, so a few bytes can hold a picture of any size. The
-/// memory must follow the request nevertheless.
+/// memory must depend only on the request nevertheless.
 TEST(SharedPixels, HundredBytesTakeAtMostAMebibyte) {
   constexpr SIZE kRequest = {96, 96};
   int thumbnails = 0;

@@ -44,7 +44,8 @@ TEST(ReleaseDll, ImportsFromTheSystemsOwnModulesOnly) {
 }
 
 TEST(ReleaseDll, ImportsNothingThatCouldOutliveIt) {
-  // No threads, no handlers of the process's exceptions, and no thread-local or fiber-local slots.
+  // Among others, functions that create threads, process-wide exception handlers, or thread-local or
+  // fiber-local slots.
   for (const auto& [name, functions] : PortableExecutable::Read(ServerDll::Path()).imports) {
     for (const char* const function :
          {"createthread", "_beginthreadex", "addvectoredexceptionhandler", "setunhandledexceptionfilter",

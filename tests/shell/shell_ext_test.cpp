@@ -169,8 +169,8 @@ TEST_F(ShellExtObject, GetLocationRequiresSizeAndFlags) {
   EXPECT_EQ(object.image->GetLocation(nullptr, 0, nullptr, &size, 24, nullptr), E_POINTER);
 }
 
-// A frame is reduced by the largest whole factor that does not make it smaller than the request in both
-// dimensions: the factor becomes 2 exactly at twice the request.
+// A frame is reduced by the largest whole factor that leaves its width or its height no smaller than the
+// request: the factor becomes 2 exactly at twice the request.
 
 TEST_F(ShellExtObject, ExtractsAtTheSizeOfGetLocation) {
   const SIZE request{256, 96};

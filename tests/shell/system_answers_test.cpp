@@ -281,7 +281,7 @@ TEST_F(SystemsLines, AreLeftOutWhenTheFileIsNotVisible) {
 
 // A lack of memory for a tip.
 
-/// The shell's allocator, without memory.
+/// The shell's allocator when it has no memory.
 class ExhaustedAllocator final : public IMalloc {
  public:
   ULONG references = 1;

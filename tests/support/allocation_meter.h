@@ -31,7 +31,7 @@ class HeapMeter {
   std::int64_t before_;
 };
 
-/// Makes one allocation of this thread fail while it exists, and all later ones too if `then` says so.
+/// While this object exists, one allocation of this thread fails, and with kStaysFull all later ones too.
 class FailingHeap {
  public:
   enum class Then { kRecovers, kStaysFull };

@@ -34,7 +34,8 @@ Answers AskEverything(std::istream& stream, const std::wstring& extension,
                       std::span<const SIZE> requests = kAllRequests);
 
 /// Returns whether a thumbnail of the frame can take seconds although the file is small, because its pixels
-/// overlap. AskEverything leaves out such frames, but not those that are refused for their size.
+/// overlap. AskEverything requests no thumbnails of such frames, except of those that are refused for their
+/// size.
 bool TakesLong(Size2 frame);
 
 /// Returns whether a request for a thumbnail ends the process by design: a request of 0 does, and so does one

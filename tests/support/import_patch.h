@@ -1,4 +1,4 @@
-// Replaces a function that a loaded module imports by one of the test. The test sees how the module uses
+// Replaces a function that a loaded module imports with one of the test. The test sees how the module uses
 // Windows and can make a call fail. Calls by other modules are not affected.
 #pragma once
 

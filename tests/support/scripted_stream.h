@@ -1,4 +1,4 @@
-// A COM stream of a test: it returns its bytes in pieces of any size, fails on demand and counts the calls.
+// A COM stream for tests: it returns its bytes in pieces of any size, fails on demand and counts the calls.
 #pragma once
 
 #include <objidl.h>
@@ -12,7 +12,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// The test owns it. The reference count does not control its lifetime; the test checks it.
+/// The test owns the stream. The reference count does not control the lifetime; tests only check it.
 class ScriptedStream final : public IStream {
  public:
   explicit ScriptedStream(std::string bytes) : content(std::move(bytes)) {}

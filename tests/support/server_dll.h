@@ -56,9 +56,9 @@ class ServerDll {
     return object;
   }
 
-  /// Returns the module's lock count. It unlocks the server until it may be unloaded, then locks it as often
-  /// again, so no other thread may use the server meanwhile. If the count is negative or above 1,000, it
-  /// fails the test and returns -1.
+  /// Returns the module's lock count. It unlocks the server until it may be unloaded, then locks it again the
+  /// same number of times, so no other thread may use the server meanwhile. If the count is negative or above
+  /// 1,000, it fails the test and returns -1.
   LONG LockCount() const;
 
  private:

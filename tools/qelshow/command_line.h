@@ -1,4 +1,4 @@
-// Parses the command line, and has the text of the help.
+// Parses the command line, and contains the text of the help.
 #pragma once
 
 #include <cstdint>

@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// A string that may be missing. Missing is the empty string, and null in JSON.
+/// A string that may be missing. A missing string is empty here and null in JSON.
 struct OptionalText : std::wstring {
   using std::wstring::wstring;
   using std::wstring::operator=;

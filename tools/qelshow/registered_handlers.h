@@ -16,7 +16,7 @@ struct Handler {
   std::wstring role;        // for instance "thumbnail"
   CLSID expected{};         // the extension's class for it
   OptionalText registered;  // identifier of the class that the shell uses
-  std::wstring key;         // where it is registered; without one, where the extension's own belongs
+  std::wstring key;         // where it is registered; if nowhere, where the extension registers its own
   bool isOwnKey = true;     // whether registering the extension writes this key
 };
 

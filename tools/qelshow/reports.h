@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Returns everything about a file that was read, as lines, except its problem.
+/// Returns all facts about a file except its problem, as lines.
 std::wstring TextReport(const FileFacts& facts);
 
 /// Return rows of the table of files. `nameWidth` is the width of the first column in characters.

@@ -11,7 +11,7 @@ namespace Qel::Lumetra::ShellExt::Show {
 /// Returns a sentence for each setting and policy that hides thumbnails, with what to do about it.
 std::vector<std::wstring> FindSettingsThatHideThumbnails();
 
-/// Return the most likely cause, as the end of a sentence after "the likely cause is".
+/// Return the most likely cause, in words that complete a sentence after "the likely cause is".
 std::wstring CauseOfNoThumbnail(const std::wstring& path);
 std::wstring CauseOfAnotherThumbnail();
 std::wstring CauseOfOtherProperties();

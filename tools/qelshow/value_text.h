@@ -1,4 +1,4 @@
-// Converts the values of the extension.
+// Converts the values that the extension returns, and formats them as text.
 #pragma once
 
 #include <windows.h>

@@ -1,7 +1,7 @@
 // The process in which the extension runs.
 //
 // Some requests end their process by design (a colour frame smaller than the request causes a division by
-// zero), and any file may reveal an unknown fault. So the program runs the extension in a second process,
+// zero), and any file may trigger an unknown fault. So the program runs the extension in a second process,
 // which is the same program started again. If that process ends, its file is reported, and a new process
 // answers the next question. The first process never loads the extension.
 #pragma once
