@@ -13,8 +13,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The values that image objects and line-data objects share. Strings are empty if the file has none;
-/// ReadText limits their length.
+/// The values that an image object and a line-data object (a line of values) both have. Strings are empty if
+/// the file has none; ReadText limits their length.
 struct EmiDataObject {
   std::string label100;
   std::string label419;
@@ -31,7 +31,7 @@ struct EmiLineData : EmiDataObject {
 };
 
 /// Traverses the whole tree once from the stream's position, counts its images and keeps the first one. The
-/// tree may have any depth: the open items are on the heap, four bytes each, as many as in the file.
+/// tree may have any depth: the open items are on the heap and take four bytes each.
 class EmiParser final : public FileParser {
  public:
   /// Does not traverse a file whose header is not acceptable. A traversal ends at the end of the tree or of
@@ -39,7 +39,7 @@ class EmiParser final : public FileParser {
   /// that is not as deep in the tree as its type requires.
   explicit EmiParser(std::istream& stream);
 
-  /// Returns whether the file has an image. The stream may be at its end or have failed in a read.
+  /// Returns whether the file has an image. Unlike badbit, eofbit and failbit of the stream do not matter.
   bool IsValid() const { return !stream().bad() && imageCount_ > 0; }
 
   static std::string_view comment() { return "VRA EMI File"; }

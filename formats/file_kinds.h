@@ -25,8 +25,8 @@ struct FileKind {
 };
 
 /// One row for each file-name extension, in the order of registration. The first row of a parser names its
-/// kind, and has the description for files whose extension is in none of its rows. CMake and Python read
-/// these rows, too (cmake/file_kinds.cmake, file_kinds.py).
+/// kind. Its description is also that of files whose extension is in none of the parser's rows. CMake and
+/// Python read these rows, too (cmake/file_kinds.cmake, file_kinds.py).
 inline constexpr std::tuple kFileKinds = {
     FileKind<MrcParser>{L"mrc", 212},  // images and volumes
     FileKind<MrcParser>{L"ali", 210},  // aligned tilt series

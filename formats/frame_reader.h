@@ -9,7 +9,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns whether all pixels of the layout are inside its block and not too many for its bytes.
+/// Returns whether all pixels of the layout are inside the frame's block of bytes, and whether there are not
+/// too many of them for its size.
 bool IsReadable(const FrameLayout& layout);
 
 /// Reads one frame and renders it (frame_renderer.h). Returns the bitmap, which the caller owns. Memory does

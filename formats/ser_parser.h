@@ -1,4 +1,5 @@
-// .ser files: a series of images, found through an array of offsets. The first image represents the file.
+// .ser files: a series of images, found through an array of offsets. The format calls each image an element
+// of the series. The first one represents the file.
 #pragma once
 
 #include <cstdint>
@@ -11,8 +12,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The values of an axis: element number `element` has the value `offset`, and neighbouring elements differ
-/// by `delta`.
+/// The values of an axis: its position number `element` has the value `offset`, and neighbouring positions
+/// differ by `delta`.
 struct SerCalibration {
   double offset = 0;
   double delta = 0;

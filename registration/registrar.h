@@ -5,10 +5,10 @@
 // with everything in it. It can be repeated, and completes an earlier attempt that failed halfway.
 //
 // Unregistering deletes the keys marked ForceRemove with all their contents, and every value set by `val`. A
-// key without a mark is deleted if nothing is left in it but the default value that the script gave it;
-// values of other programs keep it. A key marked NoRemove stays. Keys whose names many programs share (CLSID
-// and others, see kSharedKeys) are never deleted, whatever their mark and wherever they are: with a mark that
-// would delete them, they count as NoRemove.
+// key without a mark is deleted if nothing is left in it but the default value that the script gave it; a key
+// in which another program has stored something stays. A key marked NoRemove stays. Keys whose names many
+// programs share (CLSID and others, see kSharedKeys) are never deleted, wherever they are: they count as
+// NoRemove, whatever their mark.
 //
 // A string that is not a valid script is rejected before anything changes. Otherwise the first change that
 // fails ends the run, and the changes before it remain.

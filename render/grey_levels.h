@@ -29,7 +29,8 @@ double Difference(T a, T b) {
   }
 }
 
-/// The smallest and the largest value of an image. A NaN counts only as the first value.
+/// The smallest and the largest value of an image. A NaN is ignored, unless it is the first value: then it is
+/// both the smallest and the largest.
 template <class T>
 struct ValueRange {
   T minimum;

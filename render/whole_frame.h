@@ -16,8 +16,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns the bitmap that the renderer of MakeFrameRenderer makes of `frame`, with its faults and
-/// exceptions.
+/// Returns the bitmap that the renderer of MakeFrameRenderer makes of `frame`. Ends the process or throws as
+/// MakeFrameRenderer does.
 template <class Pixel>
 HBITMAP RenderThumbnail(const ImageView<const Pixel>& frame, const SIZE& request) {
   const auto renderer = MakeFrameRenderer(std::type_identity<Pixel>(), {frame.width, frame.height}, request);

@@ -1,11 +1,11 @@
 // Defines the POSIX thread functions that the C++ runtime in the DLL needs, in place of mingw's winpthreads.
 //
 // The DLL is a guest in its process. The process may load and unload it thousands of times, and unloading
-// must give back everything. The library allocates a thread-local slot, memory and event handles per thread
-// and an exception handler for the whole process, and frees only the last. The runtime uses just a few of its
-// functions: for initialisation on first use, for short critical sections and for the thread-local state of
-// exceptions. Defining them here keeps the library out of the DLL. Code that uses more of the library (such
-// as std::thread) makes the link fail, because these functions are then defined twice.
+// must give back everything. The library allocates a thread-local slot and an exception handler for the whole
+// process, and memory and event handles for each thread. It frees only the exception handler. The runtime
+// uses just a few of its functions: for initialisation on first use, for short critical sections and for the
+// thread-local state of exceptions. Defining them here keeps the library out of the DLL. Code that uses more
+// of the library (such as std::thread) makes the link fail, because these functions are then defined twice.
 #include <cxxabi.h>
 #include <pthread.h>
 #include <windows.h>

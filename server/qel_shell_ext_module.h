@@ -41,10 +41,10 @@ class CQelShellExtModule : public Qel::Com::Module {
   /// Returns whether a critical section could not be created. The DLL must not be loaded then.
   bool initFailed() const { return initFailed_; }
 
-  /// Implements DllGetClassObject: queries the class object of `clsid`, the same one for every caller, for
-  /// `iid`. Threads may call this at the same time. Returns E_POINTER for a null `classObject`, E_UNEXPECTED
-  /// if the lock of the object map could not be created, CLASS_E_CLASSNOTAVAILABLE for an unknown class, or
-  /// the failure of the class object.
+  /// Implements DllGetClassObject: returns the interface `iid` of the class object of `clsid`. Every caller
+  /// gets the same class object. Threads may call this at the same time. Returns E_POINTER for a null
+  /// `classObject`, E_UNEXPECTED if the lock of the object map could not be created,
+  /// CLASS_E_CLASSNOTAVAILABLE for an unknown class, or the failure of the class object.
   HRESULT GetClassObject(REFCLSID clsid, REFIID iid, void** classObject);
 
  private:

@@ -17,8 +17,8 @@ HRESULT DescribeColumn(DWORD index, SHCOLUMNINFO* info);
 /// Returns S_FALSE, without writing `value`, for a key without a property, for a file that cannot be opened
 /// or is not valid, and for an unsupported file-name extension. Returns E_POINTER for a null `item` if the
 /// column belongs to one of the two property sets, and for a null `value` if there is a value to store.
-/// Returns the failure of VariantClear if `value` cannot be cleared, and E_OUTOFMEMORY. After a failure
-/// `value` keeps its previous contents.
+/// Returns the failure of VariantClear if `value` cannot be cleared, and E_OUTOFMEMORY if there is no memory
+/// for a string. After a failure `value` keeps its previous contents.
 HRESULT ReadColumn(const SHCOLUMNID& column, const SHCOLUMNDATA* item, VARIANT* value);
 
 }  // namespace Qel::Lumetra::ShellExt

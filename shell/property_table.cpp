@@ -30,8 +30,8 @@ std::wstring DimensionsText(const FileTypeInfo& reader) {
   return std::to_wstring(size.width) + L" x " + std::to_wstring(size.height);
 }
 
-/// Returns, for instance, "4096 x 4096", in the shell's own form of dimensions, so that the column sorts and
-/// reads the same.
+/// Returns, for instance, "4096 x 4096", in the form that the shell itself uses for dimensions, so that the
+/// column sorts and reads as it does for other images.
 Metadatum Dimensions(const FileTypeInfo& reader) {
   return DimensionsText(reader);
 }

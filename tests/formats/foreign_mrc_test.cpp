@@ -1,5 +1,5 @@
-// Reads files that another program has written, and compares them with what it says about them
-// (write_mrc_files.py). They are in the current folder.
+// Reads files that another program has written, and compares the results with expected.txt, which
+// write_mrc_files.py computes by itself. All of them are in the current folder.
 #include <gtest/gtest.h>
 
 #include <fstream>

@@ -18,7 +18,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// A program that takes longer, in milliseconds, is ended and counts as failed.
+/// The time limit of a program in milliseconds. A program that takes longer is ended and counts as failed.
 constexpr DWORD kLongestRun = 30 * 60 * 1000;
 
 struct Results {

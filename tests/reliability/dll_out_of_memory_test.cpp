@@ -49,7 +49,7 @@ struct Request {
 
   Result withoutMemory;             // the result when the C runtime has no memory
   Result withoutOther = kNoMemory;  // the result when anything else fails
-  int madeObjects = 0;              // how many COM objects it allocates; these failures give E_OUTOFMEMORY
+  int madeObjects = 0;              // allocations for COM objects; their failure gives E_OUTOFMEMORY
   int firstPlace = 0;               // the first place that fails
 };
 
@@ -65,8 +65,8 @@ Result Send(const Request& request, Then then) {
   }
 }
 
-/// Sends `request` while the DLL's request for resources with the index `number` fails. Returns whether there
-/// is such a request.
+/// Sends `request` while one place in the DLL fails: its request for memory, a string, a lock or a bitmap
+/// with the index `number`. Returns whether there is such a place.
 bool FailOnce(const Request& request, std::int64_t number, Then then, int* objectsNotMade = nullptr) {
   request.prepare();
   ScarceSystem::FailAt(number, then);
