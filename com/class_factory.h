@@ -16,9 +16,9 @@ class CComClassFactory : public CComRoot<FreeThreaded, IClassFactory> {
   /// Creates the factory of the objects that `makeInstance` makes.
   explicit CComClassFactory(InstanceMaker makeInstance) : makeInstance_(makeInstance) {}
 
-  /// Makes an object and queries it for `iid`. Returns E_POINTER for a null `object` and
-  /// CLASS_E_NOAGGREGATION for an outer object with any interface but IUnknown, because every other interface
-  /// of the new object would belong to the outer one.
+  /// Makes an object and queries it for `iid`. Returns E_POINTER for a null `object`, and
+  /// CLASS_E_NOAGGREGATION if there is an outer object but `iid` is not IUnknown: the outer object needs the
+  /// new object's own IUnknown first, because all its other interfaces delegate to the outer one.
   HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown* outer, REFIID iid, void** object) override;
 
   HRESULT STDMETHODCALLTYPE LockServer(BOOL lock) override;

@@ -33,6 +33,7 @@ class CComObject final : public Class {
   ULONG STDMETHODCALLTYPE Release() override {
     const ULONG left = this->InternalRelease();
     if (left == 0) {
+      // moduleLock_ is destroyed before the base class, whose destructor needs the module too.
       const ModuleLock untilDeleted;
       delete this;
     }
@@ -85,6 +86,7 @@ class CComAggObject final : public IUnknown {
   ULONG STDMETHODCALLTYPE Release() override {
     const ULONG left = --count_;
     if (left == 0) {
+      // moduleLock_ is destroyed before contained_, whose destructor needs the module too.
       const ModuleLock untilDeleted;
       delete this;
     }

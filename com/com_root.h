@@ -30,8 +30,8 @@ class CComRoot : public Primary, public Others... {
   CComRoot(const CComRoot&) = delete;
   CComRoot& operator=(const CComRoot&) = delete;
 
-  /// The part of construction that can fail. A class hides this function with its own. It runs after the
-  /// constructor, when references may be taken; a failure destroys the object.
+  /// The part of construction that can fail. A class that has such a part hides this function with its own.
+  /// It runs after the constructor, when references may be taken; a failure destroys the object.
   HRESULT FinalConstruct() { return S_OK; }
 
   // All interfaces share one IUnknown, which com_object.h implements.

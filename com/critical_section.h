@@ -15,8 +15,8 @@ class CriticalSection {
   CriticalSection(const CriticalSection&) = delete;
   CriticalSection& operator=(const CriticalSection&) = delete;
 
-  /// Must be called once, before the first lock. Returns the system's error as an HRESULT. A failure without
-  /// an error code counts as success; locking then does nothing.
+  /// Creates the lock. Must be called once, before it is used. Returns the system's error as an HRESULT. A
+  /// failure for which the system sets no error code counts as success; locking then does nothing.
   HRESULT Create();
 
   void lock() {

@@ -90,7 +90,8 @@ class basic_combuf : public std::basic_streambuf<Char, Traits> {
       Record(result);
       return Traits::eof();
     }
-    // A count above `wanted` would be outside the buffer, whatever the stream reports.
+    // A faulty stream may report more than it was able to write. The get area must not extend past the
+    // buffer.
     this->setg(first - kept, first, first + std::min(read, wanted));
     return Traits::to_int_type(*first);
   }

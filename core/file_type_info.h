@@ -2,8 +2,8 @@
 //
 // A reader is created on an open stream (CreateFileTypeInfo), parses the header in its constructor and is
 // read-only afterwards. The caller owns the stream, which must outlive the reader; the reader never closes
-// it. If the file is not acceptable, the stream is in a failed state afterwards. For some contents the
-// constructor throws instead (emi_parser.h, ser_parser.h).
+// it. Most readers of a file that is not valid leave the stream in a failed state, but only IsValid decides.
+// For some contents the constructor throws (emi_parser.h, ser_parser.h).
 #pragma once
 
 #include <windows.h>
@@ -21,7 +21,8 @@ class FileTypeInfo {
   /// only.
   virtual bool IsValid() const = 0;
 
-  /// Returns a string of the string table; empty, because the table has no descriptions of file kinds.
+  /// Returns the description of the file kind from the string table. It is always empty, because the table
+  /// has no such descriptions.
   virtual std::wstring GetTypeDescription() const = 0;
 
   /// Returns the width and height of one frame in pixels.

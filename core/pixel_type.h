@@ -1,5 +1,5 @@
-// All that the layers know about a pixel type. The two enumerations of pixel types, DataType (data_type.h)
-// and MrcPixelType (mrc_parser.h), map their values to it.
+// Everything that the layers know about a pixel type. The two enumerations of pixel types, DataType
+// (data_type.h) and MrcPixelType (mrc_parser.h), map their values to it.
 #pragma once
 
 #include <cstdint>

@@ -12,8 +12,8 @@ namespace Qel::Lumetra::ShellExt {
 /// and a damaged file may state any length.
 inline constexpr std::size_t kMaxTextBytes = 512;
 
-/// Advances `stream` by the `length` bytes of a string and returns the first kMaxTextBytes of them. Fails the
-/// stream if it has fewer than `length`.
+/// Reads a string of `length` bytes and returns at most its first kMaxTextBytes bytes. Fails the stream if it
+/// has fewer than `length` bytes.
 std::string ReadText(std::istream& stream, std::uint32_t length);
 
 }  // namespace Qel::Lumetra::ShellExt

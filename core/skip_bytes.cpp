@@ -5,11 +5,12 @@
 namespace Qel::Lumetra::ShellExt {
 
 void SkipBytes(std::istream& stream, std::uint32_t count) {
-  // Reading ahead in the stream's own buffer is faster than a seek, which discards the buffer.
+  // For a few bytes, reading from the stream's buffer is faster than a seek, which discards the buffer.
   std::array<char, 512> bytes;
   std::streamsize rest = count;
   if (count > bytes.size()) {
-    // A position after the end of a file is valid, so reading the last byte shows whether the part exists.
+    // A position after the end of a file is valid, so the last of the skipped bytes is read to find out
+    // whether they exist.
     stream.seekg(rest - 1, std::ios_base::cur);
     rest = 1;
   }

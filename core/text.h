@@ -11,8 +11,8 @@ namespace Qel::Lumetra::ShellExt {
 std::wstring LoadResourceString(std::uint32_t id);
 
 /// Widens each byte from `first` up to, but not including, `last` with sign extension to 16 bits: 0x00..0x7F
-/// keep their values, 0x80..0xFF become U+FF80..U+FFFF. No code page is applied, because a file does not name
-/// the code page of its writer.
+/// keep their values, 0x80..0xFF become U+FF80..U+FFFF. No code page is applied, because a file does not say
+/// which code page its writer used.
 std::wstring WidenComment(const char* first, const char* last);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -16,7 +16,7 @@ namespace {
 constexpr std::int32_t kHeaderBytes = 54;
 constexpr std::int32_t kMaxTypeCode = 8;  // the format has no complex types
 
-constexpr double kMaxCode = 4;  // the largest code, positive or negative, with a string below
+constexpr double kMaxCode = 4;  // the largest magnitude of a code in the functions below
 
 /// Returns the integer that a double represents: adds 0.5 and truncates toward zero. Below 0 the result is
 /// not the nearest integer: a stored -2.0 is -1. Intentional.
@@ -62,7 +62,7 @@ std::string_view LensText(std::int32_t code) {
   }
 }
 
-/// Returns a number with `decimals` digits after the point, at most 1, whatever the locale.
+/// Formats a number with 0 or 1 (`decimals`) digits after the point, independently of the locale.
 std::string Decimal(double number, int decimals) {
   // Room for the digits of the largest double, a sign, the point and the digit after it.
   std::array<char, std::numeric_limits<double>::max_exponent10 + 4> text;

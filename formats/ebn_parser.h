@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The fields of the header that describe the microscope, in the order of the file. All but the voltage are
+/// The fields of the header that describe the microscope, in the order of the file. The first three are
 /// codes.
 struct EbnInstrument {
   double model = 0;

@@ -39,7 +39,8 @@ class EmiParser final : public FileParser {
   /// that is not as deep in the tree as its type requires.
   explicit EmiParser(std::istream& stream);
 
-  /// Returns whether the file has an image. Unlike badbit, eofbit and failbit of the stream do not matter.
+  /// Returns whether the file has an image. Of the stream's state only badbit matters: missing pixels do not
+  /// make the file invalid.
   bool IsValid() const { return !stream().bad() && imageCount_ > 0; }
 
   static std::string_view comment() { return "VRA EMI File"; }
@@ -63,8 +64,8 @@ class EmiParser final : public FileParser {
   void ReadPixelArray();
   void ReadLineArray();
 
-  /// Returns the place for the values of the object `id`, which is the most recently opened one; null for any
-  /// but the first image and the first line.
+  /// Returns where to keep the values of the most recently opened object, whose identifier is `id`; null
+  /// unless it is the first image or the first line.
   EmiDataObject* KeptObject(const EmiItemId& id);
 
   EmiObjectPath objectPath_;

@@ -24,9 +24,9 @@ struct FileKind {
   std::uint32_t descriptionId;  // of a string that the string table intentionally lacks
 };
 
-/// One row for each file-name extension, in the order of registration. The first row of a parser names its
-/// kind. Its description is also that of files whose extension is in none of the parser's rows. CMake and
-/// Python read these rows, too (cmake/file_kinds.cmake, file_kinds.py).
+/// One row for each file-name extension, in the order of registration. A kind has the name of its parser, for
+/// instance `mrc` for MrcParser. The description in a parser's first row also applies if the extension is in
+/// none of its rows. CMake and Python read these rows, too (cmake/file_kinds.cmake, file_kinds.py).
 inline constexpr std::tuple kFileKinds = {
     FileKind<MrcParser>{L"mrc", 212},  // images and volumes
     FileKind<MrcParser>{L"ali", 210},  // aligned tilt series

@@ -19,10 +19,11 @@ struct Fault {
 };
 
 /// A parser reads the header once, in its constructor, from the stream's position, and sets the protected
-/// members. If it does not accept the file, it sets failbit or badbit on the stream.
+/// members. If it rejects the file, it sets failbit or badbit on the stream, which IsValid checks, or has an
+/// IsValid of its own.
 ///
-/// Nothing is virtual, because every user knows the parser's type. IsValid and comment are right for most
-/// kinds; a parser that needs something else hides them with its own.
+/// Nothing is virtual, because every user knows the parser's type. IsValid and comment suit most kinds; a
+/// parser hides them with its own functions if it needs others.
 class FileParser {
  public:
   std::istream& stream() const { return *stream_; }
@@ -47,11 +48,12 @@ class FileParser {
  protected:
   explicit FileParser(std::istream& stream) : stream_(&stream) {}
 
+  /// Records that `field` breaks `rule`, unless the rule is met or an earlier fault has been recorded.
   void Require(bool isMet, const char* field, std::optional<std::int64_t> value, const char* rule) {
     if (!isMet && !fault_) fault_ = {field, value, rule};
   }
 
-  /// Records `sentence`, which describes a fault of the whole file.
+  /// Does the same for a fault of the whole file, which `sentence` describes.
   void Require(bool isMet, const char* sentence) { Require(isMet, nullptr, {}, sentence); }
 
   FrameLayout frame_;

@@ -11,7 +11,7 @@
 namespace Qel::Lumetra::ShellExt {
 
 /// Returns the part after the last dot of the whole path, folders included; empty without a dot. If only a
-/// folder has a dot, the result is the rest of the path, which is no known extension.
+/// folder has a dot, the result is the rest of the path, which is not a known extension.
 std::wstring GetExtension(const std::wstring& path);
 
 /// Return whether `extension` is one of the kind's extensions, without regard to case.

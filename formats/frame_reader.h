@@ -9,8 +9,8 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns whether all pixels of the layout are inside the frame's block of bytes, and whether there are not
-/// too many of them for its size.
+/// Returns whether all pixels of the layout are inside the frame's block of bytes, and there are not too many
+/// of them for the size of the block.
 bool IsReadable(const FrameLayout& layout);
 
 /// Reads one frame and renders it (frame_renderer.h). Returns the bitmap, which the caller owns. Memory does

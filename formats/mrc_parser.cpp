@@ -54,7 +54,7 @@ void SwapHeader(unsigned char* bytes) {
 
 MrcParser::MrcParser(std::istream& stream) : FileParser(stream) {
   stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
-  // No frame is this large in both directions, so such a header has the other byte order.
+  // No frame is this large in both directions, so such a header is big-endian.
   constexpr std::uint32_t kTooLarge = 65536;
   isSwapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
                static_cast<std::uint32_t>(Word(kNy)) >= kTooLarge;

@@ -1,5 +1,5 @@
-// .ser files: a series of images, found through an array of offsets. The format calls each image an element
-// of the series. The first one represents the file.
+// .ser files: a series of images, found through an array of offsets (the index). The format calls each image
+// an element of the series. The first one represents the file.
 #pragma once
 
 #include <cstdint>
@@ -30,7 +30,7 @@ struct SerDimension {
 
 /// The part of the header that describes the series as a whole.
 struct SerSeries {
-  bool hasPositionTags = false;  // otherwise the images have time tags
+  bool hasPositionTags = false;  // the images have times and positions; otherwise only times
   std::uint32_t dimensionCount = 0;
   std::vector<SerDimension> dimensions;  // the first kMaxDimensions at most
 };

@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Returns the type with the number `code`, from 1 on; nothing for an unused number.
+/// Returns the pixel type with the number `code`, from 1 to 10; nothing for any other number.
 std::optional<DataType> DataTypeOfCode(std::int32_t code);
 
 }  // namespace Qel::Lumetra::ShellExt

@@ -14,12 +14,13 @@ extern "C" {
 IMAGE_DOS_HEADER __ImageBase{};
 }
 
-// Returns 0, no string: native programs have no resources.
+// Returns 0 (no string), because native programs have no resources.
 int LoadStringW(HINSTANCE, UINT, wchar_t*, int) {
   return 0;
 }
 
-// Converts the path to UTF-8, whatever the locale. A path that UTF-8 cannot represent names no file.
+// Converts the path to UTF-8, whatever the locale. Returns INVALID_HANDLE_VALUE for a path that UTF-8 cannot
+// represent.
 HANDLE CreateFileW(const wchar_t* path, DWORD, DWORD, void*, DWORD, DWORD, HANDLE) try {
   const std::filesystem::path name(std::u32string(path, path + std::wcslen(path)));
   const int descriptor = open(name.c_str(), O_RDONLY | O_CLOEXEC);

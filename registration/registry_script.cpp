@@ -165,7 +165,7 @@ class Parser {
     } else if (AcceptKeyword(L"NoRemove")) {
       key.mark = KeyMark::kNoRemove;
     }
-    // An empty name would mean the enclosing key, and a backslash a key further down.
+    // An empty name would mean the enclosing key, and a backslash a key below this one.
     if (!ParseName(key.name) || key.name.empty() || key.name.find(L'\\') != std::wstring::npos) return false;
     return !Accept(TokenKind::kEquals) || ParseData(key.defaultValue.emplace());
   }

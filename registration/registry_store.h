@@ -10,9 +10,9 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// A key is identified by its root and the path below it, separated by backslashes. Every change stands
-/// alone; no key stays open for the next one. Every function returns S_OK or the failure; deleting something
-/// that is already missing succeeds.
+/// A key is identified by its root and the path below it, whose names are separated by backslashes. Every
+/// call opens and closes the key itself. Every function returns S_OK or the failure; deleting something that
+/// is already missing succeeds.
 class RegistryStore {
  public:
   /// Creates the key and all missing keys above it. An existing key keeps its contents.

@@ -29,8 +29,8 @@ double LoadAsDouble(const std::byte* bytes) {
 
 #ifdef __SSE2__
 
-/// Moves the sums with even indexes, of 2 * `columns` sums, to the front. Returns the number of columns that
-/// are done.
+/// Moves every second of 2 * `columns` sums, beginning with the first, to the front. Returns how many are in
+/// place; the caller moves the others.
 inline std::size_t DropOddColumns(std::int32_t* sums, std::size_t columns) {
   std::size_t column = 0;
   for (; column + 4 < columns; column += 4) {

@@ -50,9 +50,9 @@ class ExactBlockSums {
   ExactBlockSums(std::int32_t blocks, std::int32_t factor)
       : factor_(static_cast<std::size_t>(factor)), sums_(static_cast<std::size_t>(blocks) * kSamples) {}
 
-  /// Returns whether Add takes rows with this distance in bytes between pixels. It also adds the bytes
-  /// between the pixels, as columns that are dropped afterwards; above a certain distance gathering the
-  /// pixels is cheaper.
+  /// Returns whether Add accepts rows with this distance in bytes between pixels. Add also sums the bytes
+  /// between the pixels, as columns that it then drops. If the pixels are far apart, it is cheaper to gather
+  /// them first.
   static bool Takes(std::int64_t pixelStride) {
     constexpr std::int64_t kSampleBytes = sizeof(Sample);
     constexpr std::int64_t kPixelBytes = kSampleBytes * kSamples;

@@ -15,8 +15,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Allocates the values of a reduced image. Throws std::bad_alloc for more values than a signed 32-bit
-/// integer can count, which no bitmap has.
+/// Allocates the values of a reduced image. Throws std::bad_alloc if there are more values than a signed
+/// 32-bit integer can count; no bitmap is that large.
 template <class T>
 std::unique_ptr<T[]> AllocateImage(Size2 size) {
   const std::int64_t count = std::int64_t{size.width} * size.height;
@@ -24,7 +24,7 @@ std::unique_ptr<T[]> AllocateImage(Size2 size) {
   return std::make_unique_for_overwrite<T[]>(static_cast<std::size_t>(count));
 }
 
-/// Keeps the reduced image until the last value is in, because the grey levels depend on its whole range.
+/// Keeps the whole reduced image, because the grey levels depend on the range of all its values.
 template <class T>
 class GreyRenderer final : public FrameRenderer {
  public:

@@ -38,9 +38,9 @@ struct ValueRange {
 
   /// Finds the range of `count` values, at least one.
   ValueRange(const T* values, std::size_t count) : minimum(values[0]), maximum(values[0]) {
-    // Each lane sees only some of the values, with the same result: a NaN as the first value stays in every
-    // lane, and every lane ignores any other. The vectors are explicit because GCC does not vectorise this
-    // loop for floats.
+    // Each lane compares only some of the values. The result is the same: all lanes begin with the first
+    // value, so a NaN there stays in each of them, and every lane ignores any other NaN. The vectors are
+    // explicit because GCC does not vectorise this loop for floats.
     using Vector __attribute__((vector_size(16))) = T;
     constexpr std::size_t kLanes = sizeof(Vector) / sizeof(T);
     constexpr std::size_t kVectors = 4;

@@ -9,8 +9,8 @@ namespace Qel::Lumetra::ShellExt {
 /// times faster. Uses AVX2 if this processor has it.
 void LogarithmsToFloat(const double* values, std::size_t count, float* logarithms);
 
-/// The two implementations of LogarithmsToFloat, public for tests that compare them: for every processor, and
-/// for processors with AVX2.
+/// The two implementations of LogarithmsToFloat, for any processor and for processors with AVX2. They are
+/// public for the tests that compare them.
 void LogarithmsToFloatBaseline(const double* values, std::size_t count, float* logarithms);
 void LogarithmsToFloatAvx2(const double* values, std::size_t count, float* logarithms);
 

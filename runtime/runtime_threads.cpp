@@ -1,11 +1,11 @@
 // Defines the POSIX thread functions that the C++ runtime in the DLL needs, in place of mingw's winpthreads.
 //
 // The DLL is a guest in its process. The process may load and unload it thousands of times, and unloading
-// must give back everything. The library allocates a thread-local slot and an exception handler for the whole
+// must release everything. winpthreads allocates a thread-local slot and an exception handler for the whole
 // process, and memory and event handles for each thread. It frees only the exception handler. The runtime
 // uses just a few of its functions: for initialisation on first use, for short critical sections and for the
-// thread-local state of exceptions. Defining them here keeps the library out of the DLL. Code that uses more
-// of the library (such as std::thread) makes the link fail, because these functions are then defined twice.
+// thread-local state of exceptions. Defining them here keeps winpthreads out of the DLL. Code that uses more
+// of it (such as std::thread) makes the link fail, because these functions are then defined twice.
 #include <cxxabi.h>
 #include <pthread.h>
 #include <windows.h>
@@ -33,8 +33,8 @@ extern ULONG _tls_index;
 
 namespace {
 
-/// The one lock for everything. Sharing it costs nothing, because the runtime holds a mutex for a few
-/// instructions only and never waits while it holds one. The owning thread may lock it again.
+/// Stands for all mutexes of the runtime. Sharing one lock costs nothing, because the runtime holds a mutex
+/// for a few instructions only and never waits while it holds one. The owning thread may lock it again.
 class RuntimeLock {
  public:
   void Lock() {
@@ -74,7 +74,8 @@ constinit RuntimeLock g_lock;
 
 /// The runtime's exception state of each thread, in thread-local memory. A throw therefore needs neither
 /// memory nor a slot and reaches its handler even if the process has run out of both; the runtime's own
-/// implementation would end the process. The compiler's thread_local would bring the library back.
+/// implementation would end the process. The compiler's thread_local is not used, because it needs
+/// winpthreads.
 [[gnu::section(".tls$")]] abi::__cxa_eh_globals g_exceptions{};
 
 abi::__cxa_eh_globals* ExceptionsOfThisThread() {

@@ -3,7 +3,7 @@
 //
 // That library gets its random number from the system's cryptography functions, which load more modules while
 // the DLL itself is being loaded. The loader lock is held then, so this could deadlock the host process.
-// Instead, the number is mixed from values that differ from load to load, as the system's own modules do.
+// Instead, the number is mixed from values that differ from load to load, as in the system's own modules.
 #include <windows.h>
 
 #include <cstdint>

@@ -22,8 +22,8 @@ namespace Qel::Lumetra::ShellExt {
 /// Returns the first failure: E_OUTOFMEMORY, the error of a script that cannot be found, kInvalidScript, a
 /// registry error, or ERROR_INSUFFICIENT_BUFFER as an HRESULT if the path and its terminator do not fit into
 /// 260 characters, in which case nothing is written. After any other failure, the changes before it remain
-/// and the shell is not notified. During the call the thread's locale is LOCALE_SYSTEM_DEFAULT; it is
-/// restored in any case.
+/// and the shell is not notified. During the call the thread's locale is LOCALE_SYSTEM_DEFAULT; the previous
+/// locale is always restored.
 HRESULT UpdateRegistration(ScriptDirection direction, HINSTANCE instance, const CQelShellExtModule& module,
                            std::span<const ObjectMapEntry> objectMap);
 

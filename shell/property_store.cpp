@@ -12,8 +12,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-// The put-back reserve and the largest header. One Read gets a whole header, and for an MRC file not a byte
-// more.
+// Room for the put-back reserve of the buffer and for the largest header, so that one Read gets a whole
+// header, and exactly the header of an MRC file.
 constexpr std::size_t kBufferBytes = 4 + 1024;
 
 constexpr HRESULT kNoCount = 6;

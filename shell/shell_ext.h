@@ -22,8 +22,8 @@ namespace Qel::Lumetra::ShellExt {
 class CShellExt : public Com::CComRoot<Com::SingleThreaded, IExtractImage, IPersistFile, IQueryInfo,
                                        IColumnProvider, IPropertySetStorage> {
  public:
-  // IExtractImage. Every extraction is synchronous: GetLocation stores the size, requests that the shell
-  // caches the thumbnail, and ignores everything else.
+  // IExtractImage. Every extraction is synchronous: GetLocation stores the size, asks the shell to cache the
+  // thumbnail, and ignores everything else.
   HRESULT STDMETHODCALLTYPE GetLocation(LPWSTR pathBuffer, DWORD length, DWORD* priority, const SIZE* size,
                                         DWORD colourDepth, DWORD* flags) override;
 
