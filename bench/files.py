@@ -106,7 +106,7 @@ class Frame(Written):
 
 @dataclasses.dataclass
 class Series(Written):
-    """A .ser file of many small images, whose offsets are at its end."""
+    """A .ser file of many small images. The array of their offsets is at its end."""
 
     count: int
     edge: int = 32  # of an image of 16-bit pixels

@@ -36,7 +36,7 @@ void FillBand(DataType type, std::vector<std::byte>& band) {
     case DataType::kComplexFloat32: Fill<float>(band); break;
     case DataType::kFloat64:
     case DataType::kComplexFloat64: Fill<double>(band); break;
-    default: Fill<std::uint8_t>(band);  // any bytes are as good as any others for integers
+    default: Fill<std::uint8_t>(band);  // for integers the values make no difference
   }
 }
 

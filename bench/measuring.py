@@ -10,7 +10,7 @@ class Failure(Exception):
 
 
 class Worker:
-    """A program that replies to each line of its input, with words separated by tabs, with one line of output."""
+    """A program that reads requests, each a line of words separated by tabs, and replies to each with one line."""
 
     def __init__(self, command, folder):
         self._process = subprocess.Popen(command, cwd=folder, text=True, stdin=subprocess.PIPE,
@@ -32,8 +32,8 @@ class Worker:
         return int(answer)
 
     def peak_memory(self, small, large):
-        """Returns the peak of the bytes in use during the request `large`, above those in use after the request
-        `small`, which loads everything that is loaded only once. Must be the first use of the process."""
+        """Returns by how many bytes the request `large` raises the memory in use at its peak. The request `small` runs
+        first and loads everything that is loaded only once. Must be the first use of the process."""
         self.nanoseconds(*small)
         process = pathlib.Path("/proc") / str(self._process.pid)
         (process / "clear_refs").write_text("5")  # resets the peak

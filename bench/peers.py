@@ -1,4 +1,4 @@
-"""Measures on command how other software makes thumbnails, each in its fastest way.
+"""Measures on command how long other software takes to make thumbnails, each with its fastest method.
 
 Usage: peers.py PEER
 

@@ -107,8 +107,7 @@ def measure_series(bench, series):
 
 
 def measure_folder(bench, folder):
-    """Compares reading everything but the picture that is shown for each file of a folder with reading only the
-    headers."""
+    """Compares reading all properties of every file in a folder, without the pictures, with reading only the headers."""
     read = ("starts", MRC_HEADER_BYTES, *folder.files)
     for way, view in (("native", "reader"), ("DLL", "tip"), ("DLL", "columns"), ("DLL", "sets"), ("DLL", "store")):
         bench.measure(f"folder: {view}", None, read, {way: ("metadata", view, *folder.files)})

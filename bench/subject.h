@@ -14,8 +14,8 @@ namespace Qel::Lumetra::ShellExt::Bench {
 /// Opens the file, makes its thumbnail and closes it. The caller owns the bitmap, which is null on failure.
 HBITMAP MakeThumbnail(const std::wstring& path, const SIZE& request);
 
-/// Reads everything but the picture that the shell shows for a file. `view` is "reader" (natively), or "tip",
-/// "columns", "sets" or "store" (on Windows). Returns whether all values could be read.
+/// Reads everything that the shell shows for a file, except the picture. `view` is "reader" (natively), or
+/// "tip", "columns", "sets" or "store" (on Windows). Returns whether all values could be read.
 bool ReadMetadata(const std::string& view, const std::wstring& path);
 
 /// Blocks of the same size at equal distances in a file. Positions and sizes are in bytes.

@@ -72,7 +72,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   stream.failingRead = input.ConsumeIntegralInRange<int>(0, 20);
   stream.endResult = input.PickValueInArray(kResults);
   stream.writeResult = input.PickValueInArray(kResults);
-  // A stream that reports more bytes than it delivers gives nothing to compare with.
+  // If the stream reports more bytes than it delivers, the bytes cannot be compared.
   const bool honest = input.ConsumeBool();
   if (!honest) stream.overclaim = input.ConsumeIntegral<ULONG>();
   {

@@ -45,7 +45,7 @@ int main(int argc, char** argv) try {
   }
   int number = 0;
   for (const char* script : kScripts) Write(seeds / "registrar", std::to_string(++number), script);
-  // The meaning of these bytes to the target of basic_combuf does not matter, only their number.
+  // What these bytes mean to the fuzzer of basic_combuf does not matter. Only their number does.
   std::mt19937 random;
   for (std::size_t size = 20; size <= 400; size += 20) {
     std::string bytes(size, '\0');

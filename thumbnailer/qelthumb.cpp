@@ -1,5 +1,5 @@
-// qelthumb, the front end for the file managers of Linux. They run it for each picture, as
-// qelthumb.thumbnailer tells them to, and read the PNG file that it writes.
+// qelthumb, the front end for the file managers of Linux. They run it for each picture, with the command line
+// in qelthumb.thumbnailer, and read the PNG file that it writes.
 #include <png.h>
 #include <sys/resource.h>
 #include <unistd.h>

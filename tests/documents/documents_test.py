@@ -1,5 +1,6 @@
 #!/usr/bin/env python3
-"""Checks that the links of the documents work, and that the documents name the current version and all file kinds.
+"""Checks that the links of the documents work, that the documents name the current version and all file kinds, and that
+no file contains a phrase to avoid.
 
 usage: documents_test.py PROJECT_FOLDER VERSION
 """

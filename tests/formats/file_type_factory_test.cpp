@@ -70,7 +70,7 @@ TEST(Extensions, AreComparedAsAWholeIgnoringCase) {
     EXPECT_FALSE(row.test(L"." + row.extension));
     EXPECT_FALSE(row.test(row.extension + L" "));
     EXPECT_FALSE(row.test(row.extension + std::wstring(1, L'\0')));
-    // A character that differs from the first letter in another bit than that of the case is different.
+    // Only the case is ignored: a first letter that differs in another bit is another letter.
     EXPECT_FALSE(row.test(static_cast<wchar_t>(first ^ 0x80) + row.extension.substr(1)));
     // Each test accepts its own extensions only.
     for (const Row& other : rows) {

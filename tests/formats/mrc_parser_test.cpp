@@ -318,7 +318,7 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNone) {
     const MrcFile file{.nx = nx, .ny = ny, .mode = mode, .pixels = std::string(256, 'x')};
     const OpenMrc mrc(file);
     const int result = mrc.Thumbnail({256, 256}).width;
-    EXPECT_EQ(mrc->IsValid(), result > 0);  // as after any missing picture
+    EXPECT_EQ(mrc->IsValid(), result > 0);  // the failed read makes the reader invalid
     return result;
   };
   EXPECT_EQ(width(0, 1, 256), 1);

@@ -8,7 +8,8 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Made from a file writer (mrc_file.h and others) and the further arguments of the reader's constructor.
+/// Owns a file in memory and its reader. The constructor takes a file writer (mrc_file.h and others) and the
+/// other arguments of the reader's constructor.
 template <class Reader>
 class OpenFile {
  public:

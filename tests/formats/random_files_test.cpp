@@ -104,7 +104,7 @@ void ExpectPicture(Random& random, const OpenFile<Reader>& file, const NaiveFram
 
 constexpr int kRounds = 60;
 
-// Makes one instance of a test for every pixel type of a file kind.
+// The parameter of a test that runs once for every pixel type: the type, and its number in the file kind.
 template <class T, int kNumber>
 struct TypeCode {
   using Pixel = T;

@@ -161,7 +161,7 @@ TEST(Raw, ReadsEveryThirdByte) {
   file.rowStride = 9;
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
 
-  // The extent ends with the last pixel: offset + 2 * 3 + 1 * 9 + 1 bytes.
+  // The block ends with the last pixel: offset + 2 * 3 + 1 * 9 + 1 bytes.
   ASSERT_EQ(file.pixels.size(), 17u);
   file.pixels.pop_back();
   EXPECT_EQ(OpenRaw(file).Thumbnail(kWholeSize).width, 0);
@@ -214,7 +214,7 @@ TEST(Raw, MissingPixelsFailTheFile) {
 }
 
 TEST(Raw, ExtentThatWrapsCannotBeRead) {
-  // (width - 1) * pixelStride is 2^32, which is 0 in the 32-bit extent.
+  // (width - 1) * pixelStride is 2^32, which wraps to 0 in the size of the block.
   RawFile file = PackedRawFile(DataType::kUInt8, 0x10001, 1, std::string(0x10001, '0'));
   file.pixelStride = 0x10000;
   EXPECT_TRUE(OpenRaw(file)->IsValid());

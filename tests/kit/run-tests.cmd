@@ -1,5 +1,5 @@
 @echo off
 rem Runs every test of this folder and writes test-log.txt. The exit status is 0 if none fails.
-rem Run as administrator, it also registers the extension, checks what Windows shows, and unregisters the extension.
+rem If an administrator runs it, it also registers the extension, checks what Windows shows, and unregisters it.
 "%~dp0tests\run_tests.exe"
 exit /b %errorlevel%

@@ -256,7 +256,7 @@ class InstallerPackage(Test):
         codes = {row[0]: row[1] for row in self.database.rows("Component")}
         self.assertEqual(codes | COMPONENT_CODES, codes)
         self.assertEqual(len(set(codes.values())), len(codes))
-        self.assertEqual(component_code("abc"), "{F678095A-EDEF-5557-B64D-F8448E982C9C}")  # an extension that could be added later
+        self.assertEqual(component_code("abc"), "{F678095A-EDEF-5557-B64D-F8448E982C9C}")  # a file-name extension that could be added later
         self.assertEqual(self.database.properties["UpgradeCode"], UPGRADE_CODE)
         self.assertEqual({row[0] for row in self.database.rows("Upgrade")}, {UPGRADE_CODE})
 
@@ -497,7 +497,7 @@ class Installation(Test):
         doctor = self.prefix.qelshow("doctor")
         text = doctor.stdout.decode()
         self.assertEqual(doctor.returncode, status, text)
-        self.assertNotIn("regsvr32", text)  # it would register the omitted extension too
+        self.assertNotIn("regsvr32", text)  # it would register the omitted file-name extension too
         return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
 
     def test_an_extension_can_be_left_to_others(self):

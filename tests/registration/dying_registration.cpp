@@ -1,9 +1,9 @@
 // Registers or unregisters the built DLL in the private registry of another process, and terminates itself
-// before a given change.
+// after CHANGES changes, before the next one.
 //
 //   dying_registration register|unregister REGISTRY CHANGES
 //
-// Exits with 0 if it never reached the change, with 1 if the DLL failed, and with 3 if it terminated itself.
+// Exits with 0 if there were no more changes, with 1 if the DLL failed, and with 3 if it terminated itself.
 #include <windows.h>
 
 #include <cstdlib>

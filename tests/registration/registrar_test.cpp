@@ -325,7 +325,7 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptRemovesItsOwnEntriesAndNothingE
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kUnregister, registry), S_OK);
     EXPECT_TRUE(Testing::Same(registry.Contents(), expected)) << handler.script;
 
-    // The extension's key remains when another program has a value in it.
+    // The key of the file-name extension remains if another program has a value in it.
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
     const std::wstring key =
         L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\" +

@@ -251,8 +251,8 @@ TEST_F(Registration, ReportsALackOfMemoryAtAnyPointAndWorksOnceThereIsSome) {
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }
 
-// interrupted_registration_test ends a thread at every change. This test shows for a few changes that a
-// process that dies leaves nothing more.
+// interrupted_registration_test abandons a call at every change, as if the process had died. This test lets a
+// process die at a few changes and checks that this has the same effect.
 TEST_F(Registration, IsRepairedOrCleanedUpAfterAProcessDied) {
   const std::filesystem::path program =
       ServerDll::Path().parent_path() / L"tests" / L"dying_registration.exe";

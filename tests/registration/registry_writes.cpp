@@ -7,7 +7,7 @@ namespace {
 
 RegistryWrites* g_current = nullptr;
 
-/// Asks the test for a result, and calls the function if the result is ERROR_SUCCESS.
+/// Returns the result that the test decides on; calls the function if that is ERROR_SUCCESS.
 template <auto kFunction, class... Arguments>
 LSTATUS WINAPI Asked(Arguments... arguments) {
   const LSTATUS answer = RegistryWrites::AskCurrent();

@@ -26,7 +26,7 @@ class RegistryWrites {
   /// Returns how many changes have been requested.
   std::size_t count() const { return count_; }
 
-  /// Used by the replacements of the imports.
+  /// Returns the decision of the current object for the next change. The replaced imports call this.
   static LSTATUS AskCurrent();
 
  private:

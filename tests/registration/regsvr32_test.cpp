@@ -1,5 +1,5 @@
-// Tests the built DLL through regsvr32 and COM in the machine's own registry, under Wine that of the prefix.
-// What other programs have registered must not change.
+// Tests the built DLL through regsvr32 and COM, in the machine's own registry. Under Wine this is the
+// registry of the prefix. What other programs have registered must not change.
 #include <gtest/gtest.h>
 #include <windows.h>
 

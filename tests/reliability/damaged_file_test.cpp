@@ -1,5 +1,6 @@
-// Files with damaged contents. Whatever a header says, the reader must answer or refuse, without a fault and
-// without exceeding the memory limit. The sanitizers of the native build find out-of-bounds accesses.
+// Files with damaged contents. Whatever a header says, the reader must answer or reject the file, without
+// crashing and without exceeding the memory limit. The sanitizers of the native build find out-of-bounds
+// accesses.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -32,8 +33,8 @@ constexpr std::int64_t kMaxBytesForALie = 1 << 20;
 /// The most memory, in bytes, that a file of 100 bytes may take.
 constexpr std::int64_t kMaxBytesForAHundred = 1 << 20;
 
-/// A reduced picture, and one of every pixel. More requests would take too long with hundreds of thousands of
-/// files.
+/// Requests a reduced picture, and one that has every pixel. More requests would take too long with hundreds
+/// of thousands of files.
 constexpr SIZE kRequests[] = {{3, 2}, {Testing::kMaxRequest, Testing::kMaxRequest}};
 
 class DamagedFile : public Testing::FileKindTest {
@@ -87,7 +88,7 @@ TEST_P(DamagedFile, EveryByteOfEveryValue) {
 }
 
 TEST_P(DamagedFile, EveryFieldOfBoundaryValues) {
-  constexpr std::size_t kHeaderBytes = 96;  // of the first sample every byte is damaged
+  constexpr std::size_t kHeaderBytes = 96;  // in the first sample, every byte is damaged
   for (const SampleFile& sample : samples_) {
     const std::int64_t whole = Ask(sample.bytes);
     const std::size_t end = &sample == &samples_.front() ? sample.bytes.size() : kHeaderBytes;

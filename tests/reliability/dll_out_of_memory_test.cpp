@@ -57,8 +57,8 @@ Result Send(const Request& request, Then then) {
   try {
     return request.send();
   } catch (const std::bad_alloc&) {
-    // Without memory the exception is in the DLL's reserve, which has room for some hundred exceptions. This
-    // program's heap must not free it, so a reference to it is kept permanently.
+    // Without memory the exception is in the DLL's emergency reserve, which has room for a few hundred
+    // exceptions. This program's heap must not free it, so a reference to it is kept permanently.
     static auto* const kept = new std::vector<std::exception_ptr>();
     if (then == Then::kStaysEmpty) kept->push_back(std::current_exception());
     return kThrew;

@@ -1,4 +1,4 @@
-// Streams that fail: at every single read and in every way, and streams that cannot be positioned.
+// Tests streams that fail, at every single read and in every way, and streams that cannot be positioned.
 #include <gtest/gtest.h>
 
 #include <istream>
@@ -46,7 +46,7 @@ class FailingStream : public Testing::FileKindTest {
             std::int64_t failingRead, Failure failure) {
     OpenSample open(sample, extension_, failingRead, failure);
     if (failingRead < readsOfHeader) {
-      // If the tree of an EMI file ends early, the images up to there count.
+      // If the tree of an EMI file ends early, the images before its end count.
       EXPECT_TRUE(!open.reader->IsValid() || kind_ == "emi");
       if (open.reader->IsValid()) open.Thumbnail();
       return;

@@ -1,4 +1,4 @@
-// Measures how much memory a large frame takes.
+// Tests that the memory for a thumbnail does not grow with the frame.
 #include <gtest/gtest.h>
 
 #include <algorithm>

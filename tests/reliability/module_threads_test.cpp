@@ -1,5 +1,5 @@
-// What the threads of a process share: the module's lock count, its class objects, and free-threaded objects.
-// The test is native, so that it can be built with ThreadSanitizer too (preset linux-tsan).
+// Tests what the threads of a process share: the module's lock count, its class objects, and free-threaded
+// objects. The test is native, so that it can be built with ThreadSanitizer too (preset linux-tsan).
 // class_objects_test does the same with the DLL.
 #include <gtest/gtest.h>
 

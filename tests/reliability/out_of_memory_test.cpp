@@ -1,4 +1,4 @@
-// Memory that runs out at every single allocation. The call must throw std::bad_alloc or return no thumbnail,
+// Makes every single allocation of a call fail. The call must throw std::bad_alloc or return no thumbnail,
 // and leak nothing. The object must work again as soon as there is memory.
 #include <gtest/gtest.h>
 
@@ -23,11 +23,11 @@ using Testing::SampleFile;
 /// How a call ended in which an allocation should fail.
 enum class Outcome { kAnswered, kThrew, kNotReached };
 
-// The exact numbers of results when the allocations of a thumbnail fail in turn, without exceptions and
-// without the two calls in which no allocation is left to fail. Windows itself takes no memory from this
-// heap. Its POSIX stand-in makes four allocations for a grey bitmap: the device context, which the bitmap
-// does not need, and three for the bitmap. A colour bitmap has no colour table and needs one fewer; if memory
-// stays exhausted, the allocation of the buffer after it throws.
+// How many calls return, and do not throw, when the allocations of a thumbnail fail in turn. The two calls in
+// which no allocation fails do not count. Windows itself takes no memory from this heap. Its POSIX stand-in
+// makes four allocations for a grey bitmap: the device context, which the bitmap does not need, and three for
+// the bitmap. A colour bitmap has no colour table and needs one fewer; if memory stays exhausted, the
+// allocation of the buffer after it throws.
 #ifdef _WIN32
 constexpr int kPicturesWithoutDeviceContext = 0;
 constexpr int kGreyAnswersWithoutBitmap = 0;

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Tests the project's scripts. Copies of them run with substitutes for slow programs, the originals under Wine.
+"""Tests the project's scripts: copies of them with substitutes for slow programs, and the original scripts/wine.
 
 usage: scripts_test.py ROOT [unittest arguments]
 """

@@ -1,4 +1,4 @@
-// Reads those tables of a module's file that the tests check, in the Portable Executable format.
+// Reads the parts of a Portable Executable file (an EXE or DLL) that the tests check.
 #pragma once
 
 #include <cstdint>

@@ -16,7 +16,7 @@ struct HeapUse {
 /// Returns what all threads have allocated and not freed.
 HeapUse CurrentHeapUse();
 
-/// Measures from its construction on. One at a time: the next one resets the maxima.
+/// Measures from its construction on. Only one may exist at a time, because the next one resets the maxima.
 class HeapMeter {
  public:
   HeapMeter();

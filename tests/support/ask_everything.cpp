@@ -25,7 +25,7 @@ auto Metadata(const FileTypeInfo& reader) {
 std::unique_ptr<FileTypeInfo> MakeReader(std::istream& stream, const std::wstring& extension) {
   try {
     return CreateFileTypeInfo(stream, extension);
-  } catch (const std::invalid_argument&) {  // an item that lies outside its object
+  } catch (const std::invalid_argument&) {  // an item that is not as deep in the tree as its type requires
     if (!IsEmiExtension(extension)) throw;
   } catch (const std::length_error&) {  // a negative string length
     if (!IsSerExtension(extension)) throw;

@@ -16,7 +16,7 @@ namespace Qel::Lumetra::ShellExt::Testing {
 
 struct Answers {
   bool constructed = false;     // false if the constructor threw one of its two exceptions
-  bool valid = false;           // the first answer
+  bool valid = false;           // whether the reader accepts the file
   int bitmaps = 0;              // the number of requests that returned a bitmap
   std::uint64_t bitmapSum = 0;  // the sum of all bytes of the bitmaps
   std::string wrong;            // what broke a rule that holds for every file; empty if nothing did
@@ -29,13 +29,14 @@ inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
                                         {1, 256}, {-5, 40}, {-3, -2}, {kMaxRequest, kMaxRequest}};
 
 /// Makes the reader of `extension` on `stream`. If the file is valid, asks for its metadata, then for
-/// thumbnails of the sizes `requests`, then for its metadata again.
+/// thumbnails of the sizes `requests`, then for its metadata again. Then reads the facts of the header
+/// (HeaderFacts) and returns the answers.
 Answers AskEverything(std::istream& stream, const std::wstring& extension,
                       std::span<const SIZE> requests = kAllRequests);
 
 /// Returns whether a thumbnail of the frame can take seconds although the file is small, because its pixels
-/// overlap. AskEverything requests no thumbnails of such frames, except of those that are refused for their
-/// size.
+/// overlap. AskEverything requests no thumbnails of such frames. Returns false if the frame has so many
+/// pixels that the reader refuses it at once.
 bool TakesLong(Size2 frame);
 
 /// Returns whether a request for a thumbnail ends the process by design: a request of 0 does, and so does one

@@ -1,5 +1,5 @@
-// Replaces a function that a loaded module imports with one of the test. The test sees how the module uses
-// Windows and can make a call fail. Calls by other modules are not affected.
+// Replaces a function that a loaded module imports with a function of the test. The test sees how the module
+// uses Windows and can make a call fail. Calls by other modules are not affected.
 #pragma once
 
 #include <windows.h>

@@ -26,8 +26,8 @@ class ScarceSystem {
   ScarceSystem(const ScarceSystem&) = delete;
   ScarceSystem& operator=(const ScarceSystem&) = delete;
 
-  /// Makes the request with the index `request` fail, counted from 0 from now on, and all later ones too if
-  /// `then` says so.
+  /// Makes the request with the index `request` fail, and with kStaysEmpty all later ones too. The next
+  /// request has the index 0.
   static void FailAt(std::int64_t request, Then then);
 
   /// Makes all requests succeed again. Returns what failed first since FailAt.

@@ -54,7 +54,7 @@ class Test(unittest.TestCase):
             file.unlink()
 
     def types(self):
-        """Returns the types of the samples. Asks a separate program, which sees the same environment as the others."""
+        """Returns the types of the samples. Asks a separate program, with the environment that the thumbnailers get."""
         lines = run("gio", "info", "--attributes", "standard::content-type", *self.files,
                     env=self.stage.environment()).splitlines()
         types = [line.split()[-1] for line in lines if "standard::content-type" in line]
@@ -97,7 +97,7 @@ class Tumbler(Test):
 
 
 class Gnome(Test):
-    """The part of GNOME that makes thumbnails for Nautilus. Its sandbox is off because it has only programs in /usr."""
+    """The part of GNOME that makes thumbnails for Nautilus. Without its sandbox, which has only the programs in /usr."""
 
     def test(self):
         self.ask(FACTORY, "dbus-run-session", "--", SNAP_NAME="qelthumb")

@@ -169,7 +169,7 @@ class Fault(Test):
 
     def test_of_the_output_keeps_the_previous_thumbnail(self):
         file = self.stage.samples / "atlas.mrc"
-        self.out.write_bytes(b"the thumbnail of before")
+        self.out.write_bytes(b"an earlier thumbnail")
         (self.out.parent / "folder").mkdir()
         self.assertFails(FAILED, 128, file, self.folder / "no folder" / "a.png",
                          says="no folder/a.png cannot be written: No such file or directory.")
@@ -181,10 +181,10 @@ class Output(Test):
     """What happens to an output file that exists, or that others have open."""
 
     def test_replaces_the_previous_thumbnail_at_once(self):
-        self.out.write_bytes(b"the thumbnail of before")
+        self.out.write_bytes(b"an earlier thumbnail")
         with open(self.out, "rb") as before:
             self.thumbnail(128, self.stage.samples / "atlas.mrc")
-            self.assertEqual(before.read(), b"the thumbnail of before")
+            self.assertEqual(before.read(), b"an earlier thumbnail")
         self.assertEqual(list(self.out.parent.iterdir()), [self.out])
 
     def test_is_written_to_the_file_that_the_caller_has_made(self):

@@ -1,4 +1,4 @@
-"""qelthumb, installed into a temporary folder as its package does it, with samples of every kind."""
+"""qelthumb, installed in a temporary folder as its package installs it, with samples of every kind."""
 
 import os
 import pathlib

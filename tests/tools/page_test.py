@@ -61,8 +61,8 @@ BROKEN_WORDS = r"""(() => {
   return broken;
 })()"""
 
-# Whether the focused element is entirely visible, between the lower edge of the bar, or the upper edge of the window,
-# and the lower edge of the window.
+# Whether the focused element is entirely visible: below the bar, or below the top of the window once the bar has been
+# scrolled out of it, and above the bottom of the window.
 IN_SIGHT = """(() => {
   const box = document.activeElement.getBoundingClientRect();
   const top = Math.max(0, document.querySelector('.bar').getBoundingClientRect().bottom);
@@ -74,9 +74,9 @@ IN_SIGHT = """(() => {
 FINDINGS = """axe.run().then(({violations, incomplete, passes}) => {
   const list = (results) => results.flatMap(({id, nodes}) =>
       nodes.map(({html, any}) => [id, html.slice(0, 120), any[0]?.message, any[0]?.data?.messageKey]));
-  const untold = incomplete.filter(({id}) => id === 'color-contrast');
+  const undetermined = incomplete.filter(({id}) => id === 'color-contrast');
   return {
-    problems: [...list(violations), ...list(untold).filter(([, , , key]) => key !== 'nonBmp')],
+    problems: [...list(violations), ...list(undetermined).filter(([, , , key]) => key !== 'nonBmp')],
     contrasts: passes.find(({id}) => id === 'color-contrast')?.nodes.length ?? 0,
   };
 })"""

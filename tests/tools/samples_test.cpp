@@ -1,4 +1,4 @@
-// The bytes of the sample files, and how the readers read them. Runs in every build.
+// Tests the bytes of the sample files, and how the readers read them. Runs in every build.
 #include "samples.h"
 
 #include <gtest/gtest.h>

@@ -10,7 +10,7 @@
 
 namespace Qel::Lumetra::ShellExt::Testing {
 
-/// Returns the type and the tag of an item, which are also the whole beginning of a structure.
+/// Returns the bytes of an item's type and tag. In a structure the items follow them directly.
 std::string EmiOpening(std::uint16_t type, std::uint16_t tag);
 
 /// Returns the end marker of a list.
@@ -21,10 +21,10 @@ std::string EmiScalar(std::uint16_t type, std::uint16_t tag, std::string_view va
 
 std::string EmiDouble(std::uint16_t tag, double value);
 
-/// Returns a string item. `length` overrides the length that the item states, for a wrong one.
+/// Returns a string item. If `length` is given, the item states it instead of the true length.
 std::string EmiText(std::uint16_t tag, std::string_view text, std::optional<std::uint32_t> length = {});
 
-/// Returns an array. `byteCount` overrides the size in bytes that the item states, for a wrong one.
+/// Returns an array. If `byteCount` is given, the item states it instead of its true size in bytes.
 std::string EmiArray(std::uint16_t type, std::uint16_t tag, std::string_view payload,
                      std::optional<std::uint32_t> byteCount = {});
 

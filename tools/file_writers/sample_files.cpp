@@ -90,7 +90,7 @@ constexpr DataType kDataTypes[] = {DataType::kUInt8,          DataType::kUInt16,
                                    DataType::kFloat32,        DataType::kFloat64, DataType::kComplexFloat32,
                                    DataType::kComplexFloat64, DataType::kRgb24,   DataType::kBgr24};
 
-/// Returns the same file with strides for rows that are stored from the bottom.
+/// Returns the file with a header that says that the bottom row is stored first.
 RawFile BottomUp(RawFile file) {
   file.offset = (file.height - 1) * file.rowStride;
   file.rowStride = -file.rowStride;

@@ -47,7 +47,7 @@ struct SerFile {
   std::vector<SerDimension> dimensions = std::vector<SerDimension>(1);
   std::vector<SerElement> elements{};
 
-  // Override the values that follow from the fields above, for a file with wrong ones.
+  // Replace the values that follow from the fields above, to write a file with wrong ones.
   std::optional<std::uint32_t> totalElements{};
   std::optional<std::uint32_t> validElements{};
   std::optional<std::uint64_t> offsetArrayOffset{};

@@ -47,10 +47,10 @@ inline double Distance(double dx, double dy) {
   return std::sqrt(dx * dx + dy * dy);
 }
 
-/// Rises smoothly from 0 at `low` to 1 at `high`.
+/// Returns a value that rises smoothly from 0 at `low` to 1 at `high`.
 double SmoothStep(double low, double high, double x);
 
-/// Pixel values of no particular unit; those of most scenes are near 0 to 1. Row 0 is the top.
+/// A grey picture. Most scenes have values from about 0 to 1, without a unit. Row 0 is the top.
 class Picture {
  public:
   Picture(int width, int height, double value = 0);
