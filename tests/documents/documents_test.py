@@ -53,8 +53,10 @@ class Documents(unittest.TestCase):
     def test_name_the_current_version(self):
         versions = re.findall(r"(?m)^## \[([\d.]+)\]", (PROJECT / "CHANGELOG.md").read_text("utf-8"))
         self.assertEqual(versions[0], VERSION)
-        packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / "README.md").read_text("utf-8"))
-        self.assertEqual(set(packages), {VERSION})
+        for name in ("README.md", "docs/user-guide.md"):
+            with self.subTest(document=name):
+                packages = re.findall(r"QelShellExt-([\d.]+)-x64", (PROJECT / name).read_text("utf-8"))
+                self.assertEqual(set(packages), {VERSION})
 
 
 class Prose(unittest.TestCase):
