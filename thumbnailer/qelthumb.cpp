@@ -1,5 +1,5 @@
-// qelthumb, the front end for the file managers of Linux. They run it for each picture, with the command line
-// in qelthumb.thumbnailer, and read the PNG file that it writes.
+// qelthumb, the program that Linux file managers run for each file with a thumbnail. qelthumb.thumbnailer
+// gives them its command line. They read the PNG file that it writes.
 #include <png.h>
 #include <sys/resource.h>
 #include <unistd.h>
@@ -60,7 +60,7 @@ std::int32_t ParseSize(std::string_view text) {
 }
 
 /// Returns the edge in pixels to request for a thumbnail no larger than `size`. It is never larger than the
-/// frame, because such a request would end the process for a colour frame.
+/// frame, because such a request for a colour frame would crash the process.
 std::int32_t EdgeFor(Size2 frame, std::int32_t size) {
   const std::int64_t longest = std::max({frame.width, frame.height, 1});
   return static_cast<std::int32_t>(longest / ((longest + size - 1) / size));
@@ -69,13 +69,13 @@ std::int32_t EdgeFor(Size2 frame, std::int32_t size) {
 Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   std::error_code error;
   // Opening a pipe would wait for its writer.
-  if (!fs::is_regular_file(path, error) && !error) throw Failure("This is not a regular file.");
+  if (!fs::is_regular_file(path, error) && !error) throw Failure("This is a folder or a device, not a file.");
   std::ifstream stream(path, std::ios_base::binary);
   if (!stream) throw Failure("The file cannot be opened" + Reason());
   // The known extensions are ASCII, which is the same in every character set.
   const std::wstring extension = GetExtension({path.native().begin(), path.native().end()});
   const auto text = ExplainFault(stream, extension);
-  if (!text) throw Failure("Files with this extension are not supported.");
+  if (!text) throw Failure("Only " QEL_EXTENSIONS " files are supported.");
   if (!text->fault.empty()) throw Failure(text->fault);
 
   stream.clear();
@@ -83,7 +83,9 @@ Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   const auto reader = CreateFileTypeInfo(stream, extension);
   const std::int32_t edge = EdgeFor(reader->GetDimensions(), size);
   Bitmap bitmap(reader->CreateThumbnail({edge, edge}));
-  if (!bitmap) throw Failure("The picture cannot be reduced to " + std::to_string(edge) + " pixels.");
+  if (!bitmap)
+    throw Failure("The image is too narrow to be reduced to " + std::to_string(edge) +
+                  " pixels. Request a larger size.");
   return bitmap;
 }
 
@@ -133,7 +135,7 @@ int main(int count, char** arguments) {
   const char* const input = arguments[2];
   const char* const output = arguments[3];
   if (std::error_code error; fs::equivalent(input, output, error)) {
-    std::fprintf(stderr, "%s: The thumbnail must not overwrite this file.\n", input);
+    std::fprintf(stderr, "%s: This is also the output file. Name another output file.\n", input);
     return kWrongUsage;
   }
   // Some file managers do not limit the memory and time of thumbnailers.
@@ -143,7 +145,7 @@ int main(int count, char** arguments) {
     WritePng(MakeThumbnail(input, size), output);
     return EXIT_SUCCESS;
   } catch (const std::bad_alloc&) {
-    std::fprintf(stderr, "%s: There is not enough memory.\n", input);
+    std::fprintf(stderr, "%s: The thumbnail needs more memory than qelthumb may use.\n", input);
   } catch (const std::exception& e) {
     std::fprintf(stderr, "%s: %s\n", input, e.what());
   }

@@ -94,6 +94,17 @@ class Show(WithSubstitutes):
         self.assertNotIn("The page is", errors)
 
 
+class NothingToDo(WithSubstitutes):
+    def test_is_reported_with_an_example(self):
+        for script in ("build", "wine"):
+            with self.subTest(script):
+                shutil.rmtree(self.folder / "programs", ignore_errors=True)
+                status, errors = self.run_script(script)
+                self.assertEqual((status, errors.count("\n")), (1, 1), errors)
+                self.assertIn(f"for example: scripts/{script} ", errors)
+                self.assertFalse(self.calls.exists())
+
+
 class LongStages(WithSubstitutes):
     """Tests the progress lines of stages. Each stage lasts until the script has written two lines."""
 

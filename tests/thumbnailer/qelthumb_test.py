@@ -21,6 +21,7 @@ from stage import Stage
 
 BUILD = sys.argv.pop(1)
 DONE, FAILED, USAGE = range(3)
+UNSUPPORTED = "Only .mrc, .ali, .rec, .ser, .ebn, .emi and .raw files are supported."
 
 
 def mrc(width, height, pixels, mode=0):
@@ -87,7 +88,7 @@ class Usage(Test):
         os.link(file, hard)
         for output in (file, symbolic, hard, f"{self.out.parent}/../out/a.mrc"):
             with self.subTest(output=output):
-                self.assertFails(USAGE, 128, file, output, says="a.mrc: The thumbnail must not overwrite this file.\n")
+                self.assertFails(USAGE, 128, file, output, says="a.mrc: This is also the output file. Name another output file.\n")
         self.assertEqual(file.read_bytes(), contents)
 
 
@@ -110,7 +111,7 @@ class Thumbnail(Test):
             with self.subTest(size=size):
                 self.assertEqual(self.thumbnail(size, file).size, expected)
 
-    def test_of_a_small_colour_frame_does_not_end_the_process(self):
+    def test_of_a_small_colour_frame_does_not_crash(self):
         file = self.write("small.mrc", mrc(3, 2, bytes(range(18)), mode=16))
         picture = self.thumbnail(256, file)
         self.assertEqual((picture.mode, picture.size), ("RGB", (3, 2)))
@@ -151,18 +152,18 @@ class Fault(Test):
 
     def test_of_a_frame_that_is_too_narrow_is_reported(self):
         file = self.write("line.mrc", mrc(1000, 1, bytes(1000)))
-        self.assertFails(FAILED, 128, file, self.out, says="cannot be reduced to 125 pixels")
+        self.assertFails(FAILED, 128, file, self.out, says="is too narrow to be reduced to 125 pixels. Request a larger size.")
 
-    def test_of_a_path_without_a_picture_is_reported(self):
+    def test_of_a_path_without_an_image_is_reported(self):
         pipe = self.folder / "pipe.mrc"
         os.mkfifo(pipe)
         for file, says in (
             (self.write("empty.mrc", b""), "The file is empty."),
-            (self.write("picture.png", b"\x89PNG"), "Files with this extension are not supported."),
-            (self.write("none", b""), "Files with this extension are not supported."),
+            (self.write("picture.png", b"\x89PNG"), UNSUPPORTED),
+            (self.write("none", b""), UNSUPPORTED),
             (self.folder / "missing.mrc", "The file cannot be opened: No such file or directory."),
-            (self.folder, "This is not a regular file."),
-            (pipe, "This is not a regular file."),
+            (self.folder, "This is a folder or a device, not a file."),
+            (pipe, "This is a folder or a device, not a file."),
         ):
             with self.subTest(file=file):
                 self.assertFails(FAILED, 128, file, self.out, says=says)
@@ -226,7 +227,7 @@ class Limits(Test):
         result = subprocess.run([self.stage.program, "4096", file, self.out], stdin=subprocess.DEVNULL,
                                 stderr=subprocess.PIPE, text=True,
                                 preexec_fn=lambda: resource.setrlimit(resource.RLIMIT_AS, (limit, limit)))
-        self.assertEqual((result.returncode, result.stderr), (FAILED, f"{file}: There is not enough memory.\n"))
+        self.assertEqual((result.returncode, result.stderr), (FAILED, f"{file}: The thumbnail needs more memory than qelthumb may use.\n"))
         self.assertEqual(list(self.out.parent.iterdir()), [])
 
     def test_are_kept_for_a_large_sparse_file(self):
