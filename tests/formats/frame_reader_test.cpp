@@ -186,6 +186,18 @@ TEST(FrameReader, ReadsEachByteOfTheWholeBlocksOnce) {
   EXPECT_LE(buffer.reads, 16);
 }
 
+TEST(FrameReader, AWideRowIsReadInFullBuffers) {
+  constexpr std::int32_t kBuffer = 256 * 1024;
+  const std::string file(2 * kBuffer + 100, '\1');
+  MemoryBuffer buffer(file);
+  std::istream stream(&buffer);
+  EXPECT_EQ(
+      TakeBitmap(ReadThumbnail(stream, PackedLayout(kUInt8, {2 * kBuffer, 1}, 100), {2 * kBuffer, 1})).width,
+      2 * kBuffer);
+  EXPECT_EQ(buffer.reads, 2);
+  EXPECT_EQ(buffer.largestRead, kBuffer);
+}
+
 TEST(FrameReader, ReadsColumnsOnceWhenTheFileIsStoredByColumn) {
   const std::string file(2'000'000, '\1');
   MemoryBuffer buffer(file);

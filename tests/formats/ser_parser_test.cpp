@@ -345,6 +345,26 @@ TEST(Ser, OffsetArraysCanPass4GiB) {
   EXPECT_FALSE(isValid(kEnd - 1));
 }
 
+TEST(Ser, AnElementJustBelow4GiBHasItsPixelsAbove) {
+  constexpr std::uint32_t kElement = 0xFFFFFFF0;
+  constexpr std::uint32_t kArrays = 30;
+  SerFile file;
+  file.dimensions.clear();
+  file.totalElements = 1;
+  file.validElements = 1;
+  file.offsetArrayOffset = kArrays;
+  file.offsetArrays = BytesOf<std::uint32_t>({kElement, 0});
+  const std::string head = file.Bytes();
+  const std::string element = Image(3, 2, BytesOf<std::uint8_t>({0, 1, 2, 3, 4, 255})).Bytes();
+  Testing::MemoryBuffer buffer(head);
+  buffer.trailingZeros = kElement - static_cast<std::int64_t>(head.size());
+  buffer.tail = element;
+  std::istream stream(&buffer);
+  const SerFileInfo ser(stream);
+  ASSERT_TRUE(ser.IsValid());
+  EXPECT_EQ(Testing::TakeBitmap(ser.CreateThumbnail(kWholeSize)).bytes, (Bytes{0, 1, 2, 3, 4, 255}));
+}
+
 TEST(Ser, HugeImagesHaveNoThumbnail) {
   SerFile file = OneImage();
   file.elements[0].typeCode = 10;

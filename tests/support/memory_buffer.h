@@ -23,6 +23,7 @@ class MemoryBuffer : public std::streambuf {
   Failure failure = Failure::kBringsNothing;
   bool seekable = true;
   std::int64_t trailingZeros = 0;  // the zero bytes that follow the file's own, as in a sparse file
+  std::string_view tail = {};      // the bytes that follow these zeros
 
   std::int64_t reads = 0;
   std::int64_t bytesRead = 0;
@@ -33,7 +34,8 @@ class MemoryBuffer : public std::streambuf {
   std::streamsize xsgetn(char* target, std::streamsize count) override {
     if (count == 0) return 0;  // not a read of the file
     const auto stored = static_cast<std::streamsize>(bytes_.size());
-    std::streamsize got = std::clamp<std::streamsize>(stored + trailingZeros - position_, 0, count);
+    const std::streamsize tailPosition = stored + trailingZeros;
+    std::streamsize got = std::clamp<std::streamsize>(Size() - position_, 0, count);
     if (reads++ == failingRead) {
       if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
       got = failure == Failure::kBringsHalf ? got / 2 : 0;
@@ -43,6 +45,9 @@ class MemoryBuffer : public std::streambuf {
     const std::streamsize copied = std::clamp<std::streamsize>(stored - position_, 0, got);
     std::copy_n(bytes_.begin() + std::min(position_, stored), copied, target);
     std::fill(target + copied, target + got, '\0');
+    if (const std::streamsize before = std::max<std::streamsize>(tailPosition - position_, 0); before < got) {
+      std::copy_n(tail.begin() + (position_ + before - tailPosition), got - before, target + before);
+    }
     position_ += got;
     bytesRead += got;
     largestRead = std::max<std::int64_t>(largestRead, got);
@@ -61,8 +66,7 @@ class MemoryBuffer : public std::streambuf {
   }
 
   pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
-    const off_type base = direction == std::ios_base::end
-                              ? static_cast<off_type>(bytes_.size()) + trailingZeros
+    const off_type base = direction == std::ios_base::end   ? Size()
                           : direction == std::ios_base::cur ? position_
                                                             : 0;
     return seekpos(base + offset, std::ios_base::in);
@@ -75,6 +79,10 @@ class MemoryBuffer : public std::streambuf {
   }
 
  private:
+  std::streamoff Size() const {
+    return static_cast<std::streamoff>(bytes_.size() + tail.size()) + trailingZeros;
+  }
+
   std::string_view bytes_;
   std::streamoff position_ = 0;
   std::streamoff endOfLastRead_ = 0;
