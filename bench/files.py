@@ -35,8 +35,8 @@ def random_rows(pixel_format, width, rows, generator):
     return numpy.clip(1000 + 100 * values, 0, 32767).astype(pixel_format)
 
 
-class Written:
-    """A file or folder for one measurement: in_folder writes it and deletes it afterwards."""
+class Input:
+    """A file or folder that a measurement reads. in_folder writes it and deletes it afterwards."""
 
     @contextlib.contextmanager
     def in_folder(self, folder):
@@ -49,7 +49,7 @@ class Written:
 
 
 @dataclasses.dataclass
-class Frame(Written):
+class Frame(Input):
     """A file of one frame. Width and height are in pixels, other sizes and positions in bytes."""
 
     name: str
@@ -105,7 +105,7 @@ class Frame(Written):
 
 
 @dataclasses.dataclass
-class Series(Written):
+class Series(Input):
     """A .ser file of many small images. The array of their offsets is at its end."""
 
     count: int
@@ -145,7 +145,7 @@ class Series(Written):
 
 
 @dataclasses.dataclass
-class Folder(Written):
+class Folder(Input):
     """A folder of small .mrc files. No measurement reads their pixels, which are a hole in each sparse file."""
 
     count: int

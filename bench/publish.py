@@ -22,11 +22,11 @@ def chart(rows, file):
     matplotlib.rcParams.update({"svg.fonttype": "none", "svg.hashsalt": "", "font.family": "sans-serif"})
     figure, axes = matplotlib.pyplot.subplots(figsize=(10, 4.5), layout="constrained")
     width = 0.9 / len(COMMANDS)
-    for number, (way, colour) in enumerate(COLOURS.items()):
-        places = [(place + (number - (len(COMMANDS) - 1) / 2) * width, row["ratios"][way])
-                  for place, row in enumerate(rows) if way in row["ratios"]]
+    for number, (method, colour) in enumerate(COLOURS.items()):
+        places = [(place + (number - (len(COMMANDS) - 1) / 2) * width, row["ratios"][method])
+                  for place, row in enumerate(rows) if method in row["ratios"]]
         axes.bar([x for x, _ in places], [ratio for _, ratio in places], width, color=colour,
-                 label=f"this project, {way}" if way in SYSTEMS else way)
+                 label=f"this project, {method}" if method in SYSTEMS else method)
     axes.set_yscale("log")
     axes.set_ylim(bottom=1)
     axes.set_yticks([1, 2, 5, 10, 20, 50, 100], ["1", "2", "5", "10", "20", "50", "100"])
@@ -44,7 +44,7 @@ def table(rows):
     for row in rows:
         read = row["read_ns"].get("native") or row["read_ns"]["DLL"]
         size = f" at {row['request']}" if row["request"] not in (None, PEER_EDGE) else ""
-        ratios = (f"{row['ratios'][way]:.2f}" if way in row["ratios"] else "" for way in COMMANDS)
+        ratios = (f"{row['ratios'][method]:.2f}" if method in row["ratios"] else "" for method in COMMANDS)
         lines.append(f"| {row['workload']}{size} | {read / 1e6:.2f} | " + " | ".join(ratios) + " |")
     return "\n".join(lines)
 

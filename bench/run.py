@@ -37,6 +37,7 @@ FILES = Folder(1000)
 MEMORY_FRAME = Frame("memory", "float32", 4096, 4096)
 SMALL_FRAME = Frame("small", "float32", 64, 64)
 
+# The commands that start the worker of each method of making thumbnails.
 COMMANDS = {
     "native": [BUILD / "linux/bench/bench_worker"],
     "DLL": [BUILD.parent / "scripts/wine", BUILD / "windows/bench/bench_worker.exe"],
@@ -45,15 +46,15 @@ COMMANDS = {
 SYSTEMS = ("native", "DLL")  # each has its own bare read; peers are compared with the native one
 
 
-def request_for(way, frame, edge):
+def request_for(method, frame, edge):
     """Returns the words of a worker's request for a thumbnail."""
-    if way in SYSTEMS:
+    if method in SYSTEMS:
         return ("thumbnail", edge, frame.file)
     return ("thumbnail", frame.factor(edge), frame.pixel_format, frame.width, frame.height, frame.position,
             frame.file)
 
 
-def ways_to(frame, edge):
+def methods_for(frame, edge):
     peers = [name for name, peer in PEERS.items() if edge == PEER_EDGE and peer.accepts(frame)]
     return [*SYSTEMS, *peers]
 
@@ -72,31 +73,33 @@ class Bench:
     def new_workers(self):
         """Starts new processes for the next rows, so that earlier measurements do not influence them."""
         with contextlib.ExitStack() as stack:
-            self._workers = {way: stack.enter_context(Worker(command, FOLDER)) for way, command in COMMANDS.items()}
+            self._workers = {method: stack.enter_context(Worker(command, FOLDER))
+                             for method, command in COMMANDS.items()}
             yield
 
     def measure(self, workload, edge, read, requests):
         """Compares the time of each request with that of the bare `read` on the same system."""
-        bases = {way: "DLL" if way == "DLL" else "native" for way in requests}
+        bases = {method: "DLL" if method == "DLL" else "native" for method in requests}
         systems = [system for system in SYSTEMS if system in bases.values()]
         contenders = {("read", system): self._requesting(system, read) for system in systems}
-        contenders.update({way: self._requesting(way, words) for way, words in requests.items()})
+        contenders.update({method: self._requesting(method, words) for method, words in requests.items()})
         times = interleaved(contenders, self._rounds)
         read_ns = {system: statistics.median(times["read", system]) for system in systems}
-        ratios = {way: ratio(times[way], times["read", base]) for way, base in bases.items()}
+        ratios = {method: ratio(times[method], times["read", base]) for method, base in bases.items()}
         self.rows.append({"workload": workload, "request": edge, "read_ns": read_ns, "ratios": ratios})
         self._table.row(workload, edge or "",
                         *(f"{read_ns[system] / 1e6:.2f}" if system in read_ns else "" for system in SYSTEMS),
-                        *(f"{ratios[way]:.2f}" if way in ratios else "" for way in COMMANDS))
+                        *(f"{ratios[method]:.2f}" if method in ratios else "" for method in COMMANDS))
 
-    def _requesting(self, way, words):
-        return lambda: self._workers[way].nanoseconds(*words)
+    def _requesting(self, method, words):
+        return lambda: self._workers[method].nanoseconds(*words)
 
 
 def measure_frame(bench, frame):
     read = ("read", frame.position, frame.block_bytes, frame.file)
     for edge in EDGES:
-        bench.measure(frame.name, edge, read, {way: request_for(way, frame, edge) for way in ways_to(frame, edge)})
+        requests = {method: request_for(method, frame, edge) for method in methods_for(frame, edge)}
+        bench.measure(frame.name, edge, read, requests)
 
 
 def measure_series(bench, series):
@@ -107,23 +110,23 @@ def measure_series(bench, series):
 
 
 def measure_folder(bench, folder):
-    """Compares reading all properties of every file in a folder, without the pictures, with reading only the headers."""
+    """Compares reading all properties of every file in a folder, but no pictures, with reading only the headers."""
     read = ("starts", MRC_HEADER_BYTES, *folder.files)
-    for way, view in (("native", "reader"), ("DLL", "tip"), ("DLL", "columns"), ("DLL", "sets"), ("DLL", "store")):
-        bench.measure(f"folder: {view}", None, read, {way: ("metadata", view, *folder.files)})
+    for method, view in (("native", "reader"), ("DLL", "tip"), ("DLL", "columns"), ("DLL", "sets"), ("DLL", "store")):
+        bench.measure(f"folder: {view}", None, read, {method: ("metadata", view, *folder.files)})
 
 
 def measure_memory():
-    """Returns the bytes that a thumbnail takes in a new process of each contender, by its name."""
+    """Returns the bytes that a thumbnail takes in a new process of each method, by its name."""
     print(f"\nPeak memory for a thumbnail of {MEMORY_FRAME.pixel_format}, {MEMORY_FRAME.width} x"
           f" {MEMORY_FRAME.height}, at {PEER_EDGE}:")
     peaks = {}
     with MEMORY_FRAME.in_folder(FOLDER), SMALL_FRAME.in_folder(FOLDER):
-        for way in ways_to(MEMORY_FRAME, PEER_EDGE):
-            with Worker(COMMANDS[way], FOLDER) as worker:
-                peaks[way] = worker.peak_memory(request_for(way, SMALL_FRAME, 16),
-                                                request_for(way, MEMORY_FRAME, PEER_EDGE))
-            print(f"- {way}: {peaks[way] / 2**20:.1f} MiB", flush=True)
+        for method in methods_for(MEMORY_FRAME, PEER_EDGE):
+            with Worker(COMMANDS[method], FOLDER) as worker:
+                peaks[method] = worker.peak_memory(request_for(method, SMALL_FRAME, 16),
+                                                   request_for(method, MEMORY_FRAME, PEER_EDGE))
+            print(f"- {method}: {peaks[method] / 2**20:.1f} MiB", flush=True)
     return peaks
 
 

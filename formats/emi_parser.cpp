@@ -54,15 +54,15 @@ std::optional<std::uint32_t> BytesOfNumber(std::uint16_t type) {
 /// Returns whether `type` is a data array: an even number from 0x2100 to 0x2114 (lines) or from 0x2200 to
 /// 0x2214 (images).
 bool IsDataArray(std::uint16_t type) {
-  const int series = type & 0xFF00;
+  const int group = type & 0xFF00;
   const int elementType = type & 0x00FF;
-  return (series == 0x2100 || series == 0x2200) && elementType <= 0x14 && elementType % 2 == 0;
+  return (group == 0x2100 || group == 0x2200) && elementType <= 0x14 && elementType % 2 == 0;
 }
 
-/// Returns whether an item is the array with the values of a line (`series` 0x2100) or the pixels of an image
+/// Returns whether an item is the array with the values of a line (`group` 0x2100) or the pixels of an image
 /// (0x2200).
-bool IsArrayOf(EmiItemId id, int series) {
-  return IsDataArray(id.type) && (id.type & 0xFF00) == series && id.tag == kDataTag;
+bool IsArrayOf(EmiItemId id, int group) {
+  return IsDataArray(id.type) && (id.type & 0xFF00) == group && id.tag == kDataTag;
 }
 
 /// Returns the string of an object for the tag `tag`; null for a tag that is not kept.
@@ -105,7 +105,7 @@ EmiParser::EmiParser(std::istream& stream) : FileParser(stream) {
   Require(magic == kMagic, "magic", magic, "0x4B4A");
   Require(version <= kMaxVersion, "version", version, "0x0200 or below");
   if (stream.good() && !fault()) {
-    Walk();
+    Traverse();
     // A traversal that ends at the end of the file is a success, because what it found is usable.
     stream.clear();
   }
@@ -113,7 +113,7 @@ EmiParser::EmiParser(std::istream& stream) : FileParser(stream) {
   Require(imageCount_ > 0, "The file holds no image object.");
 }
 
-void EmiParser::Walk() {
+void EmiParser::Traverse() {
   while (true) {
     const EmiItemId id = ReadItemId();
     if (!stream().good()) return;

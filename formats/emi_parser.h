@@ -53,7 +53,7 @@ class EmiParser final : public FileParser {
 
  private:
   EmiItemId ReadItemId();
-  void Walk();
+  void Traverse();
 
   /// Reads or skips the value of the innermost open item. Returns false for a structure, whose value is a
   /// list of items.

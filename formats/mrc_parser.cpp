@@ -53,7 +53,7 @@ void SwapHeader(unsigned char* bytes) {
 }  // namespace
 
 MrcParser::MrcParser(std::istream& stream) : FileParser(stream) {
-  stream.read(reinterpret_cast<char*>(bytes_.data()), kBytes);
+  stream.read(reinterpret_cast<char*>(bytes_.data()), kHeaderBytes);
   // No frame is this large in both directions, so such a header is big-endian.
   constexpr std::uint32_t kTooLarge = 65536;
   isSwapped_ = static_cast<std::uint32_t>(Word(kNx)) >= kTooLarge &&
@@ -108,7 +108,7 @@ FrameLayout MrcParser::Section(std::int32_t section) const {
   // Sizes and positions wrap at 32 bits, so a section beyond 2 GiB cannot be read. Intentional.
   const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size.width, size.height), type.bytes());
   const std::int32_t position =
-      WrapToInt32(std::int64_t{kBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
+      WrapToInt32(std::int64_t{kHeaderBytes} + Word(kNext) + WrappingProduct(frameBytes, section));
   FrameLayout layout = FlippedVertically(PackedLayout(type, size, position));
   layout.blockBytes = frameBytes;
   // Only 16-bit pixels are swapped. Floats, complex numbers and colours of a swapped file are not.

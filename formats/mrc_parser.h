@@ -31,7 +31,7 @@ class MrcParser final : public FileParser {
   std::string comment() const;
 
  private:
-  static constexpr std::size_t kBytes = 1024;
+  static constexpr std::size_t kHeaderBytes = 1024;
   // Offsets in bytes of the fields that are used.
   static constexpr std::size_t kNx = 0;
   static constexpr std::size_t kNy = 4;
@@ -47,7 +47,7 @@ class MrcParser final : public FileParser {
   /// Returns the layout of a section. The first stored row is at the bottom of the picture.
   FrameLayout Section(std::int32_t section) const;
 
-  std::array<unsigned char, kBytes> bytes_{};
+  std::array<unsigned char, kHeaderBytes> bytes_{};
 };
 
 }  // namespace Qel::Lumetra::ShellExt

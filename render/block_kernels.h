@@ -1,5 +1,5 @@
 // The inner loops of block_sums.h, with vector instructions for x86 and in plain C++ for other processors.
-// Both give the same bits. GCC's portable vectors do not compile to such code: widening 8 bytes, for
+// Both give the same bits. GCC's portable vector types compile to slower code: widening 8 bytes, for
 // instance, becomes eight scalar conversions.
 #pragma once
 

@@ -90,7 +90,8 @@ struct ValueRange {
 };
 
 /// Truncates each of `count` levels toward zero to 32 bits and writes the low 8 bits. A NaN and a level that
-/// 32 bits cannot hold give 0, as the conversion of x86 does. The size of `levels` must be a multiple of 8.
+/// 32 bits cannot hold give 0, as the conversion of x86 does. Reads `levels` up to the next multiple of 8
+/// values.
 inline void Truncate(const double* levels, std::size_t count, std::uint8_t* bytes) {
 #ifdef __SSE2__
   const auto four = [levels](std::size_t i) {

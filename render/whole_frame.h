@@ -51,7 +51,7 @@ HBITMAP RenderColourThumbnail(const ImageView<const ColourPixel<kOrder>>& frame,
 
 /// Writes the average of every whole block of `factor` by `factor` pixels of `source` into `target`, which
 /// has the size of the source divided by the factor and no gaps between the pixels of a row. The remainder at
-/// the right and the bottom is dropped. A factor below 1 has no blocks.
+/// the right and the bottom is dropped. Writes nothing for a factor below 1.
 template <class Pixel>
 void DownsampleBox(const ImageView<const Pixel>& source, std::int32_t factor,
                    const ImageView<typename SamplesOf<Pixel>::Target>& target) {

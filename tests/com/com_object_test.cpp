@@ -96,7 +96,7 @@ class ComObject : public testing::Test {
 using ThreadingModels = testing::Types<SingleThreaded, FreeThreaded>;
 TYPED_TEST_SUITE(ComObject, ThreadingModels);
 
-TYPED_TEST(ComObject, ListsItsInterfacesInItsBases) {
+TYPED_TEST(ComObject, HasTheInterfacesInItsBaseList) {
   ComPtr<CComObject<Probe<TypeParam>>> object;
   ASSERT_EQ(MakeObject(object), S_OK);
 
@@ -209,7 +209,7 @@ TYPED_TEST(ComObject, IsNotMadeWithoutMemory) {
       void* answer = &answer;
       HRESULT result = S_OK;
       {
-        const FailingHeap heap(allocation, FailingHeap::Then::kStaysFull);
+        const FailingHeap heap(allocation, FailingHeap::Then::kKeepsFailing);
         result = MakeInstance<Probe<TypeParam>>(aggregating, IID_IUnknown, &answer);
       }
       EXPECT_EQ(result, E_OUTOFMEMORY);

@@ -117,7 +117,7 @@ TEST(WrapToInt32, KeepsTheLow32Bits) {
   EXPECT_EQ(WrapToInt32(std::uint64_t{0xFFFFFFFF}), -1);
 }
 
-TEST(WrappingProduct, IsTheProductModulo32Bits) {
+TEST(WrappingProduct, IsTheProductModulo2To32) {
   using Limits = std::numeric_limits<std::int32_t>;
   EXPECT_EQ(WrappingProduct(-3, 4), -12);
   EXPECT_EQ(WrappingProduct(0x10000, 0x10000), 0);

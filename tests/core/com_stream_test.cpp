@@ -75,14 +75,14 @@ TEST(ComBufferReading, ReturnsBytesFrom128UpAsPositiveCharacters) {
   EXPECT_EQ(buffer.sbumpc(), kEnd);
 }
 
-TEST(ComBufferReading, AcceptsBytesThatComeWithFalse) {
+TEST(ComBufferReading, AcceptsBytesReturnedWithSFalse) {
   ScriptedStream source(Bytes(10));
   source.readResult = S_FALSE;
   OpenBuffer buffer(source, 64);
   EXPECT_EQ(ReadAll(buffer), Bytes(10));
 }
 
-TEST(ComBufferReading, NeverReadsPastTheBufferWhenAStreamClaimsMoreThanItWasAskedFor) {
+TEST(ComBufferReading, NeverReadsPastTheBufferWhenAStreamClaimsMoreThanWasRequested) {
   const std::string bytes = Bytes(30);
   ScriptedStream source(bytes);
   source.overclaim = 1000;
@@ -197,7 +197,7 @@ TEST(ComBufferPutBack, SurvivesAFailureThatSpoilsTheBuffer) {
   for (int i = 7; i >= 4; --i) EXPECT_EQ(buffer.sungetc(), i);
 }
 
-TEST(ComBufferResult, IsFalseWhenTheStreamReportsItsEndSo) {
+TEST(ComBufferResult, IsSFalseIfReadReturnsItAtTheEnd) {
   ScriptedStream source("");
   source.endResult = S_FALSE;
   OpenBuffer buffer(source, 16);

@@ -82,7 +82,7 @@ TEST(PathStream, FailsForAStreamThatIsAlreadyOpen) {
   EXPECT_EQ(ReadAll(stream), "2");
 }
 
-TEST(PathStream, OthersMayWriteWhileItIsOpen) {
+TEST(PathStream, OtherProgramsMayWriteWhileItIsOpen) {
   const TempFolder folder;
   const auto path = folder.Write("file", "one");
   std::ifstream stream;
@@ -91,7 +91,7 @@ TEST(PathStream, OthersMayWriteWhileItIsOpen) {
   EXPECT_EQ(ReadAll(stream), "one two");
 }
 
-TEST(PathStream, OpensAFileThatAnotherIsWriting) {
+TEST(PathStream, OpensAFileThatAnotherProgramIsWriting) {
   const TempFolder folder;
   const auto path = folder.path() / "file";
   std::ofstream writer(path, std::ios::binary);
@@ -101,7 +101,7 @@ TEST(PathStream, OpensAFileThatAnotherIsWriting) {
   EXPECT_EQ(ReadAll(stream), "written");
 }
 
-TEST(PathStream, OthersMayRenameAndDeleteWhileItIsOpen) {
+TEST(PathStream, OtherProgramsMayRenameAndDeleteWhileItIsOpen) {
   const TempFolder folder;
   const auto path = folder.Write("file", "text");
   std::ifstream stream;

@@ -20,7 +20,7 @@ TEST(LoadResourceString, ReturnsTheStringOfTheTable) {
   EXPECT_EQ(LoadResourceString(2), L"second");
 }
 
-TEST(LoadResourceString, CutsAfter255Characters) {
+TEST(LoadResourceString, TruncatesTo255Characters) {
   EXPECT_EQ(LoadResourceString(255), Letters(255));
   EXPECT_EQ(LoadResourceString(256), Letters(255));
   EXPECT_EQ(LoadResourceString(257), Letters(255));

@@ -165,7 +165,7 @@ TEST(Emi, FileOfOnlyTheHeaderIsNotValid) {
   EXPECT_FALSE(OpenEmi(EmiFile{.items = EmiEnd()})->IsValid());
 }
 
-TEST(Emi, WalkLeavesTheStreamGood) {
+TEST(Emi, TraversalLeavesTheStreamGood) {
   OpenEmi emi(EmiFile{.items = EmiOpening(0x49B0, 0x0610)});
   EXPECT_TRUE(emi.stream().good());
   EXPECT_TRUE(emi->IsValid());
@@ -236,9 +236,9 @@ TEST(Emi, DoubleLessThanThreeDeepIsABadIndex) {
 }
 
 TEST(Emi, DataArrayAtTheTopIsABadIndex) {
-  for (const int series : {0x2100, 0x2200}) {
+  for (const int group : {0x2100, 0x2200}) {
     for (int elementType = 0; elementType <= 0x16; ++elementType) {
-      const auto type = static_cast<std::uint16_t>(series + elementType);
+      const auto type = static_cast<std::uint16_t>(group + elementType);
       SCOPED_TRACE(type);
       const std::string array = EmiArray(type, 0x0001, "01234567");
       if (elementType % 2 == 0 && elementType <= 0x14) {
@@ -276,7 +276,7 @@ TEST(Emi, ByteCountMayLeadBackToTheWidth) {
   EXPECT_EQ(emi.Thumbnail(kWholeSize).width, 0);
 }
 
-TEST(Emi, MissingWidthAndHeightEndTheWalk) {
+TEST(Emi, MissingWidthAndHeightEndTheTraversal) {
   // The array claims to have no bytes, but its width and height are read nevertheless.
   const std::string empty = EmiOpening(0x49B0, 0x0610) + EmiArray(kUInt8Image, 0x0202, "") + EmiEnd();
   const std::string opening = EmiOpening(0x49B0, 0x0610);
@@ -285,7 +285,7 @@ TEST(Emi, MissingWidthAndHeightEndTheWalk) {
   EXPECT_EQ(ImageCount(EmiImageObject(Picture()) + empty + opening + EmiEnd()), 3);
 }
 
-TEST(Emi, LengthsBeyondTheEndOfTheFileEndTheWalk) {
+TEST(Emi, LengthsBeyondTheEndOfTheFileEndTheTraversal) {
   for (const std::uint32_t length : {100u, 1000u, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFF0u, 0xFFFFFFFFu}) {
     SCOPED_TRACE(length);
     const std::string second = EmiImageObject("");

@@ -94,7 +94,7 @@ TEST(FaultText, ReportsAFileWithoutAPicture) {
             "This is a series of lines (data type id 0x4120), which have no picture.");
 }
 
-TEST(FaultText, ReportsAPictureThatIsTooFarAway) {
+TEST(FaultText, ReportsAPictureBeyondTheFirst2GiB) {
   const std::string text =
       "The picture lies beyond the first 2 GiB of the file, where this format is not read.";
   EXPECT_EQ(TextOf(MrcFile{.nx = 50000, .ny = 50000}.Bytes(), L"mrc"), text);
@@ -134,7 +134,7 @@ TEST(FaultText, AdvisesWhatToDo) {
             "Save the frames in several smaller files.");
 }
 
-TEST(FaultText, ReportsContentsThatCannotBeFollowed) {
+TEST(FaultText, ReportsContentsThatCannotBeParsed) {
   EXPECT_EQ(TextOf(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),
             "The contents cannot be read beyond byte 12: bad EMI object index.");
 }

@@ -335,7 +335,7 @@ TEST(FrameReader, ReadsOfScatteredPixelsAreLimited) {
   EXPECT_EQ(CostOf(layout, {2048, 2560}).reads, 0);
 }
 
-TEST(FrameReader, ALargeInterleavedBlockIsReadSeveralTimesInBands) {
+TEST(FrameReader, ALargeInterleavedBlockIsReadInLargeTiles) {
   const FrameLayout layout = InterleavedLayout(kUInt8, 1500, 6000);
   ASSERT_GT(layout.blockBytes, 16 * 1024 * 1024);
   const Cost cost = CostOf(layout, {100, 100});

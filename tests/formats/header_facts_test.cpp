@@ -165,7 +165,7 @@ TEST(HeaderFacts, OfASeriesAreAtMost16DimensionsAnd512BytesOfAString) {
   EXPECT_EQ(Facts(facts.end() - 6, facts.end()), kElementFacts);
 }
 
-TEST(HeaderFacts, OfASeriesThatCannotBeFollowedAreNone) {
+TEST(HeaderFacts, OfASeriesThatCannotBeParsedAreNone) {
   SerFile file = Series();
   file.dimensions[0].unitsLength = -1;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Facts{});
@@ -275,7 +275,7 @@ TEST(HeaderFacts, OfATruncatedEmiFileAreTheCompleteOnes) {
   EXPECT_EQ(FactsOfItems(EmiImageObject(EmiText(0x0100, "one", text))), Facts{});
 }
 
-TEST(HeaderFacts, OfAnEmiFileThatCannotBeFollowedAreNone) {
+TEST(HeaderFacts, OfAnEmiFileThatCannotBeParsedAreNone) {
   EXPECT_EQ(FactsOfItems(EmiImage() + EmiText(0x0100, "outside")), Facts{});
 }
 

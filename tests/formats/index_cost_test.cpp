@@ -79,7 +79,7 @@ TEST(SerCost, FalseNumbersCostNoMoreThanTheFileHolds) {
   }
 }
 
-/// Walks a tree and expects that no byte is read twice, except the widths and heights of pixel arrays.
+/// Traverses a tree and expects that no byte is read twice, except the widths and heights of pixel arrays.
 void ExpectOnePass(const std::string& items, std::int64_t images) {
   const std::string bytes = EmiFile{.items = items}.Bytes();
   CountingBuffer buffer(bytes);
@@ -90,7 +90,7 @@ void ExpectOnePass(const std::string& items, std::int64_t images) {
   EXPECT_LE(buffer.seeks() + buffer.reads(), static_cast<std::int64_t>(bytes.size()) + 3 * images);
 }
 
-TEST(EmiCost, TreeIsWalkedInOnePass) {
+TEST(EmiCost, TreeIsTraversedInOnePass) {
   constexpr std::int64_t kMany = 50000;
   std::string openings;
   std::string ends;
@@ -127,7 +127,7 @@ TEST(EmiCost, OnlyTheFirstLineIsLookedAt) {
   EXPECT_LE(manyCalls, 2 * plainCalls + 3);
 }
 
-TEST(Cost, OfALongTextIsItsFirstBytes) {
+TEST(Cost, LongStringsAreReadOnlyUpToTheLimit) {
   SerFile ser;
   ser.elements.resize(1);
   ser.dimensions[0].units = std::string(1000000, 'u');

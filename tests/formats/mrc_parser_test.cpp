@@ -337,7 +337,7 @@ TEST(MrcThumbnail, SectionWhoseSizeWrapsHasNoneAlthoughItsBytesExist) {
   EXPECT_EQ(buffer.bytesRead, 1024);
 }
 
-TEST(MrcThumbnail, ExtendedHeaderThatLeadsBehind2GiBLeadsNowhere) {
+TEST(MrcThumbnail, PositionAfterALongExtendedHeaderWraps) {
   // Extended header and section are each less than 2 GiB, and together more.
   MrcFile file{.nx = 1000, .ny = 1000, .nz = 2};
   file.next = kMax - 1024;

@@ -122,7 +122,7 @@ TEST(Raw, AcceptsAnySize) {
   }
 }
 
-TEST(Raw, AColourFrameWithoutPixelsIsNoFault) {
+TEST(Raw, AColourFrameWithoutPixelsDoesNotEndTheProcess) {
   for (const DataType type : {DataType::kRgb24, DataType::kBgr24}) {
     for (const Size2 size : {Size2{0, 0}, Size2{0, 2}, Size2{2, 0}, Size2{-2, 2}, Size2{-2, -2}}) {
       RawFile file = PackedRawFile(type, 2, 2, std::string(12, 'x'));
@@ -213,7 +213,7 @@ TEST(Raw, MissingPixelsFailTheFile) {
   EXPECT_FALSE(isValidAfterwards(file));
 }
 
-TEST(Raw, ExtentThatWrapsCannotBeRead) {
+TEST(Raw, BlockWhoseSizeWrapsCannotBeRead) {
   // (width - 1) * pixelStride is 2^32, which wraps to 0 in the size of the block.
   RawFile file = PackedRawFile(DataType::kUInt8, 0x10001, 1, std::string(0x10001, '0'));
   file.pixelStride = 0x10000;
@@ -221,7 +221,7 @@ TEST(Raw, ExtentThatWrapsCannotBeRead) {
   EXPECT_EQ(OpenRaw(file).Thumbnail({0x10001, 1}).width, 0);
 }
 
-TEST(Raw, ExtentThatWrapsCannotBeReadAlthoughItsBytesExist) {
+TEST(Raw, BlockWhoseSizeWrapsCannotBeReadAlthoughItsBytesExist) {
   struct Row {
     std::int32_t width, height, offset, pixelStride, rowStride;
   };

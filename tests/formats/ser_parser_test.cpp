@@ -130,7 +130,7 @@ TEST(Ser, RejectsUnknownKindsOfDataAndTags) {
   EXPECT_FALSE(IsValid(file));
 }
 
-TEST(Ser, AnUnknownKindOfTagsIsAFaultOfTheStreamAlone) {
+TEST(Ser, AnUnknownKindOfTagsFailsOnlyTheStream) {
   // The kind of the elements is known before the kind of the tags is checked.
   SerFile file = OneImage();
   file.tagTypeId = 0x4143;

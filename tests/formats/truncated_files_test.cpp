@@ -1,4 +1,4 @@
-// Files of every kind, truncated at every byte.
+// Tests files of every kind, truncated at every byte.
 #include <gtest/gtest.h>
 
 #include <filesystem>

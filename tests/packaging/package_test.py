@@ -500,7 +500,7 @@ class Installation(Test):
         self.assertNotIn("regsvr32", text)  # it would register the omitted file-name extension too
         return re.findall(r"run msiexec /i (\{[-0-9A-F]+\}) (.+) as administrator", text)
 
-    def test_an_extension_can_be_left_to_others(self):
+    def test_a_file_name_extension_can_be_left_to_other_programs(self):
         self.install(self.msi, "ADDLOCAL=QelShellExt,mrc,ali,rec,ser,emi,ebn")
         fewer = self.ours()
         self.assertEqual({line for line in fewer if "raw" in line.lower()}, set())

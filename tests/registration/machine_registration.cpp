@@ -26,7 +26,7 @@ std::filesystem::path RegisteredDll() {
 
 }  // namespace
 
-std::string WhyNotToRegister() {
+std::string ReasonNotToRegister() {
   if (!IsUserAnAdmin()) return "Only an administrator can register the extension.";
   const std::filesystem::path registered = RegisteredDll();
   std::error_code ignored;
@@ -37,7 +37,7 @@ std::string WhyNotToRegister() {
   return "The extension is installed on this computer. Uninstall it first.";
 }
 
-OthersRegistrations::OthersRegistrations() {
+SavedRegistrations::SavedRegistrations() {
   constexpr std::wstring_view kMachine = L"HKLM\\";
   for (const std::wstring& line : ExpectedAfterRegistering(L"")) {
     const std::size_t keyEnd = line.find(L" : ");
@@ -58,7 +58,7 @@ OthersRegistrations::OthersRegistrations() {
   }
 }
 
-OthersRegistrations::~OthersRegistrations() {
+SavedRegistrations::~SavedRegistrations() {
   for (const Value& value : values_) {
     RegSetKeyValueW(HKEY_LOCAL_MACHINE, value.key.c_str(), value.name.c_str(), value.type, value.data.data(),
                     static_cast<DWORD>(value.data.size()));

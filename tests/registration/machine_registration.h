@@ -11,16 +11,16 @@ namespace Qel::Lumetra::ShellExt::Testing {
 
 /// Returns a sentence that says why the DLL must not be registered on this machine: the user is not an
 /// administrator, or another copy of the DLL is registered. Returns an empty string if it may be registered.
-std::string WhyNotToRegister();
+std::string ReasonNotToRegister();
 
 /// Saves the values of other programs that registering the DLL replaces, and restores them when it is
 /// destroyed. Must be made before the DLL is registered.
-class OthersRegistrations {
+class SavedRegistrations {
  public:
-  OthersRegistrations();
-  ~OthersRegistrations();
-  OthersRegistrations(const OthersRegistrations&) = delete;
-  OthersRegistrations& operator=(const OthersRegistrations&) = delete;
+  SavedRegistrations();
+  ~SavedRegistrations();
+  SavedRegistrations(const SavedRegistrations&) = delete;
+  SavedRegistrations& operator=(const SavedRegistrations&) = delete;
 
  private:
   struct Value {

@@ -26,7 +26,7 @@ class Registrar : public ::testing::Test {
   HRESULT Unregister(std::string_view script) { return Run(script, ScriptDirection::kUnregister); }
 
   /// Makes a key in HKCR with the values `values`, where L"" is the default value.
-  void Have(const std::wstring& path, std::initializer_list<const wchar_t*> values = {}) {
+  void MakeKey(const std::wstring& path, std::initializer_list<const wchar_t*> values = {}) {
     ASSERT_EQ(registry_.CreateKey(kClassesRoot, path), S_OK);
     for (const std::wstring name : values) {
       ASSERT_EQ(registry_.SetValue(kClassesRoot, path, name, std::wstring(L"foreign")), S_OK);
@@ -62,8 +62,8 @@ TEST_F(Registrar, WritesKeysAndValues) {
 }
 
 TEST_F(Registrar, RegisteringKeepsWhatIsInAnUnmarkedOrNoRemoveKey) {
-  Have(L"A\\Foreign", {L"", L"x"});
-  Have(L"B", {L"", L"x"});
+  MakeKey(L"A\\Foreign", {L"", L"x"});
+  MakeKey(L"B", {L"", L"x"});
   ASSERT_EQ(Register("HKCR { A NoRemove B = s 'ours' }"), S_OK);
   EXPECT_EQ(Contents(), (RegistryContents{L"A", L"A\\Foreign", L"A\\Foreign : @ = s 'foreign'",
                                           L"A\\Foreign : x = s 'foreign'", L"B", L"B : @ = s 'ours'",
@@ -71,39 +71,39 @@ TEST_F(Registrar, RegisteringKeepsWhatIsInAnUnmarkedOrNoRemoveKey) {
 }
 
 TEST_F(Registrar, RegisteringReplacesAForceRemoveKey) {
-  Have(L"A\\Stale\\Deeper", {L"x"});
-  Have(L"A", {L"", L"x"});
-  Have(L"AB");
+  MakeKey(L"A\\Stale\\Deeper", {L"x"});
+  MakeKey(L"A", {L"", L"x"});
+  MakeKey(L"AB");
   ASSERT_EQ(Register("HKCR { ForceRemove a { val B = d '1' } }"), S_OK);
   EXPECT_EQ(Contents(), (RegistryContents{L"a", L"a : B = d 1", L"AB"}));
 }
 
 TEST_F(Registrar, UnregisteringDeletesAForceRemoveKeyWithItsContents) {
-  Have(L"A\\Foreign", {L"x"});
-  Have(L"B");
+  MakeKey(L"A\\Foreign", {L"x"});
+  MakeKey(L"B");
   ASSERT_EQ(Unregister("HKCR { ForceRemove A { C } }"), S_OK);
   EXPECT_EQ(Contents(), (RegistryContents{L"B"}));
 }
 
 TEST_F(Registrar, UnregisteringDeletesOnlyWhatTheScriptNamesInANoRemoveKey) {
-  Have(L"A", {L"", L"ours", L"x"});
-  Have(L"A\\Ours");
-  Have(L"A\\Foreign");
+  MakeKey(L"A", {L"", L"ours", L"x"});
+  MakeKey(L"A\\Ours");
+  MakeKey(L"A\\Foreign");
   ASSERT_EQ(Unregister("HKCR { NoRemove A = s 'default' { val Ours = s 'text' Ours } }"), S_OK);
   EXPECT_EQ(Contents(),
             (RegistryContents{L"A", L"A : @ = s 'foreign'", L"A : x = s 'foreign'", L"A\\Foreign"}));
 }
 
 TEST_F(Registrar, UnregisteringDeletesUnmarkedKeysFromTheBottomUp) {
-  Have(L"A\\B\\C", {L""});
+  MakeKey(L"A\\B\\C", {L""});
   ASSERT_EQ(Unregister("HKCR { A { B { C = s 'text' } } }"), S_OK);
   EXPECT_EQ(Contents(), RegistryContents{});
 }
 
 TEST_F(Registrar, UnregisteringKeepsAnUnmarkedKeyThatIsNotEmpty) {
-  Have(L"HasSubkey\\Foreign");
-  Have(L"HasValue", {L"x"});
-  Have(L"HasDefault", {L""});
+  MakeKey(L"HasSubkey\\Foreign");
+  MakeKey(L"HasValue", {L"x"});
+  MakeKey(L"HasDefault", {L""});
   const RegistryContents before = Contents();
   ASSERT_EQ(Unregister("HKCR { HasSubkey HasValue = s 'text' HasDefault }"), S_OK);
   EXPECT_EQ(Contents(), before);
@@ -120,12 +120,12 @@ TEST_F(Registrar, NeverDeletesAKeyThatManyProgramsShare) {
         "SECURITY", "SYSTEM", "Software", "TypeLib", "clsid", "SOFTWARE", "system"}) {
     const std::wstring wide(name.begin(), name.end());
     registry_ = MemoryRegistry();
-    Have(L"Around\\" + wide, {L"ours"});
+    MakeKey(L"Around\\" + wide, {L"ours"});
     const std::string script = "HKCR { Around { '" + name + "' { val Ours = s 'text' } } }";
     ASSERT_EQ(Unregister(script), S_OK);
     EXPECT_EQ(Contents(), (RegistryContents{L"Around", L"Around\\" + wide})) << name;
 
-    Have(L"Around\\" + wide + L"\\Foreign");
+    MakeKey(L"Around\\" + wide + L"\\Foreign");
     const RegistryContents before = Contents();
     const std::string forceful = "HKCR { Around { ForceRemove '" + name + "' } }";
     ASSERT_EQ(Register(forceful), S_OK);
@@ -136,7 +136,7 @@ TEST_F(Registrar, NeverDeletesAKeyThatManyProgramsShare) {
 }
 
 TEST_F(Registrar, RefusesAnInvalidScriptBeforeAnyChange) {
-  Have(L"A\\B");
+  MakeKey(L"A\\B");
   const RegistryContents before = Contents();
   for (const char* broken : {"HKCR { ForceRemove A C", "HKCR { ForceRemove A C = s '%UNKNOWN%' }"}) {
     EXPECT_EQ(Register(broken), static_cast<HRESULT>(0x8007000D));

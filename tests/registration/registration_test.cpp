@@ -106,7 +106,7 @@ TEST_F(Registration, RegisteringTwiceIsTheSameAsOnce) {
 }
 
 /// Makes a key with a default value and another value.
-void Have(HKEY root, const std::wstring& path) {
+void MakeKey(HKEY root, const std::wstring& path) {
   const wchar_t text[] = L"foreign";
   for (const wchar_t* value : {L"", L"Foreign"}) {
     ASSERT_EQ(RegSetKeyValueW(root, path.c_str(), value, REG_SZ, text, sizeof(text)), ERROR_SUCCESS);
@@ -120,7 +120,7 @@ TEST_F(Registration, RegisteringRemovesStaleSubkeysOfItsClassesAndHandlers) {
         L"CLSID\\{ADF28042-3A9F-4409-9C62-444B018A7810}\\Stale",
         L"Wow6432Node\\CLSID\\{ADF28042-3A9F-4409-9C62-444B018A7810}\\InProcServer32\\Stale",
         L".raw\\ShellEx\\PropertyHandler\\Stale"}) {
-    Have(HKEY_CLASSES_ROOT, key);
+    MakeKey(HKEY_CLASSES_ROOT, key);
   }
   ASSERT_EQ(server_.Register(), S_OK);
   EXPECT_EQ(registry_.Contents().size(), ExpectedAfterRegistering(ServerDll::Path()).size());
@@ -146,17 +146,17 @@ TEST_F(Registration, KeepsTheEntriesOfOthers) {
   const std::wstring windows = L"Software\\Microsoft\\Windows\\CurrentVersion";
   const std::wstring wowWindows = L"Software\\Wow6432Node\\Microsoft\\Windows\\CurrentVersion";
   for (const std::wstring& each : {windows, wowWindows}) {
-    Have(HKEY_LOCAL_MACHINE, each);
-    Have(HKEY_LOCAL_MACHINE, each + L"\\Shell Extensions");
-    Have(HKEY_LOCAL_MACHINE, each + L"\\Shell Extensions\\Approved");
-    Have(HKEY_LOCAL_MACHINE, each + L"\\PropertySystem\\PropertyHandlers");
-    Have(HKEY_LOCAL_MACHINE, each + L"\\PropertySystem\\PropertyHandlers\\.tif");
+    MakeKey(HKEY_LOCAL_MACHINE, each);
+    MakeKey(HKEY_LOCAL_MACHINE, each + L"\\Shell Extensions");
+    MakeKey(HKEY_LOCAL_MACHINE, each + L"\\Shell Extensions\\Approved");
+    MakeKey(HKEY_LOCAL_MACHINE, each + L"\\PropertySystem\\PropertyHandlers");
+    MakeKey(HKEY_LOCAL_MACHINE, each + L"\\PropertySystem\\PropertyHandlers\\.tif");
   }
   for (const wchar_t* key :
        {L".mrc", L".mrc\\ShellEx", L".mrc\\ShellEx\\Foreign", L".ebn\\OpenWithList", L".tif", L"CLSID",
         L"CLSID\\{00000000-0000-0000-0000-00000000F0F0}", L"Wow6432Node\\CLSID", L"AppID",
         L"AppID\\{00000000-0000-0000-0000-00000000F0F0}", L"QEL.Other"}) {
-    Have(HKEY_CLASSES_ROOT, key);
+    MakeKey(HKEY_CLASSES_ROOT, key);
   }
   const RegistryContents before = registry_.Contents();
 
@@ -169,9 +169,9 @@ TEST_F(Registration, KeepsTheEntriesOfOthers) {
 }
 
 TEST_F(Registration, KeepsAnUnmarkedKeyThatOthersUse) {
-  Have(HKEY_LOCAL_MACHINE,
-       L"Software\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\.ebn");
-  Have(HKEY_CLASSES_ROOT, L"AppID\\Brisel.DLL");
+  MakeKey(HKEY_LOCAL_MACHINE,
+          L"Software\\Microsoft\\Windows\\CurrentVersion\\PropertySystem\\PropertyHandlers\\.ebn");
+  MakeKey(HKEY_CLASSES_ROOT, L"AppID\\Brisel.DLL");
   const RegistryContents before = registry_.Contents();
   ASSERT_EQ(server_.Register(), S_OK);
   ASSERT_EQ(server_.Unregister(), S_OK);
@@ -246,7 +246,7 @@ TEST_F(Registration, ReportsALackOfMemoryAtAnyPointAndWorksOnceThereIsSome) {
   while (!getsPast(places, ScarceSystem::Then::kRecovers) && !HasFailure()) ++places;
   EXPECT_GT(places, 100);
   // If memory stays exhausted, only the cleanup differs, so a sample of the places is enough.
-  for (int place = 0; place < places; place += 10) getsPast(place, ScarceSystem::Then::kStaysEmpty);
+  for (int place = 0; place < places; place += 10) getsPast(place, ScarceSystem::Then::kKeepsFailing);
   ASSERT_EQ(server_.Register(), S_OK);
   EXPECT_TRUE(Same(registry_.Contents(), ExpectedAfterRegistering(ServerDll::Path())));
 }

@@ -39,7 +39,7 @@ class Regsvr32 : public ::testing::Test {
   ~Regsvr32() override { CoUninitialize(); }
 
   void SetUp() override {
-    if (const std::string reason = WhyNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
+    if (const std::string reason = ReasonNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
     // An earlier test may have left the DLL registered.
     ASSERT_EQ(Run({L"/s", L"/u", ServerDll::Path()}), 0u);
   }
@@ -123,7 +123,7 @@ class Regsvr32 : public ::testing::Test {
   static void RegisterAndUnregister(const std::filesystem::path& dll) {
     const RegistryContents registered = Folded(ExpectedAfterRegistering(dll));
     const RegistryContents leftOver = Folded(ExpectedAfterUnregistering());
-    const OthersRegistrations others;
+    const SavedRegistrations others;
     const RegistryContents before = Contents();
 
     ASSERT_EQ(Run({L"/s", dll}), 0u);
@@ -148,7 +148,7 @@ TEST_F(Regsvr32, RegistersAndUnregistersTheDllWhereItWasBuilt) {
 }
 
 TEST_F(Regsvr32, RestoresWhatOthersHadRegistered) {
-  const OthersRegistrations machine;
+  const SavedRegistrations machine;
   constexpr wchar_t kKey[] = L"Software\\Classes\\.raw";
   constexpr wchar_t kTip[] = L"prop:System.Size";
   ASSERT_EQ(RegSetKeyValueW(HKEY_LOCAL_MACHINE, kKey, L"InfoTip", REG_SZ, kTip, sizeof kTip), ERROR_SUCCESS);

@@ -1,6 +1,6 @@
-// Files that change while the release DLL reads them: before every single read another program appends to the
-// file, truncates it, overwrites it, deletes it or makes it unreadable. The object must return a thumbnail or
-// a failure and stay usable, and a new object must show the file as it is then.
+// Tests files that change while the release DLL reads them: before every single read another program appends
+// to the file, truncates it, overwrites it, deletes it or makes it unreadable. The object must return a
+// thumbnail or a failure and stay usable, and a new object must show the file as it is then.
 #include <gtest/gtest.h>
 #include <io.h>
 #include <windows.h>

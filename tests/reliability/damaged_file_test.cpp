@@ -1,6 +1,6 @@
-// Files with damaged contents. Whatever a header says, the reader must answer or reject the file, without
-// crashing and without exceeding the memory limit. The sanitizers of the native build find out-of-bounds
-// accesses.
+// Tests files with damaged contents. Whatever a header says, the reader must answer or reject the file,
+// without crashing and without exceeding the memory limit. The sanitizers of the native build find
+// out-of-bounds accesses.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -28,7 +28,7 @@ using Testing::PutField;
 using Testing::SampleFile;
 
 /// How much more memory, in bytes, a file may take than the same file without its damage.
-constexpr std::int64_t kMaxBytesForALie = 1 << 20;
+constexpr std::int64_t kMaxBytesForDamage = 1 << 20;
 
 /// The most memory, in bytes, that a file of 100 bytes may take.
 constexpr std::int64_t kMaxBytesForAHundred = 1 << 20;
@@ -76,25 +76,25 @@ class DamagedFile : public Testing::FileKindTest {
   std::optional<std::int64_t> mostBeyond_;
 };
 
-TEST_P(DamagedFile, EveryByteOfEveryValue) {
+TEST_P(DamagedFile, EveryValueOfEveryByte) {
   const SampleFile& sample = samples_.front();
   const std::int64_t whole = Ask(sample.bytes);
   for (std::size_t i = 0; i < sample.bytes.size(); ++i) {
     for (int value = 0; value < 256; ++value) {
-      AskDamaged(sample, whole, kMaxBytesForALie,
+      AskDamaged(sample, whole, kMaxBytesForDamage,
                  [&](std::string& bytes) { bytes[i] = static_cast<char>(value); });
     }
   }
 }
 
-TEST_P(DamagedFile, EveryFieldOfBoundaryValues) {
+TEST_P(DamagedFile, BoundaryValuesInEveryField) {
   constexpr std::size_t kHeaderBytes = 96;  // in the first sample, every byte is damaged
   for (const SampleFile& sample : samples_) {
     const std::int64_t whole = Ask(sample.bytes);
     const std::size_t end = &sample == &samples_.front() ? sample.bytes.size() : kHeaderBytes;
     for (std::size_t i = 0; i + 4 <= std::min(end, sample.bytes.size()); ++i) {
       for (const std::uint32_t value : kBoundaryValues) {
-        AskDamaged(sample, whole, kMaxBytesForALie, [&](std::string& bytes) { PutField(bytes, i, value); });
+        AskDamaged(sample, whole, kMaxBytesForDamage, [&](std::string& bytes) { PutField(bytes, i, value); });
       }
     }
   }
@@ -110,7 +110,7 @@ TEST_P(DamagedFile, HundredBytesTakeAtMostAMebibyte) {
   for (int i = 0; i < 20000; ++i) {
     std::string bytes = pick(samples_).bytes;
     bytes.resize(100);
-    for (int lies = random.Between(1, 6); lies > 0; --lies) {
+    for (int fields = random.Between(1, 6); fields > 0; --fields) {
       const auto field = static_cast<std::size_t>(random.Between(0, 96));
       PutField(bytes, field, random.OneIn(2) ? pick(kSizes) : pick(kBoundaryValues));
     }

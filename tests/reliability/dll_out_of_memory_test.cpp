@@ -1,5 +1,5 @@
-// The release DLL when memory runs out. Every single request of the DLL for memory, a string, a lock or a
-// bitmap fails once. The call must end with the promised result and leave nothing allocated, and the object
+// Tests the release DLL when memory runs out. Every single request of the DLL for memory, a string, a lock or
+// a bitmap fails once. The call must end with the promised result and leave nothing allocated, and the object
 // must work again as soon as there is memory.
 #include <gtest/gtest.h>
 #include <windows.h>
@@ -60,7 +60,7 @@ Result Send(const Request& request, Then then) {
     // Without memory the exception is in the DLL's emergency reserve, which has room for a few hundred
     // exceptions. This program's heap must not free it, so a reference to it is kept permanently.
     static auto* const kept = new std::vector<std::exception_ptr>();
-    if (then == Then::kStaysEmpty) kept->push_back(std::current_exception());
+    if (then == Then::kKeepsFailing) kept->push_back(std::current_exception());
     return kThrew;
   }
 }
@@ -75,7 +75,7 @@ bool FailOnce(const Request& request, std::int64_t number, Then then, int* objec
   const bool failed = lack != ScarceSystem::Lack::kNothing;
   if (request.madeObjects > 0 && lack == ScarceSystem::Lack::kMemory && result == kNoMemory) {
     if (objectsNotMade != nullptr) ++*objectsNotMade;
-  } else if (failed && then == Then::kStaysEmpty && result == request.withoutMemory) {
+  } else if (failed && then == Then::kKeepsFailing && result == request.withoutMemory) {
     // After the first failure an allocation failed too.
   } else if (failed) {
     EXPECT_EQ(result, lack == ScarceSystem::Lack::kMemory ? request.withoutMemory : request.withoutOther)
@@ -100,7 +100,7 @@ int FailEverywhere(const Request& request, Then then) {
 void FailEverywhereInNewThreads(const Request& request) {
   bool failed = true;
   for (int number = request.firstPlace; failed; ++number) {
-    std::thread([&] { failed = FailOnce(request, number, Then::kStaysEmpty); }).join();
+    std::thread([&] { failed = FailOnce(request, number, Then::kKeepsFailing); }).join();
   }
 }
 
@@ -111,7 +111,7 @@ class DllOutOfMemory : public ServerTest {
   /// Makes everything that `request` needs fail in every way, and checks that nothing is left allocated.
   void Try(const Request& request) {
     EXPECT_GT(FailEverywhere(request, Then::kRecovers), 0);
-    FailEverywhere(request, Then::kStaysEmpty);
+    FailEverywhere(request, Then::kKeepsFailing);
     FailEverywhereInNewThreads(request);
     ExpectNothingLeft(request);
   }
@@ -196,7 +196,7 @@ TEST_F(DllOutOfMemory, WhileAnObjectIsMade) {
                             },
                             [&] { EXPECT_EQ(References(object_), 0u); }, kNoMemory};
       FailEverywhere(request, Then::kRecovers);
-      FailEverywhere(request, Then::kStaysEmpty);
+      FailEverywhere(request, Then::kKeepsFailing);
       FailEverywhereInNewThreads(request);
       object_ = {};
       EXPECT_EQ(outer.references(), 1u);
@@ -238,7 +238,7 @@ TEST_P(DllOutOfMemoryOfKind, WhileAThumbnailIsMade) {
     ASSERT_EQ(Extract(), S_OK);
     picture = TakeBitmap(bitmap_);
     EXPECT_GT(FailEverywhere(request, Then::kRecovers), 0);
-    FailEverywhere(request, Then::kStaysEmpty);
+    FailEverywhere(request, Then::kKeepsFailing);
     FailEverywhereInNewThreads(request);
   }
   request.prepare = [&] { MakeLoaded(); };
@@ -368,7 +368,7 @@ TEST_F(DllOutOfMemory, WhileAPropertyStoreIsFilledAndRead) {
 
 /// Uses a DLL that has not made the class object yet, because it keeps the class object afterwards.
 TEST(FreshDllOutOfMemory, WhileAClassObjectIsMade) {
-  for (const Then then : {Then::kRecovers, Then::kStaysEmpty}) {
+  for (const Then then : {Then::kRecovers, Then::kKeepsFailing}) {
     bool failed = true;
     for (int number = 0; failed; ++number) {
       const ServerDll dll;

@@ -1,5 +1,5 @@
-// The release DLL in a process without free thread-local and fiber-local slots. The exceptions of readers
-// must still reach their caller, in every thread.
+// Tests the release DLL in a process without free thread-local and fiber-local slots. The exceptions of
+// readers must still reach their caller, in every thread.
 #include <gtest/gtest.h>
 #include <windows.h>
 

@@ -131,7 +131,7 @@ TEST_F(ModuleThreads, GetTheSameClassObject) {
   EXPECT_EQ(module_.GetLockCount(), 1);
 }
 
-TEST_F(ModuleThreads, KeepTheModuleLoadedByEveryReferenceOnAClassObject) {
+TEST_F(ModuleThreads, KeepTheModuleLoadedByEveryReferenceToAClassObject) {
   RunInThreads([&](std::size_t) {
     for (int i = 0; i < kRounds; ++i) {
       const auto factory = Factory();

@@ -56,7 +56,7 @@ Outcome CallWithFailingHeap(std::int64_t allocation, FailingHeap::Then then, con
 template <class Call, class Check>
 int FailEveryAllocation(const Call& call, const Check& check) {
   int exceptions = 0;
-  for (const auto then : {FailingHeap::Then::kRecovers, FailingHeap::Then::kStaysFull}) {
+  for (const auto then : {FailingHeap::Then::kRecovers, FailingHeap::Then::kKeepsFailing}) {
     Outcome outcome = Outcome::kAnswered;
     for (std::int64_t i = 0; outcome != Outcome::kNotReached; ++i) {
       SCOPED_TRACE("allocation " + std::to_string(i));

@@ -14,12 +14,12 @@ namespace Qel::Lumetra::ShellExt {
 namespace {
 
 using Testing::Random;
-using Body = void (*)(const double*, std::size_t, float*);
+using Implementation = void (*)(const double*, std::size_t, float*);
 
 /// Compares bits, so that the sign of a zero and a NaN count.
-void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
+void ExpectTheLibrarysLogarithms(Implementation implementation, const std::vector<double>& values) {
   std::vector<float> logarithms(values.size());
-  body(values.data(), values.size(), logarithms.data());
+  implementation(values.data(), values.size(), logarithms.data());
   for (std::size_t i = 0; i < values.size(); ++i) {
     const auto expected = static_cast<float>(std::log(values[i]));
     if (std::isnan(expected)) {
@@ -31,22 +31,23 @@ void ExpectTheLibrarysLogarithms(Body body, const std::vector<double>& values) {
   }
 }
 
-class EveryBody : public testing::TestWithParam<Body> {
+class EveryImplementation : public testing::TestWithParam<Implementation> {
  protected:
   void SetUp() override {
-    // A processor without AVX2 never runs this body.
-    if (GetParam() == LogarithmsToFloatAvx2 && !HasAvx2()) bodies_ = {};
+    // A processor without AVX2 never runs this implementation.
+    if (GetParam() == LogarithmsToFloatAvx2 && !HasAvx2()) implementations_ = {};
   }
 
   void Expect(const std::vector<double>& values) const {
-    for (const Body body : bodies_) ExpectTheLibrarysLogarithms(body, values);
+    for (const Implementation implementation : implementations_)
+      ExpectTheLibrarysLogarithms(implementation, values);
   }
 
  private:
-  std::vector<Body> bodies_{GetParam()};
+  std::vector<Implementation> implementations_{GetParam()};
 };
 
-TEST_P(EveryBody, SpecialValues) {
+TEST_P(EveryImplementation, SpecialValues) {
   using Limits = std::numeric_limits<double>;
   Expect({0.0,
           -0.0,
@@ -70,14 +71,14 @@ TEST_P(EveryBody, SpecialValues) {
           10.0});
 }
 
-TEST_P(EveryBody, EveryExponent) {
+TEST_P(EveryImplementation, EveryExponent) {
   Random random(1);
   std::vector<double> values;
   for (int i = 0; i < 300'000; ++i) values.push_back(std::bit_cast<double>(random.Bits()));
   Expect(values);
 }
 
-TEST_P(EveryBody, SumsOfTwoSquares) {
+TEST_P(EveryImplementation, SumsOfTwoSquares) {
   Random random(2);
   std::vector<double> values;
   for (int i = 0; i < 1'000'000; ++i) {
@@ -88,7 +89,7 @@ TEST_P(EveryBody, SumsOfTwoSquares) {
   Expect(values);
 }
 
-TEST_P(EveryBody, AroundOne) {
+TEST_P(EveryImplementation, AroundOne) {
   Random random(3);
   std::vector<double> values;
   for (int i = 0; i < 300'000; ++i) {
@@ -98,7 +99,7 @@ TEST_P(EveryBody, AroundOne) {
   Expect(values);
 }
 
-TEST_P(EveryBody, EveryLengthOfABatch) {
+TEST_P(EveryImplementation, EveryLengthOfABatch) {
   Random random(4);
   for (std::size_t length : {0u, 1u, 3u, 255u, 256u, 257u, 513u}) {
     std::vector<double> values;
@@ -107,7 +108,7 @@ TEST_P(EveryBody, EveryLengthOfABatch) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Logarithm, EveryBody,
+INSTANTIATE_TEST_SUITE_P(Logarithm, EveryImplementation,
                          testing::Values(LogarithmsToFloatBaseline, LogarithmsToFloatAvx2,
                                          LogarithmsToFloat));
 

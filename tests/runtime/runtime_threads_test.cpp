@@ -1,4 +1,4 @@
-// The DLL's own POSIX thread functions. They have other names here (tests/CMakeLists.txt), because this
+// Tests the DLL's own POSIX thread functions. They have other names here (tests/CMakeLists.txt), because this
 // program links a library with the same names.
 #include <gtest/gtest.h>
 #include <pthread.h>

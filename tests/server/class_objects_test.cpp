@@ -32,7 +32,7 @@ TEST_F(ClassObjects, RequireAnOutputPointer) {
   EXPECT_EQ(dll_.GetClassObject(kShellExtClass, IID_IClassFactory, nullptr), E_POINTER);
 }
 
-TEST_F(ClassObjects, AreRefusedForHandlersThatAreRegisteredButNotServed) {
+TEST_F(ClassObjects, AreRefusedForHandlersThatTheServerDoesNotImplement) {
   for (const wchar_t* const handler :
        {L"{F9ADF69F-20BB-45A6-ABE6-D833AD51D6AE}", L"{FEB98CE0-7F8B-46ED-940E-057F56AE3806}",
         L"{F903650A-F2FF-4B8F-8648-E7D8D00D69C7}", L"{DF388BD2-0855-4D1A-9E9A-05F6A13DBC81}"}) {

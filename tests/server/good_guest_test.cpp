@@ -150,7 +150,7 @@ std::vector<std::filesystem::path> WriteFiles(const TempFolder& folder) {
   EbnFile ebn;
   ebn.width = ebn.height = 16;
   ebn.afterHeader = pixels;
-  write("sound.ebn", ebn.Bytes());
+  write("intact.ebn", ebn.Bytes());
   write("short.ebn", ebn.Bytes().substr(0, 40));
 
   SerElement element;
@@ -158,12 +158,12 @@ std::vector<std::filesystem::path> WriteFiles(const TempFolder& folder) {
   element.pixels = pixels;
   SerFile ser;
   ser.elements = {element, element};
-  write("sound.ser", ser.Bytes());
+  write("intact.ser", ser.Bytes());
   ser.dimensions[0].unitsLength = -1;
   write("throwing.ser", ser.Bytes());
 
   EmiFile emi = OneImageEmiFile(0x2202, 16, 16, pixels);
-  write("sound.emi", emi.Bytes());
+  write("intact.emi", emi.Bytes());
   write("short.emi", emi.Bytes().substr(0, 20));
   emi.items = EmiArray(0x2202, 0x0202, pixels);
   write("throwing.emi", emi.Bytes());

@@ -98,7 +98,7 @@ TEST_F(Module, SkipsEntriesThatAreEmptyOrMakeNoClassObject) {
   EXPECT_EQ(GetClassObject(without), CLASS_E_CLASSNOTAVAILABLE);
 }
 
-TEST_F(Module, KeepsTheClassObjectEncodedUntilItGoes) {
+TEST_F(Module, KeepsTheClassObjectEncodedUntilItIsDestroyed) {
   std::array<ObjectMapEntry, 1> map{{{&kClass, 0, &MakeFaultyFactory}}};
   {
     CQelShellExtModule module(map);

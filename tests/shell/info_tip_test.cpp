@@ -182,7 +182,7 @@ TEST_F(InfoTip, ShowsTheSizeModulo4GiB) {
   }
 }
 
-TEST_F(InfoTip, IsTheSameForAllFlagsAndEveryTime) {
+TEST_F(InfoTip, IsTheSameForAllFlagsAndInEveryCall) {
   const auto file = folder_.Write(L"image.mrc", MrcFile{}.Bytes());
   const Object object = Load(file);
   const std::wstring expected = TipOf(object);

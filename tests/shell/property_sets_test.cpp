@@ -294,17 +294,17 @@ TEST_F(PropertySet, AcceptsIdsOnly) {
   EXPECT_EQ(storage->ReadMultiple(1, &neither, values), STG_E_INVALIDPARAMETER);
 }
 
-TEST_F(PropertySet, ReturnsFalseForAnEmptyRequest) {
+TEST_F(PropertySet, ReturnsSFalseForAnEmptyRequest) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   EXPECT_EQ(storage->ReadMultiple(0, nullptr, nullptr), S_FALSE);
 }
 
 TEST_F(PropertySet, NeedsAnOutputPointerForAValueThatExists) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
-  const PROPSPEC there = ById(3);
-  const PROPSPEC notThere = ById(9);
-  EXPECT_EQ(storage->ReadMultiple(1, &there, nullptr), E_POINTER);
-  EXPECT_EQ(storage->ReadMultiple(1, &notThere, nullptr), kNotSupported);
+  const PROPSPEC existing = ById(3);
+  const PROPSPEC missing = ById(9);
+  EXPECT_EQ(storage->ReadMultiple(1, &existing, nullptr), E_POINTER);
+  EXPECT_EQ(storage->ReadMultiple(1, &missing, nullptr), kNotSupported);
   EXPECT_EQ(storage->ReadMultiple(1, nullptr, nullptr), E_POINTER);
 }
 
@@ -435,7 +435,7 @@ TEST_F(PropertySet, CloneBeginsAtTheFirst) {
   EXPECT_TRUE(Ids(list).empty());
 }
 
-TEST_F(PropertySet, EnumeratorOfSetsSkipsResetsAndClonesInTheSameManner) {
+TEST_F(PropertySet, EnumeratorOfSetsSkipsResetsAndClonesInTheSameWay) {
   const SetList list = ListSets(MakeLoaded());
   STATPROPSETSTG elements[3] = {};
   ULONG fetched = 77;

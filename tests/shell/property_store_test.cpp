@@ -383,20 +383,20 @@ TEST_F(PropertyStore, NeedsEveryReadOfTheHeader) {
   }
 }
 
-TEST_F(PropertyStore, AcceptsBytesThatComeWithFalse) {
+TEST_F(PropertyStore, AcceptsBytesReturnedWithSFalse) {
   ScriptedStream stream(MrcBytes());
   stream.readResult = S_FALSE;
   stream.maxPerRead = 100;
   EXPECT_EQ(Read(Open(stream), kWidthKey), Number(VT_UI4, 512));
 }
 
-TEST_F(PropertyStore, EndsWhenAStreamReturnsFalse) {
+TEST_F(PropertyStore, EndsWhenAStreamReturnsSFalse) {
   ScriptedStream stream(MrcBytes().substr(0, 1000));
   stream.endResult = S_FALSE;
   EXPECT_EQ(ReadWidth(Open(stream)), E_FAIL);
 }
 
-TEST_F(PropertyStore, IsSafeFromAStreamThatClaimsMoreThanItWasAskedFor) {
+TEST_F(PropertyStore, IsSafeFromAStreamThatClaimsMoreThanWasRequested) {
   ScriptedStream stream(MrcBytes());
   stream.overclaim = 1'000'000;
   EXPECT_EQ(Read(Open(stream), kWidthKey), Number(VT_UI4, 512));

@@ -210,9 +210,9 @@ LPWSTR WINAPI Size(LONGLONG size, LPWSTR text, UINT room) {
   return std::wcscpy(text, L"size");
 }
 
-class SystemsLines : public SystemAnswers {
+class SystemLines : public SystemAnswers {
  protected:
-  SystemsLines() {
+  SystemLines() {
     g_date = L"date";
     g_size = 0;
   }
@@ -227,7 +227,7 @@ class SystemsLines : public SystemAnswers {
   ImportPatch size_ = Answer("StrFormatByteSizeW", &Size);
 };
 
-TEST_F(SystemsLines, AreTheLocalTimeAndTheLowHalfOfTheSize) {
+TEST_F(SystemLines, AreTheLocalTimeAndTheLowHalfOfTheSize) {
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kDateLine + kSizeLine + kCommentLine);
   EXPECT_EQ(g_shownDate.wYear, 1987);
   EXPECT_EQ(g_shownTime.wYear, 1987);
@@ -235,7 +235,7 @@ TEST_F(SystemsLines, AreTheLocalTimeAndTheLowHalfOfTheSize) {
   EXPECT_EQ(g_size, 0xFFFFFFF0);
 }
 
-TEST_F(SystemsLines, ShowUtcWhenTheLocalTimeIsUnknown) {
+TEST_F(SystemLines, ShowUtcWhenTheLocalTimeIsUnknown) {
   const auto local = Answer(
       "SystemTimeToTzSpecificLocalTime",
       +[](const TIME_ZONE_INFORMATION*, LPSYSTEMTIME, LPSYSTEMTIME time) -> BOOL WINAPI {
@@ -247,7 +247,7 @@ TEST_F(SystemsLines, ShowUtcWhenTheLocalTimeIsUnknown) {
   EXPECT_EQ(g_shownTime.wYear, 2021);
 }
 
-TEST_F(SystemsLines, LeaveOutTheDateWhenAnyOfItsStepsFails) {
+TEST_F(SystemLines, LeaveOutTheDateWhenAnyOfItsStepsFails) {
   const std::wstring expected = std::wstring(kFirstLines) + kSizeLine + kCommentLine;
   {
     const auto system =
@@ -261,19 +261,19 @@ TEST_F(SystemsLines, LeaveOutTheDateWhenAnyOfItsStepsFails) {
   }
 }
 
-TEST_F(SystemsLines, ShowADateThatFillsItsBuffer) {
+TEST_F(SystemLines, ShowADateThatFillsItsBuffer) {
   g_date = std::wstring(255, L'd');
   EXPECT_EQ(TipOf(object_),
             std::wstring(kFirstLines) + L"\r\nDate Modified: " + g_date + L" " + kSizeLine + kCommentLine);
 }
 
-TEST_F(SystemsLines, LeaveOutTheSizeWhenItCannotBeFormatted) {
+TEST_F(SystemLines, LeaveOutTheSizeWhenItCannotBeFormatted) {
   const auto size =
       Answer("StrFormatByteSizeW", +[](LONGLONG, LPWSTR, UINT) -> LPWSTR WINAPI { return nullptr; });
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kDateLine + kCommentLine);
 }
 
-TEST_F(SystemsLines, AreLeftOutWhenTheFileIsNotVisible) {
+TEST_F(SystemLines, AreLeftOutWhenTheFileIsNotVisible) {
   const auto attributes = Answer(
       "GetFileAttributesExW", +[](LPCWSTR, GET_FILEEX_INFO_LEVELS, LPVOID) -> BOOL WINAPI { return FALSE; });
   EXPECT_EQ(TipOf(object_), std::wstring(kFirstLines) + kCommentLine);

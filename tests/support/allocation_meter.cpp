@@ -16,7 +16,7 @@ std::atomic<std::int64_t> g_largest{0};
 
 constexpr std::int64_t kNever = -1;
 thread_local std::int64_t g_untilFailure = kNever;
-thread_local bool g_staysFull = false;
+thread_local bool g_keepsFailing = false;
 thread_local bool g_failed = false;
 
 std::int64_t SizeOf(void* block) {
@@ -33,15 +33,15 @@ void Raise(std::atomic<std::int64_t>& most, std::int64_t value) {
   }
 }
 
-bool IsToFail() {
-  if (g_failed && g_staysFull) return true;
+bool ShouldFail() {
+  if (g_failed && g_keepsFailing) return true;
   if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
   g_failed = true;
   return true;
 }
 
 void* Allocate(std::size_t size) {
-  if (IsToFail()) return nullptr;
+  if (ShouldFail()) return nullptr;
   void* const block = std::malloc(size);
   if (block == nullptr) return nullptr;
   const std::int64_t got = SizeOf(block);
@@ -79,7 +79,7 @@ std::int64_t HeapMeter::Largest() const {
 
 FailingHeap::FailingHeap(std::int64_t allocation, Then then) {
   g_untilFailure = allocation;
-  g_staysFull = then == Then::kStaysFull;
+  g_keepsFailing = then == Then::kKeepsFailing;
   g_failed = false;
 }
 

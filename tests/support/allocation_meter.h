@@ -31,10 +31,10 @@ class HeapMeter {
   std::int64_t before_;
 };
 
-/// While this object exists, one allocation of this thread fails, and with kStaysFull all later ones too.
+/// While this object exists, one allocation of this thread fails, and with kKeepsFailing all later ones too.
 class FailingHeap {
  public:
-  enum class Then { kRecovers, kStaysFull };
+  enum class Then { kRecovers, kKeepsFailing };
 
   /// `allocation` is the index, from 0, of the allocation that fails.
   FailingHeap(std::int64_t allocation, Then then);

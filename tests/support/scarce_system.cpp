@@ -14,11 +14,11 @@ namespace {
 
 constexpr std::int64_t kNever = -1;
 std::int64_t g_untilFailure = kNever;
-bool g_staysEmpty = false;
+bool g_keepsFailing = false;
 ScarceSystem::Lack g_failed = ScarceSystem::Lack::kNothing;
 
-bool IsToFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
-  if (g_failed != ScarceSystem::Lack::kNothing && g_staysEmpty) return true;
+bool ShouldFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
+  if (g_failed != ScarceSystem::Lack::kNothing && g_keepsFailing) return true;
   if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
   g_failed = lack;
   return true;
@@ -27,7 +27,7 @@ bool IsToFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
 /// Calls the function, or returns `kFailure` instead.
 template <auto kFunction, auto kFailure, ScarceSystem::Lack kLack, class Result, class... Arguments>
 Result Scarce(Arguments... arguments) {
-  return IsToFail(kLack) ? static_cast<Result>(kFailure) : kFunction(arguments...);
+  return ShouldFail(kLack) ? static_cast<Result>(kFailure) : kFunction(arguments...);
 }
 
 template <auto kFunction, auto kFailure, ScarceSystem::Lack kLack = ScarceSystem::Lack::kOther, class Result,
@@ -42,9 +42,11 @@ class ScarceAllocator final : public IMalloc {
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID, void**) override { return E_NOINTERFACE; }
   ULONG STDMETHODCALLTYPE AddRef() override { return 1; }
   ULONG STDMETHODCALLTYPE Release() override { return 1; }
-  void* STDMETHODCALLTYPE Alloc(SIZE_T size) override { return IsToFail() ? nullptr : CoTaskMemAlloc(size); }
+  void* STDMETHODCALLTYPE Alloc(SIZE_T size) override {
+    return ShouldFail() ? nullptr : CoTaskMemAlloc(size);
+  }
   void* STDMETHODCALLTYPE Realloc(void* block, SIZE_T size) override {
-    return IsToFail() ? nullptr : CoTaskMemRealloc(block, size);
+    return ShouldFail() ? nullptr : CoTaskMemRealloc(block, size);
   }
   void STDMETHODCALLTYPE Free(void* block) override { CoTaskMemFree(block); }
   SIZE_T STDMETHODCALLTYPE GetSize(void*) override { return static_cast<SIZE_T>(-1); }
@@ -54,19 +56,19 @@ class ScarceAllocator final : public IMalloc {
 
 HRESULT WINAPI GiveScarceAllocator(IMalloc** allocator) {
   static ScarceAllocator scarce;
-  *allocator = IsToFail() ? nullptr : &scarce;
+  *allocator = ShouldFail() ? nullptr : &scarce;
   return *allocator != nullptr ? S_OK : E_OUTOFMEMORY;
 }
 
 BOOL WINAPI MakeScarceSection(CRITICAL_SECTION* section, DWORD spinCount) {
-  if (!IsToFail()) return InitializeCriticalSectionAndSpinCount(section, spinCount);
+  if (!ShouldFail()) return InitializeCriticalSectionAndSpinCount(section, spinCount);
   SetLastError(ERROR_OUTOFMEMORY);
   return FALSE;
 }
 
 HBITMAP WINAPI MakeScarceBitmap(HDC dc, const BITMAPINFO* info, UINT usage, void** bits, HANDLE section,
                                 DWORD offset) {
-  if (!IsToFail()) return CreateDIBSection(dc, info, usage, bits, section, offset);
+  if (!ShouldFail()) return CreateDIBSection(dc, info, usage, bits, section, offset);
   *bits = nullptr;
   return nullptr;
 }
@@ -90,7 +92,7 @@ ScarceSystem::~ScarceSystem() {
 
 void ScarceSystem::FailAt(std::int64_t request, Then then) {
   g_untilFailure = request;
-  g_staysEmpty = then == Then::kStaysEmpty;
+  g_keepsFailing = then == Then::kKeepsFailing;
   g_failed = Lack::kNothing;
 }
 

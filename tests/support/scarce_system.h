@@ -15,7 +15,7 @@ namespace Qel::Lumetra::ShellExt::Testing {
 /// the module.
 class ScarceSystem {
  public:
-  enum class Then { kRecovers, kStaysEmpty };
+  enum class Then { kRecovers, kKeepsFailing };
 
   /// What failed first: an allocation of the C runtime, or another request.
   enum class Lack { kNothing, kMemory, kOther };
@@ -26,7 +26,7 @@ class ScarceSystem {
   ScarceSystem(const ScarceSystem&) = delete;
   ScarceSystem& operator=(const ScarceSystem&) = delete;
 
-  /// Makes the request with the index `request` fail, and with kStaysEmpty all later ones too. The next
+  /// Makes the request with the index `request` fail, and with kKeepsFailing all later ones too. The next
   /// request has the index 0.
   static void FailAt(std::int64_t request, Then then);
 

@@ -52,12 +52,12 @@ class ScriptedStream final : public IStream {
       *read = 0;
       return readFailure;
     }
-    const std::size_t brought =
+    const std::size_t delivered =
         std::min({content.size() - position, std::size_t{count}, std::size_t{maxPerRead}});
-    std::memcpy(bytes, content.data() + position, brought);
-    position += brought;
-    *read = static_cast<ULONG>(brought) + (brought == 0 ? 0 : overclaim);
-    return brought == 0 ? endResult : readResult;
+    std::memcpy(bytes, content.data() + position, delivered);
+    position += delivered;
+    *read = static_cast<ULONG>(delivered) + (delivered == 0 ? 0 : overclaim);
+    return delivered == 0 ? endResult : readResult;
   }
 
   HRESULT STDMETHODCALLTYPE Write(const void* bytes, ULONG count, ULONG* taken) override {

@@ -26,7 +26,7 @@ BUILD = sys.argv.pop(1)
 
 NAMESPACE = "{http://www.freedesktop.org/standards/shared-mime-info}"
 TYPES = {extension: f"application/x-{kind}" for extension, kind in KIND_OF.items()}
-TYPES["raw"] = "application/x-qel-raw"  # "raw" alone stands for photographs
+TYPES["raw"] = "application/x-qel-raw"  # application/x-raw would suggest photographs
 
 
 def mrc_header(width, order="<"):
@@ -118,7 +118,7 @@ class Test(unittest.TestCase):
                      if found != "application/x-mrc"]
             self.assertEqual(wrong, [])
 
-    def test_an_mrc_file_without_its_mark_is_recognised_by_its_name_alone(self):
+    def test_an_mrc_file_without_its_magic_number_is_recognised_by_its_name_alone(self):
         files = self.write({"old.mrc": bytes(1024), "old.MRC": bytes(1024), "old.rec": bytes(1024)})
         types = self.types_of(files)
         self.assertEqual(types[:2], ["application/x-mrc"] * 2)

@@ -1,4 +1,4 @@
-// The strings of JSON documents, and the questions that are sent to the worker process.
+// Tests the strings of JSON documents, and the questions that are sent to the worker process.
 #include "json_records.h"
 
 #include <gtest/gtest.h>

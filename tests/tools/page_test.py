@@ -540,7 +540,7 @@ class ManyFiles(PageTest):
                            + ".every(image => image.complete && image.naturalWidth > 0)", True)
         self.assertLess(len(tab.requests), 200)
         before = tab.counters()
-        # A visible card has some twenty boxes, a hidden one only its own.
+        # A visible card has about twenty boxes, a hidden one only its own.
         self.assertLess(before["LayoutObjects"], 2 * self.FILES)
         # There is not one layout per file.
         tab.press("/", *"0199")

@@ -209,7 +209,7 @@ class CommandLine(Test):
 
     def test_a_server_that_cannot_be_loaded_is_named(self):
         missing = self.folder / "no such.dll"
-        other = self.write("text.dll", b"this is no DLL")
+        other = self.write("text.dll", b"this is not a DLL")
         for server in (missing, other):
             result = run("info", self.write("a.mrc", mrc()), server=str(server))
             self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
@@ -315,7 +315,7 @@ class ExitStatus(Test):
                 errors.seek(0)
                 self.assertOneSentence(errors.read().decode(), "Standard output cannot be written: Disk full")
 
-    def test_output_that_nobody_reads_is_no_failure(self):
+    def test_output_that_nobody_reads_is_not_a_failure(self):
         path = self.write("a.mrc", mrc())
         for arguments in (("info", path), ("info", path, "--json"), ("thumbnail", path, "-o", "-")):
             reading, writing = os.pipe()
@@ -1053,7 +1053,7 @@ class Doctor(Test):
         dll = bytearray(pathlib.Path(SERVER).read_bytes())
         machine = struct.unpack_from("<i", dll, 60)[0] + 4
         for clsid, name, contents in (
-            (self.EBN_STORE, "text.dll", b"this is no DLL"),
+            (self.EBN_STORE, "text.dll", b"this is not a DLL"),
             (self.RAW_STORE, "x86.dll", dll[:machine] + b"\x4C\x01" + dll[machine + 2:]),
             (self.MRC_STORE, "plain.dll", dll.replace(b"DllGetClassObject", b"DllGetCrassObject")),
         ):

@@ -1,4 +1,5 @@
-// The comparison of what the shell shows with what the extension answers. A fake shell gives the answers.
+// Tests the comparison of what the shell shows with what the extension answers. A fake shell gives the
+// answers.
 #include "shell_view.h"
 
 #include <gtest/gtest.h>

@@ -32,7 +32,7 @@ class RegisteredDll {
   RegisteredDll& operator=(const RegisteredDll&) = delete;
 
  private:
-  Testing::OthersRegistrations others_;
+  Testing::SavedRegistrations others_;
   Testing::DllRegistration dll_;
 };
 
@@ -44,7 +44,7 @@ struct SampleView {
 class WindowsShell : public testing::Test {
  protected:
   void SetUp() override {
-    if (const std::string reason = Testing::WhyNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
+    if (const std::string reason = Testing::ReasonNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
   }
 
   /// Returns what the shell shows of every sample, except those whose thumbnail request ends the process.

@@ -157,7 +157,7 @@ std::vector<SampleFile> EbnSamples() {
     samples.Add(WithNumber("type_", code), file.Bytes());
     file.dataOffset = 100;
     file.afterHeader.insert(0, Pattern(100 - 54));
-    samples.Add(WithNumber("type_", code) + "_further_on", file.Bytes());
+    samples.Add(WithNumber("type_", code) + "_after_a_gap", file.Bytes());
   }
   int number = 0;
   for (const double code : {-4.0, -3.4, -2.5, -1.6, 0.5, 1.0, 3.4, 1e300}) {
