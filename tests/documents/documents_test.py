@@ -50,6 +50,9 @@ class Documents(unittest.TestCase):
         reached = set(re.findall(r"\]\(([^)\s#]+\.md)", (PROJECT / "README.md").read_text("utf-8"))) | {"README.md"}
         self.assertEqual(reached, {str(document.relative_to(PROJECT)) for document in self.documents})
 
+    def test_begin_with_a_readme_that_is_read_in_a_minute(self):
+        self.assertLessEqual(len((PROJECT / "README.md").read_text("utf-8").splitlines()), 90)
+
     def test_name_the_current_version(self):
         versions = re.findall(r"(?m)^## \[([\d.]+)\]", (PROJECT / "CHANGELOG.md").read_text("utf-8"))
         self.assertEqual(versions[0], VERSION)
