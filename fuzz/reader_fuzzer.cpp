@@ -17,7 +17,7 @@ using namespace Qel::Lumetra::ShellExt::Testing;
 struct Choice {
   SIZE request{1, 1};
   std::int64_t failingRead = -1;  // number of the read that fails, from 0; -1 for none
-  MemoryBuffer::Failure failure = MemoryBuffer::Failure::kBringsNothing;
+  MemoryBuffer::Failure failure = MemoryBuffer::Failure::kReturnsNothing;
   bool seekable = true;
 };
 

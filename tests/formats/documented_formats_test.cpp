@@ -402,7 +402,7 @@ TEST(DocumentedEmi, FollowsTheDocumentedRules) {
 
 /// Returns the number of images in a file where `item` and then an image are three levels deep: 1 if `item`
 /// has the length that the reader skips.
-int ImagesBehind(const std::string& item) {
+int ImageCountAfter(const std::string& item) {
   const std::string items = EmiStructure(0x4000, 1, EmiStructure(0x4000, 1, item + EmiImageObject("")));
   return OpenFile<EmiFileInfo>(EmiFile{.items = items})->GetFrameCount();
 }
@@ -418,7 +418,7 @@ TEST(DocumentedEmi, HasTheDocumentedLengthsOfValues) {
     }
     for (const std::string& type : Split(row[0], ", ")) {
       const std::string value(static_cast<std::size_t>(Number(row[1])), '\xFF');
-      EXPECT_EQ(ImagesBehind(EmiScalar(static_cast<std::uint16_t>(Number(type)), 1, value)), 1) << type;
+      EXPECT_EQ(ImageCountAfter(EmiScalar(static_cast<std::uint16_t>(Number(type)), 1, value)), 1) << type;
       ++scalars;
     }
   }
@@ -426,16 +426,16 @@ TEST(DocumentedEmi, HasTheDocumentedLengthsOfValues) {
 
   ASSERT_EQ(others.size(), 3u);
   const std::uint16_t text = others["a text"];
-  EXPECT_EQ(ImagesBehind(EmiArray(text, 1, "\xFF\xFF\xFF")), 1);
+  EXPECT_EQ(ImageCountAfter(EmiArray(text, 1, "\xFF\xFF\xFF")), 1);
   // Only a string is an error at the top level, so this shows that the type is a string.
   EXPECT_THROW(OpenFile<EmiFileInfo>(EmiFile{.items = EmiArray(text, 1, "x")}), std::exception);
   const std::uint16_t bit = others["an array"];
   EXPECT_TRUE(std::has_single_bit(bit));
-  EXPECT_EQ(ImagesBehind(EmiArray(bit, 1, "\xFF\xFF\xFF")), 1);
-  EXPECT_EQ(ImagesBehind(EmiArray(bit | 0x4001, 1, "\xFF\xFF\xFF")), 1);
+  EXPECT_EQ(ImageCountAfter(EmiArray(bit, 1, "\xFF\xFF\xFF")), 1);
+  EXPECT_EQ(ImageCountAfter(EmiArray(bit | 0x4001, 1, "\xFF\xFF\xFF")), 1);
   EXPECT_EQ(others["a list of items"], bit);
   const auto list = static_cast<std::uint16_t>(~bit);
-  EXPECT_EQ(ImagesBehind(EmiStructure(list, 1, EmiImageObject(""))), 2);
+  EXPECT_EQ(ImageCountAfter(EmiStructure(list, 1, EmiImageObject(""))), 2);
 }
 
 Facts EmiFacts(const std::string& items) {

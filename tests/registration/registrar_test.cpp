@@ -154,8 +154,8 @@ TEST_F(Registrar, StopsAtTheFirstFailureAndReturnsIt) {
   EXPECT_EQ(Contents(), (RegistryContents{L"A", L"A : @ = s 'text'"}));
 }
 
-/// Runs the module's own scripts on a registry in memory.
-class CarriedScripts : public ::testing::Test {
+/// Runs the scripts that the DLL embeds on a registry in memory.
+class EmbeddedScripts : public ::testing::Test {
  protected:
   /// The scripts in the order of registration.
   static inline const std::vector<std::string> kRunByRegistration = {"module", "shell_ext", "ebn", "raw",
@@ -195,18 +195,18 @@ class CarriedScripts : public ::testing::Test {
   MemoryRegistry machine_{MemoryRegistry::ClassesRoot::kWithinMachine};
 };
 
-TEST_F(CarriedScripts, WriteTheExpectedRegistration) {
+TEST_F(EmbeddedScripts, WriteTheExpectedRegistration) {
   ASSERT_EQ(Register(machine_), S_OK);
   EXPECT_TRUE(Testing::Same(machine_.Contents(), Testing::ExpectedAfterRegistering(kPath)));
 }
 
-TEST_F(CarriedScripts, LeaveOnlyTheKeysThatOthersMayShare) {
+TEST_F(EmbeddedScripts, LeaveOnlyTheKeysThatOthersMayShare) {
   ASSERT_EQ(Register(machine_), S_OK);
   ASSERT_EQ(Unregister(machine_), S_OK);
   EXPECT_TRUE(Testing::Same(machine_.Contents(), Testing::ExpectedAfterUnregistering()));
 }
 
-TEST_F(CarriedScripts, OneTitleDiffersInTheFirstCopyOfItsClass) {
+TEST_F(EmbeddedScripts, OneTitleDiffersInTheFirstCopyOfItsClass) {
   MemoryRegistry registry;  // keeps HKCR separate from HKLM
   ASSERT_EQ(Run({"mrc"}, ScriptDirection::kRegister, registry), S_OK);
   const RegistryContents contents = registry.Contents();
@@ -271,7 +271,7 @@ const std::vector<PropertyHandler>& PropertyHandlers() {
   return handlers;
 }
 
-TEST_F(CarriedScripts, EveryPropertyHandlerScriptHasTheSameStructure) {
+TEST_F(EmbeddedScripts, EveryPropertyHandlerScriptHasTheSameStructure) {
   const std::wstring properties =
       L"prop:System.Image.HorizontalSize;System.Image.VerticalSize;System.Image.BitDepth;"
       L"System.Media.FrameCount;System.Image.Dimensions;System.Comment";
@@ -305,7 +305,7 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptHasTheSameStructure) {
   }
 }
 
-TEST_F(CarriedScripts, EveryPropertyHandlerScriptRemovesItsOwnEntriesAndNothingElse) {
+TEST_F(EmbeddedScripts, EveryPropertyHandlerScriptRemovesItsOwnEntriesAndNothingElse) {
   for (const PropertyHandler& handler : PropertyHandlers()) {
     MemoryRegistry registry;
     ASSERT_EQ(Run({handler.script}, ScriptDirection::kRegister, registry), S_OK);
@@ -337,7 +337,7 @@ TEST_F(CarriedScripts, EveryPropertyHandlerScriptRemovesItsOwnEntriesAndNothingE
   }
 }
 
-TEST_F(CarriedScripts, RegisteringAgainRepairsARegistrationThatFailedAtAnyChange) {
+TEST_F(EmbeddedScripts, RegisteringAgainRepairsARegistrationThatFailedAtAnyChange) {
   ASSERT_EQ(Register(machine_), S_OK);
   const RegistryContents complete = machine_.Contents();
   ASSERT_EQ(Unregister(machine_), S_OK);
@@ -360,7 +360,7 @@ TEST_F(CarriedScripts, RegisteringAgainRepairsARegistrationThatFailedAtAnyChange
   }
 }
 
-TEST_F(CarriedScripts, UnregisteringAgainCompletesAnUnregistrationThatFailedAtAnyChange) {
+TEST_F(EmbeddedScripts, UnregisteringAgainCompletesAnUnregistrationThatFailedAtAnyChange) {
   HRESULT result = E_ACCESSDENIED;
   for (std::size_t changes = 0; FAILED(result); ++changes) {
     MemoryRegistry registry(MemoryRegistry::ClassesRoot::kWithinMachine);

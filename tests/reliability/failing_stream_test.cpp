@@ -64,12 +64,12 @@ class FailingStream : public Testing::FileKindTest {
 TEST_P(FailingStream, AtAnyReadIsRefusedOrGivesNoThumbnailAndRecovers) {
   for (const SampleFile& sample : samples_) {
     SCOPED_TRACE(sample.name);
-    const OpenSample whole(sample, extension_, -1, Failure::kBringsNothing);
+    const OpenSample whole(sample, extension_, -1, Failure::kReturnsNothing);
     const std::int64_t readsOfHeader = whole.buffer.reads;
     ASSERT_NE(whole.Thumbnail(), BitmapPixels());
     const std::int64_t reads = whole.buffer.reads;
     for (std::int64_t i = 0; i < reads; ++i) {
-      for (const Failure failure : {Failure::kBringsNothing, Failure::kBringsHalf, Failure::kThrows}) {
+      for (const Failure failure : {Failure::kReturnsNothing, Failure::kReturnsHalf, Failure::kThrows}) {
         SCOPED_TRACE("read " + std::to_string(i));
         const Testing::HeapUse before = Testing::CurrentHeapUse();
         Fail(sample, whole, readsOfHeader, i, failure);
@@ -107,14 +107,14 @@ TEST(FailingStreamOfALargeFrame, AtAnyReadGivesNoThumbnailAndRecovers) {
     file.rowStride = shape.rowStride;
     file.pixels.assign(static_cast<std::size_t>(shape.width) * static_cast<std::size_t>(shape.height), 'p');
     const SampleFile sample{"large", file.Bytes()};
-    const OpenSample whole(sample, L"raw", -1, Failure::kBringsNothing);
+    const OpenSample whole(sample, L"raw", -1, Failure::kReturnsNothing);
     const std::int64_t readsOfHeader = whole.buffer.reads;
     const BitmapPixels picture = whole.Thumbnail(shape.request);
     ASSERT_NE(picture, BitmapPixels());
     const std::int64_t reads = whole.buffer.reads;
     EXPECT_GT(reads, readsOfHeader + 2);
     for (std::int64_t i = readsOfHeader; i < reads; ++i) {
-      OpenSample open(sample, L"raw", i, Failure::kBringsHalf);
+      OpenSample open(sample, L"raw", i, Failure::kReturnsHalf);
       EXPECT_EQ(open.Thumbnail(shape.request), BitmapPixels()) << i;
       EXPECT_TRUE(open.stream.fail());
       open.stream.clear();

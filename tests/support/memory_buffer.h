@@ -14,13 +14,13 @@ namespace Qel::Lumetra::ShellExt::Testing {
 class MemoryBuffer : public std::streambuf {
  public:
   /// What the failing read does. Later reads succeed again.
-  enum class Failure { kBringsNothing, kBringsHalf, kThrows };
+  enum class Failure { kReturnsNothing, kReturnsHalf, kThrows };
 
   /// `bytes` must outlive the buffer.
   explicit MemoryBuffer(std::string_view bytes) : bytes_(bytes) {}
 
   std::int64_t failingRead = -1;  // its index, from 0; -1 for none
-  Failure failure = Failure::kBringsNothing;
+  Failure failure = Failure::kReturnsNothing;
   bool seekable = true;
   std::int64_t trailingZeros = 0;  // the zero bytes that follow the file's own, as in a sparse file
   std::string_view tail = {};      // the bytes that follow these zeros
@@ -38,7 +38,7 @@ class MemoryBuffer : public std::streambuf {
     std::streamsize got = std::clamp<std::streamsize>(Size() - position_, 0, count);
     if (reads++ == failingRead) {
       if (failure == Failure::kThrows) throw std::runtime_error("the medium is gone");
-      got = failure == Failure::kBringsHalf ? got / 2 : 0;
+      got = failure == Failure::kReturnsHalf ? got / 2 : 0;
     }
     if (position_ < endOfLastRead_) ++readsBackward;
     endOfLastRead_ = position_ + got;
