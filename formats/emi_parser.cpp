@@ -110,7 +110,7 @@ EmiParser::EmiParser(std::istream& stream) : FileParser(stream) {
     stream.clear();
   }
   frameCount_ = WrapToInt32(imageCount_);
-  Require(imageCount_ > 0, "The file holds no image object.");
+  Require(imageCount_ > 0, "The file contains no image object.");
 }
 
 void EmiParser::Traverse() {

@@ -12,7 +12,7 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-/// Formats a number as `rule` does: a rule with hexadecimal numbers is about a code, not a quantity.
+/// Formats a number in hexadecimal if `rule` contains hexadecimal numbers: then it is a code, not a quantity.
 std::string NumberText(std::int64_t value, std::string_view rule) {
   if (rule.find("0x") == std::string_view::npos) return std::to_string(value);
   std::ostringstream text;
@@ -20,16 +20,20 @@ std::string NumberText(std::int64_t value, std::string_view rule) {
   return text.str();
 }
 
-constexpr const char* kIncomplete = "Copy it again, or wait until it is completely written.";
+constexpr const char* kIncomplete = "Copy it again, or wait until it has been written completely.";
 constexpr const char* kWrongKind =
-    "Check that the file is of the kind that its extension says. If it is, it is damaged: copy it again.";
+    "Check that the file-name extension is right. If it is, the file is damaged: copy it again.";
+constexpr const char* kNoImage =
+    "A file without images, for example with spectra only, has no thumbnail. If it should contain images, "
+    "copy it again.";
+constexpr const char* kTooLarge = "If the file is a stack, split it into files of less than 2 GiB.";
 
 FaultText HeaderText(const Fault& fault, bool isSwapped) {
-  if (fault.field == nullptr) return {fault.rule, "The file is intact, but it has no image to show."};
+  if (fault.field == nullptr) return {fault.rule, kNoImage};
   std::string text =
-      isSwapped ? "The header, read as big-endian, is not acceptable: " : "The header is not acceptable: ";
+      isSwapped ? "The header, which appears to be big-endian, is invalid: " : "The header is invalid: ";
   text += fault.field;
-  if (fault.value) text += " is " + NumberText(*fault.value, fault.rule) + " and";
+  if (fault.value) text += " is " + NumberText(*fault.value, fault.rule) + ", but";
   return {text + " must be " + fault.rule + ".", kWrongKind};
 }
 
@@ -40,24 +44,23 @@ std::string Bytes(std::int64_t count) {
 /// Returns what is wrong if the file, which has `end` bytes, does not contain the frame.
 FaultText FrameText(const FrameLayout& frame, std::int64_t end) {
   if (frame.size.width < 1 || frame.size.height < 1) {
-    return {"The picture has no pixels: it is " + std::to_string(frame.size.width) + " x " +
+    return {"The frame has no pixels: its size is " + std::to_string(frame.size.width) + " x " +
                 std::to_string(frame.size.height) + ".",
             kWrongKind};
   }
   if (frame.blockPosition < 0 || frame.blockBytes < 0) {
-    return {"The picture lies beyond the first 2 GiB of the file, where this format is not read.",
-            "Save the frames in several smaller files."};
+    return {"The frame is not within the first 2 GiB of the file, so QelShellExt cannot read it.", kTooLarge};
   }
   const std::int64_t frameEnd = frame.blockPosition + frame.blockBytes;
   if (frameEnd > end) {
-    return {"The file is cut short: the picture ends at byte " + std::to_string(frameEnd) +
-                ", and the file has " + Bytes(end) + ".",
+    return {"The file is cut short: the frame ends at byte " + std::to_string(frameEnd) +
+                ", but the file has only " + Bytes(end) + ".",
             kIncomplete};
   }
   if (!IsReadable(frame)) {
-    return {
-        "The sizes and strides in the header do not fit the " + Bytes(frame.blockBytes) + " of the picture.",
-        kWrongKind};
+    return {"The frame size and the strides in the header do not match the " + Bytes(frame.blockBytes) +
+                " of image data.",
+            kWrongKind};
   }
   return {};
 }
@@ -84,9 +87,8 @@ std::optional<FaultText> ExplainFault(std::istream& stream, const std::wstring& 
       text = TextOf(KindParser(stream), end);
     } catch (const std::exception& e) {
       stream.clear();
-      text = {
-          "The contents cannot be read beyond byte " + std::to_string(stream.tellg()) + ": " + e.what() + ".",
-          "The file is damaged: copy it again."};
+      text = {"The file cannot be read beyond byte " + std::to_string(stream.tellg()) + ": " + e.what() + ".",
+              "The file is damaged: copy it again."};
     }
   });
   return text;

@@ -1,4 +1,4 @@
-// Explains to users why a file has no picture. The shell extension itself does not use this.
+// Explains to users why a file has no thumbnail. The shell extension itself does not use this.
 #pragma once
 
 #include <istream>
@@ -7,8 +7,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// Two sentences in English: what is wrong with a file, and what the user can do. Both are empty if nothing
-/// is wrong.
+/// English text: what is wrong with a file, and what the user can do. Both are empty if nothing is wrong.
 struct FaultText {
   std::string fault;
   std::string advice;

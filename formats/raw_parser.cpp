@@ -55,7 +55,7 @@ RawParser::RawParser(std::istream& stream) : FileParser(stream) {
   Require(word1 == 1, "word 1", word1, "1");
   Require(word4 == word1, "word 4", word4, "1");
   Require(type.has_value(), "the value class (upper 16 bits) with the bits per pixel (lower 16 bits)", code,
-          "one of the format's pairs, such as 0x00010 for 16 bit unsigned");
+          "a combination that the format defines, such as 0x00010 for 16 bit unsigned");
   if (fault()) {
     stream.setstate(std::ios_base::badbit);
     return;

@@ -86,7 +86,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
       .hasPositionTags = tagTypeId == kPositionTags, .dimensionCount = dimensionCount, .dimensions = {}};
   ReadDimensions();
   ReadElements(arrayOffset, validElements);
-  Require(isImageSeries_, "This is a series of lines (data type id 0x4120), which have no picture.");
+  Require(isImageSeries_, "The file contains a series of lines (data type id 0x4120), not of images.");
 }
 
 /// Reads the dimensions. A series that ends within them is not valid.

@@ -114,7 +114,7 @@ TEST(HeaderFacts, OfASeriesAreItsTagsItsDimensionsAndTheCalibrationsOfItsFirstIm
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
   file.version = 0x0220;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
-  // A series of lines has no picture, but its header gives facts.
+  // A series of lines has no thumbnail, but its header gives facts.
   file.dataTypeId = 0x4120;
   EXPECT_EQ(FactsOf(file.Bytes(), L"ser"), Joined(kSeriesFacts, kElementFacts));
   file.tagTypeId = 0x4152;

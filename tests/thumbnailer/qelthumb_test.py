@@ -140,10 +140,10 @@ class Thumbnail(Test):
 class Fault(Test):
     def test_of_a_damaged_file_is_reported_in_the_words_of_qelshow(self):
         for name, sentence in (
-            ("damaged.mrc", "The header is not acceptable: mode is 99 and must be from 0 to 16."),
-            ("damaged.ser", "The header is not acceptable: series id is 0x0198 and must be 0x0197."),
-            ("damaged.emi", "The contents cannot be read beyond byte 12: bad EMI object index."),
-            ("truncated.mrc", "The file is cut short: the picture ends at byte 820224, and the file has "
+            ("damaged.mrc", "The header is invalid: mode is 99, but must be from 0 to 16."),
+            ("damaged.ser", "The header is invalid: series id is 0x0198, but must be 0x0197."),
+            ("damaged.emi", "The file cannot be read beyond byte 12: bad EMI object index."),
+            ("truncated.mrc", "The file is cut short: the frame ends at byte 820224, but the file has only "
                               "102528 bytes."),
         ):
             with self.subTest(name=name):
