@@ -557,7 +557,7 @@ class Installation(Test):
                 results.append((status, out.read().decode()))
         (installed, _), (found, reported), (removed, _) = results
         self.assertEqual((installed, found, removed), (DONE, 4, DONE), results)
-        self.assertIn(f"{self.image}: has no thumbnail. The header is not acceptable: mode is 99", reported)
+        self.assertIn(f"{self.image}: no thumbnail. The header is invalid: mode is 99", reported)
         self.assertIn("QelShellExt is registered and works.", reported)
         self.assertRemoved()
 

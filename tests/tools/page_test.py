@@ -157,7 +157,7 @@ class PageTest(unittest.TestCase):
         tab.run(f"show(files.find(file => file.name === {json.dumps(name)}))")
 
     def assertQuiet(self, tab):
-        """Checks that the page had no errors and requested nothing except itself and its pictures."""
+        """Checks that the page had no errors and requested nothing except itself and its thumbnails."""
         self.assertEqual(tab.complaints, [])
         for url in tab.requests:
             self.assertRegex(url, "^(data:|" + re.escape(self.folder.as_uri()) + "/)")
@@ -170,19 +170,19 @@ class PageTest(unittest.TestCase):
         return page
 
     def many(self, count):
-        """Makes a page of `count` files by repeating the samples with other names and pictures. Returns its path."""
+        """Makes a page of `count` files by repeating the samples with other names and thumbnails. Returns its path."""
         files = []
         for i, own in zip(range(count), itertools.cycle(self.files.values())):
-            picture = own["thumbnail"]["picture"]
-            thumbnail = own["thumbnail"] | {"picture": picture and f"{picture}?{i}"}
+            file = own["thumbnail"]["file"]
+            thumbnail = own["thumbnail"] | {"file": file and f"{file}?{i}"}
             name = pathlib.PureWindowsPath(own["name"]).name
             files.append(own | {"name": f"{i:05} {name}", "thumbnail": thumbnail})
         return self.edited("many.html", files=files)
 
 
 class Page(PageTest):
-    def test_shows_every_picture_and_needs_no_network(self):
-        tab = self.open(height=6000)  # high enough to show all pictures
+    def test_shows_every_thumbnail_and_needs_no_network(self):
+        tab = self.open(height=6000)  # high enough to show all thumbnails
         tab.run("Promise.all([...document.images].map(image => image.decode()))")
         self.assertEqual(sorted(tab.run(SEEN)), sorted(pathlib.PureWindowsPath(name).name for name in self.names))
         facts = tab.run("[...document.images].map(image => [image.naturalWidth, image.naturalHeight, image.alt])")
@@ -235,7 +235,7 @@ class Page(PageTest):
         self.assertBecomes(tab, NAMES, ["truncated.ebn", "truncated.mrc"])
         self.assertBecomes(tab, COUNT, f"2 of {len(self.names)} files, 0 with a thumbnail")
         tab.type("zzz")
-        self.assertBecomes(tab, "document.querySelector('.none')?.textContent", "No file matches.")
+        self.assertBecomes(tab, "document.querySelector('.none')?.textContent", "No file matches. Clear the search or choose other kinds.")
         tab.press("Escape")
         self.assertBecomes(tab, NAMES + ".length", len(self.names))
         self.assertQuiet(tab)
@@ -386,7 +386,7 @@ class Page(PageTest):
         tab.run("show(files.find(file => file.name === 'exposure.ebn'))")
         self.assertEqual(tab.run(FACTS)[-2:], [["Beam energy", "300 kV"], ["Tilt", "-12.5"]])
         headings = "[...document.querySelectorAll('dialog h3')].map(heading => heading.textContent)"
-        self.assertEqual(tab.run(headings)[0], "More from the header of the file")
+        self.assertEqual(tab.run(headings)[0], "Other header values")
         self.assertTrue(tab.run("[...document.querySelectorAll('dd')].every(fact => "
                                 "fact.compareDocumentPosition(document.querySelector('details'))"
                                 " & Node.DOCUMENT_POSITION_FOLLOWING)"))
@@ -508,7 +508,7 @@ class Accessibility(PageTest):
                 self.assertAccessible(tab, 30)
                 tab.press("/")
                 tab.type("zzz")
-                self.assertBecomes(tab, "document.querySelector('.none')?.textContent", "No file matches.")
+                self.assertBecomes(tab, "document.querySelector('.none')?.textContent", "No file matches. Clear the search or choose other kinds.")
                 self.assertAccessible(tab, 10)
 
     def test_of_the_dialog(self):

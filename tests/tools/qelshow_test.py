@@ -26,7 +26,7 @@ from file_kinds import EXTENSIONS  # noqa: E402
 EMULATOR, QELSHOW, SERVER, FAULTY_SERVER = sys.argv[1:5]
 
 COMMANDS = ("info", "thumbnail", "page", "doctor")
-DONE, FAILED, USAGE, UNSUPPORTED, DAMAGED = range(5)
+DONE, FAILED, USAGE, UNSUPPORTED, NO_THUMBNAIL = range(5)
 
 
 def run(*arguments, server=SERVER, folder=None, program=QELSHOW):
@@ -122,7 +122,7 @@ class Test(unittest.TestCase):
         """Returns the files of the JSON document that info prints."""
         result = run("info", *paths, "--json", server=server)
         document = json.loads(result.stdout)
-        self.assertEqual(document["schema"], 2)
+        self.assertEqual(document["schema"], 3)
         return document["files"]
 
 
@@ -162,7 +162,7 @@ class CommandLine(Test):
     def test_a_pattern_without_a_match_says_so(self):
         result = run("info", "*.mrc", folder=self.folder)
         self.assertEqual((result.returncode, result.stdout, result.stderr),
-                         (FAILED, "", "*.mrc: No file matches. Check the pattern and its folder.\n"))
+                         (FAILED, "", "*.mrc: No file matches. Check the pattern and the folder.\n"))
         result = run("page", "*.mrc", folder=self.folder)
         self.assertEqual((result.returncode, result.stdout), (FAILED, ""))
         self.assertOneSentence(result.stderr, 'No file matches "*.mrc".')
@@ -222,7 +222,7 @@ class CommandLine(Test):
             ("empty.dll", b"", "damaged or not a DLL"),
             ("cut.dll", dll[:len(dll) // 2], "damaged or not a DLL"),
             ("x86.dll", dll[:machine] + b"\x4C\x01" + dll[machine + 2:], "32-bit"),
-            ("arm.dll", dll[:machine] + b"\x64\xAA" + dll[machine + 2:], "other processors"),
+            ("arm.dll", dll[:machine] + b"\x64\xAA" + dll[machine + 2:], "another kind of processor"),
             ("needy.dll", dll.replace(b"SHLWAPI.dll", b"NOTHERE.dll"), "another DLL that it needs is missing"),
         ):
             with self.subTest(name):
@@ -250,7 +250,7 @@ class ExitStatus(Test):
             ((good,), DONE),
             ((good, missing, good), FAILED),
             ((missing, text), UNSUPPORTED),
-            ((damaged, text, good), DAMAGED),
+            ((damaged, text, good), NO_THUMBNAIL),
         ):
             with self.subTest(paths=paths):
                 self.assertEqual(run("info", *paths).returncode, status)
@@ -267,7 +267,7 @@ class ExitStatus(Test):
             ("ny.ali", mrc(height=-5, pixels=b""), "ny is -5"),
             ("nz.rec", mrc(frames=0), "nz is 0"),
             ("mode.mrc", mrc(mode=17), "mode is 17", "0 to 16"),
-            ("swapped.mrc", mrc(0x7FFFFFFF, 0x7FFFFFFF, 0x7FFFFFFF, pixels=b""), "nx is -129", "read as big-endian"),
+            ("swapped.mrc", mrc(0x7FFFFFFF, 0x7FFFFFFF, 0x7FFFFFFF, pixels=b""), "nx is -129", "appears to be big-endian"),
             ("short.mrc", mrc()[:1000], "1000 bytes"),
             ("empty.mrc", b"", "The file is empty."),
             ("cut.mrc", mrc(200, 100, 3)[:41000], "41024", "41000 bytes"),
@@ -291,7 +291,7 @@ class ExitStatus(Test):
         ):
             files.append((self.write(name, contents), parts))
         result = run("info", *(path for path, _ in files))
-        self.assertEqual(result.returncode, DAMAGED)
+        self.assertEqual(result.returncode, NO_THUMBNAIL)
         reported = result.stderr.splitlines()
         self.assertEqual(len(reported), len(files))
         for line, (path, parts) in zip(reported, files):
@@ -301,7 +301,7 @@ class ExitStatus(Test):
     def test_a_missing_thumbnail_is_not_written(self):
         path = self.write("mode.mrc", mrc(mode=17))
         result = run("thumbnail", path, "-o", self.folder / "out.png")
-        self.assertEqual((result.returncode, result.stdout), (DAMAGED, ""))
+        self.assertEqual((result.returncode, result.stdout), (NO_THUMBNAIL, ""))
         self.assertOneSentence(result.stderr, path, "mode is 17")
         self.assertFalse((self.folder / "out.png").exists())
 
@@ -331,7 +331,7 @@ class ExitStatus(Test):
         paths = (self.write("mode.mrc", mrc(mode=17)), self.write("notes.txt", b""), self.folder / "gone.mrc")
         result = run("info", *paths)
         printed = result.stdout + result.stderr
-        for path, part in zip(paths, ("mode is 17", "files only", "cannot be opened")):
+        for path, part in zip(paths, ("mode is 17", "supports only", "cannot be opened")):
             self.assertEqual(printed.count(part), 1, part)
             self.assertIn(str(path), result.stderr)
         self.assertEqual(result.stdout.count("\n\n"), 0)
@@ -353,7 +353,7 @@ class Thumbnail(Test):
         piped = run_for_bytes("thumbnail", path, "--out", "-", "--size=128")
         self.assertEqual((piped.returncode, piped.stdout), (DONE, out.read_bytes()))
 
-    def test_of_a_colour_picture_is_in_colour(self):
+    def test_of_a_colour_frame_is_in_colour(self):
         out = self.folder / "out.png"
         self.assertEqual(run("thumbnail", self.write("c.mrc", mrc(300, 260, mode=16)), "-o", out).returncode, DONE)
         self.assertEqual(png_facts(out.read_bytes()), (300, 260, 8, 2))
@@ -390,7 +390,7 @@ class Output(Test):
         os.symlink(self.source, self.folder / "soft.png")
         for out in ("source.mrc", "./SOURCE.MRC", self.source, "hard.png", "soft.png"):
             with self.subTest(out=out):
-                self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "is the file to read"))
+                self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "is the input file"))
 
     def test_never_has_the_extension_of_an_image_file(self):
         self.write("other.mrc", mrc())
@@ -404,11 +404,11 @@ class Output(Test):
         self.write("photo.png", b"\x89PNG\r\n\x1a\n" + header + bytes(100))
         self.write("empty.png", b"")
         self.write("site/index.html", b"<!DOCTYPE html><title>Mine</title>")
-        self.write("album/pictures/1.png", b"mine")
+        self.write("album/thumbnails/1.png", b"mine")
         for out in ("photo.png", "empty.png"):
-            self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "not written by this version of qelshow", "delete it", "--out"))
+            self.assertRefused("thumbnail", "source.mrc", "-o", out, parts=(out, "not written by qelshow", "delete it", "--out"))
         for folder, file in (("site", "index.html"), ("album", "1.png")):
-            self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by this version of qelshow", "delete it", "--out"))
+            self.assertRefused("page", "source.mrc", "--out", folder, parts=(folder, file, "not written by qelshow", "delete it", "--out"))
 
     def test_is_not_a_folder_in_place_of_a_file_nor_a_file_in_place_of_a_folder(self):
         (self.folder / "folder").mkdir()
@@ -443,17 +443,17 @@ class Output(Test):
     def make_page(self, *paths, **options):
         return run("page", *paths, "--out", "page", folder=self.folder, **options)
 
-    def test_replaces_an_earlier_page_with_its_pictures(self):
+    def test_replaces_an_earlier_page_with_its_thumbnails(self):
         other = self.write("other.mrc", mrc(8, 6))
         self.assertEqual(self.make_page(self.source, other, other).returncode, DONE)
-        self.write("page/pictures/mine.png", b"mine")
-        self.write("page/pictures/2.txt", b"mine")
+        self.write("page/thumbnails/mine.png", b"mine")
+        self.write("page/thumbnails/2.txt", b"mine")
         self.write("page/notes.txt", b"mine")
         self.assertEqual(self.make_page(other).returncode, DONE)
         self.assertEqual(sorted(str(path.relative_to(self.folder)) for path in self.contents()),
-                         ["other.mrc", "page/index.html", "page/notes.txt", "page/pictures/1.png",
-                          "page/pictures/2.txt", "page/pictures/mine.png", "source.mrc"])
-        self.assertEqual(png_facts((self.folder / "page/pictures/1.png").read_bytes())[:2], (8, 6))
+                         ["other.mrc", "page/index.html", "page/notes.txt", "page/thumbnails/1.png",
+                          "page/thumbnails/2.txt", "page/thumbnails/mine.png", "source.mrc"])
+        self.assertEqual(png_facts((self.folder / "page/thumbnails/1.png").read_bytes())[:2], (8, 6))
 
     def test_that_is_not_finished_leaves_the_earlier_page_unchanged(self):
         self.make_page(self.source)
@@ -465,7 +465,7 @@ class Output(Test):
                             cwd=self.folder)
             self.assertEqual(process.wait(), FAILED)
         self.assertEqual(self.contents(), before)
-        self.assertEqual(sorted(path.name for path in (self.folder / "page").iterdir()), ["index.html", "pictures"])
+        self.assertEqual(sorted(path.name for path in (self.folder / "page").iterdir()), ["index.html", "thumbnails"])
 
 
 class Faults(Test):
@@ -477,14 +477,14 @@ class Faults(Test):
         self.assertOneSentence(files[0]["problem"], "in colour and smaller", "256 x 256", "0xC0000094",
                                "division by zero")
         self.assertIn("smaller icons", files[0]["advice"])
-        self.assertEqual((files[0]["verdict"], files[0]["thumbnail"]["width"]), ("damaged", 0))
+        self.assertEqual((files[0]["verdict"], files[0]["thumbnail"]["width"]), ("no thumbnail", 0))
         self.assertEqual((files[1]["verdict"], files[1]["problem"], files[1]["advice"]), ("good", None, None))
 
-    def test_a_colour_picture_has_a_thumbnail_unless_both_sides_are_smaller_than_the_request(self):
+    def test_a_colour_frame_has_a_thumbnail_unless_both_sides_are_smaller_than_the_request(self):
         small = self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3)))
         out = self.folder / "out.png"
         result = run("thumbnail", small, "-o", out, "--size", 9)
-        self.assertEqual((result.returncode, out.exists()), (DAMAGED, False))
+        self.assertEqual((result.returncode, out.exists()), (NO_THUMBNAIL, False))
         self.assertOneSentence(result.stderr, small, "in colour and smaller")
         result = run("thumbnail", small, "-o", out, "--size", 8)
         self.assertEqual((result.returncode, result.stderr, out.exists()), (DONE, "", True))
@@ -496,25 +496,25 @@ class Faults(Test):
         self.assertIn("0xC0000005 (access violation)", load["thumbnail"]["problem"])
         self.assertEqual(load["problem"], load["thumbnail"]["problem"])
         self.assertIn("0xC00000FD (stack overflow)", tip["tip"]["problem"])
-        self.assertIn(": failed.", tip["thumbnail"]["problem"])
+        self.assertIn(": unspecified failure.", tip["thumbnail"]["problem"])
         self.assertIn(": not implemented.", quiet["tip"]["problem"])
         self.assertIn("no such interface", quiet["columns"]["problem"])
         self.assertIn("no such class", quiet["propertyStore"]["problem"])
-        self.assertEqual([file["verdict"] for file in (load, tip, quiet)], ["damaged"] * 3)
+        self.assertEqual([file["verdict"] for file in (load, tip, quiet)], ["no thumbnail"] * 3)
 
     def test_exceptions_are_caught_with_their_text(self):
         error, number = self.info(self.write("error thrown.mrc", mrc()), self.write("number thrown.mrc", mrc()),
                                   server=FAULTY_SERVER)
-        self.assertIn('"no such luck"', error["thumbnail"]["problem"])
+        self.assertIn(": no such luck.", error["thumbnail"]["problem"])
         self.assertIn("unknown type", number["thumbnail"]["problem"])
 
-    def test_a_file_that_makes_a_reader_throw_is_damaged(self):
+    def test_a_file_that_makes_a_reader_throw_has_no_thumbnail(self):
         path = self.write("text.emi", b"\x4A\x4B\0\x02\0\0\0\0\x60\0\0\x01\0\0\0\0")
         result = run("info", path, "--json")
         file, = json.loads(result.stdout)["files"]
-        self.assertEqual((result.returncode, file["verdict"]), (DAMAGED, "damaged"))
+        self.assertEqual((result.returncode, file["verdict"]), (NO_THUMBNAIL, "no thumbnail"))
         self.assertIn("bad EMI object index", file["problem"])
-        self.assertIn('throws "bad EMI object index"', file["thumbnail"]["problem"])
+        self.assertIn("an exception: bad EMI object index", file["thumbnail"]["problem"])
 
 
     def test_the_worker_process_ends_with_the_program(self):
@@ -590,7 +590,7 @@ class Answers(Test):
                          [40, 30, 7, 16, "16 bit signed"])
         self.assertRegex(file["tip"]["text"], r"\ADimensions: 7 images \(40 × 30\) 16 bit signed\r\nType: \r\n"
                                               r"Date Modified: .+\r\nSize: 17.4 KB\r\nLine one\Z")
-        self.assertEqual(self.rows(file["columns"], "title", "set", "id", "declared", "delivered", "value"), [
+        self.assertEqual(self.rows(file["columns"], "title", "set", "id", "declared", "returned", "value"), [
             ("Width", self.IMAGE_SUMMARY, 3, "VT_I4", "VT_I4", 40),
             ("Height", self.IMAGE_SUMMARY, 4, "VT_I4", "VT_I4", 30),
             ("Bit Depth", self.IMAGE_SUMMARY, 7, "VT_UI4", "VT_I4", 16),
@@ -619,7 +619,7 @@ class Answers(Test):
 
         text = run("info", path).stdout
         for part in ("40 x 30", "Frames      7", "16 bit signed", "Thumbnail   40 x 30, 8 bits per pixel",
-                     "    Line one\n", "VT_UI4     VT_I4      16", "System.Media.FrameCount"):
+                     "    Line one\n", "VT_UI4     VT_I4     16", "System.Media.FrameCount"):
             self.assertIn(part, text)
 
     def test_contain_the_facts_of_the_header(self):
@@ -683,10 +683,10 @@ class Answers(Test):
 
     def test_of_a_damaged_file_say_why_they_are_missing(self):
         file, = self.info(self.write("a.mrc", mrc(mode=17)))
-        self.assertEqual(file["tip"]["problem"], "The extension returns no tip: failed.")
-        self.assertEqual(file["propertySets"]["problem"], "The extension returns no property sets: failed.")
+        self.assertEqual(file["tip"]["problem"], "The extension returned no tip: unspecified failure.")
+        self.assertEqual(file["propertySets"]["problem"], "The extension returned no property sets: unspecified failure.")
         self.assertEqual({column["problem"] for column in file["columns"]["items"]}, {"no value"})
-        self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"failed"})
+        self.assertEqual({value["problem"] for value in file["propertyStore"]["items"]}, {"unspecified failure"})
         self.assertEqual({item["value"] for name in ("columns", "propertyStore") for item in file[name]["items"]}, {None})
 
 
@@ -696,13 +696,13 @@ class Page(Test):
         text = page.read_text("utf-8")
         data = re.search(r'<script id="files" type="application/json">(.*?)</script>', text, re.DOTALL)
         document = json.loads(data[1])
-        self.assertEqual(document["schema"], 2)
+        self.assertEqual(document["schema"], 3)
         return document
 
     def files_of(self, page):
         return self.document_of(page)["files"]
 
-    def test_has_every_file_of_a_folder_with_its_picture(self):
+    def test_has_every_file_of_a_folder_with_its_thumbnail(self):
         names = ["a & b's (ü é 樹) #100%.mrc", "big.MRC", "deep/below/three.ali", "broken.ser", "small.raw"]
         for name in names[:3]:
             self.write("in/" + name, mrc(label=b"</script><img src=x onerror=alert(1)>"))
@@ -716,24 +716,24 @@ class Page(Test):
         files = self.files_of(out / "index.html")
         self.assertEqual(sorted(file["name"].replace("\\", "/") for file in files), sorted(names))
         for file in files:
-            picture = file["thumbnail"]["picture"]
+            thumbnail = file["thumbnail"]["file"]
             if file["name"] == "broken.ser":
-                self.assertIsNone(picture)
+                self.assertIsNone(thumbnail)
                 self.assertEqual(file["problem"], "The file is empty.")
                 self.assertIn("Copy it again", file["advice"])
             elif file["name"] == "small.raw":
-                self.assertIsNone(picture)
+                self.assertIsNone(thumbnail)
                 self.assertIn("in colour and smaller", file["problem"])
             else:
-                width, height, _, _ = png_facts((out / picture).read_bytes())
+                width, height, _, _ = png_facts((out / thumbnail).read_bytes())
                 self.assertEqual((width, height), (file["thumbnail"]["width"], file["thumbnail"]["height"]))
-        self.assertEqual(len({file["thumbnail"]["picture"] for file in files}), 4)
-        self.assertEqual(sorted(path.name for path in out.iterdir()), ["index.html", "pictures"])
+        self.assertEqual(len({file["thumbnail"]["file"] for file in files}), 4)
+        self.assertEqual(sorted(path.name for path in out.iterdir()), ["index.html", "thumbnails"])
 
         lines = result.stdout.splitlines()
         self.assertEqual(len(lines), 1 + len(names) + 2)
-        self.assertIn("3 thumbnails of 5 files", lines[-1])
-        self.assertRegex(result.stdout, r"(?m)^small.raw .* none: The picture is in colour and smaller")
+        self.assertIn("5 files, 3 with a thumbnail", lines[-1])
+        self.assertRegex(result.stdout, r"(?m)^small.raw .* none: The frame is in colour and smaller")
         self.assertRegex(result.stdout, r"(?m)^big.MRC .* 4 x 3$")
         self.assertRegex(result.stdout, r"(?m)^broken.ser .* none: The file is empty\.$")
 
@@ -777,15 +777,15 @@ class Page(Test):
     def windows_path(self, name):
         return f"Z:{self.folder / pathlib.PureWindowsPath(name).as_posix()}".replace("/", "\\")
 
-    def test_lists_files_whose_names_windows_cannot_represent(self):
+    def test_lists_files_whose_names_windows_does_not_allow(self):
         for name in ("in/a.mrc", "in/b?.mrc"):
             self.write(name, mrc())
         result = run("page", self.folder / "in", "--out", self.folder / "page")
         self.assertEqual(result.returncode, DONE)
         named, other = self.files_of(self.folder / "page" / "index.html")
         self.assertEqual((named["verdict"], other["name"], other["verdict"]), ("good", "b?.mrc", "failed"))
-        self.assertOneSentence(other["problem"], "Windows cannot represent its name")
-        self.assertIn("1 thumbnail of 2 files", result.stdout)
+        self.assertOneSentence(other["problem"], "characters that Windows does not allow")
+        self.assertIn("2 files, 1 with a thumbnail", result.stdout)
 
     def test_loads_nothing_from_a_network(self):
         out = self.folder / "page"
@@ -819,28 +819,28 @@ class Page(Test):
         self.assertEqual((result.returncode, result.stderr), (DONE, ""))
         page = self.folder / "qelshow-page" / "index.html"
         self.assertEqual([file["name"] for file in self.files_of(page)], ["a.mrc"])
-        self.assertIn(f"Z:{page}".replace("/", "\\") + ": 1 thumbnail", result.stdout)
+        self.assertIn(f"Z:{page}".replace("/", "\\") + ": 1 file, 1 with a thumbnail\n", result.stdout)
 
     def test_of_a_single_file_says_so(self):
         result = run("page", self.write("a.mrc", mrc()), "--out", self.folder / "page")
-        self.assertTrue(result.stdout.endswith(": 1 thumbnail of 1 file\n"), result.stdout)
+        self.assertTrue(result.stdout.endswith(": 1 file, 1 with a thumbnail\n"), result.stdout)
 
     def test_that_cannot_be_written_leaves_an_earlier_one_unchanged(self):
         out, path = self.folder / "page", self.write("a.txt", b"")
         run("page", path, self.write("b.mrc", mrc()), "--out", out)
         earlier = (out / "index.html").read_bytes()
-        shutil.rmtree(out / "pictures")
-        (out / "pictures").write_bytes(b"a file in place of the folder")
+        shutil.rmtree(out / "thumbnails")
+        (out / "thumbnails").write_bytes(b"a file in place of the folder")
         result = run("page", self.folder / "b.mrc", "--out", out)
         self.assertEqual(result.returncode, FAILED)
-        self.assertOneSentence(result.stderr, "pictures", "cannot be written: Not a directory.")
+        self.assertOneSentence(result.stderr, "thumbnails", "cannot be written: Not a directory.")
         self.assertEqual((out / "index.html").read_bytes(), earlier)
 
     def test_is_the_same_in_two_runs(self):
         path = self.write("a.mrc", mrc(300, 300))
         for out in ("one", "two"):
             run("page", path, "--out", self.folder / out)
-        for name in ("index.html", "pictures/1.png"):
+        for name in ("index.html", "thumbnails/1.png"):
             self.assertEqual((self.folder / "one" / name).read_bytes(), (self.folder / "two" / name).read_bytes())
 
     def test_shows_its_progress_on_a_terminal(self):
@@ -853,7 +853,7 @@ class Page(Test):
             seen = "".join(iter(lambda: read_terminal(terminal), ""))
             self.assertEqual(process.wait(), DONE)
             out.seek(0)
-            self.assertIn(b"3 thumbnails of 3 files", out.read())
+            self.assertIn(b"3 files, 3 with a thumbnail", out.read())
         os.close(terminal)
         for part in ("[                              ] 0 of 3  a.mrc", "[==========                    ] 1 of 3  b.mrc",
                      "[====================          ] 2 of 3  c.mrc"):
@@ -861,13 +861,13 @@ class Page(Test):
         # The progress disappears: the line is empty at the end.
         self.assertRegex(re.sub("\x1b\\[[?]25[hl]", "", seen), "\r(\x1b\\[K| +\r)\\Z")
 
-    def test_takes_no_more_memory_for_more_pictures(self):
-        # Each picture is a megabyte of noise, which PNG cannot compress.
+    def test_takes_no_more_memory_for_more_thumbnails(self):
+        # Each thumbnail is a megabyte of noise, which PNG cannot compress.
         path = self.write("noise.mrc", mrc(1024, 1024, pixels=random.Random(1).randbytes(1 << 20)))
         few, many = (self.peak_memory("page", *[path] * count, "--size", "1024", "--out", self.folder / "page")
                      for count in (2, 32))
-        self.assertEqual(len(list((self.folder / "page" / "pictures").iterdir())), 32)
-        self.assertGreater((self.folder / "page" / "pictures" / "32.png").stat().st_size, 1000000)
+        self.assertEqual(len(list((self.folder / "page" / "thumbnails").iterdir())), 32)
+        self.assertGreater((self.folder / "page" / "thumbnails" / "32.png").stat().st_size, 1000000)
         self.assertLess(many, few + (15 << 20))
 
     def peak_memory(self, *arguments):
@@ -880,7 +880,7 @@ class Page(Test):
 
 
 # The doctor's message under Wine, whose shell gives programs no thumbnails and properties.
-UNANSWERED = "The shell of this system does not report what it shows."
+UNANSWERED = "This system does not report what it shows for a file, which is normal under Wine."
 
 
 class Doctor(Test):
@@ -939,20 +939,20 @@ class Doctor(Test):
         result = run("doctor", *files, "--json", server=None)
         self.assertEqual(result.stderr, "")
         document = json.loads(result.stdout)
-        self.assertEqual(document["schema"], 2)
+        self.assertEqual(document["schema"], 3)
         return result, document
 
-    def conditions(self, document):
-        """Returns the conditions of the classes by name, and of the handlers by extension and role."""
-        return ({each["name"]: each["condition"] for each in document["classes"]}
-                | {(kind["extension"], each["role"]): each["condition"]
+    def statuses(self, document):
+        """Returns the statuses of the classes by name, and of the handlers by extension and role."""
+        return ({each["name"]: each["status"] for each in document["classes"]}
+                | {(kind["extension"], each["role"]): each["status"]
                    for kind in document["kinds"] for each in kind["handlers"]})
 
     def assertWorksBut(self, document, differences):
-        """Checks that everything works except `differences`, which have these conditions."""
-        conditions = self.conditions(document)
-        self.assertEqual(len(conditions), 4 + 7 * 3 + 3)
-        self.assertEqual({name: each for name, each in conditions.items() if each != "works"}, differences)
+        """Checks that everything works except `differences`, which have these statuses."""
+        statuses = self.statuses(document)
+        self.assertEqual(len(statuses), 4 + 7 * 3 + 3)
+        self.assertEqual({name: each for name, each in statuses.items() if each != "works"}, differences)
 
     def assertProblems(self, *problems, files=()):
         """Checks that exactly these problems are reported, each with its parts. Returns the JSON document."""
@@ -988,17 +988,17 @@ class Doctor(Test):
         gone = self.folder / "gone.mrc"
         bad = {gone: "cannot be opened", self.write("a.txt", b""): ".mrc",
                self.write("mode.mrc", mrc(mode=17)): "mode is 17"}
-        for files, status in (((good, gone), FAILED), ((good, *bad), DAMAGED)):
+        for files, status in (((good, gone), FAILED), ((good, *bad), NO_THUMBNAIL)):
             with self.subTest(files=files):
                 result = run("doctor", *files, server=None)
                 self.assertEqual((result.returncode, result.stderr), (status, ""))
-                self.assertRegex(result.stdout, rf"{re.escape(str(good))}: is read, 300 x 200 pixels, 2 frames, 8 bit.*\n"
+                self.assertRegex(result.stdout, rf"{re.escape(str(good))}: can be read: 300 x 200 pixels, 2 frames, 8 bit.*\n"
                                                 rf" +{re.escape(UNANSWERED)}\n")
                 for path, part in bad.items():
                     lines = [line for line in result.stdout.splitlines() if str(path) in line]
                     self.assertEqual(len(lines), int(path in files))
                     for line in lines:
-                        self.assertOneSentence(line, path, "has no thumbnail", part)
+                        self.assertOneSentence(line, path, "no thumbnail", part)
         result, document = self.doctor(good)
         self.assertEqual(result.returncode, DONE)
         self.assertEqual([(each["verdict"], each["frames"], each["shell"]) for each in document["files"]],
@@ -1007,7 +1007,7 @@ class Doctor(Test):
     def test_reports_that_nothing_is_registered(self):
         document = self.assertProblem("not registered on this computer", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\"),
                                       "administrator")
-        self.assertEqual(set(self.conditions(document).values()), {"not registered"})
+        self.assertEqual(set(self.statuses(document).values()), {"not registered"})
         self.assertEqual({each["dll"] for each in document["classes"]}, {None})
         document = self.assertProblem("not registered", files=(self.write("a.mrc", mrc()),))
         self.assertEqual(document["files"][0]["verdict"], "failed")
@@ -1044,8 +1044,8 @@ class Doctor(Test):
         self.register(dll=dll)
         self.assertEqual(self.doctor()[0].returncode, DONE)
         dll.rename(self.folder / "moved.dll")
-        document = self.assertProblem(f"Z:{dll}".replace("/", "\\"), "is not found", "regsvr32", SERVER.split("/")[-1])
-        self.assertEqual(set(self.conditions(document).values()), {"DLL not found"})
+        document = self.assertProblem(f"Z:{dll}".replace("/", "\\"), "cannot be found", "regsvr32", SERVER.split("/")[-1])
+        self.assertEqual(set(self.statuses(document).values()), {"DLL not found"})
         self.assertEqual({each["version"] for each in document["classes"]}, {None})
 
     def test_reports_why_the_dll_does_not_load(self):
@@ -1059,20 +1059,20 @@ class Doctor(Test):
         ):
             self.set_dll(self.write(name, contents), clsid)
         document = self.assertProblems(
-            ("text.dll", "damaged or not a DLL", "Install QelShellExt again."),
-            ("x86.dll", "32-bit", "Install QelShellExt again."),
-            ("plain.dll", "does not export DllGetClassObject", "Install QelShellExt again."))
+            ("text.dll", "damaged or not a DLL", "Reinstall QelShellExt."),
+            ("x86.dll", "32-bit", "Reinstall QelShellExt."),
+            ("plain.dll", "does not export DllGetClassObject", "Reinstall QelShellExt."))
         self.assertWorksBut(document, {f".{kind} property store": "DLL not loaded" for kind in ("ebn", "raw", "mrc")}
                             | {(f".{kind}", "property store"): "DLL not loaded" for kind in ("ebn", "raw", "mrc")})
 
     def test_reports_that_no_objects_can_be_made(self):
         self.register()
         self.set_dll(FAULTY_SERVER, self.EBN_STORE, self.MRC_STORE)
-        document = self.assertProblems(("faulty_server.dll", "ends the process", "access violation", "again."),
-                                       (self.MRC_STORE, "no such class", "Install QelShellExt again."))
+        document = self.assertProblems(("faulty_server.dll", "crashes", "access violation", "Reinstall QelShellExt."),
+                                       (self.MRC_STORE, "no such class", "Reinstall QelShellExt."))
         self.assertWorksBut(document, dict.fromkeys(
             (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store")),
-            "no object"))
+            "object not created"))
 
     def test_reports_which_part_of_the_registration_is_missing(self):
         self.register()
@@ -1082,13 +1082,13 @@ class Doctor(Test):
                            f"{self.CLASSES}CLSID\\{self.EBN_STORE}\\InProcServer32": None,
                            f"{self.CLASSES}CLSID\\{self.MRC_STORE}": None})
         document = self.assertProblems(
-            (self.EBN_STORE, "registered without its DLL", "regsvr32"),
+            (self.EBN_STORE, "registered, but without a DLL", "regsvr32"),
             (self.MRC_STORE, "is not registered", "regsvr32"),
-            (".mrc", "(thumbnail, properties)", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\")),
-            (".raw", "(property store)"))
+            (".mrc", "(missing: thumbnail, property sets)", f'regsvr32 "Z:{SERVER}"'.replace("/", "\\")),
+            (".raw", "(missing: property store)"))
         self.assertWorksBut(document, dict.fromkeys(
             (".ebn property store", (".ebn", "property store"), ".mrc property store", (".mrc", "property store"),
-             (".mrc", "thumbnail"), (".mrc", "properties"), (".raw", "property store")), "not registered"))
+             (".mrc", "thumbnail"), (".mrc", "property sets"), (".raw", "property store")), "not registered"))
 
     def leave_out(self, kind, *classes):
         """Removes a kind from the registration, as an installation without it does."""
@@ -1111,25 +1111,25 @@ class Doctor(Test):
             self.assertOneSentence(sentence, f"QelShellExt is not registered for {kind} files",
                                    f'run regsvr32 "Z:{SERVER}"'.replace("/", "\\"))
         missing = [".raw property store", (".raw", "property store")] + [
-            (kind, role) for kind in left_out for role in ("thumbnail", "info tip", "properties")]
+            (kind, role) for kind in left_out for role in ("thumbnail", "tip", "property sets")]
         self.assertWorksBut(document, dict.fromkeys(missing, "not registered"))
 
     def test_reports_a_missing_dll_even_if_a_kind_was_left_out(self):
         self.register()
         self.leave_out("ser")
         self.set_dll(self.folder / "gone.dll", self.EXTENSION)
-        document = self.assertProblem("gone.dll", "is not found")
+        document = self.assertProblem("gone.dll", "cannot be found")
         self.assertEqual(list(self.left_out(document)), [".ser"])
 
-    def test_reports_that_windows_does_not_ask_for_files_of_a_kind_that_was_left_out(self):
+    def test_reports_that_windows_does_not_use_it_for_files_of_a_kind_that_was_left_out(self):
         self.register()
         self.leave_out("ser")
         self.leave_out("raw", self.RAW_STORE)
         file = self.write("a.raw", raw(4, 4, 0, 8, bytes(16)))
         result = run("doctor", file, server=None)
         self.assertEqual((result.returncode, result.stderr), (FAILED, ""))
-        self.assertRegex(result.stdout, r"a\.raw: is read, 4 x 4 .*\n +Windows does not ask QelShellExt for \.raw files")
-        self.assertRegex(result.stdout, r"Left to other programs\n +QelShellExt .*\.ser files.*\n +QelShellExt .*\.raw files")
+        self.assertRegex(result.stdout, r"a\.raw: can be read: 4 x 4 .*\n +QelShellExt is not registered for \.raw files, so ")
+        self.assertRegex(result.stdout, r"Unregistered file kinds .*\n +QelShellExt .*\.ser files.*\n +QelShellExt .*\.raw files")
         result, document = self.doctor(self.write("a.mrc", mrc()))
         self.assertEqual((result.returncode, document["files"][0]["remark"]), (DONE, None))
         result, document = self.doctor(file)
@@ -1146,25 +1146,25 @@ class Doctor(Test):
         result, document = self.doctor()
         self.assertEqual((result.returncode, document["problems"]), (DONE, []))
         self.assertOneSentence(self.left_out(document)[".raw"], "Stack Peeker", self.FOREIGN, "C:\\peek.dll")
-        self.assertEqual(self.conditions(document)[".raw", "thumbnail"], "another program")
+        self.assertEqual(self.statuses(document)[".raw", "thumbnail"], "another program")
 
     def test_reports_a_kind_that_is_only_partly_left_out_as_a_fault(self):
         self.register()
         self.leave_out("raw")
-        document = self.assertProblem(".raw", "(thumbnail, info tip, properties, property store)")
+        document = self.assertProblem(".raw", "(missing: thumbnail, tip, property sets, property store)")
         self.assertEqual(self.left_out(document), {})
 
-    def test_sees_that_a_class_is_disabled(self):
+    def test_sees_that_a_class_is_blocked(self):
         blocked = "Software\\Microsoft\\Windows\\CurrentVersion\\Shell Extensions\\Blocked"
         keys = [f"{root}\\{blocked}" for root in ("HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER")]
         self.addCleanup(self.set_registry, dict.fromkeys(keys))
         self.register()
         self.set_registry({f"{keys[0]}@{self.RAW_STORE}": "", f"{keys[1]}@{self.MRC_STORE.lower()}": "by me"})
-        document = self.assertProblems((".raw property store", "disabled", self.RAW_STORE, keys[0]),
-                                       (".mrc property store", "disabled", self.MRC_STORE, keys[1]))
+        document = self.assertProblems((".raw property store", "blocked", self.RAW_STORE, keys[0]),
+                                       (".mrc property store", "blocked", self.MRC_STORE, keys[1]))
         self.assertWorksBut(document, dict.fromkeys(
             (".raw property store", (".raw", "property store"), ".mrc property store", (".mrc", "property store")),
-            "disabled"))
+            "blocked"))
 
     def test_normalises_the_spelling_of_classes_and_paths(self):
         dll = self.write("QelShellExt.dll", pathlib.Path(SERVER).read_bytes())
@@ -1194,24 +1194,24 @@ class Doctor(Test):
 
         explains(good, FAILED, "is not registered on this computer", "Problems", "run regsvr32", "as administrator.")
         self.register()
-        explains(self.write("cut.mrc", mrc(200, 100, 3)[:41000]), DAMAGED, "cut short", "41000 bytes", "Copy it again")
-        explains(self.write("empty.ser", b""), DAMAGED, "The file is empty.", "Copy it again, or wait")
-        explains(self.write("photo.raw", b"II*\0" + bytes(300)), DAMAGED, "must be the text \"QEL RawImage\"",
-                 "Check that the file is of the kind that its extension says.")
-        explains(self.write("notes.txt", b"notes"), UNSUPPORTED, "shows .mrc", "give it that extension")
-        explains(self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3))), DAMAGED, "in colour and smaller",
+        explains(self.write("cut.mrc", mrc(200, 100, 3)[:41000]), NO_THUMBNAIL, "cut short", "41000 bytes", "Copy it again")
+        explains(self.write("empty.ser", b""), NO_THUMBNAIL, "The file is empty.", "Copy it again, or wait")
+        explains(self.write("photo.raw", b"II*\0" + bytes(300)), NO_THUMBNAIL, "must be the text \"QEL RawImage\"",
+                 "Check that the file-name extension is right.")
+        explains(self.write("notes.txt", b"notes"), UNSUPPORTED, "supports only .mrc", "give it the right file-name extension")
+        explains(self.write("small.raw", raw(8, 6, 3, 24, bytes(8 * 6 * 3))), NO_THUMBNAIL, "in colour and smaller",
                  "View it with smaller icons")
-        explains(self.write("f" * 120 + "/" + "n" * 140 + ".mrc", mrc()), DONE, "is read, 4 x 3 pixels, 1 frame, 8 bit",
+        explains(self.write("f" * 120 + "/" + "n" * 140 + ".mrc", mrc()), DONE, "can be read: 4 x 3 pixels, 1 frame, 8 bit",
                  "260 characters", "shorten a name")
         explains(self.folder / "circle.mrc", FAILED, "cannot be opened", "Check that you have permission")
         self.set_registry({icons: 1, policy: 0})
         explains(good, FAILED, "\"Always show icons, never thumbnails\"", "clear it in Folder Options")
         self.set_registry({icons: 0, policy: 1})
-        explains(good, FAILED, "the policy \"Turn off the display of thumbnails", "ask an administrator to remove it")
+        explains(good, FAILED, "the policy \"Turn off the display of thumbnails", "ask an administrator to turn it off")
         self.set_registry({policy: 0})
         self.leave_out("raw", self.RAW_STORE)
         explains(self.write("a.raw", raw(4, 4, 0, 8, bytes(16))), FAILED, "is not registered for .raw files",
-                 "To have it show them, run regsvr32")
+                 "To register it, run regsvr32")
 
     def test_names_the_settings_of_windows_that_hide_thumbnails(self):
         windows = "\\Software\\Microsoft\\Windows\\CurrentVersion\\"
@@ -1239,7 +1239,7 @@ class Doctor(Test):
         classes = (self.EXTENSION, self.EBN_STORE, self.RAW_STORE, self.MRC_STORE)
         self.set_registry({f"{approved}@{clsid}": None for clsid in classes})
         _, document = self.doctor()
-        self.assertEqual({each["condition"] for each in document["classes"]}, {"not approved"})
+        self.assertEqual({each["status"] for each in document["classes"]}, {"not approved"})
         self.assertEqual(len(document["problems"]), 4)
         self.assertOneSentence(document["problems"][0], self.EXTENSION, "approved", "policy", "run regsvr32")
         self.set_registry({enforced: 0})
@@ -1251,7 +1251,7 @@ class Doctor(Test):
         _, document = self.doctor()
         self.assertEqual(len(document["problems"]), 1)
         self.assertOneSentence(document["problems"][0], "shell extension", '"Free"', "Apartment", "run regsvr32")
-        self.assertEqual([each["condition"] for each in document["classes"]], ["wrong threads"] + ["works"] * 3)
+        self.assertEqual([each["status"] for each in document["classes"]], ["wrong ThreadingModel"] + ["works"] * 3)
 
     def test_names_the_program_that_has_taken_a_handler(self):
         foreign = f"{self.CLASSES}CLSID\\{self.FOREIGN}"
@@ -1277,14 +1277,14 @@ class Doctor(Test):
                            choice + "@ProgId": "Peeker.Chosen", types[0] + "\\" + self.INFO_TIP: self.FOREIGN,
                            self.CLASSES + ".emi": "Peeker.Newer", types[1] + "\\" + self.NEWER_THUMBNAIL: self.FOREIGN,
                            self.CLASSES + ".raw": "Peeker.Plain", types[2] + "\\" + self.THUMBNAIL: self.FOREIGN})
-        parts = (self.FOREIGN, "takes precedence", "remove that key")
+        parts = (self.FOREIGN, "takes precedence", "delete this key")
         document = self.assertProblems(
             (".mrc", r"HKEY_CLASSES_ROOT\.mrc" + "\\" + self.NEWER_THUMBNAIL, *parts),
             (".ser", r"HKEY_CLASSES_ROOT\Peeker.Chosen" + "\\" + self.INFO_TIP, *parts),
             (".emi", r"HKEY_CLASSES_ROOT\Peeker.Newer" + "\\" + self.NEWER_THUMBNAIL, *parts),
             (".raw", r"HKEY_CLASSES_ROOT\Peeker.Plain" + "\\" + self.THUMBNAIL, *parts))
         self.assertWorksBut(document, dict.fromkeys(
-            ((".mrc", "thumbnail"), (".ser", "info tip"), (".emi", "thumbnail"), (".raw", "thumbnail")),
+            ((".mrc", "thumbnail"), (".ser", "tip"), (".emi", "thumbnail"), (".raw", "thumbnail")),
             "another program"))
 
 

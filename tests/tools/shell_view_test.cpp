@@ -1,4 +1,4 @@
-// Tests the comparison of what the shell shows with what the extension answers. A fake shell gives the
+// Tests the comparison of what the shell shows with what the extension returns. A fake shell gives the
 // answers.
 #include "shell_view.h"
 
@@ -50,19 +50,19 @@ std::uint8_t Level(std::int32_t x, std::int32_t y) {
   return static_cast<std::uint8_t>(x * 10 + y);
 }
 
-/// A file in a shell that gives these answers.
+/// A file in a shell, which gives these answers.
 class FakeItem final : public IShellItem2, public IShellItemImageFactory {
  public:
-  std::vector<HRESULT> failures;  // the results of the first requests for a picture
-  std::function<HBITMAP()> picture;
+  std::vector<HRESULT> failures;  // the results of the first requests for a thumbnail
+  std::function<HBITMAP()> thumbnail;
   HRESULT storeResult = S_OK;
   ComPtr<IPropertyStore> store;
-  bool hasPictures = true;
+  bool hasThumbnails = true;
   SIIGBF flags{};
 
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** object) override {
     *object = nullptr;
-    if (iid == IID_IShellItemImageFactory && hasPictures)
+    if (iid == IID_IShellItemImageFactory && hasThumbnails)
       *object = static_cast<IShellItemImageFactory*>(this);
     return *object != nullptr ? S_OK : E_NOINTERFACE;
   }
@@ -78,7 +78,7 @@ class FakeItem final : public IShellItem2, public IShellItemImageFactory {
       failures.erase(failures.begin());
       return failure;
     }
-    *bitmap = picture();
+    *bitmap = thumbnail();
     return S_OK;
   }
 
@@ -117,7 +117,7 @@ class ShellComparison : public testing::Test {
  protected:
   ShellComparison() {
     CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED);
-    SetOwnPicture(12, 8);
+    SetOwnThumbnail(12, 8);
     own_.thumbnail.request = kRequest;
     properties_.items.resize(2);
     properties_.items[0] = {
@@ -126,14 +126,14 @@ class ShellComparison : public testing::Test {
     EXPECT_EQ(PSCreateMemoryPropertyStore(IID_IPropertyStore, reinterpret_cast<void**>(item_.store.Put())),
               S_OK);
     SetShellWidth(640);
-    item_.picture = [] { return ShellBitmap(12, 8, Level); };
+    item_.thumbnail = [] { return ShellBitmap(12, 8, Level); };
   }
   ~ShellComparison() override {
     item_.store = {};
     CoUninitialize();
   }
 
-  void SetOwnPicture(std::int32_t width, std::int32_t height) {
+  void SetOwnThumbnail(std::int32_t width, std::int32_t height) {
     DibSection section;
     section.CreateGrey(width, height);
     for (std::int32_t y = 0; y < height; ++y) {
@@ -162,36 +162,43 @@ TEST_F(ShellComparison, AgreesIfEveryPixelAndValueIsTheSame) {
   const ShellView view = View();
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kSame);
   EXPECT_EQ(view.properties.agreement, Agreement::kSame);
-  EXPECT_TRUE(IsInOrder(view));
+  EXPECT_TRUE(IsAsExpected(view));
   EXPECT_EQ(item_.flags, SIIGBF_THUMBNAILONLY);
-  EXPECT_EQ(ShellSentence(view, L"a.mrc"),
-            L"Windows shows the thumbnail of QelShellExt and the set of properties of QelShellExt.");
+  EXPECT_EQ(ShellText(view, L"a.mrc"), L"Windows shows the thumbnail and the properties of QelShellExt.");
 }
 
 TEST_F(ShellComparison, ReportsByHowMuchASinglePixelDiffers) {
-  item_.picture = [] {
+  item_.thumbnail = [] {
     return ShellBitmap(12, 8, [](std::int32_t x, std::int32_t y) {
       return static_cast<std::uint8_t>(Level(x, y) + (x == 11 && y == 0 ? 3 : 0));
     });
   };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers);
-  EXPECT_EQ(Thumbnail().detail, L"whose pixels differ by up to 3 of 255 levels");
-  EXPECT_FALSE(IsInOrder(View()));
+  EXPECT_EQ(Thumbnail().detail, L"pixels differ by up to 3 of 255 levels");
+  EXPECT_FALSE(IsAsExpected(View()));
 }
 
 TEST_F(ShellComparison, ReportsADifferentSize) {
-  item_.picture = [] { return ShellBitmap(8, 12, Level); };
+  item_.thumbnail = [] { return ShellBitmap(8, 12, Level); };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers);
-  EXPECT_EQ(Thumbnail().detail, L"of 8 x 12 pixels instead of 12 x 8 pixels");
+  EXPECT_EQ(Thumbnail().detail, L"8 x 12 pixels instead of 12 x 8 pixels");
+  const std::wstring text = ShellText(View(), L"a.mrc");
+  EXPECT_TRUE(
+      text.starts_with(L"Windows shows another thumbnail (8 x 12 pixels instead of 12 x 8 pixels) and "
+                       L"shows the properties of QelShellExt. The likely cause is an older thumbnail"))
+      << Utf8(text);
 }
 
 TEST_F(ShellComparison, ComparesTheProportionsOfAReducedThumbnail) {
-  SetOwnPicture(39, 25);
-  item_.picture = [] { return ShellBitmap(20, 13, Level); };
+  SetOwnThumbnail(39, 25);
+  item_.thumbnail = [] { return ShellBitmap(20, 13, Level); };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kReduced);
-  EXPECT_TRUE(IsInOrder(View()));
+  EXPECT_TRUE(IsAsExpected(View()));
+  EXPECT_EQ(ShellText(View(), L"a.mrc"),
+            L"Windows shows the thumbnail of QelShellExt (reduced further) and shows the properties of "
+            L"QelShellExt.");
   for (const auto& [width, height] : {std::pair{20, 20}, std::pair{20, 11}, std::pair{18, 13}}) {
-    item_.picture = [width, height] { return ShellBitmap(width, height, Level); };
+    item_.thumbnail = [width, height] { return ShellBitmap(width, height, Level); };
     EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers) << width;
   }
 }
@@ -212,11 +219,14 @@ TEST_F(ShellComparison, ReportsAMissingThumbnailWithALikelyCause) {
   item_.failures = {static_cast<HRESULT>(0x8004B200)};
   const ShellView view = View();
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kNothing);
-  EXPECT_FALSE(IsInOrder(view));
-  const std::wstring sentence = ShellSentence(view, L"a.mrc");
-  EXPECT_TRUE(sentence.starts_with(L"Windows shows no thumbnail (0x8004B200")) << Utf8(sentence);
-  EXPECT_NE(sentence.find(L"; the likely cause is the isolated process"), std::wstring::npos)
-      << Utf8(sentence);
+  EXPECT_FALSE(IsAsExpected(view));
+  const std::wstring text = ShellText(view, L"a.mrc");
+  EXPECT_TRUE(text.starts_with(L"Windows shows no thumbnail (0x8004B200")) << Utf8(text);
+  EXPECT_NE(
+      text.find(L" and shows the properties of QelShellExt. The likely cause is that QelShellExt does not "
+                L"work in the isolated process"),
+      std::wstring::npos)
+      << Utf8(text);
 }
 
 TEST_F(ShellComparison, ReportsWhichPropertyDiffers) {
@@ -227,6 +237,14 @@ TEST_F(ShellComparison, ReportsWhichPropertyDiffers) {
   EXPECT_EQ(answer.detail,
             L"System.Image.HorizontalSize is \"64\" instead of \"640\", System.Comment is \"\" instead of "
             L"\"comment\"");
+  const std::wstring text = ShellText(View(), L"a.mrc");
+  EXPECT_TRUE(
+      text.starts_with(L"Windows shows the thumbnail of QelShellExt and shows other properties (System."))
+      << Utf8(text);
+  EXPECT_TRUE(
+      text.ends_with(L"The likely cause is that Windows still uses its old settings, or another program's "
+                     L"property handler: sign out and in again."))
+      << Utf8(text);
   SetShellWidth(std::nullopt);
   EXPECT_EQ(Properties().agreement, Agreement::kNothing);
   item_.storeResult = E_ACCESSDENIED;
@@ -239,13 +257,14 @@ TEST_F(ShellComparison, ComparesNoPropertiesForAKindWithoutAStore) {
 }
 
 TEST_F(ShellComparison, RecognisesAShellThatDoesNotAnswer) {
-  item_.hasPictures = false;
+  item_.hasThumbnails = false;
   item_.storeResult = E_NOTIMPL;
   const ShellView view = View();
   EXPECT_EQ(view.thumbnail.agreement, Agreement::kUnanswered);
   EXPECT_EQ(view.properties.agreement, Agreement::kUnanswered);
-  EXPECT_TRUE(IsInOrder(view));
-  EXPECT_EQ(ShellSentence(view, L"a.mrc"), L"The shell of this system does not report what it shows.");
+  EXPECT_TRUE(IsAsExpected(view));
+  EXPECT_EQ(ShellText(view, L"a.mrc"),
+            L"This system does not report what it shows for a file, which is normal under Wine.");
 }
 
 }  // namespace

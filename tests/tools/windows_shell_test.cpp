@@ -1,5 +1,5 @@
-// Compares what the shell of this computer shows for the sample files with what the extension answers
-// directly. The extension is registered while a test runs.
+// Compares what the shell of this computer shows for the sample files with what the extension itself returns.
+// The extension is registered while a test runs.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -47,7 +47,7 @@ class WindowsShell : public testing::Test {
     if (const std::string reason = Testing::ReasonNotToRegister(); !reason.empty()) GTEST_SKIP() << reason;
   }
 
-  /// Returns what the shell shows of every sample, except those whose thumbnail request ends the process.
+  /// Returns what the shell shows of every sample, except those whose thumbnail request crashes.
   std::vector<SampleView> AskForSamples() {
     const RegisteredDll registered;
     Worker worker{std::wstring()};
@@ -58,8 +58,7 @@ class WindowsShell : public testing::Test {
       if (worker.Ask({Subject::kThumbnail, path, kRequest}, answer)) continue;
       SampleView asked{path, {}};
       const auto end = worker.Ask({Subject::kShellView, path, kRequest}, asked.view);
-      EXPECT_FALSE(end) << sample.name << ": the process of the shell ends with "
-                        << Utf8(ProcessEndText(*end));
+      EXPECT_FALSE(end) << sample.name << ": the shell crashed: " << Utf8(ProcessEndText(*end));
       views.push_back(std::move(asked));
     }
     EXPECT_GT(views.size(), 20u);
@@ -73,10 +72,9 @@ class WindowsShell : public testing::Test {
       const Agreement agreement = (asked.view.*answer).agreement;
       if (agreement != Agreement::kUnanswered) isAnswered = true;
       EXPECT_TRUE(agreement != Agreement::kDiffers && agreement != Agreement::kNothing)
-          << Utf8(asked.path) << ": " << Utf8(ShellSentence(asked.view, asked.path));
+          << Utf8(asked.path) << ": " << Utf8(ShellText(asked.view, asked.path));
     }
-    if (!isAnswered && !HasFailure())
-      GTEST_SKIP() << "The shell of this system does not report what it shows.";
+    if (!isAnswered && !HasFailure()) GTEST_SKIP() << "This system does not report what it shows for a file.";
   }
 
   const Testing::TempFolder folder_;

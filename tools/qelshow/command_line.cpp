@@ -13,45 +13,53 @@ constexpr std::int32_t kMaxSize = 4096;
 constexpr const wchar_t* kPageFolder = L"qelshow-page";
 
 constexpr const wchar_t* kHelp =
-    LR"(qelshow shows what the QelShellExt extension shows to the Windows shell.
+    LR"(qelshow shows what Windows gets from the extension QelShellExt for a file, and
+why a file has no thumbnail.
 
 usage: qelshow COMMAND ... [OPTION ...]
 
 commands:
-  info FILE...           everything that the shell learns about each file
-  thumbnail FILE -o PNG  the thumbnail of one file
-  page FOLDER|FILE...    a page of all thumbnails and everything else
-  doctor [FILE...]       whether the extension works, and what to do if not
-  help COMMAND           more about a command
-  --version              the version of this program
+  info FILE...           print everything that Windows gets for each file, and
+                         what else its header says
+  thumbnail FILE -o PNG  write the thumbnail of a file
+  page FOLDER|FILE...    write a web page with the thumbnails and details of the
+                         files
+  doctor [FILE...]       check whether the extension works and, if not, say what
+                         to do
+  help COMMAND           explain a command
+  --version              print the version of this program
 
 FILE can be a pattern such as *.mrc. After "--" every argument is a FILE.
 
 options of info, thumbnail and page:
-  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --server PATH  use this QelShellExt.dll instead of the registered one
   --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
-exit status, the highest one of several files:
+exit status (if several apply, the highest):
   0  done
   1  something cannot be read, written or loaded
   2  the command line is wrong
-  3  the kind of a file is not supported
+  3  a file is not of a supported kind
   4  a file has no thumbnail, for example because it is damaged
 )";
 
 constexpr const wchar_t* kInfoHelp =
     LR"(usage: qelshow info FILE... [--json] [--server PATH] [--size N]
 
-Prints everything that the shell learns about each file: the size of its
-thumbnail or why there is none, the tip, the columns of the Details view with
-the declared and the delivered types, the property sets, the property store.
+Prints for each file:
+  - the size of its thumbnail, or why it has none
+  - values of its header that Windows does not show
+  - the tip, which appears when the mouse rests on the file
+  - the columns and the property sets, which some programs still use, with the
+    declared and the returned types of the columns
+  - the property store: the values in the Details view and in Properties
 
-  --json         print one JSON document: {"schema": 2, "files": [...]}
-  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --json         print one JSON document: {"schema": 3, "files": [...]}
+  --server PATH  use this QelShellExt.dll instead of the registered one
   --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 the kind of a file is not
-supported, 4 a file has no thumbnail; the highest one of several files
+exit status: 0 done, 1 failed, 2 wrong command line, 3 a file is not of a
+supported kind, 4 a file has no thumbnail; if several apply, the highest
 )";
 
 constexpr const wchar_t* kThumbnailHelp =
@@ -60,24 +68,24 @@ constexpr const wchar_t* kThumbnailHelp =
 Writes the thumbnail of a file as a PNG image.
 
   -o, --out PNG  the file to write; - for standard output
-  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --server PATH  use this QelShellExt.dll instead of the registered one
   --size N       request a thumbnail of N by N pixels (1 to 4096; default 256)
 
-exit status: 0 done, 1 failed, 2 wrong command line, 3 the kind of the file is
-not supported, 4 the file has no thumbnail
+exit status: 0 done, 1 failed, 2 wrong command line, 3 the file is not of a
+supported kind, 4 the file has no thumbnail
 )";
 
 constexpr const wchar_t* kPageHelp =
     LR"(usage: qelshow page FOLDER|FILE... [--out DIR] [--server PATH] [--size N]
 
-Writes DIR\index.html, a page of the files' thumbnails with everything else that
-the shell learns about them, and prints a table of the files. The page needs
-only its own folder. FOLDER stands for all files of the supported kinds in it
-and in its subfolders.
+Writes DIR\index.html, a web page that shows the thumbnails of the files and
+everything that "qelshow info" prints about them, and prints a table of the
+files. You can move DIR: the page uses nothing outside it. For a FOLDER, the
+page shows all supported files in it and in its subfolders.
 
-  -o, --out DIR  the folder of the page, created if it does not exist (default:
+  -o, --out DIR  the folder for the page, created if it does not exist (default:
                  qelshow-page in the current folder)
-  --server PATH  use this QelShellExt.DLL instead of the registered one
+  --server PATH  use this QelShellExt.dll instead of the registered one
   --size N       request thumbnails of N by N pixels (1 to 4096; default 256)
 
 exit status: 0 the page is written, even if files have no thumbnail, 1 failed,
@@ -87,19 +95,22 @@ exit status: 0 the page is written, even if files have no thumbnail, 1 failed,
 constexpr const wchar_t* kDoctorHelp =
     LR"(usage: qelshow doctor [FILE...] [--json]
 
-Reports whether the extension works on this computer: for each file kind, which
-handlers are registered, whether their DLL exists and loads, its version, and
-whether objects of its classes can be created; whether settings of Windows hide
-thumbnails; and whether the registered extension can read each FILE. For each
-problem, it gives the reason and says what to do. A file kind that was left to
-other programs is not a problem.
+Checks whether the extension works on this computer:
+  - whether its DLL is registered, exists and loads, and can create its objects
+  - which handlers are registered for each file kind
+  - whether settings of Windows hide thumbnails
+  - whether the extension can read each FILE, and whether Windows shows what the
+    extension returns for it
+For each problem, it gives the reason and says what to do. A file kind for which
+nothing is registered, for example because you did not install it, is not a
+problem unless you name such a FILE.
 
-  --json  print one JSON document: {"schema": 2, "classes": [...],
+  --json  print one JSON document: {"schema": 3, "classes": [...],
           "kinds": [...], "problems": [...], "files": [...]}
 
-exit status: 0 everything works, 1 something does not work, or a file is of a
-kind that was left to other programs, 2 wrong command line, 3 the kind of a file
-is not supported, 4 a file has no thumbnail; the highest one that applies
+exit status: 0 everything works, 1 something does not work, or the kind of a
+FILE is not registered, 2 wrong command line, 3 a file is not of a supported
+kind, 4 a file has no thumbnail; if several apply, the highest
 )";
 
 struct CommandFacts {
@@ -108,7 +119,7 @@ struct CommandFacts {
   Command command;
   bool takesJson;
   bool takesOut;
-  bool takesServer;  // and asks the extension about files
+  bool takesServer;  // and --size; such a command needs a file
 };
 
 constexpr CommandFacts kCommands[] = {
@@ -145,7 +156,7 @@ const CommandFacts& FindCommand(const std::wstring& name) {
   for (const CommandFacts& facts : kCommands) {
     if (name == facts.name) return facts;
   }
-  WrongUsage(L"There is no command \"" + name + L"\".");
+  WrongUsage(L"\"" + name + L"\" is not a command.");
 }
 
 bool IsHelp(const std::wstring& argument) {
@@ -213,13 +224,16 @@ class OptionReader {
 
   /// Completes the command line. Throws Failure if it is invalid.
   void Check(CommandLine& line) const {
-    if (line.files.empty() && facts_.takesServer) WrongUsage(L"No file is given.", facts_.name);
+    if (line.files.empty() && facts_.takesServer) {
+      WrongUsage(line.command == Command::kPage ? L"No file or folder is given." : L"No file is given.",
+                 facts_.name);
+    }
     if (line.command == Command::kThumbnail && line.files.size() > 1) {
       WrongUsage(L"thumbnail takes one file, not " + std::to_wstring(line.files.size()) + L".", facts_.name);
     }
     if (line.command == Command::kPage && line.out.empty()) line.out = kPageFolder;
     if (facts_.takesOut && line.out.empty()) {
-      WrongUsage(L"--out is missing: it names the file to write.", facts_.name);
+      WrongUsage(L"Name the file to write with --out, for example --out grid.png.", facts_.name);
     }
     if (line.command == Command::kPage && line.out == L"-") {
       WrongUsage(L"A page cannot be written to standard output: name a folder with --out.", facts_.name);

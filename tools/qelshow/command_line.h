@@ -1,4 +1,4 @@
-// Parses the command line, and contains the text of the help.
+// Parses the command line, and contains the help.
 #pragma once
 
 #include <cstdint>
@@ -11,7 +11,7 @@ enum class Command { kHelp, kInfo, kThumbnail, kPage, kDoctor };
 
 struct CommandLine {
   Command command = Command::kHelp;
-  std::wstring helpText;  // for kHelp: the help, or the version
+  std::wstring helpText;  // for kHelp: the help or the version
   std::vector<std::wstring> files;
   std::wstring server;  // if empty, the registered extension
   std::wstring out;     // a file or a folder

@@ -26,11 +26,7 @@ std::wstring FileName(const std::wstring& path) {
   return std::filesystem::path(path).filename().wstring();
 }
 
-std::wstring Counted(std::size_t count, const wchar_t* what) {
-  return std::to_wstring(count) + L" " + what + (count == 1 ? L"" : L"s");
-}
-
-/// Reports a file's problem.
+/// Prints a file's problem and remark, if any, to standard error.
 void PrintProblem(const FileFacts& facts) {
   if (!facts.problem.empty()) PrintError(facts.named + L": " + facts.problem + L" " + facts.advice);
   if (!facts.remark.empty()) PrintError(facts.named + L": " + facts.remark);
@@ -62,7 +58,7 @@ int RunInfo(const CommandLine& line) {
     progress.Hide();
     if (line.json) {
       PrintUtf8((count > 0 ? ",\n" : "\n") + Json(facts).dump());
-    } else if (facts.verdict == Verdict::kGood || facts.verdict == Verdict::kDamaged) {
+    } else if (facts.verdict == Verdict::kGood || facts.verdict == Verdict::kNoThumbnail) {
       Print((printed++ > 0 ? L"\n" : L"") + TextReport(facts));
     }
     if (facts.verdict != Verdict::kGood) PrintProblem(facts);
@@ -76,7 +72,7 @@ int RunInfo(const CommandLine& line) {
 int RunThumbnail(const CommandLine& line) {
   const std::wstring& path = line.files.front();
   const bool isToFile = line.out != L"-";
-  if (isToFile) CheckPictureOutput(line.out, path);
+  if (isToFile) CheckPngOutput(line.out, path);
   Worker worker = StartWorker(line);
   const FileFacts facts = InspectFile(worker, path, FileName(path), line.size);
   PrintProblem(facts);
@@ -103,18 +99,19 @@ int RunPage(const CommandLine& line) {
   Print(TableHeading(nameWidth));
   ProgressBar progress(files.size());
   std::size_t count = 0;
-  std::size_t pictures = 0;
+  std::size_t thumbnails = 0;
   for (const ListedFile& file : files) {
     progress.Show(count++, file.name);
     const FileFacts facts = InspectFile(worker, file.path, file.name, line.size);
     page.Add(facts);
-    if (!facts.png.empty()) ++pictures;
+    if (!facts.png.empty()) ++thumbnails;
     progress.Hide();
     Print(TableRow(facts, nameWidth));
   }
   page.Finish();
-  Print(L"\n" + page.path() + L": " + Counted(pictures, L"thumbnail") + L" of " +
-        Counted(files.size(), L"file") + L"\n");
+  Print(L"\n" + page.path() + L": " + std::to_wstring(files.size()) +
+        (files.size() == 1 ? L" file, " : L" files, ") + std::to_wstring(thumbnails) +
+        L" with a thumbnail\n");
   return kExitDone;
 }
 

@@ -24,7 +24,7 @@ bool PrintTo(DWORD which, std::wstring_view text) {
   return WriteBytes(target, utf8.data(), utf8.size());
 }
 
-/// Throws Failure if standard output could not be written, except if nobody reads it.
+/// Throws Failure if `isWritten` is false, unless nobody reads standard output.
 void RequirePrinted(bool isWritten) {
   if (isWritten) return;
   const DWORD error = GetLastError();

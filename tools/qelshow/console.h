@@ -13,8 +13,8 @@ namespace Qel::Lumetra::ShellExt::Show {
 /// Returns whether all bytes have been written. If not, GetLastError gives the reason.
 bool WriteBytes(HANDLE target, const void* bytes, std::size_t size);
 
-/// Writes to standard output. Like the functions below, it throws Failure if the output cannot be written. If
-/// the reader of a pipe has closed it, that is not an error.
+/// Writes to standard output. Like the functions below, it throws Failure if the output cannot be written. A
+/// pipe that its reader has closed is not an error.
 void Print(std::wstring_view text);
 
 /// Writes UTF-8 to standard output.

@@ -1,4 +1,4 @@
-// Finds out why a file has no picture and what its header says, with the project's own readers.
+// Finds out why a file has no thumbnail and what its header says, with the project's own readers.
 #pragma once
 
 #include <string>
@@ -7,8 +7,8 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Opens and parses the file at `path`, once for its fault and once for the facts of its header. Returns
-/// both, as far as the readers can determine them.
+/// Opens the file at `path` and returns its fault and the facts of its header, as far as the readers can
+/// determine them. It parses the file once for each.
 Diagnosis Diagnose(const std::wstring& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -22,7 +22,7 @@ static void to_json(Json& json, const ExaminedClass& examined) {
           {"class", GuidText(examined.clsid)},
           {"dll", examined.registered.dll},
           {"version", examined.version},
-          {"condition", ConditionText(examined.condition)},
+          {"status", StatusText(examined.status)},
           {"problem", examined.problem}};
 }
 
@@ -30,7 +30,7 @@ static void to_json(Json& json, const ExaminedHandler& examined) {
   json = {{"role", examined.registered.role},
           {"key", examined.registered.key},
           {"class", examined.registered.registered},
-          {"condition", ConditionText(examined.condition)}};
+          {"status", StatusText(examined.status)}};
 }
 
 static void to_json(Json& json, const ExaminedKind& kind) {
@@ -39,8 +39,8 @@ static void to_json(Json& json, const ExaminedKind& kind) {
 
 namespace {
 
-/// Returns the facts about the files, as the registered extension reads them. If it cannot be loaded, each
-/// file reports that as its problem.
+/// Returns the facts about the files, read with the registered extension. If it cannot be loaded, that is the
+/// problem of each file.
 std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
   std::vector<FileFacts> files;
   std::optional<Worker> worker;
@@ -61,33 +61,32 @@ std::vector<FileFacts> ExamineFiles(const CommandLine& line) {
       facts.name = name;
       facts.verdict = Verdict::kFailed;
       facts.problem = obstacle;
-      facts.advice = L"First solve what is listed under Problems.";
+      facts.advice = L"First fix the problems listed below.";
       files.push_back(std::move(facts));
     }
   }
   return files;
 }
 
-/// Adds a remark to each file whose kind is left to other programs. Returns whether the extension would show
-/// one of them.
-bool RemarkOnLeftOut(const Installation& installation, std::vector<FileFacts>& files) {
-  bool found = false;
+/// Adds a remark to each file whose kind was left out. Returns whether the extension can read any of them.
+bool AddRemarksOnLeftOutKinds(const Installation& installation, std::vector<FileFacts>& files) {
+  bool isAnyLeftOut = false;
   for (FileFacts& facts : files) {
     const auto kind = std::ranges::find(installation.kinds, L"." + facts.kind, &ExaminedKind::extension);
     if (facts.verdict != Verdict::kGood || kind == installation.kinds.end() || kind->leftOut.empty())
       continue;
     if (!facts.remark.empty()) facts.remark += L" ";
-    facts.remark += L"Windows does not ask QelShellExt for " + kind->extension +
-                    L" files, which are left to other programs.";
-    found = true;
+    facts.remark += L"QelShellExt is not registered for " + kind->extension +
+                    L" files, so Windows does not use it for this file.";
+    isAnyLeftOut = true;
   }
-  return found;
+  return isAnyLeftOut;
 }
 
-/// Asks the shell about the files that the extension reads and that have no remark. Returns whether all its
-/// answers are right.
+/// Asks the shell about the files that the extension can read and that have no remark. Returns whether it
+/// shows what it should for all of them.
 bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
-  bool isInOrder = true;
+  bool isAsExpected = true;
   std::optional<Worker> worker;
   for (FileFacts& facts : files) {
     if (facts.verdict != Verdict::kGood || !facts.remark.empty()) continue;
@@ -95,14 +94,16 @@ bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
     const std::wstring path = AbsolutePath(facts.path);
     ShellView view;
     if (const auto end = worker->Ask({Subject::kShellView, path, size}, view)) {
-      facts.shell = L"Asking the shell what it shows ends the process with " + ProcessEndText(*end) + L".";
-      isInOrder = false;
+      facts.shell =
+          L"qelshow's worker process crashed while it asked Windows for the thumbnail and the properties: " +
+          ProcessEndText(*end) + L".";
+      isAsExpected = false;
     } else {
-      facts.shell = ShellSentence(view, path);
-      isInOrder = isInOrder && IsInOrder(view);
+      facts.shell = ShellText(view, path);
+      isAsExpected = isAsExpected && IsAsExpected(view);
     }
   }
-  return isInOrder;
+  return isAsExpected;
 }
 
 Json Document(const Installation& installation, const std::vector<FileFacts>& files) {
@@ -114,10 +115,10 @@ Json Document(const Installation& installation, const std::vector<FileFacts>& fi
 }
 
 std::wstring ClassesText(const std::vector<ExaminedClass>& classes) {
-  std::vector<std::vector<std::wstring>> rows = {{L"class", L"condition", L"version", L"DLL"}};
+  std::vector<std::vector<std::wstring>> rows = {{L"class", L"status", L"version", L"DLL"}};
   const auto orDash = [](const std::wstring& text) { return text.empty() ? L"-" : text; };
   for (const ExaminedClass& examined : classes) {
-    rows.push_back({examined.name, ConditionText(examined.condition), orDash(examined.version),
+    rows.push_back({examined.name, StatusText(examined.status), orDash(examined.version),
                     orDash(examined.registered.dll)});
   }
   return Grid(rows);
@@ -130,7 +131,7 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
     for (std::size_t i = 0; i < kind.handlers.size(); ++i) {
       // Every kind has its handlers in the same order; some lack the last.
       if (rows.front().size() == i + 1) rows.front().push_back(kind.handlers[i].registered.role);
-      row.emplace_back(ConditionText(kind.handlers[i].condition));
+      row.emplace_back(StatusText(kind.handlers[i].status));
     }
     rows.push_back(std::move(row));
   }
@@ -140,8 +141,8 @@ std::wstring KindsText(const std::vector<ExaminedKind>& kinds) {
 std::wstring FileText(const FileFacts& facts) {
   std::wstring text = L"    " + facts.named + L": ";
   if (facts.verdict != Verdict::kGood)
-    return text + L"has no thumbnail. " + facts.problem + L"\n      " + facts.advice + L"\n";
-  text += L"is read, " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
+    return text + L"no thumbnail. " + facts.problem + L"\n      " + facts.advice + L"\n";
+  text += L"can be read: " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
           L" pixels, " + std::to_wstring(facts.frames) + (facts.frames == 1 ? L" frame, " : L" frames, ") +
           facts.type + L"\n";
   for (const auto& sentence : {facts.remark, facts.shell}) {
@@ -159,7 +160,7 @@ std::wstring Text(const Installation& installation, const std::vector<FileFacts>
   for (const ExaminedKind& kind : installation.kinds) {
     if (!kind.leftOut.empty()) leftOut += L"    " + kind.leftOut + L"\n";
   }
-  if (!leftOut.empty()) text += L"\nLeft to other programs\n" + leftOut;
+  if (!leftOut.empty()) text += L"\nUnregistered file kinds (not a problem if intended)\n" + leftOut;
   if (installation.problems.empty()) return text + L"\nQelShellExt is registered and works.\n";
   text += L"\nProblems\n";
   for (const std::wstring& problem : installation.problems) text += L"    " + problem + L"\n";
@@ -171,7 +172,7 @@ std::wstring Text(const Installation& installation, const std::vector<FileFacts>
 int RunDoctor(const CommandLine& line) {
   const Installation installation = ExamineInstallation();
   std::vector<FileFacts> files = ExamineFiles(line);
-  const bool isAnyLeftOut = RemarkOnLeftOut(installation, files);
+  const bool isAnyLeftOut = AddRemarksOnLeftOutKinds(installation, files);
   const bool isShown = AskShell(files, line.size);
   if (line.json) {
     PrintUtf8(Document(installation, files).dump() + "\n");

@@ -25,7 +25,7 @@ WORD MachineOf(const std::wstring& path) {
   return file && header.signature == IMAGE_NT_SIGNATURE ? header.machine : WORD{IMAGE_FILE_MACHINE_UNKNOWN};
 }
 
-/// Returns why the system does not load the DLL.
+/// Returns why the system cannot load the DLL.
 std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
   if (error == ERROR_MOD_NOT_FOUND && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES) {
     return L"another DLL that it needs is missing (error 126)";
@@ -35,7 +35,7 @@ std::wstring LoadingProblem(const std::wstring& path, DWORD error) {
     case IMAGE_FILE_MACHINE_AMD64:
     case IMAGE_FILE_MACHINE_UNKNOWN: return L"it is damaged or not a DLL";
     case IMAGE_FILE_MACHINE_I386: return L"it is for 32-bit programs; use the 64-bit DLL";
-    default: return L"it is for other processors; use the DLL for x64";
+    default: return L"it is built for another kind of processor; use the DLL for x64";
   }
 }
 
@@ -48,7 +48,7 @@ std::wstring ExtensionClient::Open(const std::wstring& path) {
                                             IID_IClassFactory, reinterpret_cast<void**>(factory.Put()));
     if (SUCCEEDED(result)) return {};
     if (result == REGDB_E_CLASSNOTREG) {
-      return L"The extension is not registered on this computer.";
+      return L"QelShellExt is not registered on this computer.";
     }
     return L"The registered extension cannot be loaded: " + ResultText(result) + L".";
   }
@@ -58,7 +58,7 @@ std::wstring ExtensionClient::Open(const std::wstring& path) {
   }
   const FARPROC procedure = GetProcAddress(module, "DllGetClassObject");
   if (procedure == nullptr) {
-    return L"The DLL \"" + path + L"\" is not a COM server: it does not export DllGetClassObject.";
+    return L"The DLL \"" + path + L"\" is not the extension: it does not export DllGetClassObject.";
   }
   getClassObject_ = reinterpret_cast<decltype(getClassObject_)>(reinterpret_cast<void*>(procedure));
   return {};

@@ -17,7 +17,7 @@ using Com::ComPtr;
 class ExtensionClient {
  public:
   /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. Returns an
-  /// empty string, or if it fails a sentence for the user; then no object can be created.
+  /// empty string. If it fails, returns a sentence for the user; then no object can be created.
   std::wstring Open(const std::wstring& path);
 
   /// Creates an object of the class and returns its interface in `object`. Returns the result of the

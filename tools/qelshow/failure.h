@@ -11,7 +11,7 @@ inline constexpr int kExitDone = 0;
 inline constexpr int kExitFailed = 1;
 inline constexpr int kExitUsage = 2;
 
-/// Carries a sentence for the user, which names the file or the argument that it is about.
+/// Contains a sentence for the user, which names the file or argument concerned.
 struct Failure {
   explicit Failure(std::wstring what, int status = kExitFailed)
       : sentence(std::move(what)), exitStatus(status) {}

@@ -1,5 +1,5 @@
-// Everything that a shell learns about one file from the extension, as plain data. The worker process
-// collects it (shell_requests.h) and sends it to the parent process (json_records.h), whose reports show it.
+// Everything that the shell gets from the extension for one file, as plain data. The worker process collects
+// it (shell_requests.h) and sends it to the parent process (json_records.h), which reports it.
 #pragma once
 
 #include <cstdint>
@@ -18,25 +18,25 @@ struct OptionalText : std::wstring {
   OptionalText(std::wstring text) : std::wstring(std::move(text)) {}
 };
 
-/// The judgement of a file, in the order of severity. The values are exit statuses of the program.
+/// The verdicts on a file, in the order of severity. The values are exit statuses of the program.
 enum class Verdict : std::int32_t {
   kGood = 0,
   kFailed = 1,  // could not be examined, for instance because it cannot be opened
   kUnsupported = 3,
-  kDamaged = 4,
+  kNoThumbnail = 4,  // for another reason, for instance because the file is damaged
 };
 
 /// A number, a string, or nothing.
 using Value = std::variant<std::monostate, std::int64_t, double, std::wstring>;
 
-/// One of the values that a file's header has beyond the picture (header_facts.h).
+/// A value of a file's header that does not describe the frame (header_facts.h).
 struct HeaderFact {
   std::wstring name;
   Value value;  // a number is finite
   OptionalText unit;
 };
 
-/// The results of the project's own readers: the fault of a file, and the facts of its header.
+/// What the project's own readers find in a file: its fault, and the facts of its header.
 struct Diagnosis {
   Verdict verdict = Verdict::kGood;
   OptionalText problem;
@@ -44,15 +44,15 @@ struct Diagnosis {
   std::vector<HeaderFact> header{};
 };
 
-/// An answer that is a list. The `problem` of this and other answers is a sentence that says why there is no
-/// answer.
+/// An answer that is a list. The `problem` of this and other answers is a sentence that says why it is
+/// missing.
 template <class Item>
 struct ListAnswer {
   std::vector<Item> items;
   OptionalText problem;
 };
 
-/// The info tip that the shell would show.
+/// The tip that the shell would show.
 struct TipAnswer {
   OptionalText text;
   OptionalText problem;
@@ -67,13 +67,13 @@ struct Column {
   std::uint32_t characters = 0;  // default width
   std::uint32_t state = 0;       // SHCOLSTATE flags
   std::wstring declared;
-  OptionalText delivered;
+  OptionalText returned;
   Value value;
   OptionalText problem;
 };
 
 struct Property {
-  OptionalText name;  // canonical name, or a plain word if there is none
+  OptionalText name;  // canonical name in a property store, plain word in a property set
   std::wstring set;   // format id
   std::uint32_t id = 0;
   OptionalText type;
@@ -86,7 +86,7 @@ struct Thumbnail {
   std::int32_t width = 0;
   std::int32_t height = 0;
   std::int32_t bitsPerPixel = 0;
-  OptionalText picture;  // the path of its file, relative to the document
+  OptionalText file;  // in a page: the path of its PNG file, relative to the page
   OptionalText problem;
 };
 
@@ -99,14 +99,14 @@ struct FileFacts {
   std::wstring path;   // absolute
   std::wstring named;  // as on the command line; not in the document
   std::wstring name;
-  std::wstring kind;  // the extension in lower case
+  std::wstring kind;  // the file-name extension in lower case, without the dot
   std::uint64_t bytes = 0;
   OptionalText modified;  // when it was last written, in UTC: 2026-11-21T15:22:03Z
   Verdict verdict = Verdict::kGood;
-  OptionalText problem;  // one sentence for every file that is not good
-  OptionalText advice;   // what to do about the problem, in one sentence
-  OptionalText remark;   // one more sentence about a file, good or not
-  OptionalText shell;    // one sentence on what Windows itself shows, if it was asked
+  OptionalText problem;  // a sentence for every file that is not good
+  OptionalText advice;   // a sentence about what to do
+  OptionalText remark;   // something else to know about the file, good or not
+  OptionalText shell;    // what Windows itself shows, if it was asked
 
   // From the property sets and the tip; 0 or empty if they are missing.
   std::int32_t width = 0;
@@ -117,7 +117,7 @@ struct FileFacts {
 
   std::vector<HeaderFact> header;
   Thumbnail thumbnail;
-  std::vector<std::uint8_t> png;  // the thumbnail's file; not in the document
+  std::vector<std::uint8_t> png;  // the thumbnail; not in the document
   TipAnswer tip;
   ListAnswer<Column> columns;
   ListAnswer<Property> propertySets;

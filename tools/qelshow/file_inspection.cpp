@@ -13,7 +13,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-/// Fills the size and the date of the file, if it can be found.
+/// Fills the size and the date of the file, if it exists.
 void FillSizeAndDate(const std::wstring& path, FileFacts& facts) {
   WIN32_FILE_ATTRIBUTE_DATA data{};
   SYSTEMTIME time{};
@@ -30,12 +30,12 @@ std::wstring Square(std::int32_t size) {
   return std::to_wstring(size) + L" x " + std::to_wstring(size);
 }
 
-/// Fills `answer`. If the process ends instead, that is the answer's problem.
+/// Fills `answer`. If the process crashes instead, the answer's problem says so.
 template <class Answer>
 void Fill(Worker& worker, Subject subject, const std::wstring& path, const wchar_t* what, Answer& answer) {
   if (const auto end = worker.Ask({subject, path}, answer)) {
     answer.problem =
-        std::wstring(L"A request for ") + what + L" ends the process with " + ProcessEndText(*end) + L".";
+        std::wstring(L"The extension crashed when asked for ") + what + L": " + ProcessEndText(*end) + L".";
   }
 }
 
@@ -56,10 +56,11 @@ std::wstring PixelType(const std::wstring& tip) {
 }
 
 constexpr const wchar_t* kReport =
-    L"Please report this to the authors of QelShellExt, with the file if you can.";
+    L"Please report this to the developers of QelShellExt, with the file if possible.";
 
-/// Returns whether a request for the thumbnail ends the process, as the frame is in colour and too small.
-bool IsSmallColourPicture(const FileFacts& facts, std::int32_t size) {
+/// Returns whether the request crashes the process because the frame is in colour and smaller than the
+/// request.
+bool IsSmallColourFrame(const FileFacts& facts, std::int32_t size) {
   return facts.type.starts_with(L"24 bit") && facts.width < size && facts.height < size;
 }
 
@@ -70,14 +71,14 @@ void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, 
   facts.thumbnail.request = size;
   facts.png = std::move(answer.png);
   if (!end) return;
-  if (IsSmallColourPicture(facts, size)) {
-    facts.thumbnail.problem = L"The picture is in colour and smaller than the requested thumbnail of " +
-                              Square(size) + L" pixels; such a request ends its process with " +
+  if (IsSmallColourFrame(facts, size)) {
+    facts.thumbnail.problem = L"The frame is in colour and smaller than the requested thumbnail (" +
+                              Square(size) + L" pixels), and the extension crashes on such a request: " +
                               ProcessEndText(*end) + L".";
-    facts.advice = L"View it with smaller icons, or save it as a larger picture.";
+    facts.advice = L"View it with smaller icons.";
   } else {
-    facts.thumbnail.problem = L"A request for a thumbnail of " + Square(size) +
-                              L" pixels ends the process with " + ProcessEndText(*end) + L".";
+    facts.thumbnail.problem = L"The extension crashed when asked for a thumbnail of " + Square(size) +
+                              L" pixels: " + ProcessEndText(*end) + L".";
   }
 }
 
@@ -96,7 +97,8 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
 
   Diagnosis diagnosis;
   if (const auto end = worker.Ask({Subject::kDiagnosis, absolute}, diagnosis)) {
-    diagnosis = {Verdict::kDamaged, L"Reading the file ends the process with " + ProcessEndText(*end) + L".",
+    diagnosis = {Verdict::kNoThumbnail,
+                 L"qelshow's worker process crashed while it read the file: " + ProcessEndText(*end) + L".",
                  kReport};
   }
   facts.verdict = diagnosis.verdict;
@@ -125,15 +127,14 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
     facts.problem.clear();
     facts.advice.clear();
   } else if (facts.verdict == Verdict::kGood) {
-    facts.verdict = Verdict::kDamaged;
+    facts.verdict = Verdict::kNoThumbnail;
     facts.problem = facts.thumbnail.problem;
     if (facts.advice.empty()) facts.advice = kReport;
   }
   if (absolute.size() >= MAX_PATH) {
-    facts.remark =
-        L"Its path has " + std::to_wstring(absolute.size()) +
-        L" characters; from 260 characters on, Windows shows no columns: move the file or shorten a "
-        L"name.";
+    facts.remark = L"The path has " + std::to_wstring(absolute.size()) +
+                   L" characters, and Windows shows no columns for paths of 260 characters or more: move the "
+                   L"file or shorten a name.";
   }
   return facts;
 }

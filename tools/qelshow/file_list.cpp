@@ -24,13 +24,13 @@ namespace fs = std::filesystem;
 void AddFolder(const fs::path& folder, std::vector<ListedFile>& files) {
   const std::size_t first = files.size();
   std::error_code error;
-  // A folder of the command line must be readable. A subfolder that is not is skipped.
+  // A folder named on the command line must be readable. An unreadable subfolder is skipped.
   const fs::directory_iterator named(folder, error);
   fs::recursive_directory_iterator entry;
   if (!error) entry = {folder, fs::directory_options::skip_permission_denied, error};
   for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {
     if (!IsSupported(entry->path().wstring())) continue;
-    // An entry whose name cannot be represented cannot be examined. It is listed, so that it is reported.
+    // An entry whose name Windows does not allow cannot be examined. It is listed, so that it is reported.
     std::error_code unknown;
     if (!entry->is_regular_file(unknown) && !unknown) continue;
     files.push_back({entry->path().wstring(), {}});
@@ -70,7 +70,7 @@ std::wstring FolderOfAll(const std::vector<std::wstring>& paths) {
   return shared.value_or(L"");
 }
 
-/// Throws the Failure for paths among which, and in which, no file can be shown.
+/// Throws the Failure for paths that lead to no file that can be shown.
 [[noreturn]] void NothingToShow(const std::vector<std::wstring>& paths) {
   const auto isMissing = [](const std::wstring& path) {
     return GetFileAttributesW(path.c_str()) == INVALID_FILE_ATTRIBUTES;
@@ -82,8 +82,10 @@ std::wstring FolderOfAll(const std::vector<std::wstring>& paths) {
   }
   const std::wstring& first = paths.front();
   std::error_code ignored;
-  throw Failure(L"\"" + first + (fs::is_directory(first, ignored) ? L"\" contains no " : L"\" is not a ") +
-                    SupportedExtensions(L"or") + L" file.",
+  const bool isFolder = fs::is_directory(first, ignored);
+  throw Failure(L"\"" + first +
+                    (isFolder ? L"\" contains no supported files (" : L"\" is not a supported file (") +
+                    SupportedExtensions(L"or") + L").",
                 static_cast<int>(Verdict::kUnsupported));
 }
 

@@ -19,69 +19,69 @@ bool FileExists(const std::wstring& path) {
   return !path.empty() && GetFileAttributesW(path.c_str()) != INVALID_FILE_ATTRIBUTES;
 }
 
-/// Returns the command that registers the extension, with the registered DLL or else with the one beside this
-/// program. If Windows Installer has installed the extension, it must also repair it: regsvr32 would register
-/// the kinds that were left out too, and the installer would not remove those.
+/// Returns advice with the command that registers the extension: the registered DLL, or else the DLL in this
+/// program's folder. What Windows Installer has installed, it must also repair: regsvr32 would register the
+/// kinds that were left out too, and the installer would not remove those.
 std::wstring RegisterAdvice(const std::wstring& registeredDll) {
   const std::wstring product = InstalledProduct();
   if (!product.empty()) return L"run msiexec /i " + product + L" REINSTALL=ALL as administrator";
   std::wstring dll = registeredDll;
   if (!FileExists(dll)) dll = std::filesystem::path(OwnPath()).replace_filename(L"QelShellExt.dll").wstring();
   return FileExists(dll) ? L"run regsvr32 \"" + dll + L"\" as administrator"
-                         : L"run regsvr32 with the path of QelShellExt.dll as administrator, or install "
-                           L"QelShellExt again";
+                         : L"run regsvr32 with the path of QelShellExt.dll as administrator, or reinstall "
+                           L"QelShellExt";
 }
 
-/// Returns the command that registers a file kind that was left out. The installer names a kind by its
-/// extension without the dot.
+/// Returns advice with the command that registers a file kind that was left out. The installer's name for a
+/// kind is its file-name extension without the dot.
 std::wstring AddAdvice(const std::wstring& extension, const std::wstring& registeredDll) {
   const std::wstring product = InstalledProduct();
   if (product.empty()) return RegisterAdvice(registeredDll);
   return L"run msiexec /i " + product + L" ADDLOCAL=" + extension.substr(1) + L" as administrator";
 }
 
-constexpr const wchar_t* kReinstall = L" Install QelShellExt again.";
+constexpr const wchar_t* kReinstall = L" Reinstall QelShellExt.";
 
 /// Worker processes, by the path of the DLL that they have loaded.
 using Workers = std::map<std::wstring, Worker>;
 
-/// Loads the DLL and creates an object, both in a worker process, because either may end the process.
+/// Loads the DLL and creates an object, both in a worker process, because either may crash.
 void ExamineObject(ExaminedClass& examined, Workers& workers) {
   const std::wstring& dll = examined.registered.dll;
-  examined.condition = Condition::kDllNotLoaded;
+  examined.status = Status::kDllNotLoaded;
   try {
     Worker& worker = workers.try_emplace(dll, dll).first->second;
-    examined.condition = Condition::kNoObject;
+    examined.status = Status::kObjectNotCreated;
     if (const auto end = worker.Ask({Subject::kCreation, GuidText(examined.clsid)}, examined.problem)) {
-      examined.problem = L"The DLL \"" + dll + L"\" ends the process when it creates an object of the " +
-                         examined.name + L", with " + ProcessEndText(*end) + L".";
+      examined.problem = L"The DLL \"" + dll + L"\" crashes when it creates the " + examined.name +
+                         L" object: " + ProcessEndText(*end) + L".";
     }
   } catch (const Failure& failure) {
     examined.problem = failure.sentence;
   }
   if (examined.problem.empty()) {
-    examined.condition = Condition::kWorks;
+    examined.status = Status::kWorks;
   } else {
     examined.problem += kReinstall;
   }
 }
 
-/// Finds what prevents the shell from using a class that works in other programs.
+/// Finds what prevents the shell from using a class that other programs can use.
 void ExamineUse(ExaminedClass& examined, const std::wstring& id) {
   const RegisteredClass& registered = examined.registered;
-  const std::wstring subject = L"The class of the " + examined.name;
+  const std::wstring subject = L"The " + examined.name;
   if (!registered.blocked.empty()) {
-    examined.condition = Condition::kBlocked;
-    examined.problem = subject + L" is disabled in the shell: remove the value " + id + L" from " +
-                       registered.blocked + L".";
+    examined.status = Status::kBlocked;
+    examined.problem = subject + L" is in Windows' list of blocked shell extensions: delete the value " + id +
+                       L" from " + registered.blocked + L".";
   } else if (registered.isUnapproved) {
-    examined.condition = Condition::kUnapproved;
+    examined.status = Status::kUnapproved;
     examined.problem = subject + L", " + id +
-                       L", is not in the list of approved extensions, which a policy enforces: " +
+                       L", is not in the list of approved shell extensions, and a policy allows no others: " +
                        RegisterAdvice(registered.dll) + L".";
   } else if (!SameIgnoringCase(registered.threadingModel, L"Apartment") &&
              !SameIgnoringCase(registered.threadingModel, L"Both")) {
-    examined.condition = Condition::kThreading;
+    examined.status = Status::kThreading;
     examined.problem = subject + L" is registered with the ThreadingModel \"" + registered.threadingModel +
                        L"\" instead of \"Apartment\" or \"Both\": " + RegisterAdvice(registered.dll) + L".";
   }
@@ -95,21 +95,21 @@ ExaminedClass ExamineClass(const wchar_t* name, const CLSID& clsid, Workers& wor
   examined.registered = ReadClass(id);
   const std::wstring& dll = examined.registered.dll;
   if (dll.empty()) {
-    examined.condition = Condition::kNotRegistered;
+    examined.status = Status::kNotRegistered;
     examined.problem =
-        L"The class of the " + examined.name + L", " + id +
-        (examined.registered.exists ? L", is registered without its DLL: " : L", is not registered: ") +
+        L"The " + examined.name + L", " + id +
+        (examined.registered.exists ? L", is registered, but without a DLL: " : L", is not registered: ") +
         RegisterAdvice({}) + L".";
   } else if (!FileExists(dll)) {
     const std::wstring reason = SystemErrorText(GetLastError());
-    examined.condition = Condition::kDllNotFound;
-    examined.problem = L"The registered DLL \"" + dll + L"\" is not found (" + reason +
+    examined.status = Status::kDllNotFound;
+    examined.problem = L"The registered DLL \"" + dll + L"\" cannot be found (" + reason +
                        L"): put it back, or " + RegisterAdvice({}) + L".";
   } else {
     examined.version = FileVersion(dll);
     ExamineObject(examined, workers);
   }
-  if (examined.condition == Condition::kWorks) ExamineUse(examined, id);
+  if (examined.status == Status::kWorks) ExamineUse(examined, id);
   return examined;
 }
 
@@ -117,17 +117,17 @@ const ExaminedClass& FindClass(const std::vector<ExaminedClass>& classes, const 
   return *std::ranges::find(classes, clsid, &ExaminedClass::clsid);
 }
 
-/// Returns the condition of a handler, which is that of its class if the class is the extension's.
-Condition ConditionOf(const Handler& handler, const std::vector<ExaminedClass>& classes) {
-  if (handler.registered.empty()) return Condition::kNotRegistered;
-  if (!SameIgnoringCase(handler.registered, GuidText(handler.expected))) return Condition::kForeign;
-  return FindClass(classes, handler.expected).condition;
+/// Returns the status of a handler, which is that of its class if the class is the extension's.
+Status StatusOf(const Handler& handler, const std::vector<ExaminedClass>& classes) {
+  if (handler.registered.empty()) return Status::kNotRegistered;
+  if (!SameIgnoringCase(handler.registered, GuidText(handler.expected))) return Status::kForeign;
+  return FindClass(classes, handler.expected).status;
 }
 
-/// Returns a description of another program's class from its registry entries.
+/// Describes another program's class by its registry entries.
 std::wstring ForeignClassText(const std::wstring& clsid) {
   const RegisteredClass foreign = ReadClass(clsid);
-  std::wstring text = L"another program's class, " + clsid;
+  std::wstring text = L"class " + clsid;
   if (!foreign.title.empty()) text += L" (" + foreign.title + L")";
   if (!foreign.dll.empty()) text += L" in \"" + foreign.dll + L"\"";
   return text;
@@ -135,24 +135,26 @@ std::wstring ForeignClassText(const std::wstring& clsid) {
 
 std::wstring ForeignHandlerProblem(const std::wstring& extension, const Handler& handler,
                                    const std::wstring& advice) {
-  const std::wstring text = L"The " + handler.role + L" of " + extension + L" files comes from " +
-                            ForeignClassText(handler.registered) + L", registered in " + handler.key;
+  const std::wstring text = L"Another program provides the " + handler.role + L" of " + extension +
+                            L" files: " + ForeignClassText(handler.registered) + L", registered in " +
+                            handler.key;
   return handler.isOwnKey
-             ? text + L". To get it from QelShellExt, " + advice + L"."
+             ? text + L". To use QelShellExt instead, " + advice + L"."
              : text +
-                   L", which takes precedence over QelShellExt. To get it from QelShellExt, remove "
-                   L"that key, or assign " +
-                   extension + L" files to another program.";
+                   L", which takes precedence over QelShellExt. To use QelShellExt instead, delete this key "
+                   L"or, if it belongs to the default program for " +
+                   extension + L" files, choose another default program.";
 }
 
 std::wstring MissingHandlersProblem(const ExaminedKind& kind, const std::wstring& advice) {
   std::wstring roles;
   for (const ExaminedHandler& handler : kind.handlers) {
-    if (handler.condition != Condition::kNotRegistered || !handler.registered.registered.empty()) continue;
+    if (handler.status != Status::kNotRegistered || !handler.registered.registered.empty()) continue;
     roles += (roles.empty() ? L"" : L", ") + handler.registered.role;
   }
   if (roles.empty()) return {};
-  return L"No handler is registered for " + kind.extension + L" files (" + roles + L"): " + advice + L".";
+  return L"The registration for " + kind.extension + L" files is incomplete (missing: " + roles + L"): " +
+         advice + L".";
 }
 
 /// Returns whether nothing of the extension is registered for this kind: it has no handler of the extension,
@@ -165,26 +167,26 @@ bool HasNothing(const ExaminedKind& kind, const std::vector<ExaminedClass>& clas
   });
 }
 
-/// Finds the file kinds that were left out: the extension is registered, but nothing of it for these kinds.
+/// Finds the file kinds that were left out: the extension is registered, but not for these kinds.
 void FindLeftOut(Installation& installation) {
   const ExaminedClass& extension = FindClass(installation.classes, CLSID_QelShellExt);
   const auto hasNothing = [&](const ExaminedKind& kind) { return HasNothing(kind, installation.classes); };
   if (!extension.registered.exists || std::ranges::all_of(installation.kinds, hasNothing)) return;
   for (ExaminedKind& kind : installation.kinds) {
     if (!hasNothing(kind)) continue;
-    std::wstring text = L"QelShellExt is not registered for " + kind.extension + L" files";
-    for (const auto& [handler, condition] : kind.handlers) {
-      if (condition != Condition::kForeign) continue;
-      text += L", whose " + handler.role + L" comes from " + ForeignClassText(handler.registered);
+    std::wstring text = L"QelShellExt is not registered for " + kind.extension + L" files.";
+    for (const auto& [handler, status] : kind.handlers) {
+      if (status != Status::kForeign) continue;
+      text += L" Another program provides their " + handler.role + L": " +
+              ForeignClassText(handler.registered) + L".";
       break;
     }
-    kind.leftOut =
-        text + L". To have it show them, " + AddAdvice(kind.extension, extension.registered.dll) + L".";
+    kind.leftOut = text + L" To register it, " + AddAdvice(kind.extension, extension.registered.dll) + L".";
   }
 }
 
 std::vector<std::wstring> FindProblems(const Installation& installation) {
-  const auto isMissing = [](const auto& examined) { return examined.condition == Condition::kNotRegistered; };
+  const auto isMissing = [](const auto& examined) { return examined.status == Status::kNotRegistered; };
   const auto isBare = [&](const ExaminedKind& kind) { return std::ranges::all_of(kind.handlers, isMissing); };
   const auto& classes = installation.classes;
   const std::wstring advice = RegisterAdvice(classes.front().registered.dll);
@@ -209,8 +211,8 @@ std::vector<std::wstring> FindProblems(const Installation& installation) {
   for (const ExaminedKind& kind : installation.kinds) {
     if (!kind.leftOut.empty()) continue;
     add(MissingHandlersProblem(kind, advice));
-    for (const auto& [handler, condition] : kind.handlers) {
-      if (condition == Condition::kForeign) add(ForeignHandlerProblem(kind.extension, handler, advice));
+    for (const auto& [handler, status] : kind.handlers) {
+      if (status == Status::kForeign) add(ForeignHandlerProblem(kind.extension, handler, advice));
     }
   }
   return problems;
@@ -218,17 +220,17 @@ std::vector<std::wstring> FindProblems(const Installation& installation) {
 
 }  // namespace
 
-std::wstring ConditionText(Condition condition) {
-  switch (condition) {
-    case Condition::kWorks: return L"works";
-    case Condition::kNotRegistered: return L"not registered";
-    case Condition::kForeign: return L"another program";
-    case Condition::kDllNotFound: return L"DLL not found";
-    case Condition::kDllNotLoaded: return L"DLL not loaded";
-    case Condition::kNoObject: return L"no object";
-    case Condition::kBlocked: return L"disabled";
-    case Condition::kUnapproved: return L"not approved";
-    case Condition::kThreading: return L"wrong threads";
+std::wstring StatusText(Status status) {
+  switch (status) {
+    case Status::kWorks: return L"works";
+    case Status::kNotRegistered: return L"not registered";
+    case Status::kForeign: return L"another program";
+    case Status::kDllNotFound: return L"DLL not found";
+    case Status::kDllNotLoaded: return L"DLL not loaded";
+    case Status::kObjectNotCreated: return L"object not created";
+    case Status::kBlocked: return L"blocked";
+    case Status::kUnapproved: return L"not approved";
+    case Status::kThreading: return L"wrong ThreadingModel";
   }
   return {};
 }
@@ -243,7 +245,7 @@ Installation ExamineInstallation() {
   for (const KindOfFile& kind : ReadHandlers()) {
     ExaminedKind examined{kind.extension, {}, {}};
     for (const Handler& handler : kind.handlers) {
-      examined.handlers.push_back({handler, ConditionOf(handler, installation.classes)});
+      examined.handlers.push_back({handler, StatusOf(handler, installation.classes)});
     }
     installation.kinds.push_back(std::move(examined));
   }

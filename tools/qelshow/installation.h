@@ -1,5 +1,5 @@
-// Examines how the extension is installed on this computer. It follows each path by which the shell reaches
-// the extension, from a file kind to its handler, the class, the DLL and an object of the class, and judges
+// Examines how the extension is installed on this computer. It follows the path by which the shell reaches
+// the extension, from a file kind to its handler, the class, the DLL and an object of the class, and checks
 // each step. The doctor shows the result.
 #pragma once
 
@@ -13,21 +13,21 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// How far the shell gets on such a path.
-enum class Condition {
+/// How far the shell gets on this path.
+enum class Status {
   kWorks,
   kNotRegistered,
   kForeign,
   kDllNotFound,
   kDllNotLoaded,
-  kNoObject,
+  kObjectNotCreated,
   kBlocked,
   kUnapproved,
   kThreading
 };
 
-/// Returns a few words for tables and JSON.
-std::wstring ConditionText(Condition condition);
+/// Returns the status in a few words, for tables and JSON.
+std::wstring StatusText(Status status);
 
 /// One of the extension's classes.
 struct ExaminedClass {
@@ -35,27 +35,27 @@ struct ExaminedClass {
   CLSID clsid{};
   RegisteredClass registered;
   OptionalText version;  // of the DLL
-  Condition condition = Condition::kWorks;
+  Status status = Status::kWorks;
   OptionalText problem;  // a sentence for the user
 };
 
 struct ExaminedHandler {
   Handler registered;
-  Condition condition = Condition::kWorks;
+  Status status = Status::kWorks;
 };
 
 struct ExaminedKind {
   std::wstring extension;
   std::vector<ExaminedHandler> handlers;
-  // A sentence for the user if nothing of the extension is registered for this kind, because the installation
-  // has left it to other programs. This is not a problem.
+  // Text for the user if the extension is registered, but not for this kind, because it was left out of the
+  // installation; otherwise empty. This is not a problem.
   OptionalText leftOut;
 };
 
 struct Installation {
   std::vector<ExaminedClass> classes;
   std::vector<ExaminedKind> kinds;
-  std::vector<std::wstring> problems;  // a sentence for each fault, with what to do about it
+  std::vector<std::wstring> problems;  // each says what is wrong and what to do
 };
 
 /// Examines the installation. It loads the DLL only in other processes.

@@ -40,9 +40,9 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 using Json = nlohmann::json;
 
-/// The version of the documents. It changes when a member is renamed, removed or given another meaning; a new
-/// member does not change it.
-inline constexpr int kJsonSchema = 2;
+/// The version of the documents. It changes when a member is renamed or removed, or when the meaning or the
+/// fixed values of a member change; a new member does not change it.
+inline constexpr int kJsonSchema = 3;
 
 inline void to_json(Json& json, const OptionalText& text) {
   if (!text.empty()) json = Utf8(text);
@@ -55,7 +55,7 @@ inline void from_json(const Json& json, OptionalText& text) {
 NLOHMANN_JSON_SERIALIZE_ENUM(Verdict, {{Verdict::kGood, "good"},
                                        {Verdict::kFailed, "failed"},
                                        {Verdict::kUnsupported, "unsupported"},
-                                       {Verdict::kDamaged, "damaged"}})
+                                       {Verdict::kNoThumbnail, "no thumbnail"}})
 
 template <class Item>
 void to_json(Json& json, const ListAnswer<Item>& answer) {
@@ -71,10 +71,10 @@ void from_json(const Json& json, ListAnswer<Item>& answer) {
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(HeaderFact, name, value, unit)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Diagnosis, verdict, problem, advice, header)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(TipAnswer, text, problem)
-NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, state, declared, delivered,
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Column, index, title, set, id, characters, state, declared, returned,
                                    value, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Property, name, set, id, type, value, problem)
-NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, picture, problem)
+NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(Thumbnail, request, width, height, bitsPerPixel, file, problem)
 NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(FileFacts, path, name, kind, bytes, modified, verdict, problem, advice,
                                    remark, shell, width, height, frames, bitDepth, type, header, thumbnail,
                                    tip, columns, propertySets, propertyStore)

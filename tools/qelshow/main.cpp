@@ -1,4 +1,4 @@
-// qelshow: shows what the extension gives the shell.
+// qelshow: shows what Windows gets from the extension for a file.
 #include <exception>
 #include <string>
 #include <vector>
@@ -41,7 +41,7 @@ int Main(const std::vector<std::wstring>& arguments) {
 }  // namespace
 }  // namespace Qel::Lumetra::ShellExt::Show
 
-/// Makes the C runtime of mingw-w64 replace patterns on the command line by the files that they match. The
+/// Makes the C runtime of mingw-w64 replace patterns on the command line with the files that they match. The
 /// command interpreters of Windows leave this to the programs.
 int _dowildcard = -1;
 

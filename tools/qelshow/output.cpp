@@ -32,7 +32,7 @@ bool IsFolder(const std::wstring& path) {
   return fs::is_directory(path, ignored);
 }
 
-/// Identifies a file, whatever path leads to it.
+/// Identifies a file, whichever path is used for it.
 struct Identity {
   DWORD volume;
   DWORD high;
@@ -59,11 +59,11 @@ std::string Beginning(const std::wstring& path, std::size_t count) {
 }
 
 constexpr const wchar_t* kForeign =
-    L"was not written by this version of qelshow and is not replaced: delete it, or choose another --out.";
+    L"was not written by qelshow and is not replaced: delete it, or choose another name with --out.";
 
-void RefuseImageExtension(const std::wstring& path) {
+void RefuseSupportedExtension(const std::wstring& path) {
   if (IsSupported(path))
-    Refuse(path, L"has the extension of an image file, which qelshow does not write: choose another --out.");
+    Refuse(path, L"has the file-name extension of a microscopy file: choose another name with --out.");
 }
 
 bool IsOwnPng(const std::wstring& path) {
@@ -72,29 +72,29 @@ bool IsOwnPng(const std::wstring& path) {
 
 }  // namespace
 
-void CheckPictureOutput(const std::wstring& path, const std::wstring& input) {
+void CheckPngOutput(const std::wstring& path, const std::wstring& input) {
   const std::optional<Identity> existing = IdentityOf(path);
   if (existing && existing == IdentityOf(input))
-    Refuse(path, L"is the file to read and is not replaced: choose another --out.");
-  if (IsFolder(path)) Refuse(path, L"is a folder; --out names the file to write.");
-  RefuseImageExtension(path);
+    Refuse(path, L"is the input file and is not replaced: choose another name with --out.");
+  if (IsFolder(path)) Refuse(path, L"is a folder: name a file with --out.");
+  RefuseSupportedExtension(path);
   if (Exists(path) && !IsOwnPng(path)) Refuse(path, kForeign);
 }
 
 void CheckPageOutput(const std::wstring& folder, std::size_t files) {
   if (!IsFolder(folder)) {
-    RefuseImageExtension(folder);
-    if (Exists(folder)) Refuse(folder, L"is a file; --out names the folder of the page.");
+    RefuseSupportedExtension(folder);
+    if (Exists(folder)) Refuse(folder, L"is a file: name a folder with --out.");
   }
   const std::wstring page = PagePath(folder);
   if (Exists(page) && !IsMarkedPage(Beginning(page, kMarkedPageBytes))) Refuse(page, kForeign);
   for (std::size_t i = 1; i <= files; ++i) {
-    const std::wstring picture = PicturePath(folder, i);
-    if (Exists(picture) && !IsOwnPng(picture)) Refuse(picture, kForeign);
+    const std::wstring thumbnail = ThumbnailPath(folder, i);
+    if (Exists(thumbnail) && !IsOwnPng(thumbnail)) Refuse(thumbnail, kForeign);
   }
 }
 
-bool IsPictureOfPage(const std::wstring& path) {
+bool IsThumbnailOfPage(const std::wstring& path) {
   const fs::path name = fs::path(path).filename();
   return name.extension() == L".png" && std::ranges::all_of(name.stem().wstring(), std::iswdigit) &&
          IsOwnPng(path);

@@ -17,9 +17,9 @@ namespace fs = std::filesystem;
 /// The placeholder of the JSON document in the template.
 constexpr std::string_view kPlaceOfFiles = "@FILES@";
 
-constexpr const wchar_t* kPicturesFolder = L"pictures";
+constexpr const wchar_t* kThumbnailsFolder = L"thumbnails";
 
-/// Returns the JSON for a script element of the page. It must not contain '<', which could end the element.
+/// Returns JSON for a script element of the page. It must not contain '<', which could end the element.
 std::string InScript(std::string json) {
   for (std::size_t i = 0; (i = json.find('<', i)) != std::string::npos;) json.replace(i, 1, "\\u003c");
   return json;
@@ -38,11 +38,11 @@ void MakeFolder(const std::wstring& path) {
   if (error) CannotWrite(path, error);
 }
 
-std::wstring PictureName(std::size_t number) {
+std::wstring ThumbnailName(std::size_t number) {
   return std::to_wstring(number) + L".png";
 }
 
-/// Returns a path in the folder at which nothing exists.
+/// Returns the path of a folder that does not exist yet, in `folder`.
 std::wstring UnusedFolder(const std::wstring& folder) {
   for (int i = 1;; ++i) {
     std::wstring path = folder + L"\\unfinished-" + std::to_wstring(i);
@@ -60,13 +60,13 @@ std::wstring PagePath(const std::wstring& folder) {
   return folder + L"\\index.html";
 }
 
-std::wstring PicturePath(const std::wstring& folder, std::size_t number) {
-  return folder + L"\\" + kPicturesFolder + L"\\" + PictureName(number);
+std::wstring ThumbnailPath(const std::wstring& folder, std::size_t number) {
+  return folder + L"\\" + kThumbnailsFolder + L"\\" + ThumbnailName(number);
 }
 
 PageWriter::PageWriter(const std::wstring& folder, const std::wstring& shownFolder)
     : folder_(fs::path(folder).make_preferred().wstring()), unfinished_(UnusedFolder(folder_)) {
-  MakeFolder(folder_ + L"\\" + kPicturesFolder);
+  MakeFolder(folder_ + L"\\" + kThumbnailsFolder);
   MakeFolder(unfinished_);
   file_ = CreateNewFile(PagePath(unfinished_));
   const std::string_view page = Template();
@@ -88,10 +88,10 @@ void PageWriter::Add(const FileFacts& facts) {
   ++count_;
   Json record = facts;
   if (!facts.png.empty()) {
-    const std::wstring name = PictureName(count_);
+    const std::wstring name = ThumbnailName(count_);
     WriteNewFile(unfinished_ + L"\\" + name, facts.png);
-    record["thumbnail"]["picture"] = std::wstring(kPicturesFolder) + L"/" + name;
-    pictures_.insert(name);
+    record["thumbnail"]["file"] = std::wstring(kThumbnailsFolder) + L"/" + name;
+    thumbnails_.insert(name);
   }
   Write((count_ > 1 ? ",\n" : "\n") + InScript(record.dump()));
 }
@@ -100,14 +100,14 @@ void PageWriter::Finish() {
   Write("\n]}");
   Write(templateEnd_);
   file_.Reset();
-  const std::wstring pictures = folder_ + L"\\" + kPicturesFolder + L"\\";
-  for (const std::wstring& name : pictures_) MoveInto(unfinished_ + L"\\" + name, pictures + name);
+  const std::wstring thumbnails = folder_ + L"\\" + kThumbnailsFolder + L"\\";
+  for (const std::wstring& name : thumbnails_) MoveInto(unfinished_ + L"\\" + name, thumbnails + name);
   MoveInto(PagePath(unfinished_), PagePath(folder_));
-  // Removes the pictures that only the earlier page had.
+  // Removes the thumbnails that only the earlier page had.
   std::error_code error;
-  for (const fs::directory_entry& entry : fs::directory_iterator(pictures, error)) {
+  for (const fs::directory_entry& entry : fs::directory_iterator(thumbnails, error)) {
     const std::wstring path = entry.path().wstring();
-    if (!pictures_.contains(entry.path().filename().wstring()) && IsPictureOfPage(path))
+    if (!thumbnails_.contains(entry.path().filename().wstring()) && IsThumbnailOfPage(path))
       DeleteFileW(path.c_str());
   }
 }

@@ -1,8 +1,8 @@
-// Writes a page of files: index.html and one PNG file for every thumbnail, in one folder.
+// Writes the page of files: index.html and a PNG file for each thumbnail, in one folder.
 //
-// The page consists of the template page.html, a resource of the program, and the JSON reports of the files,
-// which the page's script displays. Each file is written as it comes, so that the memory in use does not
-// depend on their number.
+// The page consists of the template page.html, a resource of the program, and the facts about the files as
+// JSON, which the page's script displays. Each file is written as soon as it is added, so that the memory in
+// use does not depend on their number.
 #pragma once
 
 #include <windows.h>
@@ -20,7 +20,7 @@ namespace Qel::Lumetra::ShellExt::Show {
 
 /// Return the paths of a page's files in this folder.
 std::wstring PagePath(const std::wstring& folder);
-std::wstring PicturePath(const std::wstring& folder, std::size_t number);
+std::wstring ThumbnailPath(const std::wstring& folder, std::size_t number);
 
 /// Returns whether a file that begins with these bytes is a page of this program. kMarkedPageBytes bytes are
 /// enough.
@@ -38,7 +38,7 @@ class PageWriter {
 
   void Add(const FileFacts& facts);
 
-  /// Moves the page with its pictures into the folder, where it replaces an earlier one. Without this call
+  /// Moves the page with its thumbnails into the folder, where it replaces an earlier one. Without this call
   /// nothing in the folder changes.
   void Finish();
 
@@ -51,9 +51,9 @@ class PageWriter {
   std::wstring folder_;
   std::wstring unfinished_;  // the folder of the new page until it is complete
   Com::OwnedHandle file_;
-  std::string_view templateEnd_;  // the part after the files
+  std::string_view templateEnd_;  // the part of the template after the JSON
   std::size_t count_ = 0;
-  std::set<std::wstring> pictures_;  // file names
+  std::set<std::wstring> thumbnails_;  // file names
 };
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,4 +1,4 @@
-// Makes PNG files with the imaging component of Windows (WIC).
+// Encodes PNG files with the imaging component of Windows (WIC).
 #pragma once
 
 #include <windows.h>
@@ -10,9 +10,9 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Stores the PNG file of a bitmap in `png`, with this program's name as its software. `bitmap` must be a
-/// top-down DIB section of 8-bit grey or 24-bit colour pixels; the caller keeps it. COM must be initialised.
-/// Returns a failure of the imaging component; then `png` is empty.
+/// Encodes a bitmap as a PNG file in `png`, with this program's name in its "Software" text. `bitmap` must be
+/// a top-down DIB section of 8-bit grey or 24-bit colour pixels; the caller keeps it. COM must be
+/// initialised. Returns a failure of the imaging component; then `png` is empty.
 HRESULT EncodePng(HBITMAP bitmap, std::vector<std::uint8_t>& png);
 
 /// Returns whether a file that begins with these bytes was made by EncodePng. kMarkedPngBytes bytes are

@@ -6,7 +6,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Whether the DLL can be loaded, the answers about a file, what the shell shows of it, and whether objects
+/// Whether the DLL can be loaded, the answers about a file, what the shell shows for it, and whether objects
 /// of a registered class can be created.
 enum class Subject : std::int32_t {
   kLoading,

@@ -21,8 +21,8 @@ struct ShellHandler {
 
 constexpr ShellHandler kShellHandlers[] = {
     {L"thumbnail", L"{BB2E617C-0920-11D1-9A0B-00C04FC2D6C1}", L"{E357FCCD-A995-4576-B01F-234630154E96}"},
-    {L"info tip", L"{00021500-0000-0000-C000-000000000046}", nullptr},
-    {L"properties", L"PropertyHandler", nullptr},
+    {L"tip", L"{00021500-0000-0000-C000-000000000046}", nullptr},
+    {L"property sets", L"PropertyHandler", nullptr},
 };
 
 constexpr std::size_t kMaxKeyCharacters = 255;  // the limit of Windows for the name of a key
@@ -30,13 +30,13 @@ constexpr std::size_t kMaxKeyCharacters = 255;  // the limit of Windows for the 
 constexpr const wchar_t* kPropertyHandlers =
     LR"(SOFTWARE\Microsoft\Windows\CurrentVersion\PropertySystem\PropertyHandlers\)";
 
-/// Returns the absolute path, but leaves a bare file name, which the system searches in its folders, and an
-/// empty string unchanged.
+/// Returns the absolute path. Returns an empty string unchanged, and a bare file name, which the system looks
+/// up in its folders.
 std::wstring FullPath(const std::wstring& path) {
   return path.find(L'\\') == std::wstring::npos ? path : AbsolutePath(path);
 }
 
-/// Returns the key by which an administrator, the user or a tool has disabled the class; an empty string if
+/// Returns the key in which an administrator, the user or a program has blocked the class; an empty string if
 /// there is none.
 std::wstring BlockingKey(const std::wstring& clsid) {
   constexpr const wchar_t* kBlocked =
@@ -46,8 +46,7 @@ std::wstring BlockingKey(const std::wstring& clsid) {
   return {};
 }
 
-/// Returns whether a policy prevents the shell from using the class because it is not in the list of approved
-/// ones.
+/// Returns whether a policy allows only approved classes and this class is not in the list of those.
 bool IsUnapproved(const std::wstring& clsid) {
   constexpr const wchar_t* kPolicies = LR"(Software\Microsoft\Windows\CurrentVersion\Policies\Explorer)";
   constexpr const wchar_t* kEnforced = L"EnforceShellExtensionSecurity";
@@ -60,9 +59,9 @@ bool IsUnapproved(const std::wstring& clsid) {
 }
 
 /// Returns the keys of HKEY_CLASSES_ROOT below which the shell looks for a handler, in the order of
-/// precedence: the key of the type that the user, or else a program, has assigned to the file-name extension,
+/// precedence: the key of the type that the user, or else a program, has chosen for the file-name extension,
 /// then the key of that extension.
-std::vector<std::wstring> PlacesOfHandlers(const std::wstring& extension) {
+std::vector<std::wstring> ParentsOfHandlers(const std::wstring& extension) {
   std::wstring type = TextValue(
       HKEY_CURRENT_USER,
       LR"(Software\Microsoft\Windows\CurrentVersion\Explorer\FileExts\)" + extension + L"\\UserChoice",
@@ -76,8 +75,8 @@ Handler ReadShellHandler(const std::wstring& extension, const ShellHandler& fact
   const std::wstring ownKey = extension + L"\\ShellEx\\" + facts.key;
   for (const wchar_t* const name : {facts.rival, facts.key}) {
     if (name == nullptr) continue;
-    for (const std::wstring& place : PlacesOfHandlers(extension)) {
-      const std::wstring key = place + L"\\ShellEx\\" + name;
+    for (const std::wstring& parent : ParentsOfHandlers(extension)) {
+      const std::wstring key = parent + L"\\ShellEx\\" + name;
       handler.registered = SpelledGuid(TextValue(HKEY_CLASSES_ROOT, key));
       handler.key = L"HKEY_CLASSES_ROOT\\" + key;
       handler.isOwnKey = key == ownKey;

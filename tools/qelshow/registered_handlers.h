@@ -1,5 +1,5 @@
-// Reads what the registry contains about the extension: the handlers of each file kind, and their classes. It
-// is read as the shell reads it; installation.h judges it.
+// Reads what the registry contains about the extension, as the shell does: the handlers of each file kind,
+// and their classes. installation.h evaluates it.
 #pragma once
 
 #include <windows.h>
@@ -11,12 +11,12 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// One of the registry entries that lead the shell from a file kind to a class.
+/// A registry entry that leads the shell from a file kind to a class.
 struct Handler {
   std::wstring role;        // for instance "thumbnail"
   CLSID expected{};         // the extension's class for it
   OptionalText registered;  // identifier of the class that the shell uses
-  std::wstring key;         // where it is registered; if nowhere, where the extension registers its own
+  std::wstring key;         // where it is registered, or would be by the extension
   bool isOwnKey = true;     // whether registering the extension writes this key
 };
 
@@ -25,7 +25,7 @@ struct KindOfFile {
   std::vector<Handler> handlers;
 };
 
-/// Returns every file kind with the handlers that the extension has for it.
+/// Returns every file kind with the handlers that the shell uses for it.
 std::vector<KindOfFile> ReadHandlers();
 
 /// A registered class. Strings are empty for what is not registered.
@@ -35,13 +35,13 @@ struct RegisteredClass {
   OptionalText dll;  // path
   std::wstring threadingModel;
   std::wstring blocked;       // the key, if any, that prevents the shell from using the class
-  bool isUnapproved = false;  // it is not in the list that a policy requires
+  bool isUnapproved = false;  // a policy allows only approved classes, and this is not one
 };
 
 RegisteredClass ReadClass(const std::wstring& clsid);
 
-/// Returns the product code under which Windows Installer has installed the extension, with its braces; an
-/// empty string if it has not.
+/// Returns the product code, in braces, under which Windows Installer has installed the extension; an empty
+/// string if it has not.
 std::wstring InstalledProduct();
 
 /// Returns the version of a program or DLL, for instance "1.0.0"; an empty string if it has none.

@@ -43,16 +43,16 @@ std::wstring ValueOrProblem(const Value& value, const std::wstring& problem) {
 
 std::wstring ColumnsText(const ListAnswer<Column>& columns) {
   std::vector<std::vector<std::wstring>> rows = {
-      {L"title", L"identifier", L"declared", L"delivered", L"value"}};
+      {L"title", L"property key", L"declared", L"returned", L"value"}};
   for (const Column& column : columns.items) {
     rows.push_back({column.title, column.set + L" " + std::to_wstring(column.id), column.declared,
-                    OrDash(column.delivered), ValueOrProblem(column.value, column.problem)});
+                    OrDash(column.returned), ValueOrProblem(column.value, column.problem)});
   }
   return Grid(rows);
 }
 
 std::wstring PropertiesText(const ListAnswer<Property>& properties) {
-  std::vector<std::vector<std::wstring>> rows = {{L"name", L"identifier", L"type", L"value"}};
+  std::vector<std::vector<std::wstring>> rows = {{L"name", L"property key", L"type", L"value"}};
   for (const Property& property : properties.items) {
     rows.push_back({property.name, property.set + L" " + std::to_wstring(property.id), OrDash(property.type),
                     ValueOrProblem(property.value, property.problem)});
@@ -79,7 +79,7 @@ std::wstring Section(const wchar_t* title, const Answer& answer, const std::wstr
 std::wstring ThumbnailText(const Thumbnail& thumbnail) {
   if (thumbnail.width == 0) return L"none";
   return Dimensions(thumbnail.width, thumbnail.height) + L", " + std::to_wstring(thumbnail.bitsPerPixel) +
-         L" bits per pixel, requested at " + Dimensions(thumbnail.request, thumbnail.request);
+         L" bits per pixel (" + Dimensions(thumbnail.request, thumbnail.request) + L" requested)";
 }
 
 }  // namespace
@@ -88,10 +88,10 @@ std::wstring TextReport(const FileFacts& facts) {
   std::wstring text = facts.named + L"\n";
   if (!facts.remark.empty()) text += L"  Remark      " + facts.remark + L"\n";
   if (facts.width > 0) {
-    text += L"  Dimensions  " + Dimensions(facts.width, facts.height) + L"\n";
+    text += L"  Frame size  " + Dimensions(facts.width, facts.height) + L"\n";
     text += L"  Frames      " + std::to_wstring(facts.frames) + L"\n";
   }
-  if (!facts.type.empty()) text += L"  Type        " + facts.type + L"\n";
+  if (!facts.type.empty()) text += L"  Pixel type  " + facts.type + L"\n";
   text += L"  Thumbnail   " + ThumbnailText(facts.thumbnail) + L"\n";
   text += HeaderText(facts.header);
   text += Section(L"Tip", facts.tip, L"    " + Indented(facts.tip.text, 4) + L"\n");
@@ -112,7 +112,7 @@ std::wstring TableLine(std::size_t nameWidth, std::wstring_view name, std::wstri
 }  // namespace
 
 std::wstring TableHeading(std::size_t nameWidth) {
-  return TableLine(nameWidth, L"NAME", L"DIMENSIONS", L"FRAMES", L"TYPE", L"THUMBNAIL");
+  return TableLine(nameWidth, L"NAME", L"FRAME SIZE", L"FRAMES", L"PIXEL TYPE", L"THUMBNAIL");
 }
 
 std::wstring TableRow(const FileFacts& facts, std::size_t nameWidth) {

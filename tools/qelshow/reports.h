@@ -1,5 +1,4 @@
-// Formats the facts about a file as text for a reader, and as a row of a table. json_records.h formats them
-// as JSON.
+// Formats the facts about a file as text, and as a row of a table. json_records.h formats them as JSON.
 #pragma once
 
 #include <cstddef>
@@ -10,7 +9,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// Returns all facts about a file except its problem, as lines.
+/// Returns all facts about a file except its problem, as lines of text.
 std::wstring TextReport(const FileFacts& facts);
 
 /// Return rows of the table of files. `nameWidth` is the width of the first column in characters.

@@ -14,7 +14,7 @@ namespace {
 constexpr const wchar_t* kPolicies = LR"(Software\Microsoft\Windows\CurrentVersion\Policies\Explorer)";
 constexpr const wchar_t* kFolderOptions = LR"(Software\Microsoft\Windows\CurrentVersion\Explorer\Advanced)";
 
-/// A number in the registry that hides thumbnails unless it is 0.
+/// A number in the registry that hides thumbnails unless it is 0 or missing.
 struct HidingSetting {
   const wchar_t* name;  // its name in Windows
   const wchar_t* value;
@@ -33,7 +33,13 @@ std::wstring NameOf(const HidingSetting& setting) {
   return std::wstring(L"the ") + (setting.isPolicy ? L"policy " : L"setting ") + setting.name;
 }
 
-/// Returns the keys in which it is on. A policy can apply to the computer or to the user.
+/// Returns what to do about the setting, as the end of a sentence.
+std::wstring AdviceFor(const HidingSetting& setting) {
+  return setting.isPolicy ? L": ask an administrator to turn it off."
+                          : L": clear it in Folder Options, on the View tab.";
+}
+
+/// Returns the keys in which the setting is on. A policy can apply to the computer or to the user.
 std::vector<std::wstring> KeysThatTurnOn(const HidingSetting& setting) {
   const std::wstring key = setting.isPolicy ? kPolicies : kFolderOptions;
   std::vector<std::wstring> keys;
@@ -43,7 +49,7 @@ std::vector<std::wstring> KeysThatTurnOn(const HidingSetting& setting) {
   return keys;
 }
 
-/// Returns whether the contents of the file are elsewhere, as with cloud storage.
+/// Returns whether the contents of the file are not on this computer, as in cloud storage.
 bool IsPlaceholder(const std::wstring& path) {
   constexpr DWORD kRecallOnDataAccess = 0x400000;
   const DWORD attributes = GetFileAttributesW(path.c_str());
@@ -59,10 +65,8 @@ std::vector<std::wstring> FindSettingsThatHideThumbnails() {
     for (const std::wstring& key : KeysThatTurnOn(setting)) {
       sentences.push_back(std::wstring(L"Windows shows no thumbnails ") +
                           (setting.isForNetworkFolders ? L"in network folders " : L"") + L"because of " +
-                          NameOf(setting) + L" (" + setting.value + L" in " + key + L"): " +
-                          (setting.isPolicy ? L"ask an administrator to remove it"
-                                            : L"clear it in Folder Options, on the View tab") +
-                          L".");
+                          NameOf(setting) + L" (" + setting.value + L" in " + key + L")" +
+                          AdviceFor(setting));
     }
   }
   return sentences;
@@ -71,24 +75,33 @@ std::vector<std::wstring> FindSettingsThatHideThumbnails() {
 std::wstring CauseOfNoThumbnail(const std::wstring& path) {
   for (const HidingSetting& setting : kHidingSettings) {
     if (setting.isForNetworkFolders && !PathIsNetworkPathW(path.c_str())) continue;
-    if (!KeysThatTurnOn(setting).empty()) return NameOf(setting);
+    if (!KeysThatTurnOn(setting).empty())
+      return L"The likely cause is " + NameOf(setting) + AdviceFor(setting);
   }
-  if (IsPlaceholder(path)) return L"that the file is in cloud storage and not on this computer";
+  if (IsPlaceholder(path)) {
+    return L"The likely cause is that the file is in cloud storage and not on this computer: choose \"Always "
+           L"keep on this device\" in its menu.";
+  }
   if (NumberValue(HKEY_CLASSES_ROOT, L"CLSID\\" + GuidText(CLSID_QelShellExt), L"DisableProcessIsolation") ==
       0) {
-    return L"the isolated process in which Windows runs thumbnail handlers: see \"Before you deploy\" in the "
-           L"user guide for the feature inprocess";
+    return L"The likely cause is that QelShellExt does not work in the isolated process in which Windows "
+           L"runs "
+           L"thumbnail handlers: see \"If Windows shows no thumbnails\" in the user guide.";
   }
-  return L"unknown: log on again, and see \"Why a thumbnail may be missing\" in the user guide";
+  return L"The cause is unknown: sign out and in again, and see \"Why a thumbnail may be missing\" in the "
+         L"user "
+         L"guide.";
 }
 
 std::wstring CauseOfAnotherThumbnail() {
-  return L"Windows' thumbnail cache, which may hold an older picture, or the handler of another program";
+  return L"The likely cause is an older thumbnail in Windows' cache, which you can empty, or another "
+         L"program's "
+         L"thumbnail handler: see \"The cache\" and \"Another program\" in the user guide.";
 }
 
 std::wstring CauseOfOtherProperties() {
-  return L"the property handler of another program, or that Windows has not noticed the registration: log on "
-         L"again";
+  return L"The likely cause is that Windows still uses its old settings, or another program's property "
+         L"handler: sign out and in again.";
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

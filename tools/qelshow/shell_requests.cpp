@@ -22,7 +22,7 @@
 namespace Qel::Lumetra::ShellExt::Show {
 namespace {
 
-/// The limit for lists whose end the extension reports.
+/// The most items of a list, in case the extension never reports its end.
 constexpr DWORD kMaxItems = 64;
 
 /// Owns a PROPVARIANT or VARIANT, and clears it.
@@ -38,18 +38,18 @@ using PropertyValue = OwnedVariant<PROPVARIANT, &PropVariantInit, &PropVariantCl
 using ColumnValue = OwnedVariant<VARIANT, &VariantInit, &VariantClear>;
 
 std::wstring NoAnswer(const wchar_t* what, HRESULT result) {
-  return std::wstring(L"The extension returns no ") + what + L": " + ResultText(result) + L".";
+  return std::wstring(L"The extension returned no ") + what + L": " + ResultText(result) + L".";
 }
 
-/// Runs `request`. An exception that leaves the extension becomes the problem.
+/// Runs `request`. The text of an exception that leaves the extension becomes the problem.
 template <class Request>
 void Guard(std::wstring& problem, Request request) {
   try {
     request();
   } catch (const std::exception& e) {
-    problem = L"The extension throws \"" + Wide(e.what()) + L"\".";
+    problem = L"The extension threw an exception: " + Wide(e.what()) + L".";
   } catch (...) {
-    problem = L"The extension throws an exception of an unknown type.";
+    problem = L"The extension threw an exception of an unknown type.";
   }
 }
 
@@ -75,7 +75,7 @@ void FillValue(IColumnProvider& provider, const SHCOLUMNID& id, const SHCOLUMNDA
   ColumnValue value;
   const HRESULT result = provider.GetItemData(&id, &file, &value);
   if (result == S_OK) {
-    column.delivered = TypeName(value.vt);
+    column.returned = TypeName(value.vt);
     column.value = ValueOf(value);
   } else {
     column.problem = ResultText(result);
@@ -153,7 +153,7 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
     }
     SHCOLUMNDATA file{};
     if (path.size() >= std::size(file.wszFile)) {
-      answer.problem = L"The shell requests no columns for a file whose path has 260 characters or more.";
+      answer.problem = L"Windows requests no columns for paths of 260 characters or more.";
       return;
     }
     std::ranges::copy(path, file.wszFile);
@@ -203,8 +203,8 @@ ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const s
   Guard(answer.problem, [&] {
     const CLSID* const clsid = StoreClassOf(path);
     if (clsid == nullptr) {
-      answer.problem = L"There is no property store for ." + Lowered(GetExtension(path)) +
-                       L" files: the property system has handlers for .mrc, .ebn and .raw.";
+      answer.problem = L"QelShellExt has no property store for ." + Lowered(GetExtension(path)) +
+                       L" files, only for .mrc, .ebn and .raw files.";
       return;
     }
     ComPtr<IInitializeWithStream> handler;
@@ -269,7 +269,7 @@ ThumbnailAnswer RequestThumbnail(const ExtensionClient& client, const std::wstri
     }
     result = EncodePng(bitmap.Get(), answer.png);
     if (FAILED(result)) {
-      thumbnail.problem = L"The thumbnail cannot be written as PNG: " + ResultText(result) + L".";
+      thumbnail.problem = L"The thumbnail cannot be encoded as PNG: " + ResultText(result) + L".";
       return;
     }
     thumbnail.width = facts.bmWidth;

@@ -1,7 +1,7 @@
-// Sends the extension the requests that a shell makes for a file, in the same manner: every request uses a
+// Sends the extension the requests that the shell makes for a file, as the shell does: every request uses a
 // new object, which first gets the path or the stream. Nothing here reads the file itself.
 //
-// A fault of the extension ends the process, so all requests run in the worker process (worker.h). An
+// A fault of the extension crashes the process, so all requests run in the worker process (worker.h). An
 // exception that leaves the extension is an answer: its text becomes the problem.
 #pragma once
 
@@ -23,14 +23,14 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
 /// Returns the properties of all sets, one set after the other.
 ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const std::wstring& path);
 
-/// Returns what the property system gets for a file, if the extension has a property handler for its kind.
+/// Returns the property store of a file, or as the problem that its kind has none.
 ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const std::wstring& path);
 
 /// Returns the thumbnail for a request of `size` by `size` pixels.
 ThumbnailAnswer RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
 
-/// Creates an object of a registered class, as any program would. Returns an empty string, or if it fails a
-/// sentence with the reason.
+/// Creates an object of a registered class, as any program would. Returns an empty string, or the reason why
+/// it failed as a sentence.
 std::wstring RequestObject(const std::wstring& clsid);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -19,7 +19,7 @@ namespace {
 
 using Com::ComPtr;
 
-/// The shell's result while it is still making the thumbnail.
+/// The shell's result for a thumbnail that it is still making.
 constexpr auto kExtractionPending = static_cast<HRESULT>(0x8004B205);
 
 /// Rows of pixels from the top. A pixel has four bytes: blue, green, red and an unused one.
@@ -89,7 +89,7 @@ Pixels PixelsOf(const std::vector<std::uint8_t>& png) {
   return SUCCEEDED(result) ? pixels : Pixels();
 }
 
-/// Returns the largest difference, in levels of a colour channel, between two pictures of the same size.
+/// Returns the largest difference, in levels of a colour channel, between two images of the same size.
 int LargestDifference(const Pixels& a, const Pixels& b) {
   int largest = 0;
   for (std::size_t i = 0; i < a.bytes.size(); ++i) {
@@ -102,7 +102,7 @@ std::wstring Shape(const Pixels& pixels) {
   return std::to_wstring(pixels.width) + L" x " + std::to_wstring(pixels.height) + L" pixels";
 }
 
-/// Returns whether `shown` is `own` reduced to the request, apart from the rounding of a side.
+/// Returns whether `shown` has the size of `own` reduced to the request. Each side may be rounded.
 bool IsReducedFrom(const Pixels& own, const Pixels& shown, std::int32_t size) {
   const std::int32_t longer = std::max(own.width, own.height);
   const auto isReduced = [&](std::int32_t ownSide, std::int32_t shownSide) {
@@ -112,29 +112,28 @@ bool IsReducedFrom(const Pixels& own, const Pixels& shown, std::int32_t size) {
 }
 
 ShellAnswer Compare(const Pixels& own, const Pixels& shown, std::int32_t size) {
-  if (own.bytes.empty()) return {Agreement::kDiffers, L"of " + Shape(shown) + L" where QelShellExt has none"};
+  if (own.bytes.empty()) return {Agreement::kDiffers, Shape(shown) + L"; QelShellExt returns none"};
   if (std::max(own.width, own.height) > size && IsReducedFrom(own, shown, size)) {
     return {Agreement::kReduced, {}};
   }
   if (own.width != shown.width || own.height != shown.height) {
-    return {Agreement::kDiffers, L"of " + Shape(shown) + L" instead of " + Shape(own)};
+    return {Agreement::kDiffers, Shape(shown) + L" instead of " + Shape(own)};
   }
   const int difference = LargestDifference(own, shown);
   if (difference == 0) return {Agreement::kSame, {}};
-  return {Agreement::kDiffers,
-          L"whose pixels differ by up to " + std::to_wstring(difference) + L" of 255 levels"};
+  return {Agreement::kDiffers, L"pixels differ by up to " + std::to_wstring(difference) + L" of 255 levels"};
 }
 
-/// Returns whether this is Wine, whose shell gives the same picture of one pixel for every file.
+/// Returns whether this is Wine, whose shell returns the same image of one pixel for every file.
 bool IsWine() {
   return GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "wine_get_version") != nullptr;
 }
 
-/// Gets the thumbnail that the shell has or makes, and no icon in its place. Returns the shell's failure.
+/// Gets the thumbnail that the shell has or makes, never an icon instead. Returns the shell's result.
 HRESULT GetThumbnail(IShellItemImageFactory& factory, std::int32_t size, HBITMAP& bitmap) {
-  constexpr int kMostTries = 100;
+  constexpr int kMaxTries = 100;
   HRESULT result = E_PENDING;
-  for (int i = 0; i < kMostTries && (result == E_PENDING || result == kExtractionPending); ++i) {
+  for (int i = 0; i < kMaxTries && (result == E_PENDING || result == kExtractionPending); ++i) {
     if (i > 0) Sleep(100);
     result = factory.GetImage({size, size}, SIIGBF_THUMBNAILONLY, &bitmap);
   }
@@ -184,19 +183,20 @@ ShellAnswer CompareProperties(const ComPtr<IShellItem2>& item, const ListAnswer<
                 : ShellAnswer{Agreement::kNothing, L"all values are empty"};
 }
 
-/// Returns what the shell shows, as the end of a sentence after "shows".
-std::wstring Phrase(const ShellAnswer& answer, const std::wstring& what) {
+/// Returns what the shell shows, as the end of a sentence after "Windows". `another` is the phrase
+/// for something different, such as "another thumbnail".
+std::wstring Phrase(const ShellAnswer& answer, const std::wstring& what, const std::wstring& another) {
   switch (answer.agreement) {
-    case Agreement::kSame: return L"the " + what + L" of QelShellExt";
-    case Agreement::kReduced: return L"the " + what + L" of QelShellExt, reduced further";
-    case Agreement::kDiffers: return L"another " + what + L" (" + answer.detail + L")";
-    case Agreement::kNothing: return L"no " + what + L" (" + answer.detail + L")";
+    case Agreement::kSame: return L"shows the " + what + L" of QelShellExt";
+    case Agreement::kReduced: return L"shows the " + what + L" of QelShellExt (reduced further)";
+    case Agreement::kDiffers: return L"shows " + another + L" (" + answer.detail + L")";
+    case Agreement::kNothing: return L"shows no " + what + L" (" + answer.detail + L")";
     case Agreement::kUnanswered: break;
   }
-  return L"a " + what + L" that it does not report";
+  return L"does not report the " + what;
 }
 
-bool IsInOrder(const ShellAnswer& answer) {
+bool IsAsExpected(const ShellAnswer& answer) {
   return answer.agreement != Agreement::kDiffers && answer.agreement != Agreement::kNothing;
 }
 
@@ -204,7 +204,7 @@ bool IsInOrder(const ShellAnswer& answer) {
 
 ShellView RequestShellView(const ExtensionClient& client, const std::wstring& path, std::int32_t size) {
   if (IsWine()) return {};
-  // The extension is asked first. If it ends the process, the shell is not asked.
+  // The extension is asked first. If it crashes, the shell is not asked.
   const ThumbnailAnswer thumbnail = RequestThumbnail(client, path, size);
   const ListAnswer<Property> properties = RequestPropertyStore(client, path);
   ComPtr<IShellItem2> item;
@@ -223,25 +223,23 @@ ShellView CompareWithShell(const ComPtr<IShellItem2>& item, const ThumbnailAnswe
   return {CompareThumbnails(item, thumbnail), CompareProperties(item, properties)};
 }
 
-bool IsInOrder(const ShellView& view) {
-  return IsInOrder(view.thumbnail) && IsInOrder(view.properties);
+bool IsAsExpected(const ShellView& view) {
+  return IsAsExpected(view.thumbnail) && IsAsExpected(view.properties);
 }
 
-std::wstring ShellSentence(const ShellView& view, const std::wstring& path) {
+std::wstring ShellText(const ShellView& view, const std::wstring& path) {
   if (view.thumbnail.agreement == Agreement::kUnanswered &&
       view.properties.agreement == Agreement::kUnanswered) {
-    return L"The shell of this system does not report what it shows.";
+    return L"This system does not report what it shows for a file, which is normal under Wine.";
   }
-  std::wstring text = L"Windows shows " + Phrase(view.thumbnail, L"thumbnail") + L" and " +
-                      Phrase(view.properties, L"set of properties");
-  if (!IsInOrder(view.thumbnail)) {
-    text += L"; the likely cause is " + (view.thumbnail.agreement == Agreement::kNothing
-                                             ? CauseOfNoThumbnail(path)
-                                             : CauseOfAnotherThumbnail());
-  } else if (!IsInOrder(view.properties)) {
-    text += L"; the likely cause is " + CauseOfOtherProperties();
-  }
-  return text + L".";
+  if (view.thumbnail.agreement == Agreement::kSame && view.properties.agreement == Agreement::kSame)
+    return L"Windows shows the thumbnail and the properties of QelShellExt.";
+  const std::wstring text = L"Windows " + Phrase(view.thumbnail, L"thumbnail", L"another thumbnail") +
+                            L" and " + Phrase(view.properties, L"properties", L"other properties") + L".";
+  if (view.thumbnail.agreement == Agreement::kNothing) return text + L" " + CauseOfNoThumbnail(path);
+  if (!IsAsExpected(view.thumbnail)) return text + L" " + CauseOfAnotherThumbnail();
+  if (!IsAsExpected(view.properties)) return text + L" " + CauseOfOtherProperties();
+  return text;
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -1,4 +1,4 @@
-// Compares what Windows itself shows for a file with the direct answers of the extension.
+// Compares what Windows itself shows for a file with what the extension returns.
 #pragma once
 
 #include <windows.h>
@@ -17,15 +17,15 @@ namespace Qel::Lumetra::ShellExt::Show {
 /// How an answer of the shell compares with the extension's.
 enum class Agreement : std::int32_t {
   kSame,
-  kReduced,  // the extension's picture exceeds the request, and the shell's has its proportions
+  kReduced,  // the extension's thumbnail exceeds the request, and the shell's has its proportions
   kDiffers,
   kNothing,    // the shell has no answer, but the extension has one
-  kUnanswered  // the shell of this system does not answer such questions
+  kUnanswered  // the shell of this system does not answer such requests
 };
 
 struct ShellAnswer {
   Agreement agreement = Agreement::kUnanswered;
-  std::wstring detail;  // the difference, or the code of the failure
+  std::wstring detail;  // the difference, or the text of the failure
 };
 
 struct ShellView {
@@ -40,15 +40,15 @@ NLOHMANN_DEFINE_TYPE_NON_INTRUSIVE(ShellView, thumbnail, properties)
 /// and from the extension, and compares them. Runs in the worker process. `path` is absolute.
 ShellView RequestShellView(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
 
-/// Compares the answers of the shell's item of a file with those of the extension.
+/// Compares the answers of `item`, the file in the shell, with those of the extension.
 ShellView CompareWithShell(const Com::ComPtr<IShellItem2>& item, const ThumbnailAnswer& thumbnail,
                            const ListAnswer<Property>& properties);
 
 /// Returns whether the shell shows what it should, or does not answer.
-bool IsInOrder(const ShellView& view);
+bool IsAsExpected(const ShellView& view);
 
-/// Returns a sentence that says what the shell shows and, if that differs from the extension's answers, the
-/// likely cause.
-std::wstring ShellSentence(const ShellView& view, const std::wstring& path);
+/// Returns a sentence that says what the shell shows and, if that differs from the extension's answers,
+/// another with the likely cause.
+std::wstring ShellText(const ShellView& view, const std::wstring& path);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -88,10 +88,10 @@ std::wstring ResultText(HRESULT result) {
   };
   static constexpr Known kKnown[] = {
       {S_FALSE, L"no value"},
-      {E_FAIL, L"failed"},
+      {E_FAIL, L"unspecified failure"},
       {E_NOTIMPL, L"not implemented"},
       {E_NOINTERFACE, L"no such interface"},
-      {E_UNEXPECTED, L"unexpected request"},
+      {E_UNEXPECTED, L"unexpected failure"},
       {E_OUTOFMEMORY, L"out of memory"},
       {CLASS_E_CLASSNOTAVAILABLE, L"no such class"},
       {REGDB_E_CLASSNOTREG, L"class not registered"},
@@ -114,8 +114,8 @@ std::wstring ProcessEndText(DWORD exitCode) {
       {EXCEPTION_ACCESS_VIOLATION, L"access violation"},
       {EXCEPTION_STACK_OVERFLOW, L"stack overflow"},
       {EXCEPTION_ILLEGAL_INSTRUCTION, L"illegal instruction"},
-      {0xC0000374u, L"damaged heap"},
-      {0xC0000409u, L"damaged stack"},
+      {0xC0000374u, L"heap corruption"},
+      {0xC0000409u, L"stack buffer overrun"},
   };
   for (const Known& known : kKnown) {
     if (known.code == exitCode) return HexCode(exitCode) + L" (" + known.meaning + L")";

@@ -34,16 +34,16 @@ std::wstring SystemErrorText(DWORD error);
 /// Returns the text for an error of the standard library, which has its own numbers for some errors.
 std::wstring SystemErrorText(const std::error_code& error);
 
-/// Returns the exit code of a process, with its meaning if it is a known fault.
+/// Returns the exit code of a crashed process, with its meaning if it is a known fault.
 std::wstring ProcessEndText(DWORD exitCode);
 
 /// Returns for instance "{6444048F-4C8B-11D1-8B70-080036B11A03}".
 std::wstring GuidText(const GUID& guid);
 
-/// Returns a class identifier in the spelling of GuidText; `text` itself if it is not an identifier.
+/// Returns a class identifier in the form of GuidText; `text` itself if it is not an identifier.
 std::wstring SpelledGuid(const std::wstring& text);
 
-/// Returns the absolute path of `path`.
+/// Returns the absolute form of a path.
 std::wstring AbsolutePath(const std::wstring& path);
 
 /// Returns the path of this program.
@@ -52,7 +52,7 @@ std::wstring OwnPath();
 /// Returns `text`, padded with blanks at its end to at least `width` characters.
 std::wstring Padded(std::wstring_view text, std::size_t width);
 
-/// Returns a table of indented lines. Each column is as wide as its widest cell.
+/// Returns a table of indented lines. Each column has the width of its widest cell.
 std::wstring Grid(const std::vector<std::vector<std::wstring>>& rows);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

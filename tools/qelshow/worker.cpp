@@ -68,7 +68,7 @@ LONG WINAPI EndProcess(EXCEPTION_POINTERS* fault) {
   return EXCEPTION_EXECUTE_HANDLER;
 }
 
-/// Makes a pipe of which the child process inherits the end that is not `kept`. Returns whether it could.
+/// Makes a pipe. The child process inherits the end that is not `kept`. Returns whether this succeeded.
 bool MakePipe(OwnedHandle& readEnd, OwnedHandle& writeEnd, const OwnedHandle& kept) {
   SECURITY_ATTRIBUTES inheritable = {sizeof inheritable, nullptr, TRUE};
   return CreatePipe(readEnd.Put(), writeEnd.Put(), &inheritable, 0) &&
@@ -97,7 +97,8 @@ void Worker::Start() {
   OwnedHandle childInput;
   OwnedHandle childOutput;
   if (!MakePipe(childInput, toProcess_, toProcess_) || !MakePipe(fromProcess_, childOutput, fromProcess_)) {
-    throw Failure(L"A pipe cannot be created: " + SystemErrorText(GetLastError()) + L".");
+    throw Failure(L"qelshow cannot create a pipe to its worker process: " + SystemErrorText(GetLastError()) +
+                  L".");
   }
   STARTUPINFOW startup{};
   startup.cb = sizeof startup;
@@ -110,7 +111,7 @@ void Worker::Start() {
   PROCESS_INFORMATION process{};
   if (!CreateProcessW(program.c_str(), command.data(), nullptr, nullptr, TRUE, 0, nullptr, nullptr, &startup,
                       &process)) {
-    throw Failure(L"qelshow cannot start its second process: " + SystemErrorText(GetLastError()) + L".");
+    throw Failure(L"qelshow cannot start its worker process: " + SystemErrorText(GetLastError()) + L".");
   }
   const OwnedHandle thread(process.hThread);
   process_ = OwnedHandle(process.hProcess);
@@ -119,7 +120,7 @@ void Worker::Start() {
 
   Json reply;
   if (!Exchange({Subject::kLoading, dllPath_}, reply)) {
-    throw Failure(L"Loading the extension ends the process with " + ProcessEndText(Finish()) + L".");
+    throw Failure(L"The extension crashed while it was being loaded: " + ProcessEndText(Finish()) + L".");
   }
   const auto problem = reply.get<std::wstring>();
   if (!problem.empty()) throw Failure(problem);

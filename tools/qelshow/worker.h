@@ -1,9 +1,9 @@
 // The process in which the extension runs.
 //
-// Some requests end their process by design (a colour frame smaller than the request causes a division by
-// zero), and any file may trigger an unknown fault. So the program runs the extension in a second process,
-// which is the same program started again. If that process ends, its file is reported, and a new process
-// answers the next question. The first process never loads the extension.
+// Some requests crash the process by design (a colour frame smaller than the request causes a division by
+// zero), and any file may trigger an unknown fault. So the program runs the extension in a worker process: a
+// second instance of itself. If that process crashes, the program reports the file and starts a new process
+// for the next question. The first process never loads the extension.
 #pragma once
 
 #include <windows.h>
@@ -18,7 +18,7 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// The argument that makes the program a worker process. It is not for users.
+/// The argument that makes the program a worker process. Users do not need it.
 inline constexpr const wchar_t* kWorkerArgument = L"--worker";
 
 /// Runs the worker process: answers questions from standard input until it is closed. Returns the exit
@@ -31,7 +31,7 @@ class Worker {
   /// if the process cannot start or the DLL cannot be loaded.
   explicit Worker(std::wstring dllPath) : dllPath_(std::move(dllPath)) { Start(); }
 
-  /// Fills `answer` and returns nothing. If the process ends instead, returns its exit code and starts a new
+  /// Fills `answer` and returns nothing. If the process crashes, returns its exit code and starts a new
   /// process for the next question.
   template <class Answer>
   std::optional<DWORD> Ask(const Question& question, Answer& answer) {
@@ -44,9 +44,10 @@ class Worker {
  private:
   void Start();
 
-  /// Returns whether the process has answered.
+  /// Sends the question and receives the reply. Returns false if the process has crashed.
   bool Exchange(const Question& question, Json& reply);
 
+  /// Does the work of Ask, with the reply as JSON.
   std::optional<DWORD> Transmit(const Question& question, Json& reply);
 
   /// Waits for the end of the process, whose pipes are broken. Returns its exit code.
