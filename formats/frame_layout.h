@@ -8,7 +8,7 @@
 
 namespace Qel::Lumetra::ShellExt {
 
-/// The pixel at column x of the picture's row y (row 0 is the top) begins at file offset
+/// The pixel at column x of the frame's row y (row 0 is the top) begins at file offset
 /// blockPosition + firstPixel + x * pixelStride + y * rowStride. All bytes of the frame are in the
 /// blockBytes bytes from blockPosition; a layout with a pixel outside them cannot be read.
 struct FrameLayout {

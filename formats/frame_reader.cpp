@@ -17,7 +17,7 @@ namespace {
 // the band is reduced.
 constexpr std::int64_t kBandBytes = 256LL * 1024;
 
-// Strides can make pixels overlap in the file, so that a small file claims a picture of any size. A picture
+// Strides can make pixels overlap in the file, so that a small file claims a frame of any size. A frame
 // may have this many more pixels than bytes. The maximum limits the time for a file of a few bytes.
 constexpr std::int64_t kMaxSharedPixels = 1LL << 26;
 
@@ -27,8 +27,8 @@ constexpr std::int64_t kMaxPasses = 8;
 // Reading fewer bytes than this takes the same time.
 constexpr std::int64_t kMinReadBytes = 4096;
 
-// Strides can scatter a picture so widely that each read delivers only a few of its pixels. No program writes
-// such a picture, but a few bytes of header can claim one. It is rejected if its reads have more bytes in
+// Strides can scatter a frame so widely that each read returns only a few of its pixels. No program writes
+// such a frame, but a few bytes of header can claim one. It is rejected if its reads have more bytes in
 // total than this, which limits its time to a few seconds.
 constexpr std::int64_t kMaxTileReadBytes = 1LL << 34;
 

@@ -48,7 +48,7 @@ Facts FactsOf(const SerParser& parser) {
   Facts facts;
   if (const auto& series = parser.series()) {
     facts.push_back({"Tags", series->hasPositionTags ? "positions" : "times"});
-    facts.push_back({"Dimensions of the series", series->dimensionCount});
+    facts.push_back({"Number of dimensions", series->dimensionCount});
     for (std::size_t i = 0; i < series->dimensions.size(); ++i) {
       const SerDimension& dimension = series->dimensions[i];
       const std::string name = "Dimension " + std::to_string(i + 1);
@@ -83,7 +83,7 @@ Facts FactsOf(const EmiParser& parser) {
   AddExtraValues(facts, "Image", parser.image());
   if (parser.lineDataCount() == 0) return facts;
   const EmiLineData& line = parser.lineData();
-  facts.push_back({"Line-data objects", static_cast<std::int64_t>(parser.lineDataCount())});
+  facts.push_back({"Number of lines", static_cast<std::int64_t>(parser.lineDataCount())});
   AddLabels(facts, "Line", line);
   if (line.dataType) {
     const std::wstring type = DataTypeName(*line.dataType);

@@ -1,4 +1,4 @@
-// The values of a header that do not describe the picture, for programs that show them to users. The shell
+// The values of a header that do not describe the frame, for programs that show them to users. The shell
 // extension itself does not use this.
 #pragma once
 

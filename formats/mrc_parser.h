@@ -44,7 +44,7 @@ class MrcParser final : public FileParser {
   std::int32_t Word(std::size_t offset) const;
   MrcPixelType PixelTypeOfMode() const;
 
-  /// Returns the layout of a section. The first stored row is at the bottom of the picture.
+  /// Returns the layout of a section. The first stored row is at the bottom of the frame.
   FrameLayout Section(std::int32_t section) const;
 
   std::array<unsigned char, kHeaderBytes> bytes_{};

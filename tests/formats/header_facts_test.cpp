@@ -89,7 +89,7 @@ SerFile Series() {
 }
 
 const Facts kSeriesFacts = {{"Tags", "positions"},
-                            {"Dimensions of the series", 2},
+                            {"Number of dimensions", 2},
                             {"Dimension 1 size", 3},
                             {"Dimension 1 calibration offset", -1.5, "um"},
                             {"Dimension 1 calibration delta", 0.25, "um"},
@@ -159,7 +159,7 @@ TEST(HeaderFacts, OfASeriesAreAtMost16DimensionsAnd512BytesOfAString) {
   file.dimensions[15].units = std::string(512, 'u') + std::string(600, 'v');
   const Facts facts = FactsOf(file.Bytes(), L"ser");
   ASSERT_EQ(facts.size(), 2 + 16 * 6 + kElementFacts.size());
-  EXPECT_EQ(facts[1], (HeaderFact{"Dimensions of the series", 1000}));
+  EXPECT_EQ(facts[1], (HeaderFact{"Number of dimensions", 1000}));
   EXPECT_EQ(facts[2 + 15 * 6 + 4], (HeaderFact{"Dimension 16 description", std::string(512, 'd')}));
   EXPECT_EQ(facts[2 + 15 * 6 + 5], (HeaderFact{"Dimension 16 units", std::string(512, 'u')}));
   EXPECT_EQ(Facts(facts.end() - 6, facts.end()), kElementFacts);
@@ -208,7 +208,7 @@ Facts FactsOfItems(const std::string& items) {
 }
 
 Facts FactsOfLines(std::int64_t count, const Facts& facts = kLineFacts) {
-  return Joined({{"Line-data objects", count}}, facts);
+  return Joined({{"Number of lines", count}}, facts);
 }
 
 TEST(HeaderFacts, OfAnEmiFileAreTheLabelsAndValuesOfItsFirstImageAndItsFirstLine) {

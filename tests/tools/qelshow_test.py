@@ -651,7 +651,7 @@ class Answers(Test):
             file, = self.info(path)
             self.assertEqual(
                 [(fact["name"], fact["value"], fact["unit"]) for fact in file["header"]],
-                [("Tags", "times", None), ("Dimensions of the series", 1, None), ("Dimension 1 size", 3, None),
+                [("Tags", "times", None), ("Number of dimensions", 1, None), ("Dimension 1 size", 3, None),
                  ("Dimension 1 calibration offset", -1.5, decoded), ("Dimension 1 calibration delta", 0.25, decoded),
                  ("Dimension 1 calibration element", 2, None), ("Dimension 1 description", "Defocus", None),
                  ("Dimension 1 units", decoded, None), ("X calibration offset", 0, None),

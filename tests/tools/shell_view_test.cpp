@@ -174,7 +174,7 @@ TEST_F(ShellComparison, ReportsByHowMuchASinglePixelDiffers) {
     });
   };
   EXPECT_EQ(Thumbnail().agreement, Agreement::kDiffers);
-  EXPECT_EQ(Thumbnail().detail, L"pixels differ by up to 3 of 255 levels");
+  EXPECT_EQ(Thumbnail().detail, L"pixel values differ by up to 3 of 255");
   EXPECT_FALSE(IsAsExpected(View()));
 }
 

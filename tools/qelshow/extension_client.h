@@ -20,8 +20,8 @@ class ExtensionClient {
   /// empty string. If it fails, returns a sentence for the user; then no object can be created.
   std::wstring Open(const std::wstring& path);
 
-  /// Creates an object of the class and returns its interface in `object`. Returns the result of the
-  /// extension.
+  /// Creates an object of the class and returns its interface in `object`. Returns the
+  /// extension's result.
   template <class Interface>
   HRESULT Create(const CLSID& clsid, ComPtr<Interface>& object) const {
     return Create(clsid, Com::kInterfaceId<Interface>, reinterpret_cast<void**>(object.Put()));

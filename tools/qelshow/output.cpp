@@ -124,7 +124,7 @@ void WriteNewFile(const std::wstring& path, const std::vector<std::uint8_t>& byt
   CannotWrite(path, error);
 }
 
-void MoveInto(const std::wstring& from, const std::wstring& to) {
+void MoveFileTo(const std::wstring& from, const std::wstring& to) {
   if (!MoveFileExW(from.c_str(), to.c_str(), MOVEFILE_REPLACE_EXISTING)) CannotWrite(to, GetLastError());
 }
 
@@ -133,7 +133,7 @@ void ReplaceFileAt(const std::wstring& path, const std::vector<std::uint8_t>& by
   for (int i = 2; Exists(beside); ++i) beside = path + L".part" + std::to_wstring(i);
   WriteNewFile(beside, bytes);
   try {
-    MoveInto(beside, path);
+    MoveFileTo(beside, path);
   } catch (...) {
     DeleteFileW(beside.c_str());
     throw;

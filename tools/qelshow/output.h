@@ -32,8 +32,8 @@ bool IsThumbnailOfPage(const std::wstring& path);
 Com::OwnedHandle CreateNewFile(const std::wstring& path);
 void WriteNewFile(const std::wstring& path, const std::vector<std::uint8_t>& bytes);
 
-/// Moves a file to `place` and replaces the file there, if any. Throws Failure.
-void MoveInto(const std::wstring& path, const std::wstring& place);
+/// Moves a file to the path `to` and replaces the file there, if any. Throws Failure.
+void MoveFileTo(const std::wstring& from, const std::wstring& to);
 
 /// Writes a file next to `path`, then moves it to `path`. Throws Failure; then the file at `path` is
 /// unchanged.

@@ -1,4 +1,4 @@
-// Ids of the program's resources.
+// IDs of the program's resources.
 #pragma once
 
 #define IDR_PAGE 101

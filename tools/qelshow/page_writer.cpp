@@ -101,8 +101,8 @@ void PageWriter::Finish() {
   Write(templateEnd_);
   file_.Reset();
   const std::wstring thumbnails = folder_ + L"\\" + kThumbnailsFolder + L"\\";
-  for (const std::wstring& name : thumbnails_) MoveInto(unfinished_ + L"\\" + name, thumbnails + name);
-  MoveInto(PagePath(unfinished_), PagePath(folder_));
+  for (const std::wstring& name : thumbnails_) MoveFileTo(unfinished_ + L"\\" + name, thumbnails + name);
+  MoveFileTo(PagePath(unfinished_), PagePath(folder_));
   // Removes the thumbnails that only the earlier page had.
   std::error_code error;
   for (const fs::directory_entry& entry : fs::directory_iterator(thumbnails, error)) {

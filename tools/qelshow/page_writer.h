@@ -1,4 +1,4 @@
-// Writes the page of files: index.html and a PNG file for each thumbnail, in one folder.
+// Writes a page that shows files: index.html and a PNG file for each thumbnail, in one folder.
 //
 // The page consists of the template page.html, a resource of the program, and the facts about the files as
 // JSON, which the page's script displays. Each file is written as soon as it is added, so that the memory in
@@ -29,7 +29,7 @@ inline constexpr std::size_t kMarkedPageBytes = 1024;
 
 class PageWriter {
  public:
-  /// Makes the folder if it does not exist. `shownFolder` is the folder that the page shows. Like the
+  /// Creates the folder if it does not exist. `shownFolder` is the folder that the page shows. Like the
   /// functions below, it throws Failure if something cannot be written.
   PageWriter(const std::wstring& folder, const std::wstring& shownFolder);
   ~PageWriter();

@@ -34,7 +34,7 @@ struct RegisteredClass {
   std::wstring title;
   OptionalText dll;  // path
   std::wstring threadingModel;
-  std::wstring blocked;       // the key, if any, that prevents the shell from using the class
+  std::wstring blocked;       // the key, if any, in which the class is blocked
   bool isUnapproved = false;  // a policy allows only approved classes, and this is not one
 };
 

@@ -23,14 +23,14 @@ ListAnswer<Column> RequestColumns(const ExtensionClient& client, const std::wstr
 /// Returns the properties of all sets, one set after the other.
 ListAnswer<Property> RequestPropertySets(const ExtensionClient& client, const std::wstring& path);
 
-/// Returns the property store of a file, or as the problem that its kind has none.
+/// Returns the property store of a file. If its kind has none, the problem says so.
 ListAnswer<Property> RequestPropertyStore(const ExtensionClient& client, const std::wstring& path);
 
 /// Returns the thumbnail for a request of `size` by `size` pixels.
 ThumbnailAnswer RequestThumbnail(const ExtensionClient& client, const std::wstring& path, std::int32_t size);
 
-/// Creates an object of a registered class, as any program would. Returns an empty string, or the reason why
-/// it failed as a sentence.
+/// Creates an object of a registered class, as any program would. Returns an empty string, or a sentence
+/// with the reason for a failure.
 std::wstring RequestObject(const std::wstring& clsid);
 
 }  // namespace Qel::Lumetra::ShellExt::Show

@@ -121,7 +121,7 @@ ShellAnswer Compare(const Pixels& own, const Pixels& shown, std::int32_t size) {
   }
   const int difference = LargestDifference(own, shown);
   if (difference == 0) return {Agreement::kSame, {}};
-  return {Agreement::kDiffers, L"pixels differ by up to " + std::to_wstring(difference) + L" of 255 levels"};
+  return {Agreement::kDiffers, L"pixel values differ by up to " + std::to_wstring(difference) + L" of 255"};
 }
 
 /// Returns whether this is Wine, whose shell returns the same image of one pixel for every file.

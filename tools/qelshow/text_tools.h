@@ -49,7 +49,7 @@ std::wstring AbsolutePath(const std::wstring& path);
 /// Returns the path of this program.
 std::wstring OwnPath();
 
-/// Returns `text`, padded with blanks at its end to at least `width` characters.
+/// Returns `text`, padded with spaces at its end to at least `width` characters.
 std::wstring Padded(std::wstring_view text, std::size_t width);
 
 /// Returns a table of indented lines. Each column has the width of its widest cell.
