@@ -16,8 +16,8 @@ constexpr std::array<std::wstring_view, 12> kSharedKeys = {L"AppID",    L"CLSID"
                                                            L"SYSTEM",   L"Software",  L"TypeLib"};
 
 KeyMark EffectiveMark(const ScriptKey& key) {
-  const bool isShared = std::any_of(kSharedKeys.begin(), kSharedKeys.end(),
-                                    [&](std::wstring_view name) { return SameIgnoringCase(key.name, name); });
+  const bool isShared = std::ranges::any_of(
+      kSharedKeys, [&](std::wstring_view name) { return SameIgnoringCase(key.name, name); });
   return isShared ? KeyMark::kNoRemove : key.mark;
 }
 

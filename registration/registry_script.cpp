@@ -23,7 +23,7 @@ std::wstring Widen(std::string_view ascii) {
 /// Replaces every `%name%` once; the replacement itself is not searched again. Returns nothing for a byte
 /// that no script may contain, an unknown name or a `%` without its partner.
 std::optional<std::wstring> Expand(std::string_view text, std::span<const Replacement> replacements) {
-  if (!std::all_of(text.begin(), text.end(), IsScriptByte)) return std::nullopt;
+  if (!std::ranges::all_of(text, IsScriptByte)) return std::nullopt;
 
   std::wstring expanded;
   for (;;) {
@@ -34,8 +34,8 @@ std::optional<std::wstring> Expand(std::string_view text, std::span<const Replac
     const std::size_t closing = text.find('%', opening + 1);
     if (closing == std::string_view::npos) return std::nullopt;
     const std::wstring name = Widen(text.substr(opening + 1, closing - opening - 1));
-    const auto found = std::find_if(replacements.begin(), replacements.end(),
-                                    [&](const auto& each) { return SameIgnoringCase(each.name, name); });
+    const auto found = std::ranges::find_if(
+        replacements, [&](const auto& each) { return SameIgnoringCase(each.name, name); });
     if (found == replacements.end()) return std::nullopt;
     expanded += found->value;
     text.remove_prefix(closing + 1);

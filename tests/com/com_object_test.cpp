@@ -290,7 +290,7 @@ TEST(ComPtr, ReleasesItsObjectBeforeItTakesAnother) {
 }
 
 TEST(CachedFactory, KeepsTheModuleLoadedFromItsSecondReferenceOn) {
-  CountingModule module;
+  const CountingModule module;
   ComPtr<IClassFactory> cached;
   ASSERT_EQ(MakeClassFactory(nullptr, IID_IClassFactory, reinterpret_cast<void**>(cached.Put())), S_OK);
   EXPECT_EQ(module.GetLockCount(), 0);

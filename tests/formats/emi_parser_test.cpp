@@ -39,7 +39,7 @@ std::int32_t ImageCount(const std::string& items) {
 
 void ExpectBadIndex(const std::string& items) {
   try {
-    OpenEmi emi(EmiFile{.items = items});
+    const OpenEmi emi(EmiFile{.items = items});
     ADD_FAILURE() << "no exception was thrown";
   } catch (const std::invalid_argument& error) {
     EXPECT_STREQ(error.what(), "bad EMI object index");

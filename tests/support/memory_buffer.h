@@ -66,9 +66,9 @@ class MemoryBuffer : public std::streambuf {
   }
 
   pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode) override {
-    const off_type base = direction == std::ios_base::end   ? Size()
-                          : direction == std::ios_base::cur ? position_
-                                                            : 0;
+    off_type base = 0;
+    if (direction == std::ios_base::end) base = Size();
+    if (direction == std::ios_base::cur) base = position_;
     return seekpos(base + offset, std::ios_base::in);
   }
 

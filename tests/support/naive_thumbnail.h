@@ -2,6 +2,7 @@
 // row first, and each step is a plain loop. It shares no code with what it checks.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <cstdint>
@@ -69,9 +70,7 @@ double NaiveDifference(T a, T b) {
 /// Returns the grey picture of a frame of one of the eight scalar types, for a request of `cx` by `cy`.
 template <class T>
 BitmapPixels NaiveGreyThumbnail(const NaiveFrame<T>& frame, int cx, int cy) {
-  int f = frame.width / cx;
-  if (frame.height / cy > f) f = frame.height / cy;
-  if (f < 1) f = 1;
+  const int f = std::max({frame.width / cx, frame.height / cy, 1});
   const NaiveFrame<T> reduced = NaiveReduce(frame, f);
   BitmapPixels picture;
   if (reduced.values.empty()) return picture;
