@@ -22,7 +22,8 @@ std::string NumberText(std::int64_t value, std::string_view rule) {
 
 constexpr const char* kIncomplete = "Copy it again, or wait until it has been written completely.";
 constexpr const char* kWrongKind =
-    "Check that the file-name extension is right. If it is, the file is damaged: copy it again.";
+    "Check that the file-name extension is right. If it is, copy the file again. If that does not help, the "
+    "original is damaged or of an unsupported version.";
 constexpr const char* kNoImage =
     "A file without images, for example with spectra only, has no thumbnail. If it should contain images, "
     "copy it again.";

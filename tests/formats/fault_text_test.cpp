@@ -123,7 +123,8 @@ TEST(FaultText, AdvisesWhatToDo) {
   EXPECT_EQ(AdviceFor("J", L"emi"), incomplete);
   EXPECT_EQ(AdviceFor(EbnFile{.width = 2, .afterHeader = "p"}.Bytes(), L"ebn"), incomplete);
   const std::string wrongKind =
-      "Check that the file-name extension is right. If it is, the file is damaged: copy it again.";
+      "Check that the file-name extension is right. If it is, copy the file again. If that does not help, "
+      "the original is damaged or of an unsupported version.";
   EXPECT_EQ(AdviceFor(MrcFile{.nx = 0}.Bytes(), L"mrc"), wrongKind);
   EXPECT_EQ(AdviceFor(EmiFile{.items = EmiImageObject("")}.Bytes(), L"emi"), wrongKind);
   EXPECT_EQ(AdviceFor(EmiFile{.items = EmiText(1, "a")}.Bytes(), L"emi"),

@@ -242,8 +242,9 @@ TEST_F(ShellComparison, ReportsWhichPropertyDiffers) {
       text.starts_with(L"Windows shows the thumbnail of QelShellExt and shows other properties (System."))
       << Utf8(text);
   EXPECT_TRUE(
-      text.ends_with(L"The likely cause is that Windows still uses its old settings, or another program's "
-                     L"property handler: sign out and in again."))
+      text.ends_with(L"The likely cause is that Windows has not noticed the installation yet, or another "
+                     L"program's property handler: sign out and in again, and see \"Another program\" in the "
+                     L"user guide."))
       << Utf8(text);
   SetShellWidth(std::nullopt);
   EXPECT_EQ(Properties().agreement, Agreement::kNothing);

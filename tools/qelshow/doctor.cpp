@@ -96,7 +96,8 @@ bool AskShell(std::vector<FileFacts>& files, std::int32_t size) {
     if (const auto end = worker->Ask({Subject::kShellView, path, size}, view)) {
       facts.shell =
           L"qelshow's worker process crashed while it asked Windows for the thumbnail and the properties: " +
-          ProcessEndText(*end) + L".";
+          ProcessEndText(*end) +
+          L". Please report this to the developers of QelShellExt, with the file if possible.";
       isAsExpected = false;
     } else {
       facts.shell = ShellText(view, path);

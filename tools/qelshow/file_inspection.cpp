@@ -133,8 +133,8 @@ FileFacts InspectFile(Worker& worker, const std::wstring& path, const std::wstri
   }
   if (absolute.size() >= MAX_PATH) {
     facts.remark = L"The path has " + std::to_wstring(absolute.size()) +
-                   L" characters, and Windows shows no columns for paths of 260 characters or more: move the "
-                   L"file or shorten a name.";
+                   L" characters, and programs that use the older columns interface of Windows get no "
+                   L"columns for paths of 260 characters or more: move the file or shorten a name.";
   }
   return facts;
 }

@@ -85,23 +85,20 @@ std::wstring CauseOfNoThumbnail(const std::wstring& path) {
   if (NumberValue(HKEY_CLASSES_ROOT, L"CLSID\\" + GuidText(CLSID_QelShellExt), L"DisableProcessIsolation") ==
       0) {
     return L"The likely cause is that QelShellExt does not work in the isolated process in which Windows "
-           L"runs "
-           L"thumbnail handlers: see \"If Windows shows no thumbnails\" in the user guide.";
+           L"runs thumbnail handlers: see \"If Windows shows no thumbnails\" in the user guide.";
   }
   return L"The cause is unknown: sign out and in again, and see \"Why a thumbnail may be missing\" in the "
-         L"user "
-         L"guide.";
+         L"user guide.";
 }
 
 std::wstring CauseOfAnotherThumbnail() {
   return L"The likely cause is an older thumbnail in Windows' cache, which you can empty, or another "
-         L"program's "
-         L"thumbnail handler: see \"The cache\" and \"Another program\" in the user guide.";
+         L"program's thumbnail handler: see \"The cache\" and \"Another program\" in the user guide.";
 }
 
 std::wstring CauseOfOtherProperties() {
-  return L"The likely cause is that Windows still uses its old settings, or another program's property "
-         L"handler: sign out and in again.";
+  return L"The likely cause is that Windows has not noticed the installation yet, or another program's "
+         L"property handler: sign out and in again, and see \"Another program\" in the user guide.";
 }
 
 }  // namespace Qel::Lumetra::ShellExt::Show
