@@ -105,7 +105,8 @@ std::string MrcParser::comment() const {
 FrameLayout MrcParser::Section(std::int32_t section) const {
   const PixelType type = PixelTypeOf(PixelTypeOfMode());
   const Size2 size = {Word(kNx), Word(kNy)};
-  // Sizes and positions wrap at 32 bits, so a section beyond 2 GiB cannot be read. Intentional.
+  // Sizes and positions wrap at 32 bits, so a section that begins between 2 and 4 GiB cannot be read, and one
+  // beyond 4 GiB may show another part of the file. Intentional.
   const std::int32_t frameBytes = WrappingProduct(WrappingProduct(size.width, size.height), type.bytes());
   const std::int32_t position =
       WrapToInt32(std::int64_t{kHeaderBytes} + Word(kNext) + WrappingProduct(frameBytes, section));

@@ -71,7 +71,7 @@ SerParser::SerParser(std::istream& stream) : FileParser(stream) {
   Require(validElements >= 1, "valid elements", validElements, "at least 1");
   Require(totalElements >= validElements, "total elements", totalElements,
           "at least the number of valid elements");
-  // Set before the tag type is checked, because it does not depend on the tags.
+  // A fault found below need not reset this, because it fails the stream.
   isImageSeries_ = !fault() && dataTypeId == kImages;
   Require(dataTypeId == kLines || dataTypeId == kImages, "data type id", dataTypeId,
           "0x4122 (images) or 0x4120 (lines)");

@@ -27,6 +27,7 @@ class BoxReducer {
 
   BoxReducer(std::int32_t factor, const ImageView<Target>& target)
       : factor_(factor),
+        // A frame without a whole block can have a factor whose square exceeds 32 bits.
         reciprocal_(1.0 / WrappingProduct(factor, factor)),
         target_(target),
         sums_(factor > 1 ? target.width : 0, factor) {}

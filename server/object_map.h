@@ -11,9 +11,10 @@
 
 namespace Qel::Lumetra::ShellExt {
 
+/// An entry without `clsid` is empty: GetClassObject skips it, but registration still runs its script.
 struct ObjectMapEntry {
-  const CLSID* clsid = nullptr;  ///< null in an unused entry
-  UINT registryScript = 0;       ///< resource identifier (script_ids.h) of the class's registry script
+  const CLSID* clsid = nullptr;
+  UINT registryScript = 0;  ///< resource identifier (script_ids.h) of the class's registry script
   Com::ClassObjectMaker makeClassObject = nullptr;
   Com::InstanceMaker makeInstance = nullptr;
 

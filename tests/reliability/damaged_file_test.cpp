@@ -88,7 +88,7 @@ TEST_P(DamagedFile, EveryValueOfEveryByte) {
 }
 
 TEST_P(DamagedFile, BoundaryValuesInEveryField) {
-  constexpr std::size_t kHeaderBytes = 96;  // in the first sample, every byte is damaged
+  constexpr std::size_t kHeaderBytes = 96;  // of each sample except the first, which is damaged as a whole
   for (const SampleFile& sample : samples_) {
     const std::int64_t whole = Ask(sample.bytes);
     const std::size_t end = &sample == &samples_.front() ? sample.bytes.size() : kHeaderBytes;

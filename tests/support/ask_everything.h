@@ -15,7 +15,7 @@
 namespace Qel::Lumetra::ShellExt::Testing {
 
 struct Answers {
-  bool constructed = false;     // false if the constructor threw one of its two exceptions
+  bool constructed = false;     // false if the constructor threw std::invalid_argument or std::length_error
   bool valid = false;           // whether the reader accepts the file
   int bitmaps = 0;              // the number of requests that returned a bitmap
   std::uint64_t bitmapSum = 0;  // the sum of all bytes of the bitmaps

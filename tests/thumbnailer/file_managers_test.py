@@ -97,7 +97,10 @@ class Tumbler(Test):
 
 
 class Gnome(Test):
-    """The part of GNOME that makes thumbnails for Nautilus. Without its sandbox, which has only the programs in /usr."""
+    """The part of GNOME that makes thumbnails for Nautilus.
+
+    It runs without its sandbox, which has only the programs in /usr and so lacks the qelthumb of this test.
+    """
 
     def test(self):
         self.ask(FACTORY, "dbus-run-session", "--", SNAP_NAME="qelthumb")

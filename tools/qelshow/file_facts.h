@@ -97,7 +97,7 @@ struct ThumbnailAnswer {
 
 struct FileFacts {
   std::wstring path;   // absolute
-  std::wstring named;  // as on the command line; not in the document
+  std::wstring named;  // as on the command line; not in the JSON
   std::wstring name;
   std::wstring kind;  // the file-name extension in lower case, without the dot
   std::uint64_t bytes = 0;
@@ -117,7 +117,7 @@ struct FileFacts {
 
   std::vector<HeaderFact> header;
   Thumbnail thumbnail;
-  std::vector<std::uint8_t> png;  // the thumbnail; not in the document
+  std::vector<std::uint8_t> png;  // the thumbnail; not in the JSON
   TipAnswer tip;
   ListAnswer<Column> columns;
   ListAnswer<Property> propertySets;

@@ -32,11 +32,11 @@ bool IsThumbnailOfPage(const std::wstring& path);
 Com::OwnedHandle CreateNewFile(const std::wstring& path);
 void WriteNewFile(const std::wstring& path, const std::vector<std::uint8_t>& bytes);
 
-/// Moves a file to the path `to` and replaces the file there, if any. Throws Failure.
+/// Moves a file to the path `to` and replaces the file there, if any. Throws Failure if that fails.
 void MoveFileTo(const std::wstring& from, const std::wstring& to);
 
-/// Writes a file next to `path`, then moves it to `path`. Throws Failure; then the file at `path` is
-/// unchanged.
+/// Writes a file next to `path`, then moves it to `path`. If that fails, throws Failure and leaves the file at
+/// `path` unchanged.
 void ReplaceFileAt(const std::wstring& path, const std::vector<std::uint8_t>& bytes);
 
 }  // namespace Qel::Lumetra::ShellExt::Show
