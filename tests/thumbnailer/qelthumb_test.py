@@ -1,7 +1,7 @@
 #!/usr/bin/python3
 """Runs qelthumb as file managers do.
 
-usage: qelthumb_test.py BUILD
+usage: qelthumb_test.py BUILD [TEST ...]
 """
 
 import contextlib
@@ -19,9 +19,12 @@ from PIL import Image
 
 from stage import Stage
 
+sys.path.append(str(pathlib.Path(__file__).resolve().parents[2] / "formats"))
+from file_kinds import EXTENSIONS_IN_WORDS  # noqa: E402
+
 BUILD = sys.argv.pop(1)
 DONE, FAILED, USAGE = range(3)
-UNSUPPORTED = "Only .mrc, .ali, .rec, .ser, .ebn, .emi and .raw files are supported."
+UNSUPPORTED = f"Only {EXTENSIONS_IN_WORDS} files are supported."
 
 
 def mrc(width, height, pixels, mode=0):
