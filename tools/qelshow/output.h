@@ -35,8 +35,8 @@ void WriteNewFile(const std::wstring& path, const std::vector<std::uint8_t>& byt
 /// Moves a file to the path `to` and replaces the file there, if any. Throws Failure if that fails.
 void MoveFileTo(const std::wstring& from, const std::wstring& to);
 
-/// Writes a file next to `path`, then moves it to `path`. If that fails, throws Failure and leaves the file at
-/// `path` unchanged.
+/// Writes a file next to `path`, then moves it to `path`. If that fails, throws Failure and leaves the file
+/// at `path` unchanged.
 void ReplaceFileAt(const std::wstring& path, const std::vector<std::uint8_t>& bytes);
 
 }  // namespace Qel::Lumetra::ShellExt::Show
