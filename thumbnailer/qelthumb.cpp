@@ -76,7 +76,7 @@ Bitmap MakeThumbnail(const fs::path& path, std::int32_t size) {
   const std::wstring extension = GetExtension({path.native().begin(), path.native().end()});
   const auto text = ExplainFault(stream, extension);
   if (!text) throw Failure("Only " QEL_EXTENSIONS " files are supported.");
-  if (!text->fault.empty()) throw Failure(text->fault);
+  if (!text->fault.empty()) throw Failure(text->fault + " " + text->advice);
 
   stream.clear();
   stream.seekg(0);

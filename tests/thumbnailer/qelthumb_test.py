@@ -142,16 +142,19 @@ class Thumbnail(Test):
 
 class Fault(Test):
     def test_of_a_damaged_file_is_reported_in_the_words_of_qelshow(self):
-        for name, sentence in (
-            ("damaged.mrc", "The header is invalid: mode is 99, but must be from 0 to 16."),
-            ("damaged.ser", "The header is invalid: series id is 0x0198, but must be 0x0197."),
-            ("damaged.emi", "The file cannot be read beyond byte 12: bad EMI object index."),
+        wrong_kind = ("Check that the file-name extension is right. If it is, copy the file again. If that does not "
+                      "help, the original is damaged or of an unsupported version.")
+        for name, text in (
+            ("damaged.mrc", f"The header is invalid: mode is 99, but must be from 0 to 16. {wrong_kind}"),
+            ("damaged.ser", f"The header is invalid: series id is 0x0198, but must be 0x0197. {wrong_kind}"),
+            ("damaged.emi", "The file cannot be read beyond byte 12: bad EMI object index. "
+                            "The file is damaged: copy it again."),
             ("truncated.mrc", "The file is cut short: the frame ends at byte 820224, but the file has only "
-                              "102528 bytes."),
+                              "102528 bytes. Copy it again, or wait until it has been written completely."),
         ):
             with self.subTest(name=name):
                 file = self.stage.samples / name
-                self.assertEqual(self.assertFails(FAILED, 128, file, self.out, says=sentence), f"{file}: {sentence}\n")
+                self.assertEqual(self.assertFails(FAILED, 128, file, self.out, says=text), f"{file}: {text}\n")
 
     def test_of_a_frame_that_is_too_narrow_is_reported(self):
         file = self.write("line.mrc", mrc(1000, 1, bytes(1000)))
