@@ -489,6 +489,15 @@ class Faults(Test):
         result = run("thumbnail", small, "-o", out, "--size", 8)
         self.assertEqual((result.returncode, result.stderr, out.exists()), (DONE, "", True))
 
+    def test_a_frame_has_no_thumbnail_if_its_shorter_side_has_fewer_pixels_than_the_factor(self):
+        for width, height, shown in ((1000, 3, True), (1000, 2, False), (2, 1000, False)):
+            with self.subTest(width=width, height=height):
+                [file] = self.info(self.write("line.mrc", mrc(width, height)))
+                self.assertEqual(file["thumbnail"]["width"] > 0, shown)
+                if not shown:
+                    self.assertOneSentence(file["problem"], f"{width} x {height}", "too narrow", "256 x 256")
+                    self.assertIn("larger --size", file["advice"])
+
     def test_in_any_request_are_reported_for_their_file(self):
         names = ("fault in load.mrc", "fault in tip.mrc", "quiet.mrc")
         load, tip, quiet = self.info(*(self.write(name, mrc()) for name in names), server=FAULTY_SERVER)

@@ -64,13 +64,27 @@ bool IsSmallColourFrame(const FileFacts& facts, std::int32_t size) {
   return facts.type.starts_with(L"24 bit") && facts.width < size && facts.height < size;
 }
 
+/// Returns whether the reduction to `size` pixels leaves no row or no column of the frame.
+bool IsTooNarrow(const FileFacts& facts, std::int32_t size) {
+  const auto [shorter, longer] = std::minmax(facts.width, facts.height);
+  return shorter < longer / size;
+}
+
 void FillThumbnail(Worker& worker, const std::wstring& path, std::int32_t size, FileFacts& facts) {
   ThumbnailAnswer answer;
   const auto end = worker.Ask({Subject::kThumbnail, path, size}, answer);
   facts.thumbnail = std::move(answer.thumbnail);
   facts.thumbnail.request = size;
   facts.png = std::move(answer.png);
-  if (!end) return;
+  if (!end) {
+    if (facts.png.empty() && IsTooNarrow(facts, size)) {
+      facts.thumbnail.problem =
+          L"The frame has " + std::to_wstring(facts.width) + L" x " + std::to_wstring(facts.height) +
+          L" pixels, which is too narrow for a thumbnail of " + Square(size) + L" pixels.";
+      facts.advice = L"Use larger icons, or qelshow thumbnail with a larger --size.";
+    }
+    return;
+  }
   if (IsSmallColourFrame(facts, size)) {
     facts.thumbnail.problem = L"The frame is in colour and smaller than the requested thumbnail (" +
                               Square(size) + L" pixels), and the extension crashes on such a request: " +

@@ -1,5 +1,7 @@
 #include "picture.h"
 
+#include <numbers>
+
 namespace Qel::Lumetra::ShellExt::Samples {
 
 std::uint64_t Random::Next() {
@@ -18,7 +20,7 @@ double Random::Normal() {
   // The sum of four uniform numbers, scaled to a standard deviation of 1.
   double sum = 0;
   for (int i = 0; i < 4; ++i) sum += Uniform();
-  return (sum - 2) * std::sqrt(3.0);
+  return (sum - 2) * std::numbers::sqrt3;
 }
 
 int Random::Count(double mean) {

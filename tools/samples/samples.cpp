@@ -138,7 +138,7 @@ std::string MrcDamaged() {
 }
 
 std::string MrcTruncated() {
-  std::string bytes = MrcMicrograph();
+  const std::string bytes = MrcMicrograph();
   return bytes.substr(0, bytes.size() / 8);
 }
 
@@ -275,7 +275,7 @@ std::string EbnGainReference() {
 }
 
 std::string EbnTruncated() {
-  std::string bytes = EbnExposure();
+  const std::string bytes = EbnExposure();
   return bytes.substr(0, bytes.size() / 2);
 }
 

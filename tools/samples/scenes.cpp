@@ -17,9 +17,8 @@ std::vector<Point> Scatter(Random& random, int width, int height, double apart, 
   std::vector<Point> points;
   for (int attempt = 0; attempt < wanted * 20 && static_cast<int>(points.size()) < wanted; ++attempt) {
     const Point point = {random.Uniform(0, width), random.Uniform(0, height)};
-    const bool isFree = std::all_of(points.begin(), points.end(), [&](const Point& other) {
-      return Distance(point.x - other.x, point.y - other.y) >= apart;
-    });
+    const bool isFree = std::ranges::all_of(
+        points, [&](const Point& other) { return Distance(point.x - other.x, point.y - other.y) >= apart; });
     if (isFree) points.push_back(point);
   }
   return points;
