@@ -558,7 +558,7 @@ class Installation(Test):
         (installed, _), (found, reported), (removed, _) = results
         self.assertEqual((installed, found, removed), (DONE, 4, DONE), results)
         self.assertIn(f"{self.image}: no thumbnail. The header is invalid: mode is 99", reported)
-        self.assertIn("QelShellExt is registered and works.", reported)
+        self.assertIn("QelShellExt is registered and can be loaded.", reported)
         self.assertRemoved()
 
     def test_an_upgrade_replaces_a_dll_that_is_in_use(self):

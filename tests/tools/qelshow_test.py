@@ -989,7 +989,7 @@ class Doctor(Test):
         self.assertRegex(result.stdout, r"(?m)^ +\.mrc( +works){4}$")
         self.assertRegex(result.stdout, r"(?m)^ +\.ser( +works){3}$")
         self.assertRegex(result.stdout, r"(?m)^ +\.raw property store +works +[\d.]+ +Z:.*QelShellExt\.dll$")
-        self.assertIn("QelShellExt is registered and works.", result.stdout)
+        self.assertIn("QelShellExt is registered and can be loaded.", result.stdout)
 
     def test_reports_of_each_file_whether_it_is_read_and_why_not(self):
         self.register()
@@ -1216,7 +1216,7 @@ class Doctor(Test):
         self.set_registry({icons: 1, policy: 0})
         explains(good, FAILED, "\"Always show icons, never thumbnails\"", "clear it in Folder Options")
         self.set_registry({icons: 0, policy: 1})
-        explains(good, FAILED, "the policy \"Turn off the display of thumbnails", "ask an administrator to turn it off")
+        explains(good, FAILED, "the policy \"Turn off the display of thumbnails", "ask an administrator to disable the policy")
         self.set_registry({policy: 0})
         self.leave_out("raw", self.RAW_STORE)
         explains(self.write("a.raw", raw(4, 4, 0, 8, bytes(16))), FAILED, "is not registered for .raw files",

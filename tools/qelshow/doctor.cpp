@@ -162,7 +162,7 @@ std::wstring Text(const Installation& installation, const std::vector<FileFacts>
     if (!kind.leftOut.empty()) leftOut += L"    " + kind.leftOut + L"\n";
   }
   if (!leftOut.empty()) text += L"\nUnregistered file kinds (not a problem if intended)\n" + leftOut;
-  if (installation.problems.empty()) return text + L"\nQelShellExt is registered and works.\n";
+  if (installation.problems.empty()) return text + L"\nQelShellExt is registered and can be loaded.\n";
   text += L"\nProblems\n";
   for (const std::wstring& problem : installation.problems) text += L"    " + problem + L"\n";
   return text;

@@ -35,7 +35,7 @@ std::wstring NameOf(const HidingSetting& setting) {
 
 /// Returns what to do about the setting, as the end of a sentence.
 std::wstring AdviceFor(const HidingSetting& setting) {
-  return setting.isPolicy ? L": ask an administrator to turn it off."
+  return setting.isPolicy ? L": ask an administrator to disable the policy."
                           : L": clear it in Folder Options, on the View tab.";
 }
 
