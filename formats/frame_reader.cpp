@@ -85,7 +85,8 @@ class BandReader {
     return (columns - 1) * pixelStep_ + (rows - 1) * rowStep_ + pixelBytes_;
   }
 
-  /// Returns how many rows or columns, `step` bytes apart, begin within `bytes` bytes; at most `max`.
+  /// Returns how many rows or columns, `step` bytes apart, begin at offsets from 0 to `bytes`, both included;
+  /// at most `max`.
   static std::int32_t StepsThatFit(std::int64_t bytes, std::int64_t step, std::int32_t max) {
     if (bytes < 0) return 0;
     return step == 0 ? max : static_cast<std::int32_t>(std::min<std::int64_t>(max, bytes / step + 1));
@@ -121,9 +122,9 @@ class BandReader {
     return true;
   }
 
-  /// Reads a frame whose rows are not contiguous, in tiles. The pixels of a tile are collected from as many
-  /// reads as necessary. A tile has the width of whole blocks, and the tiles of a column are read from the
-  /// top down, so that every block gets its rows from the top.
+  /// Reads in tiles a frame that bands would read too often (kMaxPasses). The pixels of a tile are collected
+  /// from as many reads as necessary. A tile has the width of whole blocks, and the tiles of a column are
+  /// read from the top down, so that every block gets its rows from the top.
   bool ReadTiles() {
     const std::int64_t maxPixels = kBandBytes / pixelBytes_;
     if (factor_ > maxPixels) return false;

@@ -12,8 +12,8 @@
 namespace Qel::Lumetra::ShellExt {
 namespace {
 
-// Room for the put-back reserve of the buffer and for the largest header, so that one Read gets a whole
-// header, and exactly the header of an MRC file.
+// Room for the put-back reserve of the buffer and for the largest header, that of an MRC file. So one Read
+// gets the whole header of every kind that has a property store, and nothing but the header of an MRC file.
 constexpr std::size_t kBufferBytes = 4 + 1024;
 
 constexpr HRESULT kNoCount = 6;

@@ -23,11 +23,16 @@ using Testing::SampleFile;
 /// How a call ended in which an allocation should fail.
 enum class Outcome { kAnswered, kThrew, kNotReached };
 
-// How many calls return, and do not throw, when the allocations of a thumbnail fail in turn. The two calls in
-// which no allocation fails do not count. Windows itself takes no memory from this heap. Its POSIX stand-in
-// makes four allocations for a grey bitmap: the device context, which the bitmap does not need, and three for
-// the bitmap. A colour bitmap has no colour table and needs one fewer; if memory stays exhausted, the
-// allocation of the buffer after it throws.
+// How many calls for a thumbnail return, with or without a picture, although an allocation fails. All other
+// failing allocations throw.
+//
+// On Windows all of them throw, because Windows itself takes no memory from this heap. Its POSIX stand-in
+// makes four allocations for a grey bitmap and never throws: one for the device context, without which it
+// still makes the bitmap, and three for the bitmap. So if only one allocation fails, one call returns the
+// picture and three return no bitmap; if all later ones fail too, none of the four calls returns a bitmap.
+//
+// A colour bitmap has no colour table and takes only two. They come before the frame reader's buffer, whose
+// allocation throws if all later ones fail too.
 #ifdef _WIN32
 constexpr int kPicturesWithoutDeviceContext = 0;
 constexpr int kGreyAnswersWithoutBitmap = 0;

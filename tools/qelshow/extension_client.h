@@ -16,8 +16,8 @@ using Com::ComPtr;
 
 class ExtensionClient {
  public:
-  /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. Returns an
-  /// empty string. If it fails, returns a sentence for the user; then no object can be created.
+  /// Loads the DLL at `path`, or the registered one if `path` is empty. COM must be initialised. On success
+  /// returns an empty string; on failure returns a sentence for the user, and no object can be created.
   std::wstring Open(const std::wstring& path);
 
   /// Creates an object of the class and returns its interface in `object`. Returns the

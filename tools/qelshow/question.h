@@ -6,8 +6,9 @@
 
 namespace Qel::Lumetra::ShellExt::Show {
 
-/// What a question is about: whether the DLL can be loaded, one of the extension's answers about a file, what
-/// the shell shows for it, or whether objects of a registered class can be created.
+/// What a question is about: whether the DLL can be loaded, the diagnosis of a file by the project's own
+/// readers, one of the extension's answers about a file, what the shell shows for it, or whether objects of a
+/// registered class can be created.
 enum class Subject : std::int32_t {
   kLoading,
   kDiagnosis,
