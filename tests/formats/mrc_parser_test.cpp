@@ -299,7 +299,7 @@ TEST(MrcThumbnail, SectionFarIntoAStackCostsNoMoreThanTheFirst) {
 
 TEST(MrcThumbnail, SectionFrom2GiBOnIsNotReached) {
   EXPECT_EQ(SparseStack(2 * 0x7FFF).Thumbnail().width, 256);  // begins 64 KiB before 2 GiB
-  SparseStack beyond(2 * 0x8000);                             // begins at 2 GiB, which is negative in 32 bits
+  const SparseStack beyond(2 * 0x8000);                       // begins at 2 GiB, which is negative in 32 bits
   EXPECT_TRUE(beyond.reader.IsValid());
   EXPECT_EQ(beyond.Thumbnail().width, 0);
   EXPECT_TRUE(beyond.stream.fail());

@@ -36,7 +36,7 @@ TEST(Raw, HasTheTypeOfItsClassAndBits) {
   for (std::int32_t valueClass = -1; valueClass <= 17; ++valueClass) {
     for (const std::int32_t bits : {-8, 0, 1, 7, 8, 12, 16, 24, 32, 48, 64, 128, 256}) {
       SCOPED_TRACE(testing::Message() << "class " << valueClass << ", " << bits << " bits");
-      const auto* const row = std::find_if(std::begin(kRows), std::end(kRows), [&](const Row& candidate) {
+      const auto* const row = std::ranges::find_if(kRows, [&](const Row& candidate) {
         return candidate.valueClass == valueClass && candidate.bits == bits;
       });
       RawFile file;

@@ -10,7 +10,7 @@ namespace {
 constexpr wchar_t kAfterBackslash = L'\\' + 1;
 
 std::wstring Lower(std::wstring text) {
-  std::transform(text.begin(), text.end(), text.begin(), [](wchar_t c) {
+  std::ranges::transform(text, text.begin(), [](wchar_t c) {
     return c >= L'A' && c <= L'Z' ? static_cast<wchar_t>(c + (L'a' - L'A')) : c;
   });
   return text;

@@ -22,7 +22,7 @@ void AddKey(RegistryContents& contents, const std::wstring& key,
 
 RegistryContents Without(const RegistryContents& a, const RegistryContents& b) {
   RegistryContents difference;
-  std::set_difference(a.begin(), a.end(), b.begin(), b.end(), std::inserter(difference, difference.end()));
+  std::ranges::set_difference(a, b, std::inserter(difference, difference.end()));
   return difference;
 }
 

@@ -19,14 +19,14 @@ namespace Qel::Lumetra::ShellExt::Testing {
 namespace {
 
 /// Allocates every free slot of the process, and frees them when it is destroyed.
-template <auto allocate, auto free>
+template <auto kAllocate, auto kFree>
 class AllSlots {
  public:
   AllSlots() {
-    for (DWORD slot = allocate(); slot != TLS_OUT_OF_INDEXES; slot = allocate()) slots_.push_back(slot);
+    for (DWORD slot = kAllocate(); slot != TLS_OUT_OF_INDEXES; slot = kAllocate()) slots_.push_back(slot);
   }
   ~AllSlots() {
-    for (const DWORD slot : slots_) free(slot);
+    for (const DWORD slot : slots_) kFree(slot);
   }
   AllSlots(const AllSlots&) = delete;
   AllSlots& operator=(const AllSlots&) = delete;

@@ -79,12 +79,7 @@ class OutOfMemory : public Testing::FileKindTest {
  protected:
   /// Throws the first exception of this thread, for which the runtime allocates what it keeps for all later
   /// ones.
-  static void SetUpTestSuite() {
-    try {
-      throw std::bad_alloc();
-    } catch (const std::bad_alloc&) {
-    }
-  }
+  static void SetUpTestSuite() { EXPECT_THROW(throw std::bad_alloc(), std::bad_alloc); }
 };
 
 TEST_P(OutOfMemory, WhileAReaderIsMadeLeaksNothing) {

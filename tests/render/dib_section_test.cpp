@@ -30,6 +30,7 @@ TEST(DibSection, HoldsTheHandleAndThenTheViewOfItsBits) {
     ImageView<std::uint8_t> bits;
   } fields;
   static_assert(sizeof fields == sizeof(DibSection));
+  // NOLINTNEXTLINE(bugprone-undefined-memory-manipulation): the test reads the memory layout
   std::memcpy(static_cast<void*>(&fields), &section, sizeof fields);
   EXPECT_EQ(fields.bits.width, 5);
   EXPECT_EQ(fields.bits.height, 3);

@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdint>
 #include <limits>
+#include <numbers>
 #include <vector>
 
 #include "random_values.h"
@@ -61,7 +62,7 @@ TEST_P(EveryImplementation, SpecialValues) {
           0.5,
           2.0,
           std::sqrt(0.5),
-          std::sqrt(2.0),
+          std::numbers::sqrt2,
           1e-300,
           1e300,
           10.0});
@@ -97,7 +98,7 @@ TEST_P(EveryImplementation, AroundOne) {
 
 TEST_P(EveryImplementation, EveryLengthOfABatch) {
   Random random(4);
-  for (std::size_t length : {0u, 1u, 3u, 255u, 256u, 257u, 513u}) {
+  for (const std::size_t length : {0u, 1u, 3u, 255u, 256u, 257u, 513u}) {
     std::vector<double> values;
     while (values.size() < length) values.push_back(random.OneIn(5) ? 0.0 : random.Between(1, 100));
     Expect(values);

@@ -285,7 +285,7 @@ TEST(GreyThumbnail, IntegerAveragesTruncateTowardZero) {
 TYPED_TEST(EveryScalar, DownsampleBoxOfAFrameNarrowerThanABlockDoesNothing) {
   using T = TypeParam;
   constexpr auto kStep = static_cast<std::int64_t>(sizeof(T));
-  StoredFrame<T> mirrored(5, 20, -kStep, 5 * kStep, 0);
+  const StoredFrame<T> mirrored(5, 20, -kStep, 5 * kStep, 0);
   T untouched{7};
   DownsampleBox(mirrored.view(), 7, ImageView<T>{0, 2, &untouched, kStep, 0});
   EXPECT_EQ(untouched, T{7});
@@ -451,13 +451,13 @@ TEST(ColourThumbnail, AveragesTruncate) {
 }
 
 TEST(ColourThumbnail, RowsArePaddedToFourBytes) {
-  StoredFrame<ColourPixel<ColourOrder::kRedFirst>> stored(3, 2, 3, 9, 0);
+  const StoredFrame<ColourPixel<ColourOrder::kRedFirst>> stored(3, 2, 3, 9, 0);
   const auto picture = TakeBitmap(RenderColourThumbnail<ColourOrder::kRedFirst>(stored.view(), {3, 2}));
   EXPECT_EQ(picture.rowBytes, 12);
 }
 
 TEST(ColourThumbnail, NegativeRequestHasNoBitmap) {
-  StoredFrame<ColourPixel<ColourOrder::kRedFirst>> stored(30, 20, 3, 90, 0);
+  const StoredFrame<ColourPixel<ColourOrder::kRedFirst>> stored(30, 20, 3, 90, 0);
   EXPECT_EQ(RenderColourThumbnail<ColourOrder::kRedFirst>(stored.view(), {-3, -3}), nullptr);
 }
 

@@ -8,11 +8,13 @@
 
 #include "import_patch.h"
 
+// NOLINTBEGIN(readability-identifier-naming): the build derives these names from those of the C library
 extern "C" {
 int guest_pthread_once(pthread_once_t* once, void (*run)());
 int guest_pthread_mutex_lock(pthread_mutex_t*);
 int guest_pthread_mutex_unlock(pthread_mutex_t*);
 }
+// NOLINTEND(readability-identifier-naming)
 
 namespace Qel::Lumetra::ShellExt::Testing {
 namespace {

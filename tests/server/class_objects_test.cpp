@@ -135,7 +135,6 @@ TEST_F(ClassObjects, MakeNothingWithoutAnOutputPointer) {
 }
 
 TEST_F(ClassObjects, MakeNothingThatLacksTheInterface) {
-  OuterObject outer;
   for (const CreatableClass& creatable : kClasses) {
     const ComPtr<IClassFactory> factory = dll_.Factory(creatable.clsid);
     void* answer = &answer;

@@ -80,7 +80,7 @@ std::vector<Stat> List(Enumerator& enumerator) {
 }
 
 void ChangeProperty(IPropertyStorage& storage, const PROPSPEC& id) {
-  PROPVARIANT value{};
+  const PROPVARIANT value{};
   storage.WriteMultiple(1, &id, &value, PID_FIRST_USABLE);
   storage.DeleteMultiple(1, &id);
   wchar_t text[] = L"name";

@@ -35,7 +35,9 @@ void Raise(std::atomic<std::int64_t>& most, std::int64_t value) {
 
 bool ShouldFail() {
   if (g_failed && g_keepsFailing) return true;
-  if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
+  if (g_untilFailure == kNever) return false;
+  --g_untilFailure;  // from 0 to kNever, so that only one allocation fails
+  if (g_untilFailure != kNever) return false;
   g_failed = true;
   return true;
 }
