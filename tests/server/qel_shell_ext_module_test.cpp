@@ -165,7 +165,7 @@ TEST_F(Module, RefusesToBeLoadedWithoutItsLocks) {
   }
   {
     g_failingSection = 2;
-    CQelShellExtModule module(map);
+    const CQelShellExtModule module(map);
     EXPECT_FALSE(module.initFailed());
   }
 }
