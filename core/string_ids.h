@@ -1,7 +1,7 @@
 // Resource identifiers of the module's strings, for C++ and for the resource compiler, which understands only
 // macros. The strings are in the server's string table (string_table.rc).
 //
-// The type descriptions of the readers have identifiers too, 101 and 210 to 215. The table intentionally
+// The type descriptions of the readers have identifiers too (formats/file_kinds.h). The table intentionally
 // omits them, so every type description is empty.
 #pragma once
 

@@ -20,7 +20,8 @@ using Testing::BitmapPixels;
 using Testing::FailingHeap;
 using Testing::SampleFile;
 
-/// How a call ended in which an allocation should fail.
+/// How a call ended: it returned or threw after an allocation failed, or it made too few allocations for one
+/// to fail.
 enum class Outcome { kAnswered, kThrew, kNotReached };
 
 // How many calls for a thumbnail return, with or without a picture, although an allocation fails. All other

@@ -23,7 +23,7 @@ enum class Verdict : std::int32_t {
   kGood = 0,
   kFailed = 1,  // could not be examined, for instance because it cannot be opened
   kUnsupported = 3,
-  kNoThumbnail = 4,  // for another reason, for instance because the file is damaged
+  kNoThumbnail = 4,  // of a supported kind, but for instance damaged
 };
 
 /// A number, a string, or nothing.
