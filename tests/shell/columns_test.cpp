@@ -91,7 +91,7 @@ TEST_F(Columns, EndAfterTheSixth) {
 }
 
 TEST_F(Columns, AcceptAnyFolder) {
-  SHCOLUMNINIT init{};
+  const SHCOLUMNINIT init{};
   EXPECT_EQ(provider_->Initialize(&init), S_OK);
   EXPECT_EQ(provider_->Initialize(nullptr), S_OK);
 }
@@ -253,7 +253,7 @@ TEST_F(Columns, NeedAnOutputPointerForAnAnswerOnly) {
 }
 
 TEST_F(Columns, SurviveNullArguments) {
-  SHCOLUMNDATA item{};
+  const SHCOLUMNDATA item{};
   VARIANT value{};
   EXPECT_EQ(provider_->GetColumnInfo(0, nullptr), E_POINTER);
   EXPECT_EQ(provider_->GetColumnInfo(6, nullptr), S_FALSE);

@@ -212,7 +212,7 @@ TEST_F(PropertySet, RefusesEveryChangeNameAndStatistic) {
   const Storage storage = Open(MakeLoaded(), kImageSummary);
   const PROPSPEC specifier = ById(3);
   const PROPID id = 3;
-  PROPVARIANT value{};
+  const PROPVARIANT value{};
   wchar_t text[] = L"name";
   LPOLESTR name = text;
   const FILETIME time{};

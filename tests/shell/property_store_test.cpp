@@ -305,8 +305,8 @@ TEST_F(PropertyStore, SwitchesToAnotherStream) {
 
 TEST_F(PropertyStore, ContinuesAtThePositionOfTheSameStream) {
   // The first header is read to its last byte and no further, so the second header follows.
-  MrcFile first{.nx = 512, .ny = 256};
-  MrcFile second{.nx = 64, .ny = 32};
+  const MrcFile first{.nx = 512, .ny = 256};
+  const MrcFile second{.nx = 64, .ny = 32};
   ScriptedStream stream(first.Bytes() + second.Bytes());
   const Handler handler = Open(stream);
   Initialize(handler, &stream);

@@ -91,7 +91,7 @@ TEST(PropertyTable, WritesNegativeNumbersUnchanged) {
 std::wstring FirstLine(const FileTypeInfo& reader) {
   wchar_t* tip = nullptr;
   EXPECT_EQ(MakeInfoTip(reader, L"Z:\\no such file", &tip), S_OK);
-  std::wstring line = tip != nullptr ? tip : L"";
+  const std::wstring line = tip != nullptr ? tip : L"";
   CoTaskMemFree(tip);
   return line.substr(0, line.find(L'\r'));
 }
