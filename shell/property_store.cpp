@@ -13,7 +13,7 @@ namespace Qel::Lumetra::ShellExt {
 namespace {
 
 // Room for the put-back reserve of the buffer and for the largest header, that of an MRC file. So one Read
-// gets the whole header of every kind that has a property store, and nothing but the header of an MRC file.
+// gets the whole header of every kind that has a property store. From an MRC file it gets nothing else.
 constexpr std::size_t kBufferBytes = 4 + 1024;
 
 constexpr HRESULT kNoCount = 6;

@@ -22,9 +22,9 @@ struct Answers {
   std::string wrong;            // what broke a rule that holds for every file; empty if nothing did
 };
 
+inline constexpr LONG kMaxRequest = std::numeric_limits<LONG>::max();
 /// Requests of every kind: smaller and larger than a frame, one pixel, far from a frame's proportions, and
 /// negative.
-inline constexpr LONG kMaxRequest = std::numeric_limits<LONG>::max();
 inline constexpr SIZE kAllRequests[] = {{1, 1},   {3, 2},   {5, 5},   {96, 96},
                                         {1, 256}, {-5, 40}, {-3, -2}, {kMaxRequest, kMaxRequest}};
 
