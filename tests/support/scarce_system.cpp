@@ -19,7 +19,9 @@ ScarceSystem::Lack g_failed = ScarceSystem::Lack::kNothing;
 
 bool ShouldFail(ScarceSystem::Lack lack = ScarceSystem::Lack::kOther) {
   if (g_failed != ScarceSystem::Lack::kNothing && g_keepsFailing) return true;
-  if (g_untilFailure == kNever || g_untilFailure-- > 0) return false;
+  if (g_untilFailure == kNever) return false;
+  --g_untilFailure;  // from 0 to kNever, so that only one call fails
+  if (g_untilFailure != kNever) return false;
   g_failed = lack;
   return true;
 }

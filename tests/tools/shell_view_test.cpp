@@ -143,7 +143,7 @@ class ShellComparison : public testing::Test {
     EXPECT_EQ(EncodePng(bitmap.Get(), own_.png), S_OK);
   }
 
-  void SetShellWidth(std::optional<ULONG> width) {
+  void SetShellWidth(std::optional<ULONG> width) const {
     PROPVARIANT value{};
     if (width) InitPropVariantFromUInt32(*width, &value);
     EXPECT_EQ(item_.store->SetValue(Testing::kWidthKey, value), S_OK);
