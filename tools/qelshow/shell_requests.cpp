@@ -26,10 +26,10 @@ namespace {
 constexpr DWORD kMaxItems = 64;
 
 /// Owns a PROPVARIANT or VARIANT, and clears it.
-template <class Variant, auto init, auto clear>
+template <class Variant, auto kInit, auto kClear>
 struct OwnedVariant : Variant {
-  OwnedVariant() { init(this); }
-  ~OwnedVariant() { clear(this); }
+  OwnedVariant() { kInit(this); }
+  ~OwnedVariant() { kClear(this); }
   OwnedVariant(const OwnedVariant&) = delete;
   OwnedVariant& operator=(const OwnedVariant&) = delete;
 };

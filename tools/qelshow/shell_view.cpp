@@ -176,7 +176,8 @@ ShellAnswer CompareProperties(const ComPtr<IShellItem2>& item, const ListAnswer<
     hasAny = hasAny || !text.empty();
     if (text == ownText) continue;
     if (!differences.empty()) differences += L", ";
-    differences += property.name + L" is \"" + text + L"\" instead of \"" + ownText + L"\"";
+    differences.append(property.name).append(L" is \"").append(text);
+    differences.append(L"\" instead of \"").append(ownText).append(L"\"");
   }
   if (differences.empty()) return {Agreement::kSame, {}};
   return hasAny ? ShellAnswer{Agreement::kDiffers, differences}
