@@ -235,8 +235,8 @@ std::wstring ShellText(const ShellView& view, const std::wstring& path) {
   }
   if (view.thumbnail.agreement == Agreement::kSame && view.properties.agreement == Agreement::kSame)
     return L"Windows shows the thumbnail and the properties of QelShellExt.";
-  const std::wstring text = L"Windows " + Phrase(view.thumbnail, L"thumbnail", L"another thumbnail") +
-                            L" and " + Phrase(view.properties, L"properties", L"other properties") + L".";
+  std::wstring text = L"Windows " + Phrase(view.thumbnail, L"thumbnail", L"another thumbnail") + L" and " +
+                      Phrase(view.properties, L"properties", L"other properties") + L".";
   if (view.thumbnail.agreement == Agreement::kNothing) return text + L" " + CauseOfNoThumbnail(path);
   if (!IsAsExpected(view.thumbnail)) return text + L" " + CauseOfAnotherThumbnail();
   if (!IsAsExpected(view.properties)) return text + L" " + CauseOfOtherProperties();
